@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+// One way to answer the platform's questions.
+#ifndef PORT_BACKEND_BACKEND_H
+#define PORT_BACKEND_BACKEND_H
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include <coresystem_port.h>
+
+#include "DeviceInfo.h"
+#include "Settings.h"
+
+namespace port
+{
+
+class Backend
+{
+public:
+    virtual ~Backend() = default;
+
+    virtual std::string name() const = 0;
+    virtual DeviceInfo& deviceInfo() = 0;
+    virtual Settings& settings() = 0;
+
+    virtual std::string deviceFile() const
+    {
+        return {};
+    }
+    virtual std::string deviceFileProblem()
+    {
+        return {};
+    }
+    virtual std::vector<coresystem_port::Service> findServices() = 0;
+};
+
+/// The backend of this process, chosen by the first call: the simulator when CORESYSTEM_DEVICE
+/// names a device file (not in a set-user-ID process), else this machine's services.
+Backend& backend();
+
+/// The two backends there are; defined in linux/ and simulator/.
+std::unique_ptr<Backend> makeLinuxBackend();
+std::unique_ptr<Backend> makeSimulatorBackend(const std::string& deviceFile);
+
+} // namespace port
+
+#endif

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: Apache-2.0
+// A value or the reason why there is none.
+#ifndef PORT_BACKEND_RESULT_H
+#define PORT_BACKEND_RESULT_H
+
+#include <string>
+#include <utility>
+#include <variant>
+
+namespace port
+{
+
+struct Error {
+    enum class Kind {
+        NotAvailable, // no service serves it here, or the one that should did not
+        NotSupported, // this kind of device has no such thing
+    };
+    Kind kind;
+    std::string reason; // for people, without a final period
+};
+
+inline Error notAvailable(std::string reason)
+{
+    return {Error::Kind::NotAvailable, std::move(reason)};
+}
+
+inline Error notSupported(std::string reason)
+{
+    return {Error::Kind::NotSupported, std::move(reason)};
+}
+
+template <typename T>
+class Result
+{
+public:
+    Result(T value) : content_(std::move(value)) {}
+    Result(Error error) : content_(std::move(error)) {}
+
+    explicit operator bool() const
+    {
+        return std::holds_alternative<T>(content_);
+    }
+    const T& value() const
+    {
+        return std::get<T>(content_);
+    }
+    const Error& error() const
+    {
+        return std::get<Error>(content_);
+    }
+
+private:
+    std::variant<T, Error> content_;
+};
+
+// A text that a backend answers, and the service or file that served it.
+struct Fact {
+    std::string value; // no NUL inside; may be empty only where a device file says so
+    std::string source;
+};
+
+} // namespace port
+
+#endif

@@ -1,0 +1,208 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "AESCrypto.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+#include <mutex>
+
+#include <dlfcn.h>
+
+#include "cipher/CipherModule.h"
+
+using coreutil::CipherModule;
+using coreutil::Key;
+
+namespace
+{
+
+struct LoadedModule {
+    const CipherModule* cipher = nullptr;
+    std::string problem;
+};
+
+// Loaded once and never unloaded.
+const LoadedModule& cipherModule()
+{
+    static const LoadedModule& module = *new LoadedModule([] {
+        LoadedModule loaded;
+        void* const library = dlopen(COREUTIL_CIPHER_MODULE, RTLD_NOW | RTLD_LOCAL);
+        if (library != nullptr)
+            loaded.cipher =
+                static_cast<const CipherModule*>(dlsym(library, "coreutilCipherModule"));
+        if (loaded.cipher == nullptr)
+            loaded.problem = std::string("the cipher cannot be loaded: ") + dlerror();
+        return loaded;
+    }());
+    return module;
+}
+
+// One byte more than the longest good key file, so that a longer one shows.
+constexpr std::size_t KEY_FILE_LIMIT = 4096;
+
+struct CloseFile {
+    void operator()(std::FILE* file) const
+    {
+        std::fclose(file);
+    }
+};
+
+bool readKeyFile(const char* path, std::string& content, std::string& problem)
+{
+    const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path, "rbe"));
+    content.resize(KEY_FILE_LIMIT);
+    if (file)
+        content.resize(std::fread(content.data(), 1, content.size(), file.get()));
+    if (!file || std::ferror(file.get()) != 0) {
+        problem = std::string("key file ") + path + ": " + std::strerror(errno);
+        return false;
+    }
+    return true;
+}
+
+bool parseKey(const CipherModule& cipher, std::string content, Key& key)
+{
+    if (content.size() == key.size()) {
+        std::memcpy(key.data(), content.data(), key.size());
+        return true;
+    }
+    content.resize(content.find_last_not_of(" \t\r\n") + 1);
+    return content.size() == 2 * key.size() && cipher.parseHexKey(content, key);
+}
+
+bool loadKey(const char* path, Key& key, std::string& problem)
+{
+    std::string content;
+    if (!readKeyFile(path, content, problem))
+        return false;
+    const LoadedModule& module = cipherModule();
+    if (module.cipher == nullptr) {
+        problem = module.problem;
+        return false;
+    }
+    if (!parseKey(*module.cipher, content, key)) {
+        problem = std::string("key file ") + path + ": a key is 32 bytes or 64 hexadecimal digits";
+        return false;
+    }
+    return true;
+}
+
+// Guarded by one mutex: debug mode is not where speed matters.
+struct KeyState {
+    std::mutex mutex;
+    bool ready = false;
+    bool configured = false;
+    Key key{};
+    std::string problem;
+};
+
+KeyState& keyState()
+{
+    static KeyState& state = *new KeyState;
+    return state;
+}
+
+void chooseKey(KeyState& state)
+{
+    if (const char* const path = secure_getenv("CORESYSTEM_LOG_KEY");
+        path != nullptr && *path != '\0') {
+        state.configured = true;
+        loadKey(path, state.key, state.problem);
+        return;
+    }
+    const LoadedModule& module = cipherModule();
+    if (module.cipher == nullptr)
+        state.problem = module.problem;
+    else if (!module.cipher->makeRandomKey(state.key))
+        state.problem = "no random key can be made";
+}
+
+void useKey(KeyState& state, const Key& key)
+{
+    const std::lock_guard<std::mutex> lock(state.mutex);
+    state.key = key;
+    state.ready = true;
+    state.configured = true;
+    state.problem.clear();
+}
+
+// A copy of the key to work with, or the reason why there is none.
+bool currentKey(Key& key, std::string& problem)
+{
+    KeyState& state = keyState();
+    const std::lock_guard<std::mutex> lock(state.mutex);
+    if (!state.ready) {
+        chooseKey(state);
+        state.ready = true;
+    }
+    problem = state.problem;
+    if (problem.empty())
+        problem = cipherModule().problem;
+    key = state.key;
+    return problem.empty();
+}
+
+} // namespace
+
+const unsigned AESCrypto::KEY_SIZE;
+
+AESCrypto::AESCrypto() = default;
+
+AESCrypto* AESCrypto::GetInstance()
+{
+    static AESCrypto instance;
+    return &instance;
+}
+
+std::string AESCrypto::Encrypt(const std::string& plain)
+{
+    Key key;
+    std::string problem;
+    std::string text;
+    if (!currentKey(key, problem))
+        return "!" + problem;
+    return cipherModule().cipher->encrypt(key, plain, text) ? text : "!the cipher failed";
+}
+
+bool AESCrypto::Decrypt(const std::string& enciphered, std::string& plain)
+{
+    Key key;
+    std::string problem;
+    return currentKey(key, problem) && cipherModule().cipher->decrypt(key, enciphered, plain);
+}
+
+void AESCrypto::SetKey(const unsigned char* bytes)
+{
+    Key key;
+    std::memcpy(key.data(), bytes, key.size());
+    useKey(keyState(), key);
+}
+
+bool AESCrypto::LoadKeyFile(const char* path, std::string& problem)
+{
+    Key key;
+    if (!loadKey(path, key, problem))
+        return false;
+    useKey(keyState(), key);
+    return true;
+}
+
+std::string AESCrypto::GetProblem()
+{
+    Key key;
+    std::string problem;
+    currentKey(key, problem);
+    return problem;
+}
+
+bool AESCrypto::HasConfiguredKey()
+{
+    Key key;
+    std::string problem;
+    currentKey(key, problem);
+    KeyState& state = keyState();
+    const std::lock_guard<std::mutex> lock(state.mutex);
+    return state.configured;
+}

@@ -1,0 +1,73 @@
+// SPDX-License-Identifier: Apache-2.0
+/// \file
+/// What the port tells about itself: which backend answers, where an answer came from, what is
+/// missing.
+///
+/// Facts about the device are asked of CoreSystem, not here. Every function may be called from any
+/// thread and none throws anything but std::bad_alloc.
+#ifndef CORESYSTEM_PORT_H
+#define CORESYSTEM_PORT_H
+
+#include <string>
+#include <vector>
+
+#define CORESYSTEM_PORT_API __attribute__((visibility("default")))
+
+namespace coresystem_port
+{
+
+/// The questions that the platform is asked.
+enum class Question {
+    DeviceName,
+    PlatformId,
+    PlatformName,
+    PlatformVersion,
+    ModelName,
+    Language,
+};
+
+/// Where an answer came from, or why there was none.
+struct Origin {
+    bool available = false;
+    std::string source; ///< the service or file that served the answer; empty when there was none
+    std::string reason; ///< why there was no answer; empty when there was one
+};
+
+/// The origin of the last answer to a question in this process; neither source nor reason when it
+/// was not asked yet.
+CORESYSTEM_PORT_API Origin lastOrigin(Question question);
+
+/// The backend that answers: "linux" (this machine's services) or "simulator" (a device file).
+CORESYSTEM_PORT_API std::string backendName();
+
+/// The device file that the simulator reads; empty with another backend.
+CORESYSTEM_PORT_API std::string deviceFile();
+
+/// What is wrong with the device file now, as FILE:LINE:COLUMN: text where a place is known; empty
+/// when it is good or another backend answers.
+CORESYSTEM_PORT_API std::string deviceFileProblem();
+
+/// Something that the backend draws on.
+struct Service {
+    std::string name;
+    bool found = false;
+    std::string state;       ///< "running", "starts on demand", or why it is not found
+    std::string serves;      ///< what it answers
+    std::string consequence; ///< what its absence takes away
+};
+
+/// Looks for everything that the backend draws on. Waits for an unresponsive bus at most 2 seconds.
+CORESYSTEM_PORT_API std::vector<Service> findServices();
+
+/// Where log lines go.
+enum class LogSink {
+    Automatic, ///< the journal when its socket is there, else standard error
+    None,      ///< nowhere
+};
+
+/// Sets where the log lines of this process go from now on; Automatic at start.
+CORESYSTEM_PORT_API void setLogSink(LogSink sink);
+
+} // namespace coresystem_port
+
+#endif

@@ -1,0 +1,123 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "DeviceInfo.h"
+
+#include <algorithm>
+#include <array>
+
+#include "Files.h"
+#include "GLibTypes.h"
+#include "Hostname1.h"
+
+namespace port::linux_backend
+{
+namespace
+{
+
+constexpr std::size_t ID_SIZE = 16;
+using Id = std::array<guint8, ID_SIZE>;
+
+// Names this application to the hash of the machine id; drawn at random once, never changed.
+constexpr Id APPLICATION_ID = {0x6f, 0x1c, 0x7e, 0x52, 0x0b, 0x94, 0x4d, 0x3a,
+                               0xa8, 0x27, 0xe1, 0x5d, 0x93, 0x40, 0xc6, 0x7b};
+
+bool parseId(const std::string& text, Id& id)
+{
+    if (text.size() != 2 * ID_SIZE)
+        return false;
+    for (std::size_t i = 0; i < ID_SIZE; ++i) {
+        const int high = g_ascii_xdigit_value(text[2 * i]);
+        const int low = g_ascii_xdigit_value(text[2 * i + 1]);
+        if (high < 0 || low < 0)
+            return false;
+        id[i] = static_cast<guint8>(high * 16 + low);
+    }
+    return true;
+}
+
+// The machine id itself must not leave the machine: it is answered only as a keyed hash, by the
+// rule of sd_id128_get_machine_app_specific(3) (HMAC-SHA256, cut to 128 bits, marked as a version 4
+// UUID).
+Id applicationSpecific(const Id& machineId)
+{
+    std::array<guint8, 32> digest{};
+    gsize size = digest.size();
+    const Owned<GHmac> hmac(g_hmac_new(G_CHECKSUM_SHA256, machineId.data(), machineId.size()));
+    g_hmac_update(hmac.get(), APPLICATION_ID.data(), static_cast<gssize>(APPLICATION_ID.size()));
+    g_hmac_get_digest(hmac.get(), digest.data(), &size);
+
+    Id id{};
+    std::copy_n(digest.begin(), id.size(), id.begin());
+    id[6] = static_cast<guint8>((id[6] & 0x0f) | 0x40);
+    id[8] = static_cast<guint8>((id[8] & 0x3f) | 0x80);
+    return id;
+}
+
+std::string toHex(const Id& id)
+{
+    constexpr char DIGITS[] = "0123456789abcdef";
+    std::string text;
+    for (const guint8 byte : id) {
+        text += DIGITS[byte >> 4];
+        text += DIGITS[byte & 0xf];
+    }
+    return text;
+}
+
+} // namespace
+
+Result<Fact> LinuxDeviceInfo::platformId()
+{
+    for (const char* const path : {"/etc/machine-id", "/var/lib/dbus/machine-id"}) {
+        const std::optional<std::string> text = readSmallFile(root_ + path);
+        if (!text)
+            continue;
+        Id machineId{};
+        if (!parseId(*text, machineId))
+            return notAvailable(std::string(path) + " holds no machine id");
+        return Fact{toHex(applicationSpecific(machineId)), std::string(path) + " (hashed)"};
+    }
+    return notAvailable("no /etc/machine-id");
+}
+
+Result<Fact> LinuxDeviceInfo::osRelease(const char* variable)
+{
+    for (const char* const path : {"/etc/os-release", "/usr/lib/os-release"}) {
+        const std::optional<std::string> content = readSmallFile(root_ + path);
+        if (!content)
+            continue;
+        const std::string place = std::string(path) + " " + variable;
+        const std::optional<std::string> value = osReleaseVariable(*content, variable);
+        if (!value)
+            return notAvailable("no " + place);
+        return Fact{*value, place};
+    }
+    return notAvailable("no /etc/os-release");
+}
+
+Result<Fact> LinuxDeviceInfo::platformName()
+{
+    return osRelease("NAME");
+}
+
+Result<Fact> LinuxDeviceInfo::platformVersion()
+{
+    return osRelease("VERSION_ID");
+}
+
+Result<Fact> LinuxDeviceInfo::modelName()
+{
+    const Result<Variant> properties = bus_.properties(HOSTNAME1);
+    if (properties) {
+        const Result<std::string> model = textProperty(properties.value(), "HardwareModel");
+        if (model)
+            return Fact{model.value(), "hostname1 HardwareModel"};
+    }
+    for (const char* const path : {"/sys/class/dmi/id/product_name", "/proc/device-tree/model"}) {
+        const std::optional<std::string> model = readSmallFile(root_ + path);
+        if (model)
+            return Fact{*model, path};
+    }
+    return notAvailable("no hardware model from hostname1, DMI or the device tree");
+}
+
+} // namespace port::linux_backend

@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: Apache-2.0
+// A device described in a TOML file.
+#ifndef PORT_SIMULATOR_DEVICE_FILE_H
+#define PORT_SIMULATOR_DEVICE_FILE_H
+
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+
+#include "../backend/Result.h"
+
+namespace port::simulator
+{
+
+// A text of the device file and the line it stands in.
+struct Text {
+    std::string value;
+    unsigned line = 0;
+};
+
+// What a device file says: texts by section and key. A key that is absent is not there.
+using Device = std::map<std::pair<std::string, std::string>, Text>;
+
+/// Parses the text of a device file; `path` is for messages only. The error's reason is
+/// FILE:LINE:COLUMN: text.
+Result<Device> parseDevice(const std::string& text, const std::string& path);
+
+/// Reads a device file afresh whenever it is asked. Any thread.
+class DeviceFile
+{
+public:
+    explicit DeviceFile(std::string path) : path_(std::move(path)) {}
+
+    const std::string& path() const
+    {
+        return path_;
+    }
+
+    /// The device as the file describes it now; the file is parsed again only when its text
+    /// changed.
+    Result<std::shared_ptr<const Device>> device();
+
+    /// One text of it.
+    Result<Fact> text(const std::string& section, const std::string& key);
+
+private:
+    const std::string path_;
+    std::mutex mutex_;
+    std::string parsedText_;
+    std::shared_ptr<const Device> parsed_;
+};
+
+} // namespace port::simulator
+
+#endif

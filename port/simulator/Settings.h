@@ -1,0 +1,32 @@
+// SPDX-License-Identifier: Apache-2.0
+// The user's settings from the section [settings] of a device file.
+#ifndef PORT_SIMULATOR_SETTINGS_H
+#define PORT_SIMULATOR_SETTINGS_H
+
+#include "../backend/Settings.h"
+#include "DeviceFile.h"
+
+namespace port::simulator
+{
+
+class SimulatedSettings : public Settings
+{
+public:
+    explicit SimulatedSettings(DeviceFile& file) : file_(file) {}
+
+    Result<Fact> deviceName() override
+    {
+        return file_.text("settings", "device_name");
+    }
+    Result<Fact> language() override
+    {
+        return file_.text("settings", "language");
+    }
+
+private:
+    DeviceFile& file_;
+};
+
+} // namespace port::simulator
+
+#endif

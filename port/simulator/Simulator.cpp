@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: Apache-2.0
+// A device described in a TOML file.
+#include "../backend/Backend.h"
+#include "DeviceFile.h"
+#include "DeviceInfo.h"
+#include "Settings.h"
+
+namespace port::simulator
+{
+namespace
+{
+
+using coresystem_port::Service;
+
+class SimulatorBackend : public Backend
+{
+public:
+    explicit SimulatorBackend(const std::string& path) : file_(path) {}
+
+    std::string name() const override
+    {
+        return "simulator";
+    }
+    DeviceInfo& deviceInfo() override
+    {
+        return deviceInfo_;
+    }
+    Settings& settings() override
+    {
+        return settings_;
+    }
+    std::string deviceFile() const override
+    {
+        return file_.path();
+    }
+
+    std::string deviceFileProblem() override
+    {
+        const auto device = file_.device();
+        return device ? std::string() : device.error().reason;
+    }
+
+    std::vector<Service> findServices() override
+    {
+        const std::string problem = deviceFileProblem();
+        return {{file_.path(), problem.empty(), problem.empty() ? "readable" : problem,
+                 "every fact", "nothing is available"}};
+    }
+
+private:
+    DeviceFile file_;
+    SimulatedDeviceInfo deviceInfo_{file_};
+    SimulatedSettings settings_{file_};
+};
+
+} // namespace
+} // namespace port::simulator
+
+std::unique_ptr<port::Backend> port::makeSimulatorBackend(const std::string& deviceFile)
+{
+    return std::make_unique<simulator::SimulatorBackend>(deviceFile);
+}

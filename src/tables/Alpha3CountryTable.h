@@ -1,0 +1,265 @@
+// SPDX-License-Identifier: Apache-2.0
+// Mobile country code (ITU E.212), ISO 3166-1 alpha-3 code in upper case.
+// Row order is behaviour: the first row that matches answers, so rows are never sorted.
+// Same order as CallingCodeTable, with 659 between 655 and 214; no other table knows 659.
+#ifndef CORESYSTEM_TABLES_ALPHA3_COUNTRY_TABLE_H
+#define CORESYSTEM_TABLES_ALPHA3_COUNTRY_TABLE_H
+
+#include "Column.h"
+
+// clang-format off
+#define CORESYSTEM_ALPHA3_COUNTRY_ROWS(ROW) \
+    ROW("412", "AFG") \
+    ROW("276", "ALB") \
+    ROW("603", "DZA") \
+    ROW("544", "ASM") \
+    ROW("213", "AND") \
+    ROW("631", "AGO") \
+    ROW("365", "AIA") \
+    ROW("344", "ATG") \
+    ROW("722", "ARG") \
+    ROW("283", "ARM") \
+    ROW("363", "ABW") \
+    ROW("505", "AUS") \
+    ROW("232", "AUT") \
+    ROW("400", "AZE") \
+    ROW("364", "BHS") \
+    ROW("426", "BHR") \
+    ROW("470", "BGD") \
+    ROW("342", "BRB") \
+    ROW("257", "BLR") \
+    ROW("206", "BEL") \
+    ROW("702", "BLZ") \
+    ROW("616", "BEN") \
+    ROW("350", "BMU") \
+    ROW("402", "BTN") \
+    ROW("736", "BOL") \
+    ROW("218", "BIH") \
+    ROW("652", "BWA") \
+    ROW("724", "BRA") \
+    ROW("528", "BRN") \
+    ROW("284", "BGR") \
+    ROW("613", "BFA") \
+    ROW("642", "BDI") \
+    ROW("456", "KHM") \
+    ROW("624", "CMR") \
+    ROW("302", "CAN") \
+    ROW("625", "CPV") \
+    ROW("346", "CYM") \
+    ROW("623", "CAF") \
+    ROW("622", "TCD") \
+    ROW("730", "CHL") \
+    ROW("460", "CHN") \
+    ROW("461", "CHN") \
+    ROW("732", "COL") \
+    ROW("654", "COM") \
+    ROW("629", "COG") \
+    ROW("630", "COD") \
+    ROW("548", "COK") \
+    ROW("712", "CRI") \
+    ROW("612", "CIV") \
+    ROW("219", "HRV") \
+    ROW("368", "CUB") \
+    ROW("280", "CYP") \
+    ROW("230", "CZE") \
+    ROW("238", "DNK") \
+    ROW("638", "DJI") \
+    ROW("366", "DMA") \
+    ROW("370", "DOM") \
+    ROW("740", "ECU") \
+    ROW("602", "EGY") \
+    ROW("706", "SLV") \
+    ROW("627", "GNQ") \
+    ROW("657", "ERI") \
+    ROW("248", "EST") \
+    ROW("636", "ETH") \
+    ROW("750", "FLK") \
+    ROW("288", "FRO") \
+    ROW("542", "FJI") \
+    ROW("244", "FIN") \
+    ROW("208", "FRA") \
+    ROW("742", "GUF") \
+    ROW("547", "PYF") \
+    ROW("628", "GAB") \
+    ROW("607", "GMB") \
+    ROW("282", "GEO") \
+    ROW("262", "DEU") \
+    ROW("620", "GHA") \
+    ROW("266", "GIB") \
+    ROW("202", "GRC") \
+    ROW("290", "GRL") \
+    ROW("352", "GRD") \
+    ROW("340", "GLP") \
+    ROW("535", "GUM") \
+    ROW("704", "GTM") \
+    ROW("611", "GIN") \
+    ROW("632", "GNB") \
+    ROW("738", "GUY") \
+    ROW("372", "HTI") \
+    ROW("708", "HND") \
+    ROW("454", "HKG") \
+    ROW("216", "HUN") \
+    ROW("274", "ISL") \
+    ROW("404", "IND") \
+    ROW("405", "IND") \
+    ROW("510", "IDN") \
+    ROW("432", "IRN") \
+    ROW("418", "IRQ") \
+    ROW("272", "IRL") \
+    ROW("425", "ISR") \
+    ROW("222", "ITA") \
+    ROW("338", "JAM") \
+    ROW("441", "JPN") \
+    ROW("440", "JPN") \
+    ROW("416", "JOR") \
+    ROW("401", "KAZ") \
+    ROW("639", "KEN") \
+    ROW("545", "KIR") \
+    ROW("467", "PRK") \
+    ROW("450", "KOR") \
+    ROW("419", "KWT") \
+    ROW("437", "KGZ") \
+    ROW("457", "LAO") \
+    ROW("247", "LVA") \
+    ROW("415", "LBN") \
+    ROW("651", "LSO") \
+    ROW("618", "LBR") \
+    ROW("606", "LBY") \
+    ROW("295", "LIE") \
+    ROW("246", "LTU") \
+    ROW("270", "LUX") \
+    ROW("455", "MAC") \
+    ROW("294", "MKD") \
+    ROW("646", "MDG") \
+    ROW("650", "MWI") \
+    ROW("502", "MYS") \
+    ROW("472", "MDV") \
+    ROW("610", "MLI") \
+    ROW("278", "MLT") \
+    ROW("551", "MHL") \
+    ROW("340", "MTQ") \
+    ROW("609", "MRT") \
+    ROW("617", "MUS") \
+    ROW("334", "MEX") \
+    ROW("550", "FSM") \
+    ROW("259", "MDA") \
+    ROW("212", "MCO") \
+    ROW("428", "MNG") \
+    ROW("297", "MNE") \
+    ROW("354", "MSR") \
+    ROW("604", "MAR") \
+    ROW("643", "MOZ") \
+    ROW("414", "MMR") \
+    ROW("649", "NAM") \
+    ROW("536", "NRU") \
+    ROW("429", "NPL") \
+    ROW("204", "NLD") \
+    ROW("362", "ANT") \
+    ROW("546", "NCL") \
+    ROW("530", "NZL") \
+    ROW("710", "NIC") \
+    ROW("614", "NER") \
+    ROW("621", "NGA") \
+    ROW("555", "NIU") \
+    ROW("534", "MNP") \
+    ROW("242", "NOR") \
+    ROW("422", "OMN") \
+    ROW("410", "PAK") \
+    ROW("552", "PLW") \
+    ROW("423", "PSE") \
+    ROW("714", "PAN") \
+    ROW("537", "PNG") \
+    ROW("744", "PRY") \
+    ROW("716", "PER") \
+    ROW("515", "PHL") \
+    ROW("260", "POL") \
+    ROW("268", "PRT") \
+    ROW("330", "PRI") \
+    ROW("427", "QAT") \
+    ROW("647", "REU") \
+    ROW("226", "ROU") \
+    ROW("250", "RUS") \
+    ROW("635", "RWA") \
+    ROW("356", "KNA") \
+    ROW("358", "LCA") \
+    ROW("308", "SPM") \
+    ROW("360", "VCT") \
+    ROW("549", "WSM") \
+    ROW("292", "SMR") \
+    ROW("626", "STP") \
+    ROW("420", "SAU") \
+    ROW("608", "SEN") \
+    ROW("220", "SRB") \
+    ROW("633", "SYC") \
+    ROW("619", "SLE") \
+    ROW("525", "SGP") \
+    ROW("231", "SVK") \
+    ROW("293", "SVN") \
+    ROW("540", "SLB") \
+    ROW("637", "SOM") \
+    ROW("655", "ZAF") \
+    ROW("659", "SSD") \
+    ROW("214", "ESP") \
+    ROW("413", "LKA") \
+    ROW("634", "SDN") \
+    ROW("746", "SUR") \
+    ROW("653", "SWZ") \
+    ROW("240", "SWE") \
+    ROW("228", "CHE") \
+    ROW("417", "SYR") \
+    ROW("466", "TWN") \
+    ROW("436", "TJK") \
+    ROW("640", "TZA") \
+    ROW("520", "THA") \
+    ROW("514", "TLS") \
+    ROW("615", "TGO") \
+    ROW("539", "TON") \
+    ROW("374", "TTO") \
+    ROW("605", "TUN") \
+    ROW("286", "TUR") \
+    ROW("438", "TKM") \
+    ROW("376", "TCA") \
+    ROW("553", "TUV") \
+    ROW("641", "UGA") \
+    ROW("255", "UKR") \
+    ROW("424", "ARE") \
+    ROW("430", "ARE") \
+    ROW("431", "ARE") \
+    ROW("234", "GBR") \
+    ROW("235", "GBR") \
+    ROW("310", "USA") \
+    ROW("311", "USA") \
+    ROW("312", "USA") \
+    ROW("313", "USA") \
+    ROW("314", "USA") \
+    ROW("315", "USA") \
+    ROW("316", "USA") \
+    ROW("748", "URY") \
+    ROW("434", "UZB") \
+    ROW("541", "VUT") \
+    ROW("225", "VAT") \
+    ROW("734", "VEN") \
+    ROW("452", "VNM") \
+    ROW("348", "VGB") \
+    ROW("332", "VIR") \
+    ROW("543", "WLF") \
+    ROW("421", "YEM") \
+    ROW("645", "ZMB") \
+    ROW("648", "ZWE")
+// clang-format on
+
+namespace coresystem
+{
+namespace Alpha3CountryTable
+{
+
+constexpr std::size_t ROWS = 0 CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
+static_assert(ROWS == 237, "a row was added or lost");
+
+constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_CELL_1_OF_2)}};
+constexpr Column<ROWS, 4> ALPHA3 = {{CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_CELL_2_OF_2)}};
+
+} // namespace Alpha3CountryTable
+} // namespace coresystem
+
+#endif
