@@ -31,8 +31,7 @@
 /// a failure. No method throws.
 ///
 /// Threads. Every method may be called from any thread at any time.
-class CoreSystem
-{
+class CoreSystem {
 public:
     /// The one instance, made by the first call and never destroyed; null if allocation failed.
     CORESYSTEM_API static CoreSystem* GetInstance();

@@ -12,8 +12,7 @@
 ///
 /// A converter writes a `strdup` copy into its slot, which the caller frees with `free`, or null
 /// and an error line when no row matches.
-class SimManager
-{
+class SimManager {
 public:
     /// The one instance, made by the first call; null if allocation failed. Any thread.
     static SimManager* GetInstance();

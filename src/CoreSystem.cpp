@@ -17,8 +17,7 @@
 
 using namespace coresystem;
 
-namespace
-{
+namespace {
 
 const char* const DEFAULT_LANGUAGE = "en_us";
 

@@ -41,8 +41,7 @@
 
 #define ERROR_LINE(...) ::coresystem::writeErrorLine(LOG_SITE, LOG_PREFIX __VA_ARGS__)
 
-namespace coresystem
-{
+namespace coresystem {
 
 // Where a log statement stands.
 struct LogSite {

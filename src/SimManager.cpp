@@ -13,8 +13,7 @@
 
 using namespace coresystem;
 
-namespace
-{
+namespace {
 
 // The texts of one converter's lines, and where they are logged from.
 struct ConversionLines {

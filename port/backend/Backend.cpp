@@ -3,8 +3,7 @@
 
 #include <cstdlib>
 
-namespace
-{
+namespace {
 
 std::unique_ptr<port::Backend> chooseBackend()
 {

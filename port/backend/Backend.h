@@ -12,11 +12,9 @@
 #include "DeviceInfo.h"
 #include "Settings.h"
 
-namespace port
-{
+namespace port {
 
-class Backend
-{
+class Backend {
 public:
     virtual ~Backend() = default;
 

@@ -5,11 +5,9 @@
 
 #include "Result.h"
 
-namespace port
-{
+namespace port {
 
-class DeviceInfo
-{
+class DeviceInfo {
 public:
     virtual ~DeviceInfo() = default;
 

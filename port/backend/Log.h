@@ -5,11 +5,9 @@
 
 #include <string>
 
-namespace port
-{
+namespace port {
 
-class Log
-{
+class Log {
 public:
     virtual ~Log() = default;
 

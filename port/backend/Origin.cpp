@@ -4,8 +4,7 @@
 #include <map>
 #include <mutex>
 
-namespace
-{
+namespace {
 
 std::mutex mutex;
 

@@ -7,8 +7,7 @@
 
 #include "Result.h"
 
-namespace port
-{
+namespace port {
 
 void recordOrigin(coresystem_port::Question question, const Result<Fact>& answer);
 

@@ -7,8 +7,7 @@
 #include <utility>
 #include <variant>
 
-namespace port
-{
+namespace port {
 
 struct Error {
     enum class Kind {
@@ -30,8 +29,7 @@ inline Error notSupported(std::string reason)
 }
 
 template <typename T>
-class Result
-{
+class Result {
 public:
     Result(T value) : content_(std::move(value)) {}
     Result(Error error) : content_(std::move(error)) {}

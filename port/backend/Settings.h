@@ -5,11 +5,9 @@
 
 #include "Result.h"
 
-namespace port
-{
+namespace port {
 
-class Settings
-{
+class Settings {
 public:
     virtual ~Settings() = default;
 

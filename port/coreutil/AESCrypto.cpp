@@ -15,8 +15,7 @@
 using coreutil::CipherModule;
 using coreutil::Key;
 
-namespace
-{
+namespace {
 
 struct LoadedModule {
     const CipherModule* cipher = nullptr;

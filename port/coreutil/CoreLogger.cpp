@@ -7,8 +7,7 @@
 #include <set>
 #include <string>
 
-namespace
-{
+namespace {
 
 std::atomic<int> debugMode{0};
 std::atomic<const char*> logTag{nullptr};

@@ -11,8 +11,7 @@
 #include "CoreMutex.h"
 #include "CoreMutexLock.h"
 
-namespace
-{
+namespace {
 
 struct Entry {
     const std::string name;

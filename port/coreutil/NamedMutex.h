@@ -5,8 +5,7 @@
 
 #include <mutex>
 
-namespace coreutil
-{
+namespace coreutil {
 
 /// The mutex known by a name in this process; made on first use, never destroyed. Null means "".
 std::recursive_mutex& namedMutex(const char* name);

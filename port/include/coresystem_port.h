@@ -13,8 +13,7 @@
 
 #define CORESYSTEM_PORT_API __attribute__((visibility("default")))
 
-namespace coresystem_port
-{
+namespace coresystem_port {
 
 /// The questions that the platform is asked.
 enum class Question {

@@ -3,10 +3,8 @@
 
 #include <algorithm>
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 constexpr BusObject BUS_ITSELF = {"org.freedesktop.DBus", "/org/freedesktop/DBus",
                                   "org.freedesktop.DBus"};
@@ -18,8 +16,7 @@ std::string messageOf(GError& error)
 }
 
 // Connecting has no time-out of its own: a timer on a private main context cancels it.
-class TimedConnect
-{
+class TimedConnect {
 public:
     explicit TimedConnect(const char* address)
         : context_(g_main_context_new()), cancellable_(g_cancellable_new()),

@@ -13,8 +13,7 @@
 #include "../backend/Result.h"
 #include "GLibTypes.h"
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
 using Connection = std::shared_ptr<GDBusConnection>;
 using Variant = std::shared_ptr<GVariant>;
@@ -26,8 +25,7 @@ struct BusObject {
     const char* interface;
 };
 
-class Bus
-{
+class Bus {
 public:
     /// How long a connection and a call may take.
     static constexpr int CONNECT_TIMEOUT_MS = 500;

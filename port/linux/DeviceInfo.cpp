@@ -8,10 +8,8 @@
 #include "GLibTypes.h"
 #include "Hostname1.h"
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 constexpr std::size_t ID_SIZE = 16;
 using Id = std::array<guint8, ID_SIZE>;

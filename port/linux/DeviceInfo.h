@@ -6,11 +6,9 @@
 #include "../backend/DeviceInfo.h"
 #include "Bus.h"
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
-class LinuxDeviceInfo : public DeviceInfo
-{
+class LinuxDeviceInfo : public DeviceInfo {
 public:
     /// `root` stands before every path that is read; "" for this machine.
     LinuxDeviceInfo(Bus& bus, std::string root) : bus_(bus), root_(std::move(root)) {}

@@ -11,16 +11,13 @@
 
 #include "GLibTypes.h"
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 constexpr std::size_t LIMIT = 64 * 1024;
 
 // A descriptor that closes itself.
-class File
-{
+class File {
 public:
     // Never waits for the writer of a pipe.
     explicit File(const std::string& path)

@@ -6,8 +6,7 @@
 #include <optional>
 #include <string>
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
 /// The text of a file up to its first NUL, without white space at its end; nothing when it cannot
 /// be read, is empty, is no regular file or is larger than 64 KiB.

@@ -7,8 +7,7 @@
 
 #include <gio/gio.h>
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
 struct GLibRelease {
     void operator()(GError* error) const
@@ -51,8 +50,7 @@ using Owned = std::unique_ptr<T, GLibRelease>;
 
 // Receives an out-parameter of a GLib call: `call(…, Out(error))`.
 template <typename T>
-class Out
-{
+class Out {
 public:
     explicit Out(Owned<T>& target) : target_(target) {}
     ~Out()

@@ -5,8 +5,7 @@
 
 #include "Bus.h"
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
 constexpr BusObject HOSTNAME1 = {"org.freedesktop.hostname1", "/org/freedesktop/hostname1",
                                  "org.freedesktop.hostname1"};

@@ -8,15 +8,12 @@
 #include "Locale1.h"
 #include "Settings.h"
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 using coresystem_port::Service;
 
-class LinuxBackend : public Backend
-{
+class LinuxBackend : public Backend {
 public:
     std::string name() const override
     {

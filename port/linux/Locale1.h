@@ -5,8 +5,7 @@
 
 #include "Bus.h"
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
 constexpr BusObject LOCALE1 = {"org.freedesktop.locale1", "/org/freedesktop/locale1",
                                "org.freedesktop.locale1"};

@@ -12,10 +12,8 @@
 
 #include "GLibTypes.h"
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 // One row per log_priority: the letter of the brief form and the journal's PRIORITY (syslog(3)).
 struct Priority {
@@ -60,8 +58,7 @@ bool writeToStandardError(const Priority& priority, const std::string& tag, cons
 
 std::atomic<bool> silent{false};
 
-class MachineLog : public Log
-{
+class MachineLog : public Log {
 public:
     bool write(int priority, const std::string& tag, const std::string& text) override
     {

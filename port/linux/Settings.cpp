@@ -9,10 +9,8 @@
 #include "Hostname1.h"
 #include "Locale1.h"
 
-namespace port::linux_backend
-{
-namespace
-{
+namespace port::linux_backend {
+namespace {
 
 // language_REGION.codeset, without an @modifier; nothing for an empty text.
 std::optional<std::string> localeName(const std::string& text)

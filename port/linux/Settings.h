@@ -6,11 +6,9 @@
 #include "../backend/Settings.h"
 #include "Bus.h"
 
-namespace port::linux_backend
-{
+namespace port::linux_backend {
 
-class LinuxSettings : public Settings
-{
+class LinuxSettings : public Settings {
 public:
     explicit LinuxSettings(Bus& bus) : bus_(bus) {}
 

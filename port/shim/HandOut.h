@@ -11,8 +11,7 @@
 #include "../backend/Origin.h"
 #include "../backend/Result.h"
 
-namespace port
-{
+namespace port {
 
 // The platform's code for a backend's error.
 inline int errorCode(Error::Kind kind, int notSupportedCode)

@@ -8,8 +8,7 @@
 #include "../backend/Log.h"
 #include "HandOut.h"
 
-namespace
-{
+namespace {
 
 // The formatted text; empty and false when the format is no good.
 bool format(std::string& text, const char* fmt, va_list arguments)

@@ -6,8 +6,7 @@
 #include "../backend/Backend.h"
 #include "HandOut.h"
 
-namespace
-{
+namespace {
 
 using coresystem_port::Question;
 using port::DeviceInfo;

@@ -9,10 +9,8 @@
 #include <toml++/toml.h>
 #include <unistd.h>
 
-namespace port::simulator
-{
-namespace
-{
+namespace port::simulator {
+namespace {
 
 constexpr long SCHEMA = 1;
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024;

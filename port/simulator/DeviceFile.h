@@ -10,8 +10,7 @@
 
 #include "../backend/Result.h"
 
-namespace port::simulator
-{
+namespace port::simulator {
 
 // A text of the device file and the line it stands in.
 struct Text {
@@ -27,8 +26,7 @@ using Device = std::map<std::pair<std::string, std::string>, Text>;
 Result<Device> parseDevice(const std::string& text, const std::string& path);
 
 /// Reads a device file afresh whenever it is asked. Any thread.
-class DeviceFile
-{
+class DeviceFile {
 public:
     explicit DeviceFile(std::string path) : path_(std::move(path)) {}
 

@@ -6,11 +6,9 @@
 #include "../backend/DeviceInfo.h"
 #include "DeviceFile.h"
 
-namespace port::simulator
-{
+namespace port::simulator {
 
-class SimulatedDeviceInfo : public DeviceInfo
-{
+class SimulatedDeviceInfo : public DeviceInfo {
 public:
     explicit SimulatedDeviceInfo(DeviceFile& file) : file_(file) {}
 

@@ -6,11 +6,9 @@
 #include "../backend/Settings.h"
 #include "DeviceFile.h"
 
-namespace port::simulator
-{
+namespace port::simulator {
 
-class SimulatedSettings : public Settings
-{
+class SimulatedSettings : public Settings {
 public:
     explicit SimulatedSettings(DeviceFile& file) : file_(file) {}
 

@@ -5,15 +5,12 @@
 #include "DeviceInfo.h"
 #include "Settings.h"
 
-namespace port::simulator
-{
-namespace
-{
+namespace port::simulator {
+namespace {
 
 using coresystem_port::Service;
 
-class SimulatorBackend : public Backend
-{
+class SimulatorBackend : public Backend {
 public:
     explicit SimulatorBackend(const std::string& path) : file_(path) {}
 

@@ -248,10 +248,8 @@
     ROW("648", "ZWE")
 // clang-format on
 
-namespace coresystem
-{
-namespace Alpha3CountryTable
-{
+namespace coresystem {
+namespace Alpha3CountryTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 237, "a row was added or lost");

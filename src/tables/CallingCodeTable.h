@@ -247,10 +247,8 @@
     ROW("648", "263")
 // clang-format on
 
-namespace coresystem
-{
-namespace CallingCodeTable
-{
+namespace coresystem {
+namespace CallingCodeTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_CALLING_CODE_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 236, "a row was added or lost");

@@ -19,8 +19,7 @@
 #define CORESYSTEM_CELL_2_OF_3(first, second, third) second,
 #define CORESYSTEM_CELL_3_OF_3(first, second, third) third,
 
-namespace coresystem
-{
+namespace coresystem {
 
 // Rows that are compared at once.
 constexpr std::size_t SCAN_BLOCK = 16;

@@ -169,10 +169,8 @@
     ROW("hin", "HI")
 // clang-format on
 
-namespace coresystem
-{
-namespace LanguageCodeTable
-{
+namespace coresystem {
+namespace LanguageCodeTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_LANGUAGE_CODE_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 159, "a row was added or lost");

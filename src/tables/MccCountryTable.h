@@ -247,10 +247,8 @@
     ROW("648", "zw", "Zimbabwe")
 // clang-format on
 
-namespace coresystem
-{
-namespace MccCountryTable
-{
+namespace coresystem {
+namespace MccCountryTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 236, "a row was added or lost");

@@ -58,10 +58,8 @@
     ROW("316", "us", "United States of America")
 // clang-format on
 
-namespace coresystem
-{
-namespace MoSupportMccTable
-{
+namespace coresystem {
+namespace MoSupportMccTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_MO_SUPPORT_MCC_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 48, "a row was added or lost");

@@ -145,10 +145,8 @@
     ROW("744", "es_PY")
 // clang-format on
 
-namespace coresystem
-{
-namespace ServiceCountryTable
-{
+namespace coresystem {
+namespace ServiceCountryTable {
 
 constexpr std::size_t ROWS = 0 CORESYSTEM_SERVICE_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
 static_assert(ROWS == 134, "a row was added or lost");

@@ -8,8 +8,7 @@
 #include <openssl/evp.h>
 #include <openssl/rand.h>
 
-namespace
-{
+namespace {
 
 using coreutil::Key;
 

@@ -7,8 +7,7 @@
 #include <array>
 #include <string>
 
-namespace coreutil
-{
+namespace coreutil {
 
 using Key = std::array<unsigned char, 32>;
 

@@ -12,8 +12,7 @@
 /// CORESYSTEM_LOG_KEY names (ignored in a set-user-ID process). With none of them a random key is
 /// made for this process: what it enciphers cannot be read later. A key file that was named and
 /// cannot be used is never replaced by another key. The key is never logged. Any thread.
-class AESCrypto
-{
+class AESCrypto {
 public:
     /// Bytes of a key.
     static const unsigned KEY_SIZE = 32;

@@ -9,8 +9,7 @@
 ///
 /// The environment sets the start values (ignored in a set-user-ID process): CORESYSTEM_LOG_DEBUG=1
 /// switches debug mode on, CORESYSTEM_LOG_TAG=TAG sets the application's tag.
-class CoreLogger
-{
+class CoreLogger {
 public:
     /// The one logger; never null.
     static CoreLogger* GetInstance();

@@ -10,8 +10,7 @@
 /// take it again and releases it as often. So an application that holds one of these names, in a
 /// callback say, can call a library that takes it too without a deadlock. A null name is the name
 /// "".
-class CoreMutex
-{
+class CoreMutex {
 public:
     /// Finds or makes the mutex; does not lock it. The name is copied.
     explicit CoreMutex(const char* name);

@@ -5,8 +5,7 @@
 #define COREUTIL_CORE_MUTEX_LOCK_H
 
 /// Holds the mutex of a name (see CoreMutex) from construction to destruction.
-class CoreMutexLock
-{
+class CoreMutexLock {
 public:
     explicit CoreMutexLock(const char* name);
     ~CoreMutexLock();

@@ -7,8 +7,7 @@
 #include <string>
 
 /// Small conversions; stateless, any thread.
-class CoreUtil
-{
+class CoreUtil {
 public:
     /// The one instance; never null.
     static CoreUtil* GetInstance();
