@@ -67,6 +67,9 @@ enum class LogSink {
 /// Sets where the log lines of this process go from now on; Automatic at start.
 CORESYSTEM_PORT_API void setLogSink(LogSink sink);
 
+/// Where LogSink::Automatic leads now: "journal" or "standard error".
+CORESYSTEM_PORT_API std::string automaticLogSink();
+
 } // namespace coresystem_port
 
 #endif

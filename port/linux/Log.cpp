@@ -56,6 +56,11 @@ bool writeToStandardError(const Priority& priority, const std::string& tag, cons
     return write(STDERR_FILENO, line.data(), line.size()) == static_cast<ssize_t>(line.size());
 }
 
+bool journalIsThere()
+{
+    return access("/run/systemd/journal/socket", W_OK) == 0;
+}
+
 std::atomic<bool> silent{false};
 
 class MachineLog : public Log {
@@ -65,8 +70,8 @@ public:
         if (silent)
             return true;
         const Priority& row = rowOf(priority);
-        const bool journal = access("/run/systemd/journal/socket", W_OK) == 0;
-        return (journal && writeToJournal(row, tag, text)) || writeToStandardError(row, tag, text);
+        return (journalIsThere() && writeToJournal(row, tag, text)) ||
+               writeToStandardError(row, tag, text);
     }
 };
 
@@ -82,4 +87,9 @@ port::Log& port::processLog()
 void coresystem_port::setLogSink(LogSink sink)
 {
     port::linux_backend::silent = sink == LogSink::None;
+}
+
+std::string coresystem_port::automaticLogSink()
+{
+    return port::linux_backend::journalIsThere() ? "journal" : "standard error";
 }
