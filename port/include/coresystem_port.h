@@ -60,8 +60,9 @@ CORESYSTEM_PORT_API std::vector<Service> findServices();
 
 /// Where log lines go.
 enum class LogSink {
-    Automatic, ///< the journal when its socket is there, else standard error
-    None,      ///< nowhere
+    Automatic,     ///< the journal when its socket is there, else standard error
+    StandardError, ///< standard error, whatever is there
+    None,          ///< nowhere
 };
 
 /// Sets where the log lines of this process go from now on; Automatic at start.

@@ -61,17 +61,19 @@ bool journalIsThere()
     return access("/run/systemd/journal/socket", W_OK) == 0;
 }
 
-std::atomic<bool> silent{false};
+using coresystem_port::LogSink;
+std::atomic<LogSink> chosenSink{LogSink::Automatic};
 
 class MachineLog : public Log {
 public:
     bool write(int priority, const std::string& tag, const std::string& text) override
     {
-        if (silent)
+        const LogSink sink = chosenSink;
+        if (sink == LogSink::None)
             return true;
         const Priority& row = rowOf(priority);
-        return (journalIsThere() && writeToJournal(row, tag, text)) ||
-               writeToStandardError(row, tag, text);
+        const bool journal = sink == LogSink::Automatic && journalIsThere();
+        return (journal && writeToJournal(row, tag, text)) || writeToStandardError(row, tag, text);
     }
 };
 
@@ -86,7 +88,7 @@ port::Log& port::processLog()
 
 void coresystem_port::setLogSink(LogSink sink)
 {
-    port::linux_backend::silent = sink == LogSink::None;
+    port::linux_backend::chosenSink = sink;
 }
 
 std::string coresystem_port::automaticLogSink()
