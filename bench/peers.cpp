@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: Apache-2.0
+// The same questions to others: a ready-built hash map of the same rows, libphonenumber, ICU.
+// Their answers are handed out as ours are, in memory that the caller frees, except where the peer
+// fills the caller's own string. None of them takes a lock or has a debug line.
+#include "Cases.h"
+
+#include <cstdlib>
+#include <cstring>
+#include <string_view>
+#include <unordered_map>
+
+#include <phonenumbers/phonenumberutil.h>
+#include <unicode/uloc.h>
+
+#include "tables/Alpha3CountryTable.h"
+#include "tables/CallingCodeTable.h"
+#include "tables/MccCountryTable.h"
+#include "tables/ServiceCountryTable.h"
+
+using namespace coresystem;
+using i18n::phonenumbers::PhoneNumberUtil;
+
+namespace bench {
+namespace {
+
+// The first row of a key answers, as in the scan.
+template <class Keys, class Values>
+void addHashMap(const std::string& question, const Keys& keys, const Values& values,
+                const char* noMatch)
+{
+    std::unordered_map<std::string_view, const char*> map;
+    for (std::size_t row = 0; row < Keys::rows; ++row)
+        map.emplace(keys.cells[row], values.cells[row]);
+    addRounds("hash map " + question, roundsOf(textsOf(keys), noMatch), [map](const char* key) {
+        const auto found = map.find(key);
+        char* const answer = found != map.end() ? strdup(found->second) : nullptr;
+        benchmark::DoNotOptimize(answer);
+        std::free(answer);
+    });
+}
+
+void addHashMaps()
+{
+    namespace Mcc = MccCountryTable;
+    namespace Service = ServiceCountryTable;
+    namespace Calling = CallingCodeTable;
+    namespace Alpha3 = Alpha3CountryTable;
+    addHashMap("GetCountryCodeFromMcc", Mcc::MCC, Mcc::ALPHA2, "999");
+    addHashMap("GetCountryNameFromMcc", Mcc::MCC, Mcc::NAME, "999");
+    addHashMap("GetMccFromCountryCode", Mcc::ALPHA2, Mcc::MCC, "zz");
+    addHashMap("GetMccFromServiceCountryCode", Service::LOCALE, Service::MCC, "zz_ZZ");
+    addHashMap("GetServiceCountryCodeFromMcc", Service::MCC, Service::LOCALE, "999");
+    addHashMap("GetCountryCallingCodeFromMcc", Calling::MCC, Calling::CALLING_CODE, "999");
+    addHashMap("GetAlpha3CountryCodeFromMcc", Alpha3::MCC, Alpha3::ALPHA3, "999");
+    addHashMap("GetMccFromCountryCallingCode", Calling::CALLING_CODE, Calling::MCC, "999");
+}
+
+std::string upper(std::string text)
+{
+    for (char& character : text)
+        character = static_cast<char>(character - 'a' + 'A');
+    return text;
+}
+
+// Alpha-2 codes as a peer spells them.
+std::vector<std::string> regions(const char* prefix)
+{
+    std::vector<std::string> texts;
+    for (const char* const alpha2 : textsOf(MccCountryTable::ALPHA2))
+        texts.push_back(prefix + upper(alpha2));
+    return texts;
+}
+
+std::vector<int> callingCodes()
+{
+    std::vector<int> codes;
+    for (const char* const code : textsOf(CallingCodeTable::CALLING_CODE))
+        codes.push_back(std::atoi(code));
+    return codes;
+}
+
+void addLibphonenumber()
+{
+    const PhoneNumberUtil* const util = PhoneNumberUtil::GetInstance();
+    addRounds("libphonenumber GetRegionCodeForCountryCode", roundsOf(callingCodes(), 999),
+              [util](int code) {
+                  std::string region;
+                  util->GetRegionCodeForCountryCode(code, &region);
+                  benchmark::DoNotOptimize(region);
+              });
+    addRounds("libphonenumber GetCountryCodeForRegion", roundsOf(regions(""), std::string("ZZ")),
+              [util](const std::string& region) {
+                  benchmark::DoNotOptimize(util->GetCountryCodeForRegion(region));
+              });
+}
+
+void addIcu()
+{
+    const auto locales = roundsOf(regions("_"), std::string("_ZZ"));
+    addRounds("ICU uloc_getISO3Country", locales, [](const std::string& locale) {
+        benchmark::DoNotOptimize(uloc_getISO3Country(locale.c_str()));
+    });
+    addRounds("ICU uloc_getDisplayCountry", locales, [](const std::string& locale) {
+        UChar name[64];
+        UErrorCode error = U_ZERO_ERROR;
+        uloc_getDisplayCountry(locale.c_str(), "en", name, 64, &error);
+        benchmark::DoNotOptimize(name);
+    });
+}
+
+} // namespace
+} // namespace bench
+
+void bench::addPeers()
+{
+    addHashMaps();
+    addLibphonenumber();
+    addIcu();
+}
