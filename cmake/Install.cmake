@@ -1,0 +1,34 @@
+# What is installed: the libraries, the public headers, and what lets others find them, by
+# find_package(coresystem) and by pkg-config.
+include(CMakePackageConfigHelpers)
+
+set_target_properties(platform PROPERTIES EXPORT_NAME port)
+
+install(TARGETS coresystem platform coreutil EXPORT coresystem)
+# Loaded by the utility library from beside itself; nobody links with it.
+install(TARGETS coreutil_cipher LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+
+install(FILES ${PROJECT_SOURCE_DIR}/include/CoreSystem.h
+              ${PROJECT_SOURCE_DIR}/port/include/coresystem_port.h TYPE INCLUDE)
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/port/coreutil/include/
+        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/coreutil FILES_MATCHING PATTERN "*.h")
+
+set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/coresystem)
+install(EXPORT coresystem NAMESPACE coresystem:: FILE coresystemConfig.cmake
+        DESTINATION ${package_dir})
+write_basic_package_version_file(${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake
+                                 COMPATIBILITY SameMajorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake DESTINATION ${package_dir})
+
+# Writes NAME.pc; it holds no absolute path, so an installed tree can be moved.
+function(coresystem_install_pkg_config name library description)
+  set(pkg_config_dir ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+  file(RELATIVE_PATH up /${pkg_config_dir} /)
+  string(REGEX REPLACE "/$" "" up "${up}")
+  configure_file(${PROJECT_SOURCE_DIR}/cmake/package.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
+  install(FILES ${PROJECT_BINARY_DIR}/${name}.pc DESTINATION ${pkg_config_dir})
+endfunction()
+coresystem_install_pkg_config(coresystem coresystem "${PROJECT_DESCRIPTION}")
+coresystem_install_pkg_config(coresystem-port coresystem-port
+  "Which backend answers on this machine, and where answers come from")
+coresystem_install_pkg_config(coreutil coreutil "Logger state, log cipher and named mutexes")
