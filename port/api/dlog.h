@@ -35,7 +35,7 @@ typedef enum {
 } dlog_error_e;
 
 /* Writes one line, printf style; the length of the text, or a negative code. Any thread. */
-int __dlog_print(log_id_t log_id, int prio, const char *tag, const char *fmt, ...);
+int __dlog_print(log_id_t log_id, int prio, const char* tag, const char* fmt, ...);
 
 #ifdef __cplusplus
 }

@@ -18,10 +18,11 @@ typedef enum {
 } system_info_error_e;
 
 /*
- * Reads the string value of a key; *value is malloc memory that the caller frees, untouched on failure.
- * INVALID_PARAMETER: unknown key or null argument; IO_ERROR: the value cannot be read. Any thread.
+ * Reads the string value of a key; *value is malloc memory that the caller frees, untouched on
+ * failure. INVALID_PARAMETER: unknown key or null argument; IO_ERROR: the value cannot be read. Any
+ * thread.
  */
-int system_info_get_platform_string(const char *key, char **value);
+int system_info_get_platform_string(const char* key, char** value);
 
 #ifdef __cplusplus
 }

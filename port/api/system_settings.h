@@ -54,10 +54,10 @@ typedef enum {
 
 /*
  * Reads a string setting; *value is malloc memory that the caller frees, untouched on failure.
- * INVALID_PARAMETER: unknown key, a key of another type or a null argument; IO_ERROR: the setting cannot
- * be read; NOT_SUPPORTED: this device has no such setting. Any thread.
+ * INVALID_PARAMETER: unknown key, a key of another type or a null argument; IO_ERROR: the setting
+ * cannot be read; NOT_SUPPORTED: this device has no such setting. Any thread.
  */
-int system_settings_get_value_string(system_settings_key_e key, char **value);
+int system_settings_get_value_string(system_settings_key_e key, char** value);
 
 #ifdef __cplusplus
 }

@@ -51,6 +51,15 @@ private:
     std::variant<T, Error> content_;
 };
 
+// A second source's answer after a first one failed: the reason names both when there is none.
+template <typename T>
+Result<T> orElse(const Error& first, const Result<T>& second)
+{
+    if (second)
+        return second;
+    return Error{second.error().kind, first.reason + "; " + second.error().reason};
+}
+
 // A text that a backend answers, and the service or file that served it.
 struct Fact {
     std::string value; // no NUL inside; may be empty only where a device file says so

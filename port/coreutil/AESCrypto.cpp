@@ -1,15 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "AESCrypto.h"
 
-#include <cerrno>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <memory>
 #include <mutex>
 
 #include <dlfcn.h>
 
+#include "../common/RegularFile.h"
 #include "cipher/CipherModule.h"
 
 using coreutil::CipherModule;
@@ -38,28 +36,7 @@ const LoadedModule& cipherModule()
     return module;
 }
 
-// One byte more than the longest good key file, so that a longer one shows.
-constexpr std::size_t KEY_FILE_LIMIT = 4096;
-
-struct CloseFile {
-    void operator()(std::FILE* file) const
-    {
-        std::fclose(file);
-    }
-};
-
-bool readKeyFile(const char* path, std::string& content, std::string& problem)
-{
-    const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path, "rbe"));
-    content.resize(KEY_FILE_LIMIT);
-    if (file)
-        content.resize(std::fread(content.data(), 1, content.size(), file.get()));
-    if (!file || std::ferror(file.get()) != 0) {
-        problem = std::string("key file ") + path + ": " + std::strerror(errno);
-        return false;
-    }
-    return true;
-}
+constexpr std::size_t KEY_FILE_LIMIT = 4096; // room for white space
 
 bool parseKey(const CipherModule& cipher, std::string content, Key& key)
 {
@@ -71,21 +48,18 @@ bool parseKey(const CipherModule& cipher, std::string content, Key& key)
     return content.size() == 2 * key.size() && cipher.parseHexKey(content, key);
 }
 
-bool loadKey(const char* path, Key& key, std::string& problem)
+// The key of a file, or the reason why there is none.
+bool loadKey(const std::string& path, Key& key, std::string& problem)
 {
-    std::string content;
-    if (!readKeyFile(path, content, problem))
-        return false;
     const LoadedModule& module = cipherModule();
-    if (module.cipher == nullptr) {
+    std::string content;
+    if (module.cipher == nullptr)
         problem = module.problem;
-        return false;
-    }
-    if (!parseKey(*module.cipher, content, key)) {
-        problem = std::string("key file ") + path + ": a key is 32 bytes or 64 hexadecimal digits";
-        return false;
-    }
-    return true;
+    else if (!port::readRegularFile(path, KEY_FILE_LIMIT, content, problem))
+        problem = "key file " + path + ": " + problem;
+    else if (!parseKey(*module.cipher, content, key))
+        problem = "key file " + path + ": a key is 32 bytes or 64 hexadecimal digits";
+    return problem.empty();
 }
 
 // Guarded by one mutex: debug mode is not where speed matters.
@@ -182,8 +156,11 @@ void AESCrypto::SetKey(const unsigned char* bytes)
 bool AESCrypto::LoadKeyFile(const char* path, std::string& problem)
 {
     Key key;
-    if (!loadKey(path, key, problem))
+    std::string reason;
+    if (!loadKey(path, key, reason)) {
+        problem = reason;
         return false;
+    }
     useKey(keyState(), key);
     return true;
 }

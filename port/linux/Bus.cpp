@@ -2,12 +2,13 @@
 #include "Bus.h"
 
 #include <algorithm>
+#include <string_view>
 
 namespace port::linux_backend {
 namespace {
 
 constexpr BusObject BUS_ITSELF = {"org.freedesktop.DBus", "/org/freedesktop/DBus",
-                                  "org.freedesktop.DBus"};
+                                  "org.freedesktop.DBus", Start::Never};
 
 std::string messageOf(GError& error)
 {
@@ -95,15 +96,41 @@ Error callError(const char* name, GError& error)
     return notAvailable(service + ": " + messageOf(error));
 }
 
+// "hostname1" of "org.freedesktop.hostname1".
+std::string shortName(const BusObject& object)
+{
+    const std::string_view name(object.name);
+    return std::string(name.substr(name.rfind('.') + 1));
+}
+
+Result<std::string> textOf(const Variant& properties, const char* name)
+{
+    const Owned<GVariant> value(g_variant_lookup_value(properties.get(), name, nullptr));
+    if (!value)
+        return notAvailable(std::string(name) + " is missing");
+    if (!g_variant_is_of_type(value.get(), G_VARIANT_TYPE_STRING))
+        return notAvailable(std::string(name) + " is no text");
+    const std::string text = g_variant_get_string(value.get(), nullptr);
+    if (text.empty())
+        return notAvailable(std::string(name) + " is empty");
+    return text;
+}
+
 } // namespace
 
 Result<Connection> Bus::connection()
 {
+    const unsigned attemptsBefore = attempts_;
     const std::lock_guard<std::mutex> lock(mutex_);
     if (connection_ && !g_dbus_connection_is_closed(connection_.get()))
         return connection_;
+    // Threads that waited while another one tried in vain must not wait again, one after the other.
+    if (attempts_ != attemptsBefore)
+        return problem_;
     const Result<Connection> fresh = connect();
     connection_ = fresh ? fresh.value() : nullptr;
+    problem_ = fresh ? notAvailable("the system bus went away") : fresh.error();
+    ++attempts_;
     return fresh;
 }
 
@@ -111,26 +138,49 @@ Result<Variant> Bus::call(const BusObject& object, const char* method, GVariant*
                           const char* replyType)
 {
     const Variant sunkArguments(g_variant_ref_sink(arguments), GLibRelease());
-    const Result<Connection> bus = connection();
-    if (!bus)
-        return bus.error();
-    Owned<GError> error;
-    GVariant* const reply = g_dbus_connection_call_sync(
-        bus.value().get(), object.name, object.path, object.interface, method, sunkArguments.get(),
-        G_VARIANT_TYPE(replyType), G_DBUS_CALL_FLAGS_NONE, CALL_TIMEOUT_MS, nullptr, Out(error));
-    if (reply == nullptr)
-        return callError(object.name, *error);
-    return Variant(reply, GLibRelease());
+    const GDBusCallFlags flags =
+        object.start == Start::Never ? G_DBUS_CALL_FLAGS_NO_AUTO_START : G_DBUS_CALL_FLAGS_NONE;
+    for (bool again = true;; again = false) {
+        const Result<Connection> bus = connection();
+        if (!bus)
+            return bus.error();
+        Owned<GError> error;
+        GVariant* const reply = g_dbus_connection_call_sync(
+            bus.value().get(), object.name, object.path, object.interface, method,
+            sunkArguments.get(), G_VARIANT_TYPE(replyType), flags, CALL_TIMEOUT_MS, nullptr,
+            Out(error));
+        if (reply != nullptr)
+            return Variant(reply, GLibRelease());
+        // A bus that was restarted shows only now: ask the new one.
+        if (!again || !g_dbus_connection_is_closed(bus.value().get()))
+            return callError(object.name, *error);
+    }
 }
 
 Result<Variant> Bus::properties(const BusObject& object)
 {
-    const BusObject target = {object.name, object.path, "org.freedesktop.DBus.Properties"};
+    const BusObject target = {object.name, object.path, "org.freedesktop.DBus.Properties",
+                              object.start};
     const Result<Variant> reply =
         call(target, "GetAll", g_variant_new("(s)", object.interface), "(a{sv})");
     if (!reply)
         return reply;
     return Variant(g_variant_get_child_value(reply.value().get(), 0), GLibRelease());
+}
+
+Result<Fact> Bus::textProperty(const BusObject& object, std::initializer_list<const char*> names)
+{
+    const Result<Variant> all = properties(object);
+    if (!all)
+        return all.error();
+    std::string problems;
+    for (const char* const name : names) {
+        const Result<std::string> text = textOf(all.value(), name);
+        if (text)
+            return Fact{text.value(), shortName(object) + " " + name};
+        problems += (problems.empty() ? ": " : ", ") + text.error().reason;
+    }
+    return notAvailable(shortName(object) + problems);
 }
 
 Result<std::vector<std::string>> Bus::names(const char* method)
@@ -159,19 +209,6 @@ Result<std::string> Bus::stateOf(const std::string& name)
             return std::string(state);
     }
     return notAvailable("not on the system bus");
-}
-
-Result<std::string> textProperty(const Variant& properties, const char* name)
-{
-    const Owned<GVariant> value(g_variant_lookup_value(properties.get(), name, nullptr));
-    if (!value)
-        return notAvailable(std::string(name) + " is missing");
-    if (!g_variant_is_of_type(value.get(), G_VARIANT_TYPE_STRING))
-        return notAvailable(std::string(name) + " is no text");
-    const std::string text = g_variant_get_string(value.get(), nullptr);
-    if (text.empty())
-        return notAvailable(std::string(name) + " is empty");
-    return text;
 }
 
 } // namespace port::linux_backend

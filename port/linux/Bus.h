@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // The one D-Bus transport: a connection to the system bus that is the port's own.
 //
-// It never ends the application, never blocks without a bound, and is kept: nothing reconnects
-// while the bus lives.
+// It never ends the application, never blocks without a bound, and is kept: it is opened again only
+// after the bus went away.
 #ifndef PORT_LINUX_BUS_H
 #define PORT_LINUX_BUS_H
 
+#include <atomic>
+#include <initializer_list>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -18,11 +20,16 @@ namespace port::linux_backend {
 using Connection = std::shared_ptr<GDBusConnection>;
 using Variant = std::shared_ptr<GVariant>;
 
+// Whether asking a service may start it. hostname1 and locale1 live only while they are asked, so
+// the bus starts them on purpose; nothing else ever is.
+enum class Start { WhenAsked, Never };
+
 // A service of the system bus that is asked for its properties.
 struct BusObject {
     const char* name;
     const char* path;
     const char* interface;
+    Start start;
 };
 
 class Bus {
@@ -31,9 +38,12 @@ public:
     static constexpr int CONNECT_TIMEOUT_MS = 500;
     static constexpr int CALL_TIMEOUT_MS = 1000;
 
-    /// All properties of an object's interface, as a{sv}. Services like hostname1 and locale1 live
-    /// only while they are asked: the bus starts them for this call.
+    /// All properties of an object's interface, as a{sv}.
     Result<Variant> properties(const BusObject& object);
+
+    /// The first of several properties that is a text and not empty; the error says what is wrong
+    /// with each.
+    Result<Fact> textProperty(const BusObject& object, std::initializer_list<const char*> names);
 
     /// "running", "starts on demand", or the error why neither.
     Result<std::string> stateOf(const std::string& name);
@@ -46,10 +56,9 @@ private:
 
     std::mutex mutex_;
     Connection connection_;
+    Error problem_{};                   // of the last attempt to connect
+    std::atomic<unsigned> attempts_{0}; // to connect, finished
 };
-
-/// A text property; an error that names what is wrong when it is missing, empty or no text.
-Result<std::string> textProperty(const Variant& properties, const char* name);
 
 } // namespace port::linux_backend
 

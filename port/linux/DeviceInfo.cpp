@@ -29,7 +29,7 @@ bool parseId(const std::string& text, Id& id)
             return false;
         id[i] = static_cast<guint8>(high * 16 + low);
     }
-    return true;
+    return id != Id{}; // all zeros is no id
 }
 
 // The machine id itself must not leave the machine: it is answered only as a keyed hash, by the
@@ -65,31 +65,24 @@ std::string toHex(const Id& id)
 
 Result<Fact> LinuxDeviceInfo::platformId()
 {
-    for (const char* const path : {"/etc/machine-id", "/var/lib/dbus/machine-id"}) {
-        const std::optional<std::string> text = readSmallFile(root_ + path);
-        if (!text)
-            continue;
-        Id machineId{};
-        if (!parseId(*text, machineId))
-            return notAvailable(std::string(path) + " holds no machine id");
-        return Fact{toHex(applicationSpecific(machineId)), std::string(path) + " (hashed)"};
-    }
-    return notAvailable("no /etc/machine-id");
+    const Result<Fact> file = readFirst(root_, MACHINE_ID);
+    if (!file)
+        return file;
+    Id machineId{};
+    if (!parseId(file.value().value, machineId))
+        return notAvailable(file.value().source + " holds no machine id");
+    return Fact{toHex(applicationSpecific(machineId)), file.value().source + " (hashed)"};
 }
 
 Result<Fact> LinuxDeviceInfo::osRelease(const char* variable)
 {
-    for (const char* const path : {"/etc/os-release", "/usr/lib/os-release"}) {
-        const std::optional<std::string> content = readSmallFile(root_ + path);
-        if (!content)
-            continue;
-        const std::string place = std::string(path) + " " + variable;
-        const std::optional<std::string> value = osReleaseVariable(*content, variable);
-        if (!value)
-            return notAvailable("no " + place);
-        return Fact{*value, place};
-    }
-    return notAvailable("no /etc/os-release");
+    const Result<Fact> file = readFirst(root_, OS_RELEASE);
+    if (!file)
+        return file;
+    const std::optional<std::string> value = osReleaseVariable(file.value().value, variable);
+    if (!value)
+        return notAvailable(file.value().source + " has no " + variable);
+    return Fact{*value, file.value().source + " " + variable};
 }
 
 Result<Fact> LinuxDeviceInfo::platformName()
@@ -104,18 +97,8 @@ Result<Fact> LinuxDeviceInfo::platformVersion()
 
 Result<Fact> LinuxDeviceInfo::modelName()
 {
-    const Result<Variant> properties = bus_.properties(HOSTNAME1);
-    if (properties) {
-        const Result<std::string> model = textProperty(properties.value(), "HardwareModel");
-        if (model)
-            return Fact{model.value(), "hostname1 HardwareModel"};
-    }
-    for (const char* const path : {"/sys/class/dmi/id/product_name", "/proc/device-tree/model"}) {
-        const std::optional<std::string> model = readSmallFile(root_ + path);
-        if (model)
-            return Fact{*model, path};
-    }
-    return notAvailable("no hardware model from hostname1, DMI or the device tree");
+    const Result<Fact> model = bus_.textProperty(HOSTNAME1, {"HardwareModel"});
+    return model ? model : orElse(model.error(), readFirst(root_, HARDWARE_MODEL));
 }
 
 } // namespace port::linux_backend

@@ -3,14 +3,25 @@
 #ifndef PORT_LINUX_FILES_H
 #define PORT_LINUX_FILES_H
 
+#include <initializer_list>
 #include <optional>
 #include <string>
 
+#include "../backend/Result.h"
+
 namespace port::linux_backend {
 
-/// The text of a file up to its first NUL, without white space at its end; nothing when it cannot
-/// be read, is empty, is no regular file or is larger than 64 KiB.
-std::optional<std::string> readSmallFile(const std::string& path);
+// Files that may hold a fact, the preferred one first.
+using Places = std::initializer_list<const char*>;
+
+constexpr Places MACHINE_ID = {"/etc/machine-id", "/var/lib/dbus/machine-id"};
+constexpr Places OS_RELEASE = {"/etc/os-release", "/usr/lib/os-release"};
+constexpr Places HARDWARE_MODEL = {"/sys/class/dmi/id/product_name", "/proc/device-tree/model"};
+
+/// The text of the first place below `root` that holds one, with that place as its source. It ends
+/// at the first NUL and has no white space at its end. A file that is no regular file, is larger
+/// than 64 KiB or holds nothing is passed over; the error says why each of them was.
+Result<Fact> readFirst(const std::string& root, Places places);
 
 /// A variable of an os-release(5) file, unquoted; nothing when it is missing, empty or malformed.
 std::optional<std::string> osReleaseVariable(const std::string& content, const std::string& name);

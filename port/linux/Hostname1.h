@@ -8,7 +8,7 @@
 namespace port::linux_backend {
 
 constexpr BusObject HOSTNAME1 = {"org.freedesktop.hostname1", "/org/freedesktop/hostname1",
-                                 "org.freedesktop.hostname1"};
+                                 "org.freedesktop.hostname1", Start::WhenAsked};
 
 } // namespace port::linux_backend
 

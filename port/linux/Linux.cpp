@@ -36,12 +36,9 @@ public:
                 "the device name is the kernel's host name, the model DMI's or the device tree's"),
             onBus(LOCALE1, "display language",
                   "the language is that of LC_ALL, LC_MESSAGES or LANG"),
-            file({"/etc/os-release", "/usr/lib/os-release"}, "platform name and version",
-                 "no platform name and version"),
-            file({"/etc/machine-id", "/var/lib/dbus/machine-id"}, "platform identifier",
-                 "no platform identifier"),
-            file({"/sys/class/dmi/id/product_name", "/proc/device-tree/model"}, "hardware model",
-                 "the model is hostname1's only"),
+            file(OS_RELEASE, "platform name and version", "no platform name and version"),
+            file(MACHINE_ID, "platform identifier", "no platform identifier"),
+            file(HARDWARE_MODEL, "hardware model", "the model is hostname1's only"),
         };
     }
 
@@ -53,14 +50,12 @@ private:
                 serves, consequence};
     }
 
-    // The first of several places that can be read.
-    static Service file(const std::vector<const char*>& paths, const char* serves,
-                        const char* consequence)
+    static Service file(Places places, const char* serves, const char* consequence)
     {
-        for (const char* const path : paths)
-            if (readSmallFile(path))
-                return {path, true, "readable", serves, consequence};
-        return {paths.front(), false, "missing or not readable", serves, consequence};
+        const Result<Fact> read = readFirst("", places);
+        if (read)
+            return {read.value().source, true, "readable", serves, consequence};
+        return {*places.begin(), false, read.error().reason, serves, consequence};
     }
 
     Bus bus_;

@@ -8,7 +8,7 @@
 namespace port::linux_backend {
 
 constexpr BusObject LOCALE1 = {"org.freedesktop.locale1", "/org/freedesktop/locale1",
-                               "org.freedesktop.locale1"};
+                               "org.freedesktop.locale1", Start::WhenAsked};
 
 } // namespace port::linux_backend
 

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <cerrno>
 #include <cstdio>
 
 #include <coresystem_port.h>
@@ -53,7 +54,11 @@ bool writeToStandardError(const Priority& priority, const std::string& tag, cons
     std::string line = std::string(1, priority.letter) + "/" + tag;
     line.resize(std::max(line.size(), sizeof "I/12345678" - 1), ' ');
     line += processId + text + "\n";
-    return write(STDERR_FILENO, line.data(), line.size()) == static_cast<ssize_t>(line.size());
+    ssize_t written = 0;
+    do
+        written = write(STDERR_FILENO, line.data(), line.size());
+    while (written < 0 && errno == EINTR);
+    return written == static_cast<ssize_t>(line.size());
 }
 
 bool journalIsThere()

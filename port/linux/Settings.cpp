@@ -2,6 +2,7 @@
 #include "Settings.h"
 
 #include <cstdlib>
+#include <cstring>
 #include <optional>
 
 #include <sys/utsname.h>
@@ -19,60 +20,65 @@ std::optional<std::string> localeName(const std::string& text)
     return name.empty() ? std::nullopt : std::optional<std::string>(name);
 }
 
-// The language among locale1's assignments, "LANG=de_DE.UTF-8".
-std::optional<Fact> languageOf(const Variant& properties)
+// The value among locale1's assignments, "LANG=de_DE.UTF-8".
+std::optional<std::string> assigned(GVariant* locale, const std::string& variable)
 {
-    const Owned<GVariant> locale(
-        g_variant_lookup_value(properties.get(), "Locale", G_VARIANT_TYPE_STRING_ARRAY));
-    if (!locale)
-        return std::nullopt;
-    for (const std::string variable : {"LC_MESSAGES", "LANG"}) {
-        for (std::size_t i = 0; i < g_variant_n_children(locale.get()); ++i) {
-            const Owned<GVariant> item(g_variant_get_child_value(locale.get(), i));
-            const std::string assignment = g_variant_get_string(item.get(), nullptr);
-            if (assignment.compare(0, variable.size() + 1, variable + "=") != 0)
-                continue;
-            if (const auto name = localeName(assignment.substr(variable.size() + 1)))
-                return Fact{*name, "locale1 " + variable};
-        }
+    for (std::size_t i = 0; i < g_variant_n_children(locale); ++i) {
+        const Owned<GVariant> item(g_variant_get_child_value(locale, i));
+        const std::string assignment = g_variant_get_string(item.get(), nullptr);
+        if (assignment.compare(0, variable.size() + 1, variable + "=") == 0)
+            return localeName(assignment.substr(variable.size() + 1));
     }
     return std::nullopt;
 }
 
-} // namespace
-
-Result<Fact> LinuxSettings::deviceName()
+Result<Fact> languageOfMachine(Bus& bus)
 {
-    const Result<Variant> properties = bus_.properties(HOSTNAME1);
-    if (properties) {
-        for (const char* const property : {"PrettyHostname", "StaticHostname"}) {
-            const Result<std::string> name = textProperty(properties.value(), property);
-            if (name)
-                return Fact{name.value(), std::string("hostname1 ") + property};
-        }
-    }
-    struct utsname system = {};
-    // "(none)" is what the kernel says before anybody named the machine.
-    if (uname(&system) == 0 && *system.nodename != '\0' && std::string(system.nodename) != "(none)")
-        return Fact{system.nodename, "kernel host name"};
-    return notAvailable("no host name from hostname1 or the kernel");
+    const Result<Variant> properties = bus.properties(LOCALE1);
+    if (!properties)
+        return properties.error();
+    const Owned<GVariant> locale(
+        g_variant_lookup_value(properties.value().get(), "Locale", G_VARIANT_TYPE_STRING_ARRAY));
+    if (!locale)
+        return notAvailable("locale1: Locale is missing or no list of texts");
+    for (const char* const variable : {"LC_MESSAGES", "LANG"})
+        if (const auto name = assigned(locale.get(), variable))
+            return Fact{*name, std::string("locale1 ") + variable};
+    return notAvailable("locale1: Locale sets no language");
 }
 
-Result<Fact> LinuxSettings::language()
+Result<Fact> languageOfProcess()
 {
-    const Result<Variant> properties = bus_.properties(LOCALE1);
-    if (properties) {
-        const std::optional<Fact> language = languageOf(properties.value());
-        if (language)
-            return *language;
-    }
     // In the order in which POSIX looks at them.
     for (const char* const variable : {"LC_ALL", "LC_MESSAGES", "LANG"}) {
         const char* const value = std::getenv(variable);
         if (const auto name = localeName(value != nullptr ? value : ""))
             return Fact{*name, std::string("environment ") + variable};
     }
-    return notAvailable("no locale from locale1, LC_ALL, LC_MESSAGES or LANG");
+    return notAvailable("LC_ALL, LC_MESSAGES and LANG are not set");
+}
+
+Result<Fact> hostNameOfKernel()
+{
+    struct utsname system = {};
+    if (uname(&system) != 0 || *system.nodename == '\0' ||
+        std::strcmp(system.nodename, "(none)") == 0) // what it says before anybody named it
+        return notAvailable("the kernel has no host name");
+    return Fact{system.nodename, "kernel host name"};
+}
+
+} // namespace
+
+Result<Fact> LinuxSettings::deviceName()
+{
+    const Result<Fact> name = bus_.textProperty(HOSTNAME1, {"PrettyHostname", "StaticHostname"});
+    return name ? name : orElse(name.error(), hostNameOfKernel());
+}
+
+Result<Fact> LinuxSettings::language()
+{
+    const Result<Fact> language = languageOfMachine(bus_);
+    return language ? language : orElse(language.error(), languageOfProcess());
 }
 
 } // namespace port::linux_backend

@@ -1,19 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "DeviceFile.h"
 
-#include <cerrno>
-#include <cstring>
+#include <algorithm>
+#include <sstream>
 
-#include <fcntl.h>
-#include <sys/stat.h>
+#include <dlog.h>
 #include <toml++/toml.h>
-#include <unistd.h>
+
+#include "../backend/Log.h"
+#include "../common/RegularFile.h"
 
 namespace port::simulator {
 namespace {
 
 constexpr long SCHEMA = 1;
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024;
+constexpr std::size_t LINE_LIMIT = 1024;
 
 // Every key that a device file may hold.
 constexpr struct {
@@ -51,9 +53,13 @@ bool isTextKey(std::string_view section, std::string_view key)
     return false;
 }
 
+// In quotes and on one line, whatever it holds.
 std::string quoted(std::string_view name)
 {
-    return "\"" + std::string(name) + "\"";
+    const toml::value<std::string> text{std::string(name)};
+    std::ostringstream stream;
+    stream << toml::toml_formatter{text, toml::format_flags::none};
+    return stream.str();
 }
 
 void checkSchema(const toml::table& root)
@@ -89,46 +95,17 @@ void readSection(Device& device, const toml::key& name, const toml::node& node)
         readKey(device, std::string(name.str()), key, value);
 }
 
-Error unreadable(const std::string& path, const std::string& why)
+// Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the
+// line (and on nested values, TOML_MAX_NESTED_VALUES) keeps that from using up the stack.
+void checkLines(const std::string& text)
 {
-    return notAvailable(path + ": " + why);
-}
-
-struct Descriptor {
-    const int number;
-    ~Descriptor()
-    {
-        if (number >= 0)
-            close(number);
+    toml::source_index line = 1;
+    for (std::size_t begin = 0, end = 0; begin < text.size(); begin = end + 1, ++line) {
+        end = std::min(text.find('\n', begin), text.size());
+        if (end - begin > LINE_LIMIT)
+            throw Problem{{{line, 1}, {line, 1}, {}},
+                          "a line longer than " + std::to_string(LINE_LIMIT) + " bytes"};
     }
-};
-
-Result<std::string> readDeviceFile(const std::string& path)
-{
-    // Does not wait when somebody names a pipe.
-    const Descriptor file{open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK)};
-    struct stat status = {};
-    if (file.number < 0 || fstat(file.number, &status) != 0)
-        return unreadable(path, std::strerror(errno));
-    if (S_ISDIR(status.st_mode))
-        return unreadable(path, std::strerror(EISDIR));
-    if (!S_ISREG(status.st_mode))
-        return unreadable(path, "not a regular file");
-
-    std::string text(SIZE_LIMIT + 1, '\0');
-    std::size_t size = 0;
-    while (size < text.size()) {
-        const ssize_t step = read(file.number, text.data() + size, text.size() - size);
-        if (step < 0)
-            return unreadable(path, std::strerror(errno));
-        if (step == 0)
-            break;
-        size += static_cast<std::size_t>(step);
-    }
-    if (size > SIZE_LIMIT)
-        return unreadable(path, "larger than 1 MiB, which no device file is");
-    text.resize(size);
-    return text;
 }
 
 } // namespace
@@ -136,6 +113,7 @@ Result<std::string> readDeviceFile(const std::string& path)
 Result<Device> parseDevice(const std::string& text, const std::string& path)
 {
     try {
+        checkLines(text);
         const toml::table root = toml::parse(text, path);
         checkSchema(root);
         Device device;
@@ -152,18 +130,38 @@ Result<Device> parseDevice(const std::string& text, const std::string& path)
 
 Result<std::shared_ptr<const Device>> DeviceFile::device()
 {
-    const Result<std::string> text = readDeviceFile(path_);
-    if (!text)
-        return text.error();
+    const Result<std::shared_ptr<const Device>> now = read();
+    report(now ? std::string() : now.error().reason);
+    return now;
+}
+
+Result<std::shared_ptr<const Device>> DeviceFile::read()
+{
+    std::string text;
+    std::string problem;
+    if (!readRegularFile(path_, SIZE_LIMIT, text, problem))
+        return notAvailable(path_ + ": " + problem);
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (parsed_ == nullptr || parsedText_ != text.value()) {
-        const Result<Device> fresh = parseDevice(text.value(), path_);
+    if (parsed_ == nullptr || parsedText_ != text) {
+        const Result<Device> fresh = parseDevice(text, path_);
         if (!fresh)
             return fresh.error();
         parsed_ = std::make_shared<const Device>(fresh.value());
-        parsedText_ = text.value();
+        parsedText_ = text;
     }
     return parsed_;
+}
+
+void DeviceFile::report(const std::string& problem)
+{
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        if (problem == reported_)
+            return;
+        reported_ = problem;
+    }
+    if (!problem.empty())
+        processLog().write(DLOG_ERROR, "coresystem-port", problem);
 }
 
 Result<Fact> DeviceFile::text(const std::string& section, const std::string& key)

@@ -36,17 +36,22 @@ public:
     }
 
     /// The device as the file describes it now; the file is parsed again only when its text
-    /// changed.
+    /// changed. A problem with the file is also written to the log, so that an application learns
+    /// of it: one line, and no other until the problem changes or goes away.
     Result<std::shared_ptr<const Device>> device();
 
     /// One text of it.
     Result<Fact> text(const std::string& section, const std::string& key);
 
 private:
+    Result<std::shared_ptr<const Device>> read();
+    void report(const std::string& problem);
+
     const std::string path_;
     std::mutex mutex_;
     std::string parsedText_;
     std::shared_ptr<const Device> parsed_;
+    std::string reported_; // the problem that the log was told last; empty when there is none
 };
 
 } // namespace port::simulator

@@ -5,6 +5,7 @@
 #include <memory>
 
 #include <openssl/crypto.h>
+#include <openssl/err.h>
 #include <openssl/evp.h>
 #include <openssl/rand.h>
 
@@ -52,16 +53,34 @@ bool fromBase64(const std::string& text, std::string& data)
     if (padding > 2)
         return false;
     data.resize(data.size() - padding);
-    return true;
+    // The decoder lets other texts pass for the same bytes: "=" in the middle, bits behind the end.
+    return toBase64(data) == text;
 }
+
+// Leaves the calling thread's OpenSSL error queue as it was: the application may use OpenSSL too.
+class QuietErrors {
+public:
+    QuietErrors()
+    {
+        ERR_set_mark();
+    }
+    ~QuietErrors()
+    {
+        ERR_pop_to_mark();
+    }
+    QuietErrors(const QuietErrors&) = delete;
+    QuietErrors& operator=(const QuietErrors&) = delete;
+};
 
 bool makeRandomKey(Key& key)
 {
+    const QuietErrors quiet;
     return RAND_priv_bytes(key.data(), static_cast<int>(key.size())) == 1;
 }
 
 bool parseHexKey(const std::string& digits, Key& key)
 {
+    const QuietErrors quiet;
     std::size_t size = 0;
     return OPENSSL_hexstr2buf_ex(key.data(), key.size(), &size, digits.c_str(), '\0') == 1 &&
            size == key.size();
@@ -69,6 +88,7 @@ bool parseHexKey(const std::string& digits, Key& key)
 
 bool encrypt(const Key& key, const std::string& plain, std::string& text)
 {
+    const QuietErrors quiet;
     std::string sealed(NONCE_SIZE + plain.size() + TAG_SIZE, '\0');
     unsigned char* const nonce = bytes(sealed);
     unsigned char* const body = nonce + NONCE_SIZE;
@@ -89,6 +109,7 @@ bool encrypt(const Key& key, const std::string& plain, std::string& text)
 
 bool decrypt(const Key& key, const std::string& text, std::string& plain)
 {
+    const QuietErrors quiet;
     std::string sealed;
     if (!fromBase64(text, sealed) || sealed.size() < NONCE_SIZE + TAG_SIZE)
         return false;
