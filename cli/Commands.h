@@ -1,0 +1,46 @@
+// SPDX-License-Identifier: Apache-2.0
+// The command groups, and what all of them share.
+#ifndef CLI_COMMANDS_H
+#define CLI_COMMANDS_H
+
+#include <functional>
+#include <stdexcept>
+#include <string>
+
+#include <CLI/CLI.hpp>
+
+namespace cli {
+
+enum ExitCode {
+    SUCCESS = 0,
+    FAILURE = 1,
+    USAGE = 2,
+    NOT_AVAILABLE = 3,
+    BAD_DEVICE_FILE = 4,
+    UNKNOWN_COUNTRY = 5,
+};
+
+// A mistake in the arguments, told to the user as it is.
+struct UsageError : std::runtime_error {
+    using std::runtime_error::runtime_error;
+};
+
+// The options of every command, and the command that was asked for.
+struct Invocation {
+    std::string deviceFile;
+    bool verbose = false;
+    bool json = false;
+    std::function<ExitCode()> command;
+};
+
+/// Ends a command's help with its own remarks and those that hold for every command.
+void setFooter(CLI::App& command, const std::string& remarks);
+
+void addInfoCommands(CLI::App& app, Invocation& invocation);
+void addCountryCommand(CLI::App& app, Invocation& invocation);
+void addLogCommands(CLI::App& app, Invocation& invocation);
+void addDoctorCommand(CLI::App& app, Invocation& invocation);
+
+} // namespace cli
+
+#endif

@@ -1,0 +1,121 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem info` and `coresystem get`.
+#include <algorithm>
+
+#include "Commands.h"
+#include "Facts.h"
+#include "Session.h"
+#include "Terminal.h"
+#include "Text.h"
+
+namespace cli {
+namespace {
+
+// The whole reason was already told once, about the device file.
+std::vector<std::string> rowOf(const Fact& fact, bool deviceFileBad)
+{
+    if (!fact.value)
+        return {fact.name, "not available",
+                "(" + (deviceFileBad ? "the device file is unusable" : fact.reason) + ")"};
+    return {fact.name, fact.value->empty() ? "\"\"" : *fact.value, fact.source};
+}
+
+std::string infoText(const std::vector<Fact>& facts, bool deviceFileBad)
+{
+    Rows rows;
+    for (const Fact& fact : facts)
+        rows.push_back(rowOf(fact, deviceFileBad));
+    return backendLine() + "\n\n" + aligned(rows, "");
+}
+
+std::string infoJson(const std::vector<Fact>& facts)
+{
+    Json json = jsonAnswer();
+    Json sources = Json::object();
+    Json reasons = Json::object();
+    for (const Fact& fact : facts) {
+        json[fact.name] = fact.value ? Json(*fact.value) : Json(nullptr);
+        fact.value ? sources[fact.name] = fact.source : reasons[fact.name] = fact.reason;
+    }
+    json["sources"] = sources;
+    json["reasons"] = reasons;
+    return jsonText(json);
+}
+
+ExitCode runInfo(const Invocation& invocation)
+{
+    std::vector<Fact> facts;
+    for (const std::string& name : factNames())
+        facts.push_back(askFact(name));
+    const bool deviceFileBad = reportDeviceFileProblem();
+    writeOut(invocation.json ? infoJson(facts) : infoText(facts, deviceFileBad));
+    return deviceFileBad ? BAD_DEVICE_FILE : SUCCESS;
+}
+
+void checkFactName(const std::string& name)
+{
+    const std::vector<std::string> names = factNames();
+    if (std::find(names.begin(), names.end(), name) == names.end())
+        throw UsageError("no fact is called " + quoted(name) + "; did you mean \"" +
+                         closest(name, names) + "\"? The facts are " + listed(names));
+}
+
+ExitCode reportMissing(const Fact& fact)
+{
+    if (reportDeviceFileProblem())
+        return BAD_DEVICE_FILE;
+    complain(fact.name + " is not available: " + printable(fact.reason));
+    return NOT_AVAILABLE;
+}
+
+ExitCode runGet(const Invocation& invocation, const std::string& name)
+{
+    checkFactName(name);
+    const Fact fact = askFact(name);
+    if (invocation.json)
+        writeOut(infoJson({fact}));
+    else if (fact.value)
+        writeOut(printable(*fact.value) + "\n");
+    return fact.value ? SUCCESS : reportMissing(fact);
+}
+
+ExitCode listFacts()
+{
+    for (const std::string& name : factNames())
+        writeOut(name + "\n");
+    return SUCCESS;
+}
+
+void addGet(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const get = app.add_subcommand("get", "Print one fact: the value and nothing else");
+    const auto name = std::make_shared<std::string>();
+    const auto list = std::make_shared<bool>(false);
+    get->add_option("FACT", *name, "The fact, as `coresystem get --list` names it");
+    get->add_flag("--list", *list, "Print the names of all facts");
+    get->add_flag("--json", invocation.json, "Print a JSON object with value and source");
+    setFooter(*get, "Example: coresystem get device_name\n"
+                    "Exit code 3: the fact is not available; the reason is on standard error.");
+    get->callback([&invocation, name, list] {
+        if (name->empty() != *list)
+            throw UsageError("get takes one fact (or --list)");
+        invocation.command = [&invocation, name, list] {
+            return *list ? listFacts() : runGet(invocation, *name);
+        };
+    });
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addInfoCommands(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const info =
+        app.add_subcommand("info", "Print every fact about the device, with its source");
+    info->add_flag("--json", invocation.json, "Print one JSON object");
+    setFooter(*info, "Examples: coresystem info\n"
+                     "          coresystem info --json --device phone.toml");
+    info->callback(
+        [&invocation] { invocation.command = [&invocation] { return runInfo(invocation); }; });
+    addGet(app, invocation);
+}

@@ -1,0 +1,171 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem log decipher`: makes a debug trace readable.
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+
+#include <AESCrypto.h>
+
+#include "Commands.h"
+#include "Session.h"
+#include "Terminal.h"
+#include "Text.h"
+
+namespace cli {
+namespace {
+
+const std::string OPENING = "{#!@";
+const std::string CLOSING = "#!@}";
+
+struct Deciphered {
+    std::string line;
+    unsigned failures = 0;
+};
+
+// A text instead of a cipher text begins with "!" and says why nothing was enciphered.
+bool isProblemText(const std::string& body)
+{
+    return !body.empty() && body.front() == '!';
+}
+
+// Replaces one marked body, "{#!@...#!@}", if it can be deciphered.
+void decipherBody(const std::string& marked, Deciphered& result)
+{
+    const std::string body =
+        marked.substr(OPENING.size(), marked.size() - OPENING.size() - CLOSING.size());
+    std::string plain;
+    if (AESCrypto::GetInstance()->Decrypt(body, plain)) {
+        result.line += printable(plain); // a record stays one line
+        return;
+    }
+    result.line += marked;
+    result.failures += isProblemText(body) ? 0 : 1;
+}
+
+Deciphered decipherLine(const std::string& line)
+{
+    Deciphered result;
+    std::size_t done = 0;
+    for (;;) {
+        const std::size_t opening = line.find(OPENING, done);
+        if (opening == std::string::npos)
+            break;
+        const std::size_t closing = line.find(CLOSING, opening + OPENING.size());
+        if (closing == std::string::npos)
+            break;
+        // The last opening before the end: an earlier one belongs to the text around.
+        const std::size_t start = line.rfind(OPENING, closing - OPENING.size());
+        const std::size_t end = closing + CLOSING.size();
+        result.line.append(line, done, start - done);
+        decipherBody(line.substr(start, end - start), result);
+        done = end;
+    }
+    result.line.append(line, done, std::string::npos);
+    return result;
+}
+
+// Lines of standard input, of any length and with any bytes, each with its line feed if it has one.
+class InputLines {
+public:
+    InputLines() = default;
+    ~InputLines()
+    {
+        std::free(buffer_);
+    }
+    InputLines(const InputLines&) = delete;
+    InputLines& operator=(const InputLines&) = delete;
+
+    bool next(std::string& line)
+    {
+        const ssize_t size = getline(&buffer_, &capacity_, stdin);
+        if (size < 0)
+            return false;
+        line.assign(buffer_, static_cast<std::size_t>(size));
+        return true;
+    }
+
+private:
+    char* buffer_ = nullptr;
+    std::size_t capacity_ = 0;
+};
+
+void reportFailures(unsigned long number, unsigned failures)
+{
+    const std::string what = failures == 1 ? "a body" : std::to_string(failures) + " bodies";
+    complain("line " + std::to_string(number) + ": " + what +
+             " cannot be deciphered (another key, or changed since)");
+}
+
+ExitCode decipherInput()
+{
+    InputLines input;
+    ExitCode result = SUCCESS;
+    std::string line;
+    for (unsigned long number = 1; input.next(line); ++number) {
+        const Deciphered deciphered = decipherLine(line);
+        writeOut(deciphered.line);
+        if (deciphered.failures > 0) {
+            reportFailures(number, deciphered.failures);
+            result = FAILURE;
+        }
+    }
+    if (std::ferror(stdin) != 0) {
+        complain(std::string("standard input cannot be read: ") + std::strerror(errno));
+        return FAILURE;
+    }
+    return result;
+}
+
+// Why there is no key to decipher with; empty when there is one.
+std::string takeKey(const std::string& keyFile)
+{
+    AESCrypto& cipher = *AESCrypto::GetInstance();
+    std::string problem;
+    if (!keyFile.empty()) {
+        cipher.LoadKeyFile(keyFile.c_str(), problem);
+        return problem;
+    }
+    problem = cipher.GetProblem();
+    if (problem.empty() && !cipher.HasConfiguredKey())
+        problem = "no key: name the key file with --key or CORESYSTEM_LOG_KEY";
+    return problem;
+}
+
+ExitCode runDecipher(const std::string& keyFile)
+{
+    if (const std::string problem = takeKey(keyFile); !problem.empty()) {
+        complain(printable(problem));
+        return FAILURE;
+    }
+    return decipherInput();
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addLogCommands(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const log = app.add_subcommand("log", "Work with the library's log");
+    log->require_subcommand(0, 1);
+    log->callback([log] {
+        if (log->get_subcommands().empty())
+            throw UsageError("log takes a command: decipher");
+    });
+    CLI::App* const decipher = log->add_subcommand(
+        "decipher", "Copy log lines from standard input, with their bodies deciphered");
+    const auto keyFile = std::make_shared<std::string>();
+    CLI::Option* const key = decipher->add_option(
+        "--key", *keyFile, "The key file (default: the one that CORESYSTEM_LOG_KEY names)");
+    key->type_name("FILE");
+    setFooter(*decipher,
+              "Example: CORESYSTEM_LOG_DEBUG=1 CORESYSTEM_LOG_KEY=key coresystem info 2>&1 |\n"
+              "             coresystem log decipher --key key\n"
+              "Exit code 1: a body could not be deciphered, or there is no usable key.");
+    decipher->callback([&invocation, key, keyFile] {
+        if (key->count() > 0 && keyFile->empty())
+            throw UsageError("--key names no file");
+        invocation.command = [keyFile] { return runDecipher(*keyFile); };
+    });
+}

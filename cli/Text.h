@@ -1,0 +1,32 @@
+// SPDX-License-Identifier: Apache-2.0
+// Texts as a terminal shows them. Works on UTF-8 once useUtf8() was called.
+#ifndef CLI_TEXT_H
+#define CLI_TEXT_H
+
+#include <string>
+#include <vector>
+
+namespace cli {
+
+/// Takes characters as UTF-8, whatever the user's locale says; messages stay as they are.
+void useUtf8();
+
+/// The text with every control character and every byte that is no UTF-8 escaped: one line that
+/// cannot steer a terminal.
+std::string printable(const std::string& text);
+
+std::string quoted(const std::string& text);
+
+/// "a, b and c"
+std::string listed(const std::vector<std::string>& words);
+
+/// Rows of cells, aligned under each other, two blanks apart; printable() is applied to each cell.
+using Rows = std::vector<std::vector<std::string>>;
+std::string aligned(const Rows& rows, const std::string& indent = "  ");
+
+/// The candidate that takes the fewest edits to make from the word.
+std::string closest(const std::string& word, const std::vector<std::string>& candidates);
+
+} // namespace cli
+
+#endif

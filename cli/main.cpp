@@ -1,0 +1,141 @@
+// SPDX-License-Identifier: Apache-2.0
+// The command `coresystem`.
+#include <cerrno>
+#include <cstring>
+#include <exception>
+
+#include "Commands.h"
+#include "Session.h"
+#include "Terminal.h"
+#include "Text.h"
+
+namespace cli {
+namespace {
+
+const char* const VERSION_TEXT = "coresystem " CORESYSTEM_VERSION;
+
+const char* const FOOTER = R"(Examples:
+  coresystem info                        every fact about this machine
+  coresystem info --device phone.toml    every fact about a simulated device
+  coresystem get device_name             one fact, for scripts
+  coresystem country 340                 what the library makes of a country key
+  coresystem log decipher --key key <log read a debug trace
+  coresystem doctor                      what the answers rest on
+
+Exit codes:
+  0 success   1 failure   2 usage error   3 fact not available
+  4 device file unusable   5 no such country key)";
+
+struct Program {
+    CLI::App app{"Asks the CoreSystem library about this device.", "coresystem"};
+    Invocation invocation;
+    CLI::Option* device = nullptr;
+
+    Program()
+    {
+        app.set_version_flag("--version", VERSION_TEXT, "Print the version and exit");
+        device = app.add_option("--device", invocation.deviceFile,
+                                "Ask a simulated device (overrides CORESYSTEM_DEVICE)");
+        device->type_name("FILE");
+        app.add_flag("-v,--verbose", invocation.verbose,
+                     "Show the library's log lines and the backend on standard error");
+        app.fallthrough(); // options of every command may also stand behind it; inherited
+        app.require_subcommand(0, 1);
+        addInfoCommands(app, invocation);
+        addCountryCommand(app, invocation);
+        addLogCommands(app, invocation);
+        addDoctorCommand(app, invocation);
+        app.footer(FOOTER);
+    }
+};
+
+ExitCode reportUsage(const std::string& text)
+{
+    complain(text + "\nRun \"coresystem --help\" for the commands and their options.");
+    return USAGE;
+}
+
+ExitCode reportExtras(const CLI::App& app)
+{
+    const std::vector<std::string> extras = app.remaining(true);
+    const std::string word = extras.empty() ? "" : extras.front();
+    if (!app.get_subcommands().empty() || word.rfind('-', 0) == 0)
+        return reportUsage("unexpected argument " + quoted(word));
+    std::vector<std::string> names;
+    for (const CLI::App* const command : app.get_subcommands({}))
+        names.push_back(command->get_name());
+    return reportUsage("no command is called " + quoted(word) + "; did you mean \"" +
+                       closest(word, names) + "\"? The commands are " + listed(names));
+}
+
+ExitCode execute(const Program& program)
+{
+    if (program.device->count() > 0) {
+        if (program.invocation.deviceFile.empty())
+            return reportUsage("--device names no file");
+        chooseDevice(program.invocation.deviceFile);
+    }
+    if (!program.invocation.command) {
+        writeOut(program.app.help());
+        return USAGE;
+    }
+    chooseLogSink(program.invocation.verbose);
+    if (program.invocation.verbose)
+        writeErrorLine(backendLine());
+    return program.invocation.command();
+}
+
+ExitCode run(int argc, char** argv)
+{
+    Program program;
+    try {
+        program.app.parse(argc, argv);
+        return execute(program);
+    } catch (const CLI::CallForHelp&) {
+        writeOut(program.app.help());
+        return SUCCESS;
+    } catch (const CLI::CallForVersion&) {
+        writeOut(std::string(VERSION_TEXT) + "\n");
+        return SUCCESS;
+    } catch (const CLI::ExtrasError&) {
+        return reportExtras(program.app);
+    } catch (const CLI::ParseError& error) {
+        return reportUsage(printable(error.what()));
+    } catch (const UsageError& error) {
+        return reportUsage(error.what());
+    }
+}
+
+ExitCode reportOutputFailure(int error)
+{
+    if (error == EPIPE) // the reader has seen enough
+        return SUCCESS;
+    complain(std::string("standard output cannot be written: ") + std::strerror(error));
+    return FAILURE;
+}
+
+} // namespace
+
+void setFooter(CLI::App& command, const std::string& remarks)
+{
+    command.footer(remarks + "\n--device FILE and -v go with every command; \"coresystem --help\" "
+                             "lists all exit codes.");
+}
+
+} // namespace cli
+
+int main(int argc, char** argv)
+{
+    try {
+        cli::useUtf8();
+        cli::prepareStandardStreams();
+        return cli::run(argc, argv);
+    } catch (const cli::OutputFailed& failure) {
+        return cli::reportOutputFailure(failure.error);
+    } catch (const std::exception& error) {
+        cli::complain(error.what());
+    } catch (...) {
+        cli::complain("unknown failure");
+    }
+    return cli::FAILURE;
+}
