@@ -1,0 +1,43 @@
+// SPDX-License-Identifier: Apache-2.0
+// The tests' way to the private members of the singletons.
+#ifndef CORESYSTEM_TESTS_SUPPORT_CORE_SYSTEM_INTERNALS_H
+#define CORESYSTEM_TESTS_SUPPORT_CORE_SYSTEM_INTERNALS_H
+
+#include <string>
+
+#include <CoreSystem.h>
+#include <SimManager.h>
+
+struct CoreSystemInternals {
+    template <class Singleton>
+    static Singleton* instance()
+    {
+        return Singleton::instance_;
+    }
+
+    // Back to the state before the first GetInstance().
+    template <class Singleton>
+    static void destroyInstance()
+    {
+        delete Singleton::instance_;
+        Singleton::instance_ = nullptr;
+    }
+
+    static int tagStartPosition(const std::string& value, const std::string& tag)
+    {
+        return CoreSystem::instance_->GetTagStartPosition(value, tag);
+    }
+
+    static std::string valueFromPosition(const std::string& value, int start, int end)
+    {
+        return CoreSystem::instance_->GetValueFromPosition(value, start, end);
+    }
+
+    static const char* iso639(const std::string& upperCode, const char* preset)
+    {
+        CoreSystem::instance_->GetISO639LangCodeFromDeviceLang(upperCode, &preset);
+        return preset;
+    }
+};
+
+#endif

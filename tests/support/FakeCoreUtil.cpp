@@ -1,0 +1,181 @@
+// SPDX-License-Identifier: Apache-2.0
+// The utility library's classes, as the recording fake has them.
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <stdexcept>
+
+#include <gtest/gtest.h>
+
+#include <AESCrypto.h>
+#include <CoreLogger.h>
+#include <CoreMutex.h>
+#include <CoreMutexLock.h>
+#include <CoreUtil.h>
+
+#include "FakePlatform.h"
+
+using namespace fake;
+
+namespace {
+
+void recordLogger(const char* operation)
+{
+    const AllocationPause pause;
+    platform().record(Event::Kind::LOGGER, operation);
+}
+
+// The bytes that the library may write, and after them some that it may not.
+struct FormatBuffer {
+    static const std::size_t USABLE = 599;
+    static const char UNTOUCHED = '\x7f';
+
+    FormatBuffer()
+    {
+        bytes.fill(UNTOUCHED);
+    }
+
+    bool overrun() const
+    {
+        return std::any_of(bytes.begin() + USABLE, bytes.end(),
+                           [](char byte) { return byte != UNTOUCHED; });
+    }
+
+    std::array<char, 1024> bytes;
+};
+
+// More buffers than threads that log at once.
+std::array<FormatBuffer, 64> buffers;
+std::atomic<int> nextIndex{3};
+
+// A named mutex; never destroyed.
+struct NamedLock {
+    std::string name;
+    std::recursive_mutex mutex;
+};
+
+NamedLock& namedLock(const char* name)
+{
+    static std::mutex mutex;
+    static auto& locks = *new std::map<std::string, NamedLock>;
+    const AllocationPause pause;
+    const std::lock_guard<std::mutex> guard(mutex);
+    NamedLock& lock = locks[name];
+    lock.name = name;
+    return lock;
+}
+
+void acquire(void* mutex)
+{
+    const AllocationPause pause;
+    auto& lock = *static_cast<NamedLock*>(mutex);
+    lock.mutex.lock();
+    platform().record(Event::Kind::LOCK, "lock " + lock.name);
+}
+
+void release(void* mutex)
+{
+    const AllocationPause pause;
+    auto& lock = *static_cast<NamedLock*>(mutex);
+    platform().record(Event::Kind::UNLOCK, "unlock " + lock.name);
+    lock.mutex.unlock();
+}
+
+} // namespace
+
+CoreLogger::CoreLogger() = default;
+
+CoreLogger* CoreLogger::GetInstance()
+{
+    static CoreLogger instance;
+    recordLogger("GetInstance");
+    return &instance;
+}
+
+int CoreLogger::GetDebugMode()
+{
+    recordLogger("GetDebugMode");
+    return platform().debugMode;
+}
+
+bool CoreLogger::HasLogTag()
+{
+    recordLogger("HasLogTag");
+    return platform().tag.has_value();
+}
+
+const char* CoreLogger::GetLogTag() const
+{
+    recordLogger("GetLogTag");
+    EXPECT_TRUE(platform().tag.has_value()) << "a tag was taken that is not set";
+    return platform().tag->c_str();
+}
+
+int CoreLogger::GetBufferIndex()
+{
+    recordLogger("GetBufferIndex");
+    return nextIndex++;
+}
+
+char* CoreLogger::GetBuffer(const int& index)
+{
+    recordLogger("GetBuffer");
+    EXPECT_TRUE(index >= 3 && index < nextIndex) << "nobody handed out buffer " << index;
+    FormatBuffer& buffer = buffers[static_cast<std::size_t>(index) % buffers.size()];
+    EXPECT_FALSE(buffer.overrun()) << "a message was longer than its buffer";
+    return buffer.bytes.data();
+}
+
+AESCrypto::AESCrypto() = default;
+
+AESCrypto* AESCrypto::GetInstance()
+{
+    static AESCrypto instance;
+    return &instance;
+}
+
+std::string AESCrypto::Encrypt(const std::string& plain)
+{
+    const AllocationPause pause;
+    platform().record(Event::Kind::CIPHER, callText("Encrypt", plain));
+    if (platform().cipherThrows)
+        throw std::runtime_error("the cipher failed");
+    return encipher(plain);
+}
+
+CoreMutex::CoreMutex(const char* name) : mutex_(&namedLock(name)) {}
+CoreMutex::~CoreMutex() = default;
+
+void CoreMutex::Lock()
+{
+    acquire(mutex_);
+}
+
+void CoreMutex::Unlock()
+{
+    release(mutex_);
+}
+
+CoreMutexLock::CoreMutexLock(const char* name) : mutex_(&namedLock(name))
+{
+    acquire(mutex_);
+}
+
+CoreMutexLock::~CoreMutexLock()
+{
+    release(mutex_);
+}
+
+CoreUtil::CoreUtil() = default;
+
+CoreUtil* CoreUtil::GetInstance()
+{
+    static CoreUtil instance;
+    return &instance;
+}
+
+std::string CoreUtil::intToStr(int number)
+{
+    const AllocationPause pause;
+    return std::to_string(number);
+}

@@ -1,0 +1,158 @@
+// SPDX-License-Identifier: Apache-2.0
+// A recording fake of everything the library imports: the platform's C functions and the utility
+// library. It is linked with the library's objects in place of both.
+//
+// What happens is recorded as one ordered sequence of events; what the platform answers is set by
+// the test. A call whose answer was not set fails the test, and so does a log line that breaks the
+// rules that hold for every line.
+//
+// A new platform function takes one definition in FakePlatform.cpp:
+//
+//     int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
+//     {
+//         return platform().reply(state, "telephony_sim_get_state", handle);
+//     }
+#ifndef CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
+#define CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
+
+#include <any>
+#include <cstdarg>
+#include <functional>
+#include <map>
+#include <mutex>
+#include <optional>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "FailingAllocation.h"
+#include "Ledger.h"
+
+namespace fake {
+
+struct LogLine {
+    int id = 0;
+    int priority = 0;
+    std::string tag;
+    std::string format;
+    std::string file;
+    std::string function;
+    int line = 0;
+    std::string text;  // as written, without the prefix
+    std::string plain; // the text; of a debug line the deciphered body
+};
+
+struct Event {
+    enum class Kind { CALL, LOCK, UNLOCK, LOG, LOGGER, CIPHER };
+    Kind kind;
+    // CALL   "function(argument, argument)"
+    // LOCK   "lock NAME", UNLOCK "unlock NAME"
+    // LOG    "debug FILE FUNCTION: PLAIN", likewise "error" and "notice"; where the format is not
+    //        the plain text itself, "error FILE FUNCTION: PLAIN <- FORMAT"
+    // LOGGER "GetDebugMode"; CIPHER "Encrypt(PLAIN)"
+    std::string text;
+    LogLine line; // of LOG only
+};
+
+typedef std::vector<std::string> Texts;
+
+// Operations on it may be called from any thread; the settings are for one thread at a time.
+class FakePlatform {
+public:
+    // Forgets all events, answers and settings, and empties the ledger.
+    void reset();
+    // Forgets the events only.
+    void forgetEvents();
+
+    // \name What it answers
+    // A value is written into the caller's slot whatever the result is; without one the slot stays
+    // as it was. A std::string becomes malloc memory that is entered in the ledger.
+    void answer(const std::string& call, int result, std::any value = {});
+
+    int debugMode = 0;
+    std::optional<std::string> tag;
+    bool cipherThrows = false;
+    int logResult = 0;
+    // Called after each event outside LOGGER and CIPHER, on the thread of the event.
+    std::function<void(const Event&)> onEvent;
+
+    // \name What happened
+    std::vector<Event> events() const;
+    // The calls, locks and log lines.
+    Texts trace() const;
+    // The operations of the logger, or of the cipher.
+    Texts texts(Event::Kind kind) const;
+    std::vector<LogLine> lines() const;
+
+    // \name For the fake functions
+    void record(Event::Kind kind, const std::string& text, const LogLine& line = {});
+    // Records a call and gives the result that was set for it.
+    template <class... Arguments>
+    int call(const char* function, const Arguments&... arguments);
+    // The same for a function that hands a value out through `slot`.
+    template <class Value, class... Arguments>
+    int reply(Value* slot, const char* function, const Arguments&... arguments);
+
+private:
+    struct Answer {
+        int result;
+        std::any value;
+    };
+    Answer answerTo(const std::string& call);
+
+    mutable std::mutex mutex_;
+    std::vector<Event> events_;
+    std::map<std::string, Answer> answers_;
+};
+
+FakePlatform& platform();
+
+// What the fake cipher makes of a text, and back.
+std::string encipher(const std::string& plain);
+std::string decipher(const std::string& enciphered);
+
+// \name The text of a call
+inline void writeArgument(std::ostream& out, const char* text)
+{
+    out << (text != nullptr ? text : "null");
+}
+template <class Value>
+void writeArgument(std::ostream& out, const Value& value)
+{
+    out << value;
+}
+template <class... Arguments>
+std::string callText(const char* function, const Arguments&... arguments)
+{
+    std::ostringstream out;
+    [[maybe_unused]] const char* separator = "";
+    out << function << '(';
+    ((out << separator, writeArgument(out, arguments), separator = ", "), ...);
+    out << ')';
+    return out.str();
+}
+
+template <class... Arguments>
+int FakePlatform::call(const char* function, const Arguments&... arguments)
+{
+    const AllocationPause pause;
+    return answerTo(callText(function, arguments...)).result;
+}
+
+template <class Value, class... Arguments>
+int FakePlatform::reply(Value* slot, const char* function, const Arguments&... arguments)
+{
+    const AllocationPause pause;
+    const Answer answer = answerTo(callText(function, arguments...));
+    if constexpr (std::is_same_v<Value, char*>) {
+        if (const auto* const text = std::any_cast<std::string>(&answer.value))
+            *slot = ledger().handOut(*text);
+    }
+    if (const auto* const value = std::any_cast<Value>(&answer.value))
+        *slot = *value;
+    return answer.result;
+}
+
+} // namespace fake
+
+#endif

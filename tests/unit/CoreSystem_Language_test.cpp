@@ -1,0 +1,306 @@
+// SPDX-License-Identifier: Apache-2.0
+// The display language.
+#include <limits>
+
+#include "support/PlatformTest.h"
+
+using namespace fake;
+using testing::IsEmpty;
+
+namespace {
+
+const std::string READ = "system_settings_get_value_string(13)";
+const std::string METHOD = "GetDeviceLanguageCode";
+const char* const UNTOUCHED = "untouched";
+
+// The language code, or UNTOUCHED; everything else must be freed again.
+std::string languageCode(bool convertToISO639, int expectedResult)
+{
+    char preset[] = "untouched";
+    char* slot = preset;
+    EXPECT_EQ(
+        CoreSystemInternals::instance<CoreSystem>()->GetDeviceLanguageCode(&slot, convertToISO639),
+        expectedResult);
+    const std::string code(slot);
+    if (slot != preset) {
+        EXPECT_EQ(ledger().live(), Texts{"copy: " + code});
+        std::free(slot);
+    }
+    EXPECT_THAT(ledger().live(), IsEmpty());
+    return code;
+}
+
+std::string languageCodeOf(const std::string& setting, bool convertToISO639)
+{
+    platform().answer(READ, 0, setting);
+    return languageCode(convertToISO639, 0);
+}
+
+// The lines up to the language part; the same in all cases.
+Texts readingTrace(int result, int position)
+{
+    return {
+        CORE_SYSTEM.debug(METHOD, "CoreSystem::GetDeviceLanguageCode"),
+        READ,
+        CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode ret : " + std::to_string(result)),
+        CORE_SYSTEM.debug("GetTagStartPosition", "CoreSystem::GetTagStartPosition"),
+        CORE_SYSTEM.debug("GetTagStartPosition", "[TAG: _] tag pos " + std::to_string(position)),
+        CORE_SYSTEM.debug("GetValueFromPosition", "CoreSystem::GetValueFromPosition")};
+}
+
+Texts capital(const std::string& text)
+{
+    return {
+        CORE_SYSTEM.debug("GetISO639LangCodeFromDeviceLang", "success to get capital : " + text)};
+}
+
+Texts converted(const std::string& text, const std::string& code)
+{
+    return capital(text) +
+           Texts{
+               CORE_SYSTEM.debug("GetISO639LangCodeFromDeviceLang",
+                                 "success to get ISO639Lang : " + code),
+               CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode[convertToISO639] : " + code + " ")};
+}
+
+Texts notConverted(const std::string& text)
+{
+    return {CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode[notconvert] : " + text)};
+}
+
+// An empty setting stands for a read that gives nothing.
+LoggedCall call(const std::string& name, int result, const std::string& setting, bool convert,
+                const Texts& trace)
+{
+    return {name,
+            [=] {
+                platform().answer(READ, result, setting.empty() ? std::any() : std::any(setting));
+                languageCode(convert, result);
+            },
+            trace};
+}
+
+const LoggedCall CALLS[] = {
+    call("LanguageAsItIs", 0, "en_US.UTF-8", false, readingTrace(0, 2) + notConverted("EN")),
+    call("LanguageConverted", 0, "ko_KR.UTF-8", true, readingTrace(0, 2) + converted("KO", "kor")),
+    call("LanguageNotInTable", 0, "de_DE.UTF-8", true, readingTrace(0, 2) + capital("DE")),
+    call("LanguageWithoutSeparator", 0, "C", false, readingTrace(0, -1) + notConverted("C")),
+    call("LanguageWithoutSeparatorConverted", 0, "C", true, readingTrace(0, -1) + capital("C")),
+    call("LanguageEmpty", 0, "_x", false, readingTrace(0, 0) + notConverted("")),
+    call("LanguageEmptyConverted", 0, "_x", true, readingTrace(0, 0) + capital("")),
+    call("LanguageReadFailed", -5, "", false, readingTrace(-5, 2) + notConverted("EN")),
+    call("LanguageReadFailedConverted", -13, "", true,
+         readingTrace(-13, 2) + converted("EN", "eng")),
+    call("LanguageReadGaveNull", 0, "", false, readingTrace(0, 2) + notConverted("EN")),
+};
+
+} // namespace
+
+INSTANTIATE_TEST_SUITE_P(Language, LoggedCallTest, testing::ValuesIn(CALLS), rowName<LoggedCall>);
+
+class LanguageTest : public PlatformTest {};
+
+TEST_F(LanguageTest, LanguagePartIsUpperCased)
+{
+    EXPECT_EQ(languageCodeOf("en_US.UTF-8", false), "EN");
+    EXPECT_EQ(languageCodeOf("ko_KR.UTF-8", false), "KO");
+    EXPECT_EQ(languageCodeOf("de_DE.UTF-8", false), "DE");
+    EXPECT_EQ(languageCodeOf("azAZ_x", false), "AZAZ");
+    EXPECT_EQ(languageCodeOf("a_b_c", false), "A");
+}
+
+TEST_F(LanguageTest, LanguagePartIsConverted)
+{
+    EXPECT_EQ(languageCodeOf("en_US.UTF-8", true), "eng");
+    EXPECT_EQ(languageCodeOf("ko_KR.UTF-8", true), "kor");
+    EXPECT_EQ(languageCodeOf("LG_x", true), "lug");
+    EXPECT_EQ(languageCodeOf("hi_IN", true), "hin");
+    EXPECT_EQ(languageCodeOf("ie", true), "ine");
+}
+
+TEST_F(LanguageTest, LanguageThatTheTableLacksLeavesTheSlot)
+{
+    for (const std::string setting : {"de_DE.UTF-8", "fr_FR", "zh_CN", "C", "POSIX", "_x", "eng_GB",
+                                      "en.UTF-8", " en_US", "e_n", "\xff_x"})
+        EXPECT_EQ(languageCodeOf(setting, true), UNTOUCHED) << setting;
+}
+
+TEST_F(LanguageTest, SettingWithoutSeparatorIsTakenWhole)
+{
+    EXPECT_EQ(languageCodeOf("C", false), "C");
+    EXPECT_EQ(languageCodeOf("c.utf-8", false), "C.UTF-8");
+    EXPECT_EQ(languageCodeOf("", false), "");
+    EXPECT_EQ(languageCodeOf("", true), UNTOUCHED);
+}
+
+TEST_F(LanguageTest, SettingThatBeginsWithTheSeparatorIsEmpty)
+{
+    EXPECT_EQ(languageCodeOf("_x", false), "");
+    EXPECT_EQ(languageCodeOf("_", false), "");
+}
+
+TEST_F(LanguageTest, OnlyAsciiLowerCaseLettersChange)
+{
+    for (int byte = 1; byte < 256; ++byte) {
+        const char character = static_cast<char>(byte);
+        if (character == '_')
+            continue;
+        const bool lowerCase = byte >= 97 && byte <= 122;
+        const std::string expected(1, lowerCase ? static_cast<char>(byte - 32) : character);
+        EXPECT_EQ(languageCodeOf(std::string(1, character) + "_x", false), expected) << byte;
+    }
+}
+
+TEST_F(LanguageTest, FailedReadAnswersWithTheDefaultAndItsCode)
+{
+    for (const int code : {-5, -22, -13, -1073741822, 1}) {
+        platform().answer(READ, code);
+        EXPECT_EQ(languageCode(false, code), "EN");
+        EXPECT_EQ(languageCode(true, code), "eng");
+        EXPECT_THAT(platform().lines(), IsEmpty());
+    }
+}
+
+TEST_F(LanguageTest, RemainsOfFailedReadAreNeitherUsedNorFreed)
+{
+    char remains[] = "ko_KR";
+    platform().answer(READ, -5, static_cast<char*>(remains));
+    EXPECT_EQ(languageCode(false, -5), "EN");
+    EXPECT_STREQ(remains, "ko_KR");
+}
+
+TEST_F(LanguageTest, NullStringAfterSuccessAnswersWithTheDefault)
+{
+    platform().answer(READ, 0);
+    EXPECT_EQ(languageCode(false, 0), "EN");
+    EXPECT_EQ(languageCode(true, 0), "eng");
+}
+
+TEST_F(LanguageTest, HugeSettingIsHandled)
+{
+    const std::string huge(10 << 20, 'x');
+    platform().debugMode = 1;
+    EXPECT_TRUE(languageCodeOf(huge, false) == std::string(huge.size(), 'X'));
+    EXPECT_TRUE(languageCodeOf("en_" + huge, false) == "EN");
+    EXPECT_EQ(languageCodeOf(huge, true), UNTOUCHED);
+}
+
+TEST_F(LanguageTest, FailedCopyGivesNull)
+{
+    for (const bool convert : {false, true}) {
+        platform().answer(READ, 0, std::string("en_US"));
+        const FailingAllocation failure(Allocation::STRDUP);
+        char* slot = nullptr;
+        EXPECT_EQ(system.GetDeviceLanguageCode(&slot, convert), 0);
+        EXPECT_EQ(slot, nullptr);
+        EXPECT_TRUE(failure.happened());
+        EXPECT_THAT(ledger().live(), IsEmpty());
+    }
+}
+
+// Lets each allocation of the call fail in turn: none of them may come out as an exception, and
+// whatever happens the platform's string is freed.
+TEST_F(LanguageTest, NoAllocationFailureLeavesTheMethod)
+{
+    const std::string setting = std::string(100, 'x') + "_X";
+    for (const int mode : {0, 1}) {
+        platform().debugMode = mode;
+        bool happened = true;
+        int failures = 0;
+        for (; happened && failures < 100; ++failures) {
+            platform().answer(READ, 0, setting);
+            char preset = 'p';
+            char* slot = &preset;
+            {
+                const FailingAllocation failure(Allocation::THROWING, failures);
+                EXPECT_NO_THROW(EXPECT_EQ(system.GetDeviceLanguageCode(&slot, false), 0));
+                happened = failure.happened();
+            }
+            EXPECT_TRUE(happened || slot == std::string(100, 'X'));
+            if (slot != &preset)
+                std::free(slot);
+            EXPECT_THAT(ledger().live(), IsEmpty());
+        }
+        EXPECT_GT(failures, 2) << "nothing was allocated";
+    }
+}
+
+TEST_F(LanguageTest, FailedAllocationLeavesTheSlot)
+{
+    platform().answer(READ, 0, std::string(100, 'x'));
+    char preset = 'p';
+    char* slot = &preset;
+    const FailingAllocation failure(Allocation::THROWING);
+    EXPECT_EQ(system.GetDeviceLanguageCode(&slot, false), 0);
+    EXPECT_TRUE(failure.happened());
+    EXPECT_EQ(slot, &preset);
+}
+
+TEST_F(LanguageTest, TagPositionIsThatOfTheFirstOccurrence)
+{
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("en_US", "_"), 2);
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("_a_b", "_"), 0);
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("a__b", "__"), 1);
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("abc", "_"), -1);
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("", "_"), -1);
+    EXPECT_EQ(CoreSystemInternals::tagStartPosition("abc", ""), 0);
+}
+
+TEST_F(LanguageTest, TagPositionLineNamesTheTag)
+{
+    platform().debugMode = 1;
+    CoreSystemInternals::tagStartPosition("a<b>", "<b>");
+    EXPECT_EQ(platform().trace().back(),
+              CORE_SYSTEM.debug("GetTagStartPosition", "[TAG: <b>] tag pos 1"));
+}
+
+TEST_F(LanguageTest, ValueReachesFromStartToEndInclusive)
+{
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, 1), "ab");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 2, 2), "c");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 5), "def");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 2), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, -1), "");
+}
+
+TEST_F(LanguageTest, NegativeLengthMeansTheWholeRest)
+{
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, -2), "abcdef");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 0), "def");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 1, std::numeric_limits<int>::min()),
+              "bcdef");
+}
+
+TEST_F(LanguageTest, ValueEndsWithTheText)
+{
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 4, 100), "ef");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 4, std::numeric_limits<int>::max()),
+              "ef");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 6, 8), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("", 0, 0), "");
+}
+
+TEST_F(LanguageTest, ValueThatStartsOutsideTheTextIsEmpty)
+{
+    const int least = std::numeric_limits<int>::min();
+    const int most = std::numeric_limits<int>::max();
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 7, 8), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", most, most), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", -1, 3), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", least, most), "");
+    EXPECT_EQ(CoreSystemInternals::valueFromPosition("", 1, 1), "");
+}
+
+TEST_F(LanguageTest, ConversionIsExactAndClearsItsSlot)
+{
+    EXPECT_STREQ(CoreSystemInternals::iso639("EN", UNTOUCHED), "eng");
+    for (const std::string unknown : {"en", "EN ", "E", "ENG", "", "DE"})
+        EXPECT_EQ(CoreSystemInternals::iso639(unknown, UNTOUCHED), nullptr) << unknown;
+}
+
+TEST_F(LanguageTest, ConversionAnswersWithTheTablesOwnText)
+{
+    const char* const first = CoreSystemInternals::iso639("EN", nullptr);
+    EXPECT_EQ(CoreSystemInternals::iso639("EN", nullptr), first);
+    EXPECT_THAT(ledger().live(), IsEmpty());
+}

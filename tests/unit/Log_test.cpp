@@ -1,0 +1,183 @@
+// SPDX-License-Identifier: Apache-2.0
+// The logging convention by itself, as a source file with a tag of its own uses it.
+#define CORESYSTEM_DEFAULT_TAG "Logger"
+#include "Log.h"
+
+#include "support/PlatformTest.h"
+
+using namespace fake;
+using testing::Each;
+using testing::ElementsAre;
+using testing::Field;
+
+class LogTest : public PlatformTest {};
+
+namespace {
+
+const char* const PREFIX = "%s: %s(%d) > ";
+
+coresystem::LogSite siteAt(const char* path)
+{
+    return {"AnyTag", path, "AnyFunction", 12};
+}
+
+std::string loggedBody(const std::string& message)
+{
+    platform().debugMode = 1;
+    platform().forgetEvents();
+    DEBUG_LINE("%s", message.c_str());
+    return platform().lines().at(0).plain;
+}
+
+} // namespace
+
+TEST_F(LogTest, ErrorLineIsPlainTextInOneFormat)
+{
+    const int line = __LINE__ + 1;
+    ERROR_LINE("failed [%d] %s", -5, "here");
+
+    const LogLine written = platform().lines().at(0);
+    EXPECT_EQ(written.id, 0);
+    EXPECT_EQ(written.priority, 6);
+    EXPECT_EQ(written.tag, "Logger");
+    EXPECT_EQ(written.format, std::string(PREFIX) + "failed [%d] %s");
+    EXPECT_EQ(written.file, "Log_test.cpp");
+    EXPECT_EQ(written.function, "TestBody");
+    EXPECT_EQ(written.line, line);
+    EXPECT_EQ(written.text, "failed [-5] here");
+}
+
+TEST_F(LogTest, DebugLineIsEncipheredBetweenItsMarkers)
+{
+    platform().debugMode = 1;
+    const int line = __LINE__ + 1;
+    DEBUG_LINE("name : %s", "my phone");
+
+    const LogLine written = platform().lines().at(0);
+    EXPECT_EQ(written.id, 0);
+    EXPECT_EQ(written.priority, 4);
+    EXPECT_EQ(written.tag, "Logger");
+    EXPECT_EQ(written.format, "%s: %s(%d) > {#!@%s#!@}");
+    EXPECT_EQ(written.file, "Log_test.cpp");
+    EXPECT_EQ(written.function, "TestBody");
+    EXPECT_EQ(written.line, line);
+    EXPECT_EQ(written.text, "{#!@" + encipher("name : my phone") + "#!@}");
+}
+
+TEST_F(LogTest, DebugLineTakesOneBufferAndEnciphersOnce)
+{
+    platform().debugMode = 1;
+    platform().tag = "App";
+    DEBUG_LINE("text");
+
+    Texts steps;
+    for (const Event& event : platform().events())
+        if (event.text != "GetInstance")
+            steps.push_back(event.text);
+    EXPECT_THAT(steps, ElementsAre("GetDebugMode", "GetBufferIndex", "GetBuffer", "Encrypt(text)",
+                                   "HasLogTag", "GetLogTag", "debug Log_test.cpp TestBody: text"));
+}
+
+TEST_F(LogTest, QuietDebugLineCostsTwoLoggerCallsAndEvaluatesNothing)
+{
+    int evaluated = 0;
+    DEBUG_LINE("%d", ++evaluated);
+    EXPECT_EQ(evaluated, 0);
+    EXPECT_THAT(platform().texts(Event::Kind::LOGGER), ElementsAre("GetInstance", "GetDebugMode"));
+    EXPECT_EQ(platform().events().size(), 2u);
+}
+
+TEST_F(LogTest, ErrorLineDoesNotAskForTheMode)
+{
+    ERROR_LINE("text");
+    EXPECT_THAT(platform().texts(Event::Kind::LOGGER), ElementsAre("GetInstance", "HasLogTag"));
+}
+
+TEST_F(LogTest, OnlyModeOneIsDebugMode)
+{
+    for (const int mode : {0, 2, -1, 256, 257}) {
+        platform().debugMode = mode;
+        DEBUG_LINE("text");
+    }
+    EXPECT_EQ(platform().trace(), Texts());
+}
+
+TEST_F(LogTest, TagIsChosenAnewForEachLine)
+{
+    ERROR_LINE("no tag yet");
+    platform().tag = "First";
+    ERROR_LINE("with a tag");
+    platform().tag = "Second";
+    ERROR_LINE("with another");
+    platform().tag.reset();
+    ERROR_LINE("without again");
+
+    Texts tags;
+    for (const LogLine& line : platform().lines())
+        tags.push_back(line.tag);
+    EXPECT_THAT(tags, ElementsAre("Logger", "First", "Second", "Logger"));
+}
+
+TEST_F(LogTest, MessageIsCutAfter598Characters)
+{
+    std::string message;
+    for (int i = 0; message.size() < 700; ++i)
+        message += std::to_string(i);
+    message.resize(700);
+
+    EXPECT_EQ(loggedBody(message), message.substr(0, 598));
+    EXPECT_EQ(loggedBody(message.substr(0, 599)), message.substr(0, 598));
+    EXPECT_EQ(loggedBody(message.substr(0, 598)), message.substr(0, 598));
+    EXPECT_EQ(loggedBody(message.substr(0, 597)), message.substr(0, 597));
+    EXPECT_EQ(loggedBody(std::string(10 << 20, 'x')), std::string(598, 'x'));
+    EXPECT_EQ(loggedBody("the buffers are sound"), "the buffers are sound");
+}
+
+TEST_F(LogTest, EmptyMessageIsEncipheredToo)
+{
+    EXPECT_EQ(loggedBody(""), "");
+    EXPECT_EQ(platform().lines().at(0).text, "{#!@#!@}");
+    EXPECT_THAT(platform().texts(Event::Kind::CIPHER), ElementsAre("Encrypt()"));
+}
+
+TEST_F(LogTest, MessageWithPercentSignsIsNotReadAsFormat)
+{
+    EXPECT_EQ(loggedBody("%s %n %d"), "%s %n %d");
+}
+
+TEST_F(LogTest, ErrorTextsAreNotCut)
+{
+    const std::string message(5000, 'e');
+    ERROR_LINE("%s", message.c_str());
+    EXPECT_EQ(platform().lines().at(0).text, message);
+}
+
+TEST_F(LogTest, FileNameIsWhatFollowsTheLastSlash)
+{
+    EXPECT_STREQ(coresystem::logFileName(siteAt("src/CoreSystem.cpp")), "CoreSystem.cpp");
+    EXPECT_STREQ(coresystem::logFileName(siteAt("/a/b/c.cpp")), "c.cpp");
+    EXPECT_STREQ(coresystem::logFileName(siteAt("CoreSystem.cpp")), "CoreSystem.cpp");
+    EXPECT_STREQ(coresystem::logFileName(siteAt("a/")), "");
+}
+
+TEST_F(LogTest, FailingCipherLosesTheLineOnly)
+{
+    platform().debugMode = 1;
+    platform().cipherThrows = true;
+    DEBUG_LINE("lost");
+    platform().cipherThrows = false;
+    DEBUG_LINE("kept");
+    EXPECT_THAT(platform().trace(), ElementsAre("debug Log_test.cpp TestBody: kept"));
+}
+
+TEST_F(LogTest, FailedAllocationLosesTheLineOnly)
+{
+    platform().debugMode = 1;
+    const std::string message(100, 'x');
+    {
+        const FailingAllocation failure(Allocation::THROWING);
+        DEBUG_LINE("%s", message.c_str());
+        EXPECT_TRUE(failure.happened());
+    }
+    EXPECT_EQ(platform().trace(), Texts());
+}

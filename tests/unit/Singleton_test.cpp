@@ -1,0 +1,194 @@
+// SPDX-License-Identifier: Apache-2.0
+// The access pattern that all singleton classes share.
+#include <future>
+#include <thread>
+#include <type_traits>
+
+#include "support/PlatformTest.h"
+
+using namespace fake;
+using testing::Each;
+
+namespace {
+
+template <class Singleton>
+const SourceFile& sourceOf();
+template <>
+const SourceFile& sourceOf<CoreSystem>()
+{
+    return CORE_SYSTEM;
+}
+template <>
+const SourceFile& sourceOf<SimManager>()
+{
+    return SIM_MANAGER;
+}
+
+// Looks before the first test does anything.
+class LoadTime : public testing::Environment {
+public:
+    static bool nothingHappened;
+
+    void SetUp() override
+    {
+        nothingHappened = platform().events().empty() &&
+                          CoreSystemInternals::instance<CoreSystem>() == nullptr &&
+                          CoreSystemInternals::instance<SimManager>() == nullptr;
+    }
+};
+bool LoadTime::nothingHappened = false;
+
+testing::Environment* const loadTime = testing::AddGlobalTestEnvironment(new LoadTime);
+
+} // namespace
+
+// As after loading: there is no instance, and nothing is recorded.
+template <class Singleton>
+class SingletonTest : public testing::Test {
+protected:
+    SingletonTest()
+    {
+        CoreSystemInternals::destroyInstance<Singleton>();
+        platform().reset();
+        platform().debugMode = 1;
+    }
+    ~SingletonTest() override
+    {
+        CoreSystemInternals::destroyInstance<Singleton>();
+        platform().reset();
+    }
+
+    const SourceFile& source = sourceOf<Singleton>();
+
+    std::string constructorLine() const
+    {
+        return source.debug(source.className, source.className + "()");
+    }
+    // A GetInstance() with something inside its lock.
+    Texts accessAround(const std::string& line) const
+    {
+        Texts trace = source.access();
+        trace.insert(trace.end() - 1, line);
+        return trace;
+    }
+};
+
+typedef testing::Types<CoreSystem, SimManager> Singletons;
+class SingletonName {
+public:
+    template <class Singleton>
+    static std::string GetName(int)
+    {
+        return sourceOf<Singleton>().className;
+    }
+};
+TYPED_TEST_SUITE(SingletonTest, Singletons, SingletonName);
+
+TYPED_TEST(SingletonTest, LoadingDoesNothing)
+{
+    EXPECT_TRUE(LoadTime::nothingHappened);
+    EXPECT_NE(loadTime, nullptr);
+}
+
+TYPED_TEST(SingletonTest, HasVirtualDestructorAndNoData)
+{
+    EXPECT_TRUE(std::has_virtual_destructor<TypeParam>::value);
+    EXPECT_EQ(sizeof(TypeParam), sizeof(void*));
+    EXPECT_FALSE(std::is_default_constructible<TypeParam>::value);
+    EXPECT_FALSE(std::is_destructible<TypeParam>::value);
+    EXPECT_FALSE(std::is_copy_constructible<TypeParam>::value);
+    EXPECT_FALSE(std::is_copy_assignable<TypeParam>::value);
+}
+
+TYPED_TEST(SingletonTest, FirstCallConstructsUnderItsLock)
+{
+    TypeParam* const instance = TypeParam::GetInstance();
+    ASSERT_NE(instance, nullptr);
+    EXPECT_EQ(instance, CoreSystemInternals::instance<TypeParam>());
+    EXPECT_EQ(platform().trace(), this->accessAround(this->constructorLine()));
+}
+
+TYPED_TEST(SingletonTest, ConstructorCreatesNoOtherInstance)
+{
+    CoreSystemInternals::destroyInstance<CoreSystem>();
+    CoreSystemInternals::destroyInstance<SimManager>();
+    TypeParam::GetInstance();
+    const bool coreSystem = CoreSystemInternals::instance<CoreSystem>() != nullptr;
+    const bool simManager = CoreSystemInternals::instance<SimManager>() != nullptr;
+    EXPECT_EQ(coreSystem, (std::is_same<TypeParam, CoreSystem>::value));
+    EXPECT_EQ(simManager, (std::is_same<TypeParam, SimManager>::value));
+}
+
+TYPED_TEST(SingletonTest, LaterCallsTakeTheLockAndConstructNothing)
+{
+    TypeParam* const instance = TypeParam::GetInstance();
+    for (int i = 0; i < 3; ++i) {
+        platform().forgetEvents();
+        EXPECT_EQ(TypeParam::GetInstance(), instance);
+        EXPECT_EQ(platform().trace(), this->source.access());
+    }
+}
+
+TYPED_TEST(SingletonTest, QuietModeStillTakesTheLock)
+{
+    platform().debugMode = 0;
+    TypeParam::GetInstance();
+    EXPECT_EQ(platform().trace(), (Texts{this->source.lock(), "un" + this->source.lock()}));
+}
+
+TYPED_TEST(SingletonTest, FailedAllocationGivesNullAndAnErrorLine)
+{
+    const FailingAllocation failure(Allocation::NOTHROW);
+    EXPECT_EQ(TypeParam::GetInstance(), nullptr);
+    EXPECT_TRUE(failure.happened());
+    EXPECT_EQ(platform().trace(), this->accessAround(this->source.error(
+                                      "GetInstance", this->source.className + "() failed.")));
+    EXPECT_EQ(platform().lines().back().tag, "CoreSystem");
+}
+
+TYPED_TEST(SingletonTest, CallAfterFailedAllocationTriesAgain)
+{
+    for (int i = 0; i < 2; ++i) {
+        const FailingAllocation failure(Allocation::NOTHROW);
+        EXPECT_EQ(TypeParam::GetInstance(), nullptr);
+    }
+    platform().forgetEvents();
+    EXPECT_NE(TypeParam::GetInstance(), nullptr);
+    EXPECT_EQ(platform().trace(), this->accessAround(this->constructorLine()));
+}
+
+TYPED_TEST(SingletonTest, DestructorIsSilent)
+{
+    TypeParam::GetInstance();
+    platform().forgetEvents();
+    CoreSystemInternals::destroyInstance<TypeParam>();
+    EXPECT_TRUE(platform().events().empty());
+}
+
+TYPED_TEST(SingletonTest, ManyThreadsGetOneInstanceConstructedOnce)
+{
+    const int THREADS = 8;
+    std::promise<void> start;
+    const std::shared_future<void> started = start.get_future().share();
+    std::vector<std::future<TypeParam*>> answers;
+    for (int i = 0; i < THREADS; ++i)
+        answers.push_back(std::async(std::launch::async, [started] {
+            started.wait();
+            return TypeParam::GetInstance();
+        }));
+    start.set_value();
+
+    std::vector<TypeParam*> instances;
+    for (auto& answer : answers)
+        instances.push_back(answer.get());
+    ASSERT_NE(instances.front(), nullptr);
+    EXPECT_THAT(instances, Each(instances.front()));
+
+    const Texts trace = platform().trace();
+    const auto times = [&trace](const std::string& text) {
+        return std::count(trace.begin(), trace.end(), text);
+    };
+    EXPECT_EQ(times(this->constructorLine()), 1);
+    EXPECT_EQ(times(this->source.lock()), THREADS);
+    EXPECT_EQ(times("un" + this->source.lock()), THREADS);
+}
