@@ -142,7 +142,7 @@ std::string othersText(const Reading& reading)
                         other.name.value_or("(not in the library's MCC table)")});
     return "\nAmbiguous: " + std::to_string(rows.size() + 1) + " MCCs have the " +
            reading.kind->name + " " + reading.key + ". The library answers with " +
-           reading.country.mcc + ",\nthe first in its table. Not answered:\n" + aligned(rows);
+           reading.country.mcc + ",\nthe first in its table, and leaves out:\n" + aligned(rows);
 }
 
 std::string severalCountriesText(const Reading& reading)

@@ -148,6 +148,7 @@ ExitCode runDecipher(const std::string& keyFile)
 void cli::addLogCommands(CLI::App& app, Invocation& invocation)
 {
     CLI::App* const log = app.add_subcommand("log", "Work with the library's log");
+    setFooter(*log, "Example: coresystem log decipher --key key <trace");
     log->require_subcommand(0, 1);
     log->callback([log] {
         if (log->get_subcommands().empty())
