@@ -1,0 +1,144 @@
+// SPDX-License-Identifier: Apache-2.0
+// The real host name and locale services, started by a private bus. They see an /etc of the test's
+// own and a host name of their own, so nothing reaches the machine.
+#include <cstdlib>
+
+#include <gmock/gmock.h>
+#include <unistd.h>
+
+#include "backend/Backend.h"
+#include "linux/Bus.h"
+#include "linux/Hostname1.h"
+#include "linux/Locale1.h"
+#include "linux/Settings.h"
+#include "support/Child.h"
+#include "support/PrivateBus.h"
+#include "support/Together.h"
+
+using port::Fact;
+using port::Result;
+using port::linux_backend::Bus;
+using port::linux_backend::BusObject;
+using port::linux_backend::HOSTNAME1;
+using port::linux_backend::LinuxSettings;
+using port::linux_backend::LOCALE1;
+using testing::StartsWith;
+
+namespace {
+
+const char HOSTNAMED[] = "/lib/systemd/systemd-hostnamed";
+const char LOCALED[] = "/lib/systemd/systemd-localed";
+
+class SystemdServicesTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (access(HOSTNAMED, X_OK) != 0 || access(LOCALED, X_OK) != 0)
+            GTEST_SKIP() << "needs systemd-hostnamed and systemd-localed (package systemd)";
+        if (!canHavePrivateMounts())
+            GTEST_SKIP()
+                << "needs a mount namespace, so that the machine's own /etc stays as it is";
+        for (const char* const variable : {"LC_ALL", "LC_MESSAGES", "LANG"})
+            unsetenv(variable);
+        etc.write("/passwd", "root:x:0:0:root:/root:/bin/sh\n");
+        etc.write("/group", "root:x:0:\n");
+        etc.write("/hostname", "static-name\n");
+        setLocale("");
+        bus.addActivatable(HOSTNAME1.name, HOSTNAMED);
+        bus.addActivatable(LOCALE1.name, LOCALED);
+        bus.useEtc(etc.root());
+        bus.start();
+    }
+
+    // The service reads one of the two, by distribution.
+    void setLocale(const std::string& assignments) const
+    {
+        etc.write("/locale.conf", assignments);
+        etc.write("/default/locale", assignments);
+    }
+
+    std::string deviceName()
+    {
+        return show(settings.deviceName());
+    }
+    std::string language()
+    {
+        return show(settings.language());
+    }
+    static std::string show(const Result<Fact>& answer)
+    {
+        return answer ? answer.value().value + " <" + answer.value().source + ">"
+                      : "error: " + answer.error().reason;
+    }
+
+    const TemporaryTree etc;
+    PrivateBus bus;
+    Bus client;
+    LinuxSettings settings{client};
+};
+
+TEST_F(SystemdServicesTest, PrettyNameComesBeforeTheStaticOne)
+{
+    EXPECT_EQ("static-name <hostname1 StaticHostname>", deviceName());
+    etc.write("/machine-info", "PRETTY_HOSTNAME=\"Grandma's \xe2\x98\x8e phone\"\n");
+    EXPECT_EQ("Grandma's \xe2\x98\x8e phone <hostname1 PrettyHostname>", deviceName());
+    etc.remove("/machine-info");
+    EXPECT_EQ("static-name <hostname1 StaticHostname>", deviceName());
+}
+
+TEST_F(SystemdServicesTest, NameSetThroughTheServiceIsSeen)
+{
+    deviceName();
+    GDBusConnection* const setter = g_dbus_connection_new_for_address_sync(
+        bus.address().c_str(),
+        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+        nullptr, nullptr, nullptr);
+    ASSERT_NE(nullptr, setter);
+    GVariant* const reply =
+        g_dbus_connection_call_sync(setter, HOSTNAME1.name, HOSTNAME1.path, HOSTNAME1.interface,
+                                    "SetPrettyHostname", g_variant_new("(sb)", "Pocket", FALSE),
+                                    nullptr, G_DBUS_CALL_FLAGS_NONE, 5000, nullptr, nullptr);
+    ASSERT_NE(nullptr, reply);
+    g_variant_unref(reply);
+    g_object_unref(setter);
+    EXPECT_EQ("Pocket <hostname1 PrettyHostname>", deviceName());
+}
+
+TEST_F(SystemdServicesTest, LanguageOfTheMachineIsSeen)
+{
+    EXPECT_EQ("error: locale1: Locale sets no language; LC_ALL, LC_MESSAGES and LANG are not set",
+              language());
+    setLocale("LANG=ko_KR.UTF-8\n");
+    EXPECT_EQ("ko_KR.UTF-8 <locale1 LANG>", language());
+    setLocale("LANG=ko_KR.UTF-8\nLC_MESSAGES=de_DE.UTF-8\n");
+    EXPECT_EQ("de_DE.UTF-8 <locale1 LC_MESSAGES>", language());
+}
+
+TEST_F(SystemdServicesTest, MachinesLanguageComesBeforeTheProcesss)
+{
+    setenv("LANG", "fr_FR.UTF-8", 1);
+    EXPECT_EQ("fr_FR.UTF-8 <environment LANG>", language());
+    setLocale("LANG=ko_KR.UTF-8\n");
+    EXPECT_EQ("ko_KR.UTF-8 <locale1 LANG>", language());
+    unsetenv("LANG");
+}
+
+TEST_F(SystemdServicesTest, BackendFindsBothServices)
+{
+    const auto backend = port::makeLinuxBackend();
+    for (const auto& service : backend->findServices())
+        if (service.name == HOSTNAME1.name || service.name == LOCALE1.name) {
+            EXPECT_EQ("starts on demand", service.state);
+        }
+    deviceName();
+    EXPECT_EQ("running", backend->findServices().at(0).state);
+    EXPECT_EQ("static-name", backend->settings().deviceName().value().value);
+}
+
+TEST_F(SystemdServicesTest, ThreadsMayAskTheServiceThatStartsMeanwhile)
+{
+    together(8, [this](int) { EXPECT_EQ("static-name <hostname1 StaticHostname>", deviceName()); });
+}
+
+} // namespace

@@ -1,0 +1,51 @@
+// SPDX-License-Identifier: Apache-2.0
+// The numbers of the platform's headers, which are part of every application's binary.
+#include <dlog.h>
+#include <gtest/gtest.h>
+#include <system_info.h>
+#include <system_settings.h>
+
+namespace {
+
+TEST(ApiTest, LogNumbersAreThePlatforms)
+{
+    EXPECT_EQ(0, LOG_ID_MAIN);
+    EXPECT_EQ(4, LOG_ID_MAX);
+    EXPECT_EQ(3, DLOG_DEBUG);
+    EXPECT_EQ(4, DLOG_INFO);
+    EXPECT_EQ(6, DLOG_ERROR);
+    EXPECT_EQ(9, DLOG_PRIO_MAX);
+    EXPECT_EQ(-1, DLOG_ERROR_NOT_PERMITTED);
+    EXPECT_EQ(-22, DLOG_ERROR_INVALID_PARAMETER);
+}
+
+TEST(ApiTest, InformationErrorsAreThePlatforms)
+{
+    EXPECT_EQ(0, SYSTEM_INFO_ERROR_NONE);
+    EXPECT_EQ(-5, SYSTEM_INFO_ERROR_IO_ERROR);
+    EXPECT_EQ(-12, SYSTEM_INFO_ERROR_OUT_OF_MEMORY);
+    EXPECT_EQ(-13, SYSTEM_INFO_ERROR_PERMISSION_DENIED);
+    EXPECT_EQ(-22, SYSTEM_INFO_ERROR_INVALID_PARAMETER);
+}
+
+TEST(ApiTest, SettingsNumbersAreThePlatforms)
+{
+    EXPECT_EQ(0, SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE);
+    EXPECT_EQ(3, SYSTEM_SETTINGS_KEY_FONT_SIZE);
+    EXPECT_EQ(8, SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED);
+    EXPECT_EQ(13, SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE);
+    EXPECT_EQ(21, SYSTEM_SETTINGS_KEY_DEVICE_NAME);
+    EXPECT_EQ(29, SYSTEM_SETTINGS_KEY_MAX);
+    EXPECT_EQ(-5, SYSTEM_SETTINGS_ERROR_IO_ERROR);
+    EXPECT_EQ(-22, SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER);
+    EXPECT_EQ(-1073741822, SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED);
+    EXPECT_EQ(-38141951, SYSTEM_SETTINGS_ERROR_LOCKSCREEN_APP_PASSWORD_MODE);
+}
+
+TEST(ApiTest, EnumerationsAreIntSized)
+{
+    EXPECT_EQ(sizeof(int), sizeof(log_id_t));
+    EXPECT_EQ(sizeof(int), sizeof(system_settings_key_e));
+}
+
+} // namespace

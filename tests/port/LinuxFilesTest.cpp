@@ -1,0 +1,204 @@
+// SPDX-License-Identifier: Apache-2.0
+// Facts from files, in a made-up tree and with no bus.
+#include <algorithm>
+#include <cstdlib>
+#include <filesystem>
+
+#include <gmock/gmock.h>
+#include <openssl/evp.h>
+#include <openssl/hmac.h>
+#include <sys/stat.h>
+#include <systemd/sd-id128.h>
+
+#include "linux/DeviceInfo.h"
+#include "support/Child.h"
+#include "support/TemporaryTree.h"
+
+using port::Fact;
+using port::Result;
+using port::linux_backend::Bus;
+using port::linux_backend::LinuxDeviceInfo;
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+const std::string MACHINE_ID = "4f2d9c0b6a714e8d95c3b17e20fd86aa";
+
+// The port's name in the hash of the machine id; it must never change.
+const sd_id128_t APPLICATION =
+    SD_ID128_MAKE(6f, 1c, 7e, 52, 0b, 94, 4d, 3a, a8, 27, e1, 5d, 93, 40, c6, 7b);
+
+std::string hex(const sd_id128_t& id)
+{
+    char text[SD_ID128_STRING_MAX];
+    return sd_id128_to_string(id, text);
+}
+
+std::string show(const Result<Fact>& answer)
+{
+    return answer ? answer.value().value + " <" + answer.value().source + ">"
+                  : "error: " + answer.error().reason;
+}
+
+class LinuxFilesTest : public testing::Test {
+protected:
+    LinuxFilesTest()
+    {
+        setenv("DBUS_SYSTEM_BUS_ADDRESS", "unix:path=/nowhere/bus", 1);
+    }
+    ~LinuxFilesTest() override
+    {
+        unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+    }
+
+    std::string nameIn(const std::string& osRelease)
+    {
+        tree.write("/etc/os-release", osRelease);
+        return show(device.platformName());
+    }
+
+    const TemporaryTree tree;
+    Bus bus;
+    LinuxDeviceInfo device{bus, tree.root()};
+};
+
+TEST_F(LinuxFilesTest, PlatformIdIsTheHashThatOpenSslComputes)
+{
+    tree.write("/etc/machine-id", MACHINE_ID + "\n");
+    sd_id128_t machine;
+    ASSERT_EQ(0, sd_id128_from_string(MACHINE_ID.c_str(), &machine));
+    unsigned char digest[EVP_MAX_MD_SIZE];
+    unsigned size = 0;
+    ASSERT_NE(nullptr, HMAC(EVP_sha256(), machine.bytes, sizeof machine.bytes, APPLICATION.bytes,
+                            sizeof APPLICATION.bytes, digest, &size));
+    sd_id128_t expected;
+    std::copy_n(digest, sizeof expected.bytes, expected.bytes);
+    expected.bytes[6] = static_cast<unsigned char>((expected.bytes[6] & 0x0f) | 0x40);
+    expected.bytes[8] = static_cast<unsigned char>((expected.bytes[8] & 0x3f) | 0x80);
+    EXPECT_EQ(hex(expected) + " </etc/machine-id (hashed)>", show(device.platformId()));
+}
+
+TEST_F(LinuxFilesTest, PlatformIdIsTheOneThatSystemdComputes)
+{
+    if (!canHavePrivateMounts())
+        GTEST_SKIP()
+            << "needs a mount namespace, to show systemd's library a machine id of its own";
+    tree.write("/etc/machine-id", MACHINE_ID + "\n");
+    const std::string expected = inChild([this] {
+        sd_id128_t id;
+        if (!enterPrivateMounts() || !bindFolder(tree.path("/etc"), "/etc") ||
+            sd_id128_get_machine_app_specific(APPLICATION, &id) != 0)
+            return std::string("failed");
+        return hex(id);
+    });
+    EXPECT_EQ(expected + " </etc/machine-id (hashed)>", show(device.platformId()));
+}
+
+TEST_F(LinuxFilesTest, MachineIdItselfIsNeverTold)
+{
+    tree.write("/etc/machine-id", MACHINE_ID + "\n");
+    EXPECT_THAT(show(device.platformId()), testing::Not(HasSubstr(MACHINE_ID)));
+    tree.write("/etc/machine-id", MACHINE_ID + "00\n");
+    EXPECT_EQ("error: /etc/machine-id holds no machine id", show(device.platformId()));
+}
+
+TEST_F(LinuxFilesTest, TextsThatAreNoMachineIdAreRefused)
+{
+    for (const std::string& text :
+         {std::string("uninitialized\n"), MACHINE_ID.substr(1), MACHINE_ID.substr(1) + "g",
+          std::string(32, '0'), std::string("4f2d9c0b-6a71-4e8d-95c3-b17e20fd86aa")}) {
+        tree.write("/etc/machine-id", text);
+        EXPECT_EQ("error: /etc/machine-id holds no machine id", show(device.platformId())) << text;
+    }
+}
+
+TEST_F(LinuxFilesTest, MachineIdOfTheBusIsTheSecondChoice)
+{
+    EXPECT_EQ("error: /etc/machine-id: No such file or directory, "
+              "/var/lib/dbus/machine-id: No such file or directory",
+              show(device.platformId()));
+    tree.write("/var/lib/dbus/machine-id", MACHINE_ID + "\n");
+    EXPECT_THAT(show(device.platformId()), HasSubstr(" </var/lib/dbus/machine-id (hashed)>"));
+    tree.write("/etc/machine-id", "\n");
+    EXPECT_THAT(show(device.platformId()), HasSubstr(" </var/lib/dbus/machine-id (hashed)>"));
+}
+
+TEST_F(LinuxFilesTest, OsReleaseNamesAndNumbersThePlatform)
+{
+    tree.write("/etc/os-release",
+               "PRETTY_NAME=\"Some OS 7 (x)\"\nNAME=\"Some OS\"\nVERSION_ID=7.1\n");
+    EXPECT_EQ("Some OS </etc/os-release NAME>", show(device.platformName()));
+    EXPECT_EQ("7.1 </etc/os-release VERSION_ID>", show(device.platformVersion()));
+}
+
+TEST_F(LinuxFilesTest, OsReleaseIsUnquotedAsAShellDoes)
+{
+    const std::string place = " </etc/os-release NAME>";
+    EXPECT_EQ("Plain" + place, nameIn("NAME=Plain"));
+    EXPECT_EQ("a b" + place, nameIn("NAME='a b'\n"));
+    EXPECT_EQ("a \"b\" $c `d` \\" + place, nameIn("NAME=\"a \\\"b\\\" \\$c \\`d\\` \\\\\"\n"));
+    EXPECT_EQ("a\"b" + place, nameIn("NAME='a\"b'\n"));
+    EXPECT_EQ("Plain" + place, nameIn("  NAME=Plain  \r\n"));
+    EXPECT_EQ("a=b" + place, nameIn("NAME=a=b\n"));
+    EXPECT_EQ("Über" + place, nameIn("NAME=Über\n"));
+}
+
+TEST_F(LinuxFilesTest, LastAssignmentOfOsReleaseCounts)
+{
+    EXPECT_EQ("two </etc/os-release NAME>", nameIn("NAME=one\nNAME=two\n"));
+    EXPECT_EQ("error: /etc/os-release has no NAME", nameIn("NAME=one\nNAME=\n"));
+}
+
+TEST_F(LinuxFilesTest, OtherLinesOfOsReleaseAreNotTaken)
+{
+    for (const char* const text :
+         {"# NAME=x\n", "MYNAME=x\n", "NAME_X=x\n", "NAME x\n", "NAME =x\n", "NAME=\n",
+          "NAME=\"\"\n", "NAME=\"unclosed\n", "ID=x\n"})
+        EXPECT_EQ("error: /etc/os-release has no NAME", nameIn(text)) << text;
+}
+
+TEST_F(LinuxFilesTest, VendorsOsReleaseIsTheSecondChoice)
+{
+    tree.write("/usr/lib/os-release", "NAME=Vendor\n");
+    EXPECT_EQ("Vendor </usr/lib/os-release NAME>", show(device.platformName()));
+    EXPECT_EQ("Admin </etc/os-release NAME>", nameIn("NAME=Admin\n"));
+}
+
+TEST_F(LinuxFilesTest, ModelComesFromDmiThenFromTheDeviceTree)
+{
+    tree.write("/proc/device-tree/model", std::string("Board 3\0", 8));
+    EXPECT_EQ("Board 3 </proc/device-tree/model>", show(device.modelName()));
+    tree.write("/sys/class/dmi/id/product_name", "\n");
+    EXPECT_EQ("Board 3 </proc/device-tree/model>", show(device.modelName()));
+    tree.write("/sys/class/dmi/id/product_name", "Laptop 9 \n");
+    EXPECT_EQ("Laptop 9 </sys/class/dmi/id/product_name>", show(device.modelName()));
+}
+
+TEST_F(LinuxFilesTest, AbsentModelNamesEveryPlace)
+{
+    EXPECT_THAT(show(device.modelName()),
+                AllOf(StartsWith("error: no system bus: "),
+                      HasSubstr("; /sys/class/dmi/id/product_name: No such file or directory, "
+                                "/proc/device-tree/model: No such file or directory")));
+}
+
+TEST_F(LinuxFilesTest, OddFilesAreNamedAndNeverWaitedFor)
+{
+    const std::string path = tree.path("/etc/os-release");
+    std::filesystem::create_directories(path);
+    EXPECT_THAT(show(device.platformName()),
+                StartsWith("error: /etc/os-release: Is a directory, "));
+    std::filesystem::remove(path);
+    ASSERT_EQ(0, mkfifo(path.c_str(), 0600));
+    EXPECT_THAT(show(device.platformName()),
+                StartsWith("error: /etc/os-release: not a regular file, "));
+    std::filesystem::remove(path);
+    EXPECT_THAT(nameIn(std::string(70000, '\n')),
+                StartsWith("error: /etc/os-release: larger than 65536 bytes, "));
+    EXPECT_THAT(nameIn(std::string("\0NAME=x\n", 8)),
+                StartsWith("error: /etc/os-release: empty, "));
+}
+
+} // namespace

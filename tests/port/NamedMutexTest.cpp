@@ -1,0 +1,159 @@
+// SPDX-License-Identifier: Apache-2.0
+// That a mutex excludes is seen by counting without an atomic: a lost count shows a hole, and the
+// thread sanitizer sees every unordered access.
+#include <atomic>
+#include <string>
+#include <thread>
+
+#include <gtest/gtest.h>
+
+#include "CoreMutex.h"
+#include "CoreMutexLock.h"
+#include "support/Together.h"
+
+namespace {
+
+// Reads, lets others run, writes.
+void countSlowly(int& count)
+{
+    const int before = count;
+    std::this_thread::yield();
+    count = before + 1;
+}
+
+TEST(NamedMutexTest, ScopedLocksOfOneNameExclude)
+{
+    int count = 0;
+    together(8, [&](int) {
+        for (int round = 0; round < 200; ++round) {
+            const CoreMutexLock lock("NamedMutexTest::scoped");
+            countSlowly(count);
+        }
+    });
+    EXPECT_EQ(8 * 200, count);
+}
+
+TEST(NamedMutexTest, BothClassesMeanTheSameMutex)
+{
+    int count = 0;
+    together(8, [&](int number) {
+        CoreMutex mutex("NamedMutexTest::both");
+        for (int round = 0; round < 200; ++round) {
+            if (number % 2 == 0) {
+                const CoreMutexLock lock("NamedMutexTest::both");
+                countSlowly(count);
+            } else {
+                mutex.Lock();
+                countSlowly(count);
+                mutex.Unlock();
+            }
+        }
+    });
+    EXPECT_EQ(8 * 200, count);
+}
+
+TEST(NamedMutexTest, HolderMayTakeItAgain)
+{
+    int count = 0;
+    together(4, [&](int) {
+        for (int round = 0; round < 200; ++round) {
+            const CoreMutexLock outer("NamedMutexTest::again");
+            {
+                const CoreMutexLock inner("NamedMutexTest::again");
+                CoreMutex mutex("NamedMutexTest::again");
+                mutex.Lock();
+                mutex.Unlock();
+            }
+            countSlowly(count); // the outer lock still holds
+        }
+    });
+    EXPECT_EQ(4 * 200, count);
+}
+
+TEST(NamedMutexTest, LockOutlivesTheObjectThatTookIt)
+{
+    int count = 0;
+    together(4, [&](int) {
+        for (int round = 0; round < 200; ++round) {
+            CoreMutex("NamedMutexTest::outlives").Lock();
+            countSlowly(count);
+            CoreMutex("NamedMutexTest::outlives").Unlock();
+        }
+    });
+    EXPECT_EQ(4 * 200, count);
+}
+
+TEST(NamedMutexTest, ThousandNamesAreThousandMutexes)
+{
+    const auto name = [](int i) { return "NamedMutexTest::name " + std::to_string(i); };
+    for (const int held : {0, 1, 500, 999}) {
+        const CoreMutexLock lock(name(held).c_str());
+        std::thread([&] { // hangs if another name meant the held mutex
+            for (int i = 0; i < 1000; ++i)
+                if (i != held)
+                    const CoreMutexLock other(name(i).c_str());
+        })
+            .join();
+    }
+}
+
+TEST(NamedMutexTest, ThreadsThatMakeTheSameNameAtOnceGetOneMutex)
+{
+    for (int i = 0; i < 50; ++i) {
+        const std::string name = "NamedMutexTest::made at once " + std::to_string(i);
+        int count = 0;
+        together(8, [&](int) {
+            const CoreMutexLock lock(name.c_str());
+            countSlowly(count);
+        });
+        ASSERT_EQ(8, count) << name;
+    }
+}
+
+TEST(NamedMutexTest, NameIsCopied)
+{
+    std::string name = "NamedMutexTest::copied";
+    int count = 0;
+    CoreMutex mutex(name.c_str());
+    name.assign(name.size(), 'x');
+    together(4, [&](int number) {
+        for (int round = 0; round < 200; ++round) {
+            CoreMutex own("NamedMutexTest::copied");
+            CoreMutex& used = number % 2 == 0 ? mutex : own;
+            used.Lock();
+            countSlowly(count);
+            used.Unlock();
+        }
+    });
+    EXPECT_EQ(4 * 200, count);
+}
+
+TEST(NamedMutexTest, NullIsTheEmptyName)
+{
+    int count = 0;
+    together(4, [&](int number) {
+        for (int round = 0; round < 200; ++round) {
+            const CoreMutexLock lock(number % 2 == 0 ? nullptr : "");
+            countSlowly(count);
+        }
+    });
+    EXPECT_EQ(4 * 200, count);
+}
+
+TEST(NamedMutexTest, UnlockByAThreadThatDoesNotHoldItDoesNothing)
+{
+#if defined(__SANITIZE_THREAD__)
+    GTEST_SKIP() << "the thread sanitizer reports such an unlock, as it should";
+#endif
+    int count = 0;
+    together(4, [&](int) {
+        for (int round = 0; round < 200; ++round) {
+            const CoreMutexLock lock("NamedMutexTest::not held");
+            std::thread([] { CoreMutex("NamedMutexTest::not held").Unlock(); }).join();
+            countSlowly(count);
+        }
+    });
+    EXPECT_EQ(4 * 200, count);
+}
+
+} // namespace

@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: Apache-2.0
+// Which backend a process gets.
+#include <filesystem>
+
+#include <gmock/gmock.h>
+#include <sys/statvfs.h>
+#include <unistd.h>
+
+#include "support/Program.h"
+#include "support/TemporaryTree.h"
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+TEST(BackendChoiceTest, ThisMachineAnswersUnlessADeviceFileIsNamed)
+{
+    EXPECT_THAT(outputOf("env -u CORESYSTEM_DEVICE " ENVIRONMENT_PROBE),
+                StartsWith("backend=linux\n"));
+    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE= " ENVIRONMENT_PROBE), StartsWith("backend=linux\n"));
+}
+
+TEST(BackendChoiceTest, NamedDeviceFileIsNeverReplacedByThisMachine)
+{
+    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE=/nowhere.toml " ENVIRONMENT_PROBE),
+                StartsWith("backend=simulator\n"));
+}
+
+TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
+{
+    const TemporaryTree tree;
+    struct statvfs folder = {};
+    if (geteuid() != 0 || statvfs(tree.root().c_str(), &folder) != 0 ||
+        (folder.f_flag & ST_NOSUID) != 0)
+        GTEST_SKIP() << "needs root and a temporary folder that allows set-user-ID programs";
+    const std::string probe = tree.path("/probe");
+    fs::copy_file(ENVIRONMENT_PROBE, probe);
+    fs::permissions(probe, fs::perms::set_uid | fs::perms(0755));
+
+    const std::string asNobody =
+        "setpriv --reuid=65534 --clear-groups env ASAN_OPTIONS=detect_leaks=0"
+        " CORESYSTEM_DEVICE=/nowhere.toml CORESYSTEM_LOG_DEBUG=1"
+        " CORESYSTEM_LOG_TAG=Weather CORESYSTEM_LOG_KEY=/nowhere ";
+    EXPECT_THAT(outputOf(asNobody + probe), HasSubstr("backend=linux\ndebug=0\ntag=0:\n"));
+    EXPECT_THAT(outputOf(asNobody + probe + " balance"), HasSubstr("configured=0\n"));
+    fs::permissions(probe, fs::perms(0755)); // the same program as an ordinary one obeys
+    EXPECT_THAT(outputOf(asNobody + probe), HasSubstr("debug=1\ntag=1:Weather\n"));
+}
+
+} // namespace

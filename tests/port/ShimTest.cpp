@@ -1,0 +1,322 @@
+// SPDX-License-Identifier: Apache-2.0
+// The platform's C functions over a device file.
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+#include <dlog.h>
+#include <gmock/gmock.h>
+#include <system_info.h>
+#include <system_settings.h>
+
+#include "coresystem_port.h"
+#include "shim/HandOut.h"
+#include "support/CapturedStandardError.h"
+#include "support/TemporaryTree.h"
+#include "support/Together.h"
+
+using coresystem_port::lastOrigin;
+using coresystem_port::Origin;
+using coresystem_port::Question;
+using testing::AllOf;
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::MatchesRegex;
+using testing::StartsWith;
+
+namespace {
+
+bool noMemory = false;
+
+} // namespace
+
+// The linker sends every strdup here.
+extern "C" char* __real_strdup(const char* text);
+extern "C" char* __wrap_strdup(const char* text)
+{
+    return noMemory ? nullptr : __real_strdup(text);
+}
+
+namespace {
+
+const TemporaryTree& tree()
+{
+    static const TemporaryTree& only = *[] {
+        auto* const made = new TemporaryTree;
+        setenv("CORESYSTEM_DEVICE", made->path("/device.toml").c_str(), 1);
+        return made;
+    }();
+    return only;
+}
+
+// The backend is chosen once per process: every test uses the same path.
+class ShimTest : public testing::Test {
+protected:
+    ShimTest()
+    {
+        coresystem_port::setLogSink(coresystem_port::LogSink::StandardError);
+        describe(
+            "[device]\n"
+            "platform_id = 'id'\nplatform_name = 'name'\nplatform_version = '1.2'\n"
+            "model_name = 'model'\n[settings]\ndevice_name = 'phone'\nlanguage = 'de_DE.UTF-8'\n");
+    }
+    ~ShimTest() override
+    {
+        noMemory = false;
+        tree().remove("/device.toml");
+        free(slot);
+    }
+
+    void describe(const std::string& facts)
+    {
+        tree().write("/device.toml", "schema = 1\n" + facts);
+    }
+
+    char* slot = nullptr;
+};
+
+struct Information {
+    const char* key;
+    const char* value;
+    Question question;
+};
+const Information INFORMATION[] = {
+    {"tizen.org/system/tizenid", "id", Question::PlatformId},
+    {"tizen.org/system/platform.name", "name", Question::PlatformName},
+    {"tizen.org/feature/platform.version", "1.2", Question::PlatformVersion},
+    {"tizen.org/system/model_name", "model", Question::ModelName},
+};
+struct Setting {
+    system_settings_key_e key;
+    const char* value;
+    Question question;
+};
+const Setting SETTINGS[] = {
+    {SYSTEM_SETTINGS_KEY_DEVICE_NAME, "phone", Question::DeviceName},
+    {SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, "de_DE.UTF-8", Question::Language},
+};
+
+char* const UNTOUCHED = reinterpret_cast<char*>(1);
+
+// The result of a call that must leave its slot alone.
+template <typename Call>
+int failure(Call call)
+{
+    char* untouched = UNTOUCHED;
+    const int result = call(&untouched);
+    EXPECT_EQ(UNTOUCHED, untouched);
+    return result;
+}
+
+int failedInformation(const char* key)
+{
+    return failure([key](char** slot) { return system_info_get_platform_string(key, slot); });
+}
+
+int failedSetting(int key)
+{
+    return failure([key](char** slot) {
+        return system_settings_get_value_string(static_cast<system_settings_key_e>(key), slot);
+    });
+}
+
+TEST_F(ShimTest, EveryInformationKeyIsAnswered)
+{
+    for (const Information& row : INFORMATION) {
+        ASSERT_EQ(0, system_info_get_platform_string(row.key, &slot)) << row.key;
+        EXPECT_STREQ(row.value, slot);
+        EXPECT_TRUE(lastOrigin(row.question).available);
+        EXPECT_THAT(lastOrigin(row.question).source,
+                    MatchesRegex(tree().path("/device.toml") + ":[3-6]"));
+        EXPECT_EQ("", lastOrigin(row.question).reason);
+        free(std::exchange(slot, nullptr));
+    }
+}
+
+TEST_F(ShimTest, EverySettingIsAnswered)
+{
+    for (const Setting& row : SETTINGS) {
+        ASSERT_EQ(0, system_settings_get_value_string(row.key, &slot));
+        EXPECT_STREQ(row.value, slot);
+        EXPECT_TRUE(lastOrigin(row.question).available);
+        free(std::exchange(slot, nullptr));
+    }
+}
+
+TEST_F(ShimTest, EachCallHandsOutACopyOfItsOwn)
+{
+    char* second = nullptr;
+    ASSERT_EQ(0, system_info_get_platform_string("tizen.org/system/tizenid", &slot));
+    ASSERT_EQ(0, system_info_get_platform_string("tizen.org/system/tizenid", &second));
+    EXPECT_NE(slot, second);
+    std::strcpy(slot, "xx");
+    EXPECT_STREQ("id", second);
+    free(second);
+}
+
+TEST_F(ShimTest, EmptyTextOfTheDeviceFileIsAnAnswer)
+{
+    describe("[settings]\nlanguage = ''\n");
+    ASSERT_EQ(0, system_settings_get_value_string(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, &slot));
+    EXPECT_STREQ("", slot);
+}
+
+TEST_F(ShimTest, NullArgumentsAreInvalid)
+{
+    EXPECT_EQ(-22, failedInformation(nullptr));
+    EXPECT_EQ(-22, system_info_get_platform_string("tizen.org/system/tizenid", nullptr));
+    EXPECT_EQ(-22, system_settings_get_value_string(SYSTEM_SETTINGS_KEY_DEVICE_NAME, nullptr));
+}
+
+TEST_F(ShimTest, UnknownInformationKeysAreInvalid)
+{
+    for (const char* const key :
+         {"", "tizen.org/system/tizenid ", "TIZEN.ORG/SYSTEM/TIZENID",
+          "tizen.org/system/platform.version", "http://tizen.org/system/tizenid"})
+        EXPECT_EQ(-22, failedInformation(key)) << key;
+}
+
+TEST_F(ShimTest, SettingsOfAnotherTypeAreInvalid)
+{
+    for (const int key :
+         {SYSTEM_SETTINGS_KEY_FONT_SIZE, SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED,
+          SYSTEM_SETTINGS_KEY_LOCK_STATE})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSetting(key)) << key;
+}
+
+TEST_F(ShimTest, NumbersOutsideTheEnumerationAreInvalid)
+{
+    for (const int key :
+         {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 30, 31, 32, 1000, -2147483647})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSetting(key)) << key;
+}
+
+TEST_F(ShimTest, TextSettingsThatNoDeviceHasAreNotSupported)
+{
+    for (const int key : {SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE, SYSTEM_SETTINGS_KEY_FONT_TYPE,
+                          SYSTEM_SETTINGS_KEY_LOCALE_COUNTRY, SYSTEM_SETTINGS_KEY_LOCALE_TIMEZONE,
+                          SYSTEM_SETTINGS_KEY_SOUND_NOTIFICATION})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedSetting(key)) << key;
+}
+
+TEST_F(ShimTest, AbsentFactIsAnIoErrorWithAReason)
+{
+    describe("");
+    for (const Information& row : INFORMATION) {
+        EXPECT_EQ(SYSTEM_INFO_ERROR_IO_ERROR, failedInformation(row.key)) << row.key;
+        EXPECT_FALSE(lastOrigin(row.question).available);
+        EXPECT_THAT(lastOrigin(row.question).reason, HasSubstr("[device] has no "));
+        EXPECT_EQ("", lastOrigin(row.question).source);
+    }
+    for (const Setting& row : SETTINGS)
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_IO_ERROR, failedSetting(row.key)) << row.key;
+}
+
+TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
+{
+    const auto code = [](const port::Error& error, int notSupported) {
+        return failure([&](char** answer) {
+            return port::handOut(Question::Language, error, answer, notSupported);
+        });
+    };
+    EXPECT_EQ(-5, code(port::notAvailable("why"), -7));
+    EXPECT_EQ(-7, code(port::notSupported("why"), -7));
+    EXPECT_EQ("why", lastOrigin(Question::Language).reason);
+}
+
+TEST_F(ShimTest, NoExceptionLeavesAShim)
+{
+    EXPECT_EQ(-12, port::guarded([]() -> int { throw std::bad_alloc(); }));
+    EXPECT_EQ(-5, port::guarded([]() -> int { throw 1; }));
+    EXPECT_EQ(3, port::guarded([]() -> int { return 3; }));
+}
+
+TEST_F(ShimTest, MissingMemoryIsNamed)
+{
+    noMemory = true;
+    EXPECT_EQ(SYSTEM_INFO_ERROR_OUT_OF_MEMORY, failedInformation("tizen.org/system/tizenid"));
+    EXPECT_EQ(SYSTEM_SETTINGS_ERROR_OUT_OF_MEMORY, failedSetting(SYSTEM_SETTINGS_KEY_DEVICE_NAME));
+}
+
+TEST_F(ShimTest, BadDeviceFileIsToldToTheLogOnce)
+{
+    describe("[device]\ncolour = 'red'\n");
+    const std::string problem = tree().path("/device.toml:3:1: unknown key \"colour\" in [device]");
+    CapturedStandardError log;
+    for (const Information& row : INFORMATION)
+        EXPECT_EQ(SYSTEM_INFO_ERROR_IO_ERROR, failedInformation(row.key));
+    EXPECT_EQ(problem, coresystem_port::deviceFileProblem());
+    const std::string lines = log.take();
+    EXPECT_THAT(lines, AllOf(StartsWith("E/coresystem-port("), EndsWith("): " + problem + "\n")));
+    EXPECT_EQ(1, std::count(lines.begin(), lines.end(), '\n'));
+}
+
+TEST_F(ShimTest, ThreadsMayAskWhileTheFileChanges)
+{
+    coresystem_port::setLogSink(coresystem_port::LogSink::None); // of half-written files
+    together(8, [this](int number) {
+        for (int round = 0; round < 50; ++round) {
+            if (number == 0)
+                describe("[device]\nmodel_name = '" + std::string(round % 2 == 0 ? "even" : "odd") +
+                         "'\n");
+            char* model = nullptr;
+            if (system_info_get_platform_string("tizen.org/system/model_name", &model) == 0) {
+                const std::string text = model;
+                ASSERT_TRUE(text == "model" || text == "even" || text == "odd") << text;
+            }
+            free(model);
+        }
+    });
+}
+
+TEST_F(ShimTest, PortTellsWhatAnswers)
+{
+    EXPECT_EQ("simulator", coresystem_port::backendName());
+    EXPECT_EQ(tree().path("/device.toml"), coresystem_port::deviceFile());
+    EXPECT_EQ("", coresystem_port::deviceFileProblem());
+    ASSERT_EQ(1U, coresystem_port::findServices().size());
+    EXPECT_TRUE(coresystem_port::findServices()[0].found);
+}
+
+TEST_F(ShimTest, LogLineIsFormattedAndCounted)
+{
+    CapturedStandardError log;
+    EXPECT_EQ(14,
+              __dlog_print(LOG_ID_MAIN, DLOG_ERROR, "Weather", "%s: %d of %c", "cloud", 42, 'x'));
+    EXPECT_THAT(log.take(), MatchesRegex("E/Weather \\([ 0-9]+\\): cloud: 42 of x\n"));
+}
+
+TEST_F(ShimTest, LongLogLineIsNotCut)
+{
+    CapturedStandardError log;
+    const std::string text(5000, 'x');
+    EXPECT_EQ(5000, __dlog_print(LOG_ID_MAIN, DLOG_INFO, "Weather", "%s", text.c_str()));
+    EXPECT_THAT(log.take(), HasSubstr(text + "\n"));
+}
+
+TEST_F(ShimTest, LogWithoutAFormatIsInvalid)
+{
+    const char* const none = nullptr;
+    EXPECT_EQ(DLOG_ERROR_INVALID_PARAMETER, __dlog_print(LOG_ID_MAIN, DLOG_INFO, "Weather", none));
+}
+
+TEST_F(ShimTest, LogTakesAnyNumberAndANullTag)
+{
+    CapturedStandardError log;
+    int number = 77;
+    const auto outside = static_cast<log_id_t>(number);
+    for (const int priority : {-1, 0, 9, 1000})
+        EXPECT_EQ(1, __dlog_print(outside, priority, nullptr, "x"));
+    EXPECT_THAT(log.take(), MatchesRegex("(\\?/        \\([ 0-9]+\\): x\n)+"));
+}
+
+TEST_F(ShimTest, LogThatGoesNowhereIsNoError)
+{
+    CapturedStandardError log;
+    coresystem_port::setLogSink(coresystem_port::LogSink::None);
+    EXPECT_EQ(1, __dlog_print(LOG_ID_MAIN, DLOG_INFO, "Weather", "x"));
+    EXPECT_EQ("", log.take());
+}
+
+} // namespace

@@ -1,0 +1,199 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/PrivateBus.h"
+
+#include <cerrno>
+#include <csignal>
+#include <cstdlib>
+#include <memory>
+#include <set>
+#include <stdexcept>
+
+#include <gio/gio.h>
+#include <poll.h>
+#include <sched.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "support/Child.h"
+
+extern "C" { // which the header of glibc 2.36 forgets
+#include <sys/pidfd.h>
+}
+
+namespace {
+
+constexpr int ADDRESS_DESCRIPTOR = 9;
+constexpr int PATIENCE_MS = 5000;
+
+const char CONFIGURATION[] =
+    R"(<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-BUS Bus Configuration 1.0//EN"
+ "http://www.freedesktop.org/standards/dbus/1.0/busconfig.dtd">
+<busconfig>
+  <type>system</type>
+  <listen>unix:path=@ROOT@/socket</listen>
+  <auth>EXTERNAL</auth>
+  <servicedir>@ROOT@/services</servicedir>
+  <policy context="default">
+    <allow user="*"/>
+    <allow own="*"/>
+    <allow send_destination="*" eavesdrop="true"/>
+    <allow eavesdrop="true"/>
+  </policy>
+</busconfig>
+)";
+
+std::string configurationFor(const std::string& root)
+{
+    std::string text = CONFIGURATION;
+    const std::string mark = "@ROOT@";
+    for (std::size_t at = text.find(mark); at != std::string::npos; at = text.find(mark, at))
+        text.replace(at, mark.size(), root);
+    return text;
+}
+
+struct Release {
+    void operator()(GDBusConnection* connection) const
+    {
+        g_dbus_connection_close_sync(connection, nullptr, nullptr);
+        g_object_unref(connection);
+    }
+    void operator()(GVariant* variant) const
+    {
+        g_variant_unref(variant);
+    }
+};
+using Connection = std::unique_ptr<GDBusConnection, Release>;
+using Variant = std::unique_ptr<GVariant, Release>;
+
+Variant askBus(const Connection& bus, const char* method, GVariant* arguments)
+{
+    return Variant(g_dbus_connection_call_sync(
+        bus.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
+        arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr));
+}
+
+void endDaemon(int processDescriptor)
+{
+    pollfd ended = {processDescriptor, POLLIN, 0};
+    pidfd_send_signal(processDescriptor, SIGTERM, nullptr, 0);
+    if (poll(&ended, 1, PATIENCE_MS) == 0)
+        pidfd_send_signal(processDescriptor, SIGKILL, nullptr, 0);
+    close(processDescriptor);
+}
+
+} // namespace
+
+PrivateBus::PrivateBus()
+{
+    tree_.write("/bus.conf", configurationFor(tree_.root()));
+    tree_.write("/services/none", "");
+}
+
+PrivateBus::~PrivateBus()
+{
+    stop();
+    unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+}
+
+std::string PrivateBus::address() const
+{
+    return "unix:path=" + tree_.path("/socket");
+}
+
+void PrivateBus::addActivatable(const std::string& name, const std::string& program) const
+{
+    tree_.write("/services/" + name + ".service",
+                "[D-BUS Service]\nName=" + name + "\nExec=" + program + "\nUser=root\n");
+}
+
+void PrivateBus::useEtc(const std::string& folder)
+{
+    etc_ = folder;
+}
+
+void PrivateBus::run(int addressPipe) const
+{
+    const bool ready = etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
+                                        bindFolder(etc_, "/etc"));
+    if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0) {
+        const std::string configuration = "--config-file=" + tree_.path("/bus.conf");
+        execlp("dbus-daemon", "dbus-daemon", configuration.c_str(), "--nofork", "--nopidfile",
+               "--print-address=9", static_cast<char*>(nullptr));
+    }
+    _exit(127);
+}
+
+void PrivateBus::start()
+{
+    int ends[2];
+    if (pipe(ends) != 0)
+        throw std::runtime_error("no pipe");
+    process_ = fork();
+    if (process_ == 0)
+        run(ends[1]);
+    close(ends[1]);
+    char first = 0;
+    const bool ready = read(ends[0], &first, 1) == 1; // it prints its address once it listens
+    close(ends[0]);
+    if (!ready)
+        throw std::runtime_error("dbus-daemon does not start");
+    setenv("DBUS_SYSTEM_BUS_ADDRESS", address().c_str(), 1);
+}
+
+void PrivateBus::kill()
+{
+    ::kill(process_, SIGKILL);
+    waitpid(process_, nullptr, 0);
+    process_ = 0;
+}
+
+void PrivateBus::freeze() const
+{
+    ::kill(process_, SIGSTOP);
+    waitpid(process_, nullptr, WUNTRACED); // until it has stopped
+}
+
+void PrivateBus::thaw() const
+{
+    ::kill(process_, SIGCONT);
+}
+
+// The processes on the bus besides this one: the daemons that it started.
+std::vector<int> PrivateBus::daemons() const
+{
+    std::vector<int> found;
+    const Connection bus(g_dbus_connection_new_for_address_sync(
+        address().c_str(),
+        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+        nullptr, nullptr, nullptr));
+    const Variant names = bus ? askBus(bus, "ListNames", nullptr) : nullptr;
+    if (!names)
+        return found;
+    std::set<pid_t> seen = {getpid(), process_};
+    GVariantIter* each = nullptr;
+    const char* name = nullptr;
+    g_variant_get(names.get(), "(as)", &each);
+    while (g_variant_iter_next(each, "&s", &name)) {
+        const Variant reply = askBus(bus, "GetConnectionUnixProcessID", g_variant_new("(s)", name));
+        guint32 process = 0;
+        if (reply)
+            g_variant_get(reply.get(), "(u)", &process);
+        if (process != 0 && seen.insert(static_cast<pid_t>(process)).second)
+            found.push_back(pidfd_open(static_cast<pid_t>(process), 0));
+    }
+    g_variant_iter_free(each);
+    return found;
+}
+
+void PrivateBus::stop()
+{
+    if (process_ == 0)
+        return;
+    thaw();
+    const std::vector<int> started = daemons();
+    ::kill(process_, SIGTERM);
+    waitpid(process_, nullptr, 0);
+    for (const int daemon : started)
+        endDaemon(daemon);
+}

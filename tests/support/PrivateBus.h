@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+// A system bus of the test's own.
+#ifndef TESTS_SUPPORT_PRIVATE_BUS_H
+#define TESTS_SUPPORT_PRIVATE_BUS_H
+
+#include <string>
+#include <vector>
+
+#include <sys/types.h>
+
+#include "support/TemporaryTree.h"
+
+/// A dbus-daemon of type system on a private socket. It is ready when start() returns. While it
+/// lives, DBUS_SYSTEM_BUS_ADDRESS of this process names it. At the end it is stopped, and so is
+/// every daemon that it started, by process id.
+class PrivateBus {
+public:
+    PrivateBus();
+    ~PrivateBus();
+    PrivateBus(const PrivateBus&) = delete;
+    PrivateBus& operator=(const PrivateBus&) = delete;
+
+    /// Before start(): lets the bus start a program when somebody asks for a name.
+    void addActivatable(const std::string& name, const std::string& program) const;
+    /// Before start(): the bus and what it starts see this folder as /etc, in namespaces of their
+    /// own, so that nothing they change reaches the machine.
+    void useEtc(const std::string& folder);
+
+    void start();
+    /// Kills it without a farewell; start() brings it back under the same address.
+    void kill();
+    /// Stops it from running, and lets it go on.
+    void freeze() const;
+    void thaw() const;
+
+    /// Without the bus's identity, so that it stays right after a restart.
+    std::string address() const;
+
+private:
+    [[noreturn]] void run(int addressPipe) const;
+    std::vector<int> daemons() const;
+    void stop();
+
+    TemporaryTree tree_;
+    std::string etc_;
+    pid_t process_ = 0;
+};
+
+#endif

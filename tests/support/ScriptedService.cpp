@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/ScriptedService.h"
+
+#include <stdexcept>
+
+namespace {
+
+constexpr int PATIENCE_MS = 5000;
+constexpr guint32 PRIMARY_OWNER = 1;
+
+GDBusConnection* connectTo(const std::string& address)
+{
+    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
+        address.c_str(),
+        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+        nullptr, nullptr, nullptr);
+    if (connection == nullptr)
+        throw std::runtime_error("no bus at " + address);
+    return connection;
+}
+
+void ownName(GDBusConnection* connection, const std::string& name)
+{
+    GVariant* const reply = g_dbus_connection_call_sync(
+        connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+        "RequestName", g_variant_new("(su)", name.c_str(), 0U), nullptr, G_DBUS_CALL_FLAGS_NONE,
+        PATIENCE_MS, nullptr, nullptr);
+    guint32 result = 0;
+    if (reply != nullptr)
+        g_variant_get(reply, "(u)", &result);
+    if (reply != nullptr)
+        g_variant_unref(reply);
+    if (result != PRIMARY_OWNER)
+        throw std::runtime_error("cannot own " + name);
+}
+
+bool isGetAll(GDBusMessage* message)
+{
+    return g_dbus_message_get_message_type(message) == G_DBUS_MESSAGE_TYPE_METHOD_CALL &&
+           g_strcmp0(g_dbus_message_get_member(message), "GetAll") == 0;
+}
+
+} // namespace
+
+ScriptedService::ScriptedService(const std::string& address, const std::string& name)
+    : connection_(connectTo(address)),
+      filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage, this, nullptr))
+{
+    answer("(@a{sv} {},)");
+    ownName(connection_, name);
+}
+
+ScriptedService::~ScriptedService()
+{
+    g_dbus_connection_remove_filter(connection_, filter_);
+    g_dbus_connection_close_sync(connection_, nullptr, nullptr);
+    g_object_unref(connection_);
+}
+
+// Runs on the connection's own thread, so a test may block in a call meanwhile.
+GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessage* message,
+                                         gboolean incoming, gpointer self)
+{
+    if (!incoming || !isGetAll(message))
+        return message;
+    auto& service = *static_cast<ScriptedService*>(self);
+    const std::lock_guard<std::mutex> lock(service.mutex_);
+    GDBusMessage* const reply = service.script_(message);
+    if (reply != nullptr) {
+        g_dbus_connection_send_message(connection, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                       nullptr);
+        g_object_unref(reply);
+    }
+    g_object_unref(message);
+    return nullptr;
+}
+
+void ScriptedService::follow(Script script)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    script_ = std::move(script);
+}
+
+void ScriptedService::answer(const std::string& body)
+{
+    follow([body](GDBusMessage* question) {
+        GDBusMessage* const reply = g_dbus_message_new_method_reply(question);
+        g_dbus_message_set_body(reply,
+                                g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr));
+        return reply;
+    });
+}
+
+void ScriptedService::fail(const std::string& errorName, const std::string& message)
+{
+    follow([errorName, message](GDBusMessage* question) {
+        return g_dbus_message_new_method_error_literal(question, errorName.c_str(),
+                                                       message.c_str());
+    });
+}
+
+void ScriptedService::keepSilent()
+{
+    whenAsked([] {});
+}
+
+void ScriptedService::whenAsked(std::function<void()> act)
+{
+    follow([act](GDBusMessage*) -> GDBusMessage* {
+        act();
+        return nullptr;
+    });
+}
+
+void ScriptedService::leaveWhenAsked()
+{
+    whenAsked([this] { g_dbus_connection_close(connection_, nullptr, nullptr, nullptr); });
+}

@@ -1,0 +1,45 @@
+// SPDX-License-Identifier: Apache-2.0
+// A service on the bus that answers as a test says.
+#ifndef TESTS_SUPPORT_SCRIPTED_SERVICE_H
+#define TESTS_SUPPORT_SCRIPTED_SERVICE_H
+
+#include <functional>
+#include <mutex>
+#include <string>
+
+#include <gio/gio.h>
+
+/// Owns a name from construction to destruction and answers every GetAll sent to it, at first with
+/// no properties.
+class ScriptedService {
+public:
+    ScriptedService(const std::string& address, const std::string& name);
+    ~ScriptedService();
+    ScriptedService(const ScriptedService&) = delete;
+    ScriptedService& operator=(const ScriptedService&) = delete;
+
+    /// The whole body of the reply in GVariant text form: "({'Hostname': <'box'>},)". Any type.
+    void answer(const std::string& body);
+    /// Answers with a D-Bus error.
+    void fail(const std::string& errorName, const std::string& message);
+    /// Takes the question and never answers.
+    void keepSilent();
+    /// Runs something when it is asked, and never answers.
+    void whenAsked(std::function<void()> act);
+    /// Leaves the bus when it is asked, as a daemon that dies does.
+    void leaveWhenAsked();
+
+private:
+    using Script = std::function<GDBusMessage*(GDBusMessage* question)>;
+
+    static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
+                                   gpointer self);
+    void follow(Script script);
+
+    std::mutex mutex_;
+    Script script_;
+    GDBusConnection* connection_;
+    guint filter_;
+};
+
+#endif
