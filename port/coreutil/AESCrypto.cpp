@@ -20,12 +20,21 @@ struct LoadedModule {
     std::string problem;
 };
 
+// The module stands beside this library, wherever that is.
+std::string modulePath()
+{
+    static const char here = 0;
+    Dl_info self = {};
+    const std::string library = dladdr(&here, &self) != 0 ? self.dli_fname : "";
+    return library.substr(0, library.rfind('/') + 1) + COREUTIL_CIPHER_MODULE;
+}
+
 // Loaded once and never unloaded.
 const LoadedModule& cipherModule()
 {
     static const LoadedModule& module = *new LoadedModule([] {
         LoadedModule loaded;
-        void* const library = dlopen(COREUTIL_CIPHER_MODULE, RTLD_NOW | RTLD_LOCAL);
+        void* const library = dlopen(modulePath().c_str(), RTLD_NOW | RTLD_LOCAL);
         if (library != nullptr)
             loaded.cipher =
                 static_cast<const CipherModule*>(dlsym(library, "coreutilCipherModule"));
