@@ -2,11 +2,12 @@
 // One column of a constant table, and the search of it.
 //
 // Cells have a fixed width and are padded with NUL, so a column is plain read-only data: no
-// pointer, no relocation. A cell compares as one machine word, which lets the compiler scan many
-// rows at once; the scan still goes from the first row to the last.
+// pointer, no relocation. A cell compares as one machine word, so a vector holds several rows; the
+// scan still goes from the first row to the last.
 #ifndef CORESYSTEM_TABLES_COLUMN_H
 #define CORESYSTEM_TABLES_COLUMN_H
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -36,35 +37,70 @@ struct Column {
     alignas(16) char cells[paddedRows(Rows)][Width];
 };
 
+// Written with the compilers' own vectors: a plain loop becomes vector code in some callers only.
+typedef std::uint32_t Words __attribute__((vector_size(16)));
+typedef std::uint64_t DoubleWords __attribute__((vector_size(16)));
+
+// How a cell of a width compares: `equal` sets each lane of a vector of cells whose cell equals.
 template <std::size_t Width>
-struct CellWord;
+struct Cell;
 template <>
-struct CellWord<4> {
-    typedef std::uint32_t Type;
+struct Cell<4> {
+    typedef std::uint32_t Word;
+    typedef Words Vector;
+    static Vector equal(Vector cells, Word wanted)
+    {
+        return reinterpret_cast<Vector>(cells == wanted);
+    }
 };
 template <>
-struct CellWord<8> {
-    typedef std::uint64_t Type;
+struct Cell<8> {
+    typedef std::uint64_t Word;
+    typedef DoubleWords Vector;
+    // In halves: not every processor compares double words. Only the low half of a lane is set.
+    static Vector equal(Vector cells, Word wanted)
+    {
+        const Vector all = {wanted, wanted};
+        const Vector halves = reinterpret_cast<Vector>(reinterpret_cast<Words>(cells) ==
+                                                       reinterpret_cast<Words>(all));
+        return halves & halves >> 32;
+    }
 };
 
+// A key as the word that an equal cell holds; false when it is too long to equal any cell.
 template <std::size_t Width>
-inline typename CellWord<Width>::Type loadCell(const char (&cell)[Width])
+inline bool packKey(const char* key, typename Cell<Width>::Word& word)
 {
-    typename CellWord<Width>::Type word;
-    std::memcpy(&word, cell, Width);
-    return word;
-}
-
-// Copies a NUL-terminated key into a cell; false when it is too long to equal any cell.
-template <std::size_t Width>
-inline bool packKey(const char* key, char (&cell)[Width])
-{
+    char cell[Width] = {};
     for (std::size_t i = 0; i < Width; ++i) {
-        if (key[i] == '\0')
+        if (key[i] == '\0') {
+            std::memcpy(&word, cell, Width);
             return true;
+        }
         cell[i] = key[i];
     }
     return false;
+}
+
+// One bit for each row of a block whose cell equals, the first row lowest.
+template <std::size_t Width>
+inline std::uint32_t equalRows(const char (*block)[Width], typename Cell<Width>::Word wanted)
+{
+    typedef typename Cell<Width>::Vector Vector;
+    constexpr std::size_t LANES = sizeof(Vector) / Width;
+
+    Vector bits = {};
+    for (std::size_t lane = 0; lane < LANES; ++lane)
+        bits[lane] = 1u << lane;
+    Vector rows = {};
+    for (std::size_t row = 0; row < SCAN_BLOCK; row += LANES, bits <<= LANES) {
+        Vector cells;
+        std::memcpy(&cells, block + row, sizeof cells);
+        rows |= Cell<Width>::equal(cells, wanted) & bits;
+    }
+    const DoubleWords pair = reinterpret_cast<DoubleWords>(rows);
+    const std::uint64_t both = pair[0] | pair[1];
+    return static_cast<std::uint32_t>(both | both >> 32);
 }
 
 // The row of the first cell that equals the key, or the column's row count.
@@ -72,22 +108,13 @@ inline bool packKey(const char* key, char (&cell)[Width])
 template <std::size_t Rows, std::size_t Width>
 inline std::size_t findFirst(const Column<Rows, Width>& column, const char* key)
 {
-    typedef typename CellWord<Width>::Type Word;
-    char keyCell[Width] = {};
-    if (!packKey(key, keyCell))
+    typename Cell<Width>::Word wanted;
+    if (!packKey<Width>(key, wanted))
         return Rows;
-    const Word wanted = loadCell(keyCell);
-
-    for (std::size_t block = 0; block < paddedRows(Rows); block += SCAN_BLOCK) {
-        Word hits = 0; // no early exit inside a block: this loop becomes vector code
-        for (std::size_t i = 0; i < SCAN_BLOCK; ++i)
-            hits |= static_cast<Word>(loadCell(column.cells[block + i]) == wanted);
-        if (hits != 0) {
-            std::size_t row = block;
-            while (loadCell(column.cells[row]) != wanted)
-                ++row;
-            return row;
-        }
+    for (std::size_t block = 0; block < Rows; block += SCAN_BLOCK) {
+        const std::uint32_t rows = equalRows(&column.cells[block], wanted);
+        if (rows != 0)
+            return std::min(block + static_cast<std::size_t>(__builtin_ctz(rows)), Rows);
     }
     return Rows;
 }
@@ -97,9 +124,14 @@ template <std::size_t Rows, std::size_t Width>
 inline std::size_t findLast(const Column<Rows, Width>& column, const char* key)
 {
     std::size_t found = Rows;
-    for (std::size_t row = 0; row < Rows; ++row)
-        if (std::strcmp(column.cells[row], key) == 0)
-            found = row;
+    typename Cell<Width>::Word wanted;
+    if (!packKey<Width>(key, wanted))
+        return Rows;
+    for (std::size_t block = 0; block < Rows; block += SCAN_BLOCK) {
+        const std::uint32_t rows = equalRows(&column.cells[block], wanted);
+        if (rows != 0)
+            found = std::min(block + 31 - static_cast<std::size_t>(__builtin_clz(rows)), Rows);
+    }
     return found;
 }
 
