@@ -3,10 +3,10 @@
 
 #include <array>
 #include <atomic>
-#include <functional>
-#include <memory>
+#include <cstdint>
+#include <cstring>
+#include <map>
 #include <string>
-#include <string_view>
 
 #include "CoreMutex.h"
 #include "CoreMutexLock.h"
@@ -14,33 +14,42 @@
 namespace {
 
 struct Entry {
-    const std::string name;
+    const char* const name;
+    std::recursive_mutex& mutex;
     const Entry* const next;
-    mutable std::recursive_mutex mutex;
 };
 
-// Entries are only ever added, at the head of a bucket, and never removed: finding one needs no
-// lock.
+// The address of the caller's text chooses the bucket, which is cheaper than reading the text and
+// serves because names are literals as a rule; the text itself decides. The same text at another
+// address may get an entry in another bucket, for the same mutex. Entries are only ever added, at
+// the head, and never removed: finding one needs no lock.
 std::array<std::atomic<const Entry*>, 64> buckets{};
-std::mutex additions;
 
-const Entry* findEntry(const Entry* entry, std::string_view name)
+std::atomic<const Entry*>& bucketOf(const char* name)
 {
-    while (entry != nullptr && entry->name != name)
+    return buckets[reinterpret_cast<std::uintptr_t>(name) / 8 % buckets.size()];
+}
+
+const Entry* findEntry(const Entry* entry, const char* name)
+{
+    while (entry != nullptr && std::strcmp(entry->name, name) != 0)
         entry = entry->next;
     return entry;
 }
 
-const Entry& addEntry(std::atomic<const Entry*>& bucket, std::string_view name)
+[[gnu::cold, gnu::noinline]] const Entry* addEntry(const char* name)
 {
+    static std::mutex additions;
+    static auto& mutexes = *new std::map<std::string, std::recursive_mutex>;
     const std::lock_guard<std::mutex> lock(additions);
+    auto& bucket = bucketOf(name);
     const Entry* const head = bucket.load(std::memory_order_relaxed);
-    const Entry* entry = findEntry(head, name); // another thread may have been faster
-    if (entry == nullptr) {
-        entry = new Entry{std::string(name), head, {}};
-        bucket.store(entry, std::memory_order_release);
-    }
-    return *entry;
+    if (const Entry* const found = findEntry(head, name)) // another thread was faster
+        return found;
+    auto& named = *mutexes.try_emplace(name).first;
+    const Entry* const entry = new Entry{named.first.c_str(), named.second, head};
+    bucket.store(entry, std::memory_order_release);
+    return entry;
 }
 
 std::recursive_mutex& asMutex(void* mutex)
@@ -52,10 +61,9 @@ std::recursive_mutex& asMutex(void* mutex)
 
 std::recursive_mutex& coreutil::namedMutex(const char* text)
 {
-    const std::string_view name(text != nullptr ? text : "");
-    auto& bucket = buckets[std::hash<std::string_view>()(name) % buckets.size()];
-    const Entry* const found = findEntry(bucket.load(std::memory_order_acquire), name);
-    return found != nullptr ? found->mutex : addEntry(bucket, name).mutex;
+    const char* const name = text != nullptr ? text : "";
+    const Entry* const found = findEntry(bucketOf(name).load(std::memory_order_acquire), name);
+    return (found != nullptr ? found : addEntry(name))->mutex;
 }
 
 CoreMutex::CoreMutex(const char* name) : mutex_(&coreutil::namedMutex(name)) {}
