@@ -47,7 +47,8 @@ void askIsMoSupportMcc(const char* key)
     benchmark::DoNotOptimize(CoreSystem::GetInstance()->IsMoSupportMcc(key));
 }
 
-#define ADD_QUESTION(question, rounds) addRounds(#question, rounds, askAndFree<&CoreSystem::question>)
+#define ADD_QUESTION(question, rounds) \
+    addRounds(#question, rounds, askAndFree<&CoreSystem::question>)
 
 // The chained questions keep a small copy for good: few enough calls that memory stays small.
 constexpr std::size_t LEAKING_CALLS = 50000;

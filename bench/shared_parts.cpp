@@ -55,9 +55,8 @@ void floorQuery(const char* key)
 void bench::addSharedParts()
 {
     addRounds("floor", roundsOf(textsOf(MccCountryTable::MCC), "999"), floorQuery);
-    addCase("GetInstance/-", [](std::size_t) {
-        benchmark::DoNotOptimize(CoreSystem::GetInstance());
-    });
+    addCase("GetInstance/-",
+            [](std::size_t) { benchmark::DoNotOptimize(CoreSystem::GetInstance()); });
     addCase("lock by name/-", [](std::size_t) {
         const CoreMutexLock lock("CoreSystem.cpp::GetInstance");
         benchmark::ClobberMemory();
