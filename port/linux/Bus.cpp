@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <string_view>
 
+#include <unistd.h>
+
 namespace port::linux_backend {
 namespace {
 
@@ -118,8 +120,16 @@ Result<std::string> textOf(const Variant& properties, const char* name)
 
 } // namespace
 
+bool Bus::isOwnedByThisProcess()
+{
+    pid_t owner = 0;
+    return owner_.compare_exchange_strong(owner, getpid()) || owner == getpid();
+}
+
 Result<Connection> Bus::connection()
 {
+    if (!isOwnedByThisProcess())
+        return notAvailable("the process was forked after it had asked the system bus");
     const unsigned attemptsBefore = attempts_;
     const std::lock_guard<std::mutex> lock(mutex_);
     if (connection_ && !g_dbus_connection_is_closed(connection_.get()))

@@ -2,7 +2,8 @@
 // The one D-Bus transport: a connection to the system bus that is the port's own.
 //
 // It never ends the application, never blocks without a bound, and is kept: it is opened again only
-// after the bus went away.
+// after the bus went away. A process that was forked from one that had asked the bus gets no answer
+// from it: GLib's bus thread stays behind in the parent, and waiting for it would never end.
 #ifndef PORT_LINUX_BUS_H
 #define PORT_LINUX_BUS_H
 
@@ -11,6 +12,8 @@
 #include <mutex>
 #include <string>
 #include <vector>
+
+#include <sys/types.h>
 
 #include "../backend/Result.h"
 #include "GLibTypes.h"
@@ -54,6 +57,9 @@ private:
                          const char* replyType);
     Result<std::vector<std::string>> names(const char* method);
 
+    bool isOwnedByThisProcess();
+
+    std::atomic<pid_t> owner_{0}; // the process that asked first
     std::mutex mutex_;
     Connection connection_;
     Error problem_{};                   // of the last attempt to connect
