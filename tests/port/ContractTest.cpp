@@ -189,7 +189,14 @@ protected:
 };
 
 using Backends = testing::Types<SimulatorStage, LinuxStage>;
-TYPED_TEST_SUITE(ContractTest, Backends);
+struct BackendName {
+    template <typename Backend>
+    static std::string GetName(int)
+    {
+        return std::is_same_v<Backend, LinuxStage> ? "Linux" : "Simulator";
+    }
+};
+TYPED_TEST_SUITE(ContractTest, Backends, BackendName);
 
 TYPED_TEST(ContractTest, SampleDevicesAreAnsweredAsDescribed)
 {

@@ -27,8 +27,8 @@ namespace {
 const std::string MACHINE_ID = "4f2d9c0b6a714e8d95c3b17e20fd86aa";
 
 // The port's name in the hash of the machine id; it must never change.
-const sd_id128_t APPLICATION =
-    SD_ID128_MAKE(6f, 1c, 7e, 52, 0b, 94, 4d, 3a, a8, 27, e1, 5d, 93, 40, c6, 7b);
+const sd_id128_t APPLICATION = {{0x6f, 0x1c, 0x7e, 0x52, 0x0b, 0x94, 0x4d, 0x3a, 0xa8, 0x27, 0xe1,
+                                 0x5d, 0x93, 0x40, 0xc6, 0x7b}};
 
 std::string hex(const sd_id128_t& id)
 {

@@ -11,6 +11,7 @@
 #include <gio/gio.h>
 #include <poll.h>
 #include <sched.h>
+#include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -113,6 +114,8 @@ void PrivateBus::useEtc(const std::string& folder)
 
 void PrivateBus::run(int addressPipe) const
 {
+    // A test that ends before its time leaves no bus behind.
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
     const bool ready = etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
                                         bindFolder(etc_, "/etc"));
     if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0) {

@@ -12,7 +12,7 @@
 
 /// A dbus-daemon of type system on a private socket. It is ready when start() returns. While it
 /// lives, DBUS_SYSTEM_BUS_ADDRESS of this process names it. At the end it is stopped, and so is
-/// every daemon that it started, by process id.
+/// every daemon that it started, by process id. The thread that calls start() must outlive it.
 class PrivateBus {
 public:
     PrivateBus();

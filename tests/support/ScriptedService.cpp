@@ -45,7 +45,9 @@ bool isGetAll(GDBusMessage* message)
 
 ScriptedService::ScriptedService(const std::string& address, const std::string& name)
     : connection_(connectTo(address)),
-      filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage, this, nullptr))
+      filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage,
+                                           new std::shared_ptr<State>(state_),
+                                           &ScriptedService::releaseState))
 {
     answer("(@a{sv} {},)");
     ownName(connection_, name);
@@ -53,6 +55,7 @@ ScriptedService::ScriptedService(const std::string& address, const std::string& 
 
 ScriptedService::~ScriptedService()
 {
+    keepSilent();
     g_dbus_connection_remove_filter(connection_, filter_);
     g_dbus_connection_close_sync(connection_, nullptr, nullptr);
     g_object_unref(connection_);
@@ -60,13 +63,13 @@ ScriptedService::~ScriptedService()
 
 // Runs on the connection's own thread, so a test may block in a call meanwhile.
 GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessage* message,
-                                         gboolean incoming, gpointer self)
+                                         gboolean incoming, gpointer state)
 {
     if (!incoming || !isGetAll(message))
         return message;
-    auto& service = *static_cast<ScriptedService*>(self);
-    const std::lock_guard<std::mutex> lock(service.mutex_);
-    GDBusMessage* const reply = service.script_(message);
+    const auto& shared = *static_cast<std::shared_ptr<State>*>(state);
+    const std::lock_guard<std::mutex> lock(shared->mutex);
+    GDBusMessage* const reply = shared->script(message);
     if (reply != nullptr) {
         g_dbus_connection_send_message(connection, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
                                        nullptr);
@@ -76,10 +79,15 @@ GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessa
     return nullptr;
 }
 
+void ScriptedService::releaseState(gpointer state)
+{
+    delete static_cast<std::shared_ptr<State>*>(state);
+}
+
 void ScriptedService::follow(Script script)
 {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    script_ = std::move(script);
+    const std::lock_guard<std::mutex> lock(state_->mutex);
+    state_->script = std::move(script);
 }
 
 void ScriptedService::answer(const std::string& body)

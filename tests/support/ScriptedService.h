@@ -4,6 +4,7 @@
 #define TESTS_SUPPORT_SCRIPTED_SERVICE_H
 
 #include <functional>
+#include <memory>
 #include <mutex>
 #include <string>
 
@@ -32,14 +33,20 @@ public:
 private:
     using Script = std::function<GDBusMessage*(GDBusMessage* question)>;
 
+    // Shared with the connection's thread, which may still be at it after the object's end.
+    struct State {
+        std::mutex mutex;
+        Script script;
+    };
+
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
-                                   gpointer self);
+                                   gpointer state);
+    static void releaseState(gpointer state);
     void follow(Script script);
 
-    std::mutex mutex_;
-    Script script_;
-    GDBusConnection* connection_;
-    guint filter_;
+    const std::shared_ptr<State> state_ = std::make_shared<State>();
+    GDBusConnection* const connection_;
+    const guint filter_;
 };
 
 #endif
