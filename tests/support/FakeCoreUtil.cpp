@@ -27,8 +27,8 @@ void recordLogger(const char* operation)
 
 // The bytes that the library may write, and after them some that it may not.
 struct FormatBuffer {
-    static const std::size_t USABLE = 599;
-    static const char UNTOUCHED = '\x7f';
+    static constexpr std::size_t USABLE = 599;
+    static constexpr char UNTOUCHED = '\x7f';
 
     FormatBuffer()
     {

@@ -51,11 +51,8 @@ inline Texts operator+(Texts texts, const Texts& more)
 // All instances exist and nothing is recorded when a test begins.
 class PlatformTest : public testing::Test {
 protected:
-    PlatformTest()
+    PlatformTest() : system(*CoreSystem::GetInstance()), sim(*SimManager::GetInstance())
     {
-        platform().reset();
-        CoreSystem::GetInstance();
-        SimManager::GetInstance();
         platform().reset();
     }
     ~PlatformTest() override
@@ -63,8 +60,8 @@ protected:
         platform().reset();
     }
 
-    CoreSystem& system = *CoreSystemInternals::instance<CoreSystem>();
-    SimManager& sim = *CoreSystemInternals::instance<SimManager>();
+    CoreSystem& system;
+    SimManager& sim;
 };
 
 // One call of the library and everything it does in debug mode, in order. The tests of all such

@@ -142,11 +142,3 @@ TEST(ColumnSearch, BytesAfterTheKeysEndDoNotCount)
     EXPECT_EQ(findFirst(numbered<20, 8>(), key), 7u);
     EXPECT_EQ(findFirst(numbered<20, 4>(), key), 7u);
 }
-
-TEST(ColumnSearch, RowsArePaddedToWholeBlocks)
-{
-    EXPECT_EQ(paddedRows(1), 16u);
-    EXPECT_EQ(paddedRows(16), 16u);
-    EXPECT_EQ(paddedRows(17), 32u);
-    EXPECT_EQ(paddedRows(0), 0u);
-}

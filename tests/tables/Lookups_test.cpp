@@ -64,11 +64,15 @@ const std::set<std::string>& keys()
     return all;
 }
 
-std::string takeText(char* text)
+template <class Singleton>
+std::string answer(Singleton& asked, void (Singleton::*question)(const char*, char**),
+                   const std::string& key)
 {
-    const std::string copy = text != nullptr ? text : NONE;
-    std::free(text);
-    return copy;
+    char* slot = nullptr;
+    (asked.*question)(key.c_str(), &slot);
+    const std::string text = slot != nullptr ? slot : NONE;
+    std::free(slot);
+    return text;
 }
 
 std::string firstOf(const std::vector<std::string>& cells)
@@ -98,9 +102,7 @@ INSTANTIATE_TEST_SUITE_P(Every, LookupTest, testing::ValuesIn(LOOKUPS), rowName<
 TEST_P(LookupTest, SearchAnswersAsPlainScanDoes)
 {
     for (const std::string& key : keys()) {
-        char* slot = nullptr;
-        (sim.*lookup.search)(key.c_str(), &slot);
-        ASSERT_EQ(takeText(slot), expected(key)) << key;
+        ASSERT_EQ(answer(sim, lookup.search, key), expected(key)) << key;
         platform().forgetEvents();
     }
 }
@@ -108,9 +110,7 @@ TEST_P(LookupTest, SearchAnswersAsPlainScanDoes)
 TEST_P(LookupTest, FacadeAnswersAsPlainScanDoes)
 {
     for (const std::string& key : keys()) {
-        char* slot = nullptr;
-        (system.*lookup.question)(key.c_str(), &slot);
-        ASSERT_EQ(takeText(slot), expected(key)) << key;
+        ASSERT_EQ(answer(system, lookup.question, key), expected(key)) << key;
         platform().forgetEvents();
     }
 }
@@ -133,9 +133,9 @@ TEST_F(OtherLookupTest, KeysCoverWhatTheyShould)
 TEST_F(OtherLookupTest, NameOfCallingCodeIsThatOfItsFirstMcc)
 {
     for (const std::string& key : keys()) {
-        char* slot = nullptr;
-        system.GetCountryNameFromCountryCallingCode(key.c_str(), &slot);
-        ASSERT_EQ(takeText(slot), firstOf(cellsOf(mccCountries(), 0, mccOf(key), 2))) << key;
+        ASSERT_EQ(answer(system, &CoreSystem::GetCountryNameFromCountryCallingCode, key),
+                  firstOf(cellsOf(mccCountries(), 0, mccOf(key), 2)))
+            << key;
         platform().forgetEvents();
     }
 }

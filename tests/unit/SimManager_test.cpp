@@ -108,10 +108,10 @@ TEST_P(SimConverterTest, FailedCopyGivesNull)
 class SimManagerTest : public PlatformTest {
 protected:
     // The answer of a converter, "null" for none.
-    std::string answer(void (SimManager::*question)(const char*, char**), const char* key)
+    static std::string answer(void (SimManager::*question)(const char*, char**), const char* key)
     {
         char* slot = nullptr;
-        (sim.*question)(key, &slot);
+        (::sim().*question)(key, &slot);
         const std::string text = slot != nullptr ? slot : "null";
         std::free(slot);
         return text;
