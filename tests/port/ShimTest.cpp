@@ -42,11 +42,7 @@ namespace {
 
 const TemporaryTree& tree()
 {
-    static const TemporaryTree& only = *[] {
-        auto* const made = new TemporaryTree;
-        setenv("CORESYSTEM_DEVICE", made->path("/device.toml").c_str(), 1);
-        return made;
-    }();
+    static const TemporaryTree only;
     return only;
 }
 
@@ -55,6 +51,7 @@ class ShimTest : public testing::Test {
 protected:
     ShimTest()
     {
+        setenv("CORESYSTEM_DEVICE", tree().path("/device.toml").c_str(), 1);
         coresystem_port::setLogSink(coresystem_port::LogSink::StandardError);
         describe(
             "[device]\n"
