@@ -204,7 +204,7 @@ TEST_F(AESCryptoTest, KeyFileOfTheEnvironmentIsUsed)
 {
     const std::string key = tree.write("/key", HEX_KEY);
     const std::string output =
-        outputOf("CORESYSTEM_LOG_KEY=" + key + " " ENVIRONMENT_PROBE " balance");
+        outputOf("CORESYSTEM_LOG_KEY=" + key + " " QUOTED_ENVIRONMENT_PROBE " balance");
     EXPECT_THAT(output, HasSubstr("\nconfigured=1\nproblem=\n"));
     const std::size_t begin = output.find("enciphered=") + 11;
     EXPECT_EQ("balance", open(output.substr(begin, output.find('\n', begin) - begin)));
@@ -215,14 +215,15 @@ TEST_F(AESCryptoTest, UnusableKeyFileOfTheEnvironmentIsNeverReplaced)
     const std::string key = tree.write("/key", HEX_KEY.substr(2));
     const std::string why = "key file " + key + ": a key is 32 bytes or 64 hexadecimal digits";
     const std::string output =
-        outputOf("CORESYSTEM_LOG_KEY=" + key + " " ENVIRONMENT_PROBE " balance");
+        outputOf("CORESYSTEM_LOG_KEY=" + key + " " QUOTED_ENVIRONMENT_PROBE " balance");
     EXPECT_THAT(output, AllOf(HasSubstr("enciphered=!" + why + "\nconfigured=1\nproblem=" + why),
                               Not(HasSubstr("balance"))));
 }
 
 TEST_F(AESCryptoTest, WithoutAKeyEveryProcessMakesItsOwn)
 {
-    const std::string output = outputOf("env -u CORESYSTEM_LOG_KEY " ENVIRONMENT_PROBE " balance");
+    const std::string output =
+        outputOf("env -u CORESYSTEM_LOG_KEY " QUOTED_ENVIRONMENT_PROBE " balance");
     EXPECT_THAT(output, AllOf(HasSubstr("\nconfigured=0\nproblem=\n"), Not(HasSubstr("balance"))));
     const std::size_t begin = output.find("enciphered=") + 11;
     const std::string text = output.substr(begin, output.find('\n', begin) - begin);
@@ -236,7 +237,7 @@ TEST_F(AESCryptoTest, KeyIsInNoOutput)
     for (const std::string& content :
          {HEX_KEY, HEX_KEY.substr(1), HEX_KEY + "zz", fromHex(HEX_KEY)})
         all += outputOf("CORESYSTEM_LOG_KEY=" + tree.write("/key", content) +
-                        " " ENVIRONMENT_PROBE " balance");
+                        " " QUOTED_ENVIRONMENT_PROBE " balance");
     EXPECT_THAT(all, AllOf(HasSubstr("enciphered="), Not(HasSubstr(HEX_KEY.substr(1, 16))),
                            Not(HasSubstr(fromHex(HEX_KEY).substr(16, 8)))));
 }

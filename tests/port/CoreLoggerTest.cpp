@@ -33,7 +33,7 @@ protected:
 std::string probe(const std::string& environment)
 {
     return outputOf("env -u CORESYSTEM_LOG_DEBUG -u CORESYSTEM_LOG_TAG " + environment +
-                    " " ENVIRONMENT_PROBE);
+                    " " QUOTED_ENVIRONMENT_PROBE);
 }
 
 TEST_F(CoreLoggerTest, ThereIsOneLogger)

@@ -18,14 +18,15 @@ namespace fs = std::filesystem;
 
 TEST(BackendChoiceTest, ThisMachineAnswersUnlessADeviceFileIsNamed)
 {
-    EXPECT_THAT(outputOf("env -u CORESYSTEM_DEVICE " ENVIRONMENT_PROBE),
+    EXPECT_THAT(outputOf("env -u CORESYSTEM_DEVICE " QUOTED_ENVIRONMENT_PROBE),
                 StartsWith("backend=linux\n"));
-    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE= " ENVIRONMENT_PROBE), StartsWith("backend=linux\n"));
+    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE= " QUOTED_ENVIRONMENT_PROBE),
+                StartsWith("backend=linux\n"));
 }
 
 TEST(BackendChoiceTest, NamedDeviceFileIsNeverReplacedByThisMachine)
 {
-    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE=/nowhere.toml " ENVIRONMENT_PROBE),
+    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE=/nowhere.toml " QUOTED_ENVIRONMENT_PROBE),
                 StartsWith("backend=simulator\n"));
 }
 
