@@ -93,6 +93,15 @@ TEST(ColumnSearch, KeyThatIsOneTooLongIsNotCutToFit)
     EXPECT_EQ(findFirst(wide, "abcdefgh"), 2u);
 }
 
+TEST(ColumnSearch, KeyThatCannotEqualAnyCellIsNotPacked)
+{
+    std::uint32_t word = 0;
+    EXPECT_TRUE(packKey<4>("", word));
+    EXPECT_TRUE(packKey<4>("abc", word));
+    EXPECT_FALSE(packKey<4>("abcd", word));
+    EXPECT_FALSE(packKey<4>("abcde", word));
+}
+
 TEST(ColumnSearch, PrefixIsNoMatch)
 {
     Column<1, 4> column = {};
