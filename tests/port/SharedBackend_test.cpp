@@ -39,6 +39,7 @@ TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
         GTEST_SKIP() << "needs root and a temporary folder that allows set-user-ID programs";
     const std::string probe = tree.path("/probe");
     fs::copy_file(ENVIRONMENT_PROBE, probe);
+    fs::copy_file(CIPHER_MODULE, tree.path("/" + fs::path(CIPHER_MODULE).filename().string()));
     fs::permissions(probe, fs::perms::set_uid | fs::perms(0755));
 
     const std::string asNobody =
@@ -46,7 +47,7 @@ TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
         " CORESYSTEM_DEVICE=/nowhere.toml CORESYSTEM_LOG_DEBUG=1"
         " CORESYSTEM_LOG_TAG=Weather CORESYSTEM_LOG_KEY=/nowhere ";
     EXPECT_THAT(outputOf(asNobody + probe), HasSubstr("backend=linux\ndebug=0\ntag=0:\n"));
-    EXPECT_THAT(outputOf(asNobody + probe + " balance"), HasSubstr("configured=0\n"));
+    EXPECT_THAT(outputOf(asNobody + probe + " balance"), HasSubstr("configured=0\nproblem=\n"));
     fs::permissions(probe, fs::perms(0755)); // the same program as an ordinary one obeys
     EXPECT_THAT(outputOf(asNobody + probe), HasSubstr("debug=1\ntag=1:Weather\n"));
 }
