@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "NamedMutex.h"
+// The registry behind CoreMutex and CoreMutexLock.
 
 #include <array>
 #include <atomic>
 #include <cstdint>
 #include <cstring>
 #include <map>
+#include <mutex>
 #include <string>
 
 #include "CoreMutex.h"
@@ -57,16 +58,17 @@ std::recursive_mutex& asMutex(void* mutex)
     return *static_cast<std::recursive_mutex*>(mutex);
 }
 
-} // namespace
-
-std::recursive_mutex& coreutil::namedMutex(const char* text)
+// The mutex known by a name in this process; made on first use, never destroyed.
+[[gnu::always_inline]] inline std::recursive_mutex& namedMutex(const char* text)
 {
     const char* const name = text != nullptr ? text : "";
     const Entry* const found = findEntry(bucketOf(name).load(std::memory_order_acquire), name);
     return (found != nullptr ? found : addEntry(name))->mutex;
 }
 
-CoreMutex::CoreMutex(const char* name) : mutex_(&coreutil::namedMutex(name)) {}
+} // namespace
+
+CoreMutex::CoreMutex(const char* name) : mutex_(&namedMutex(name)) {}
 
 CoreMutex::~CoreMutex() = default;
 
@@ -80,7 +82,7 @@ void CoreMutex::Unlock()
     asMutex(mutex_).unlock();
 }
 
-CoreMutexLock::CoreMutexLock(const char* name) : mutex_(&coreutil::namedMutex(name))
+CoreMutexLock::CoreMutexLock(const char* name) : mutex_(&namedMutex(name))
 {
     asMutex(mutex_).lock();
 }
