@@ -4,21 +4,15 @@
 
 #include <cstdlib>
 
-#include <CoreSystem.h>
-
-#include "tables/Alpha3CountryTable.h"
-#include "tables/CallingCodeTable.h"
-#include "tables/MccCountryTable.h"
-#include "tables/ServiceCountryTable.h"
+#include "Conversions.h"
 
 using namespace coresystem;
 using bench::addRounds;
+using bench::Question;
 using bench::roundsOf;
 using bench::textsOf;
 
 namespace {
-
-typedef void (CoreSystem::*Question)(const char* key, char** answer);
 
 template <Question question>
 void askAndFree(const char* key)
@@ -47,9 +41,6 @@ void askIsMoSupportMcc(const char* key)
     benchmark::DoNotOptimize(CoreSystem::GetInstance()->IsMoSupportMcc(key));
 }
 
-#define ADD_QUESTION(question, rounds) \
-    addRounds(#question, rounds, askAndFree<&CoreSystem::question>)
-
 // The chained questions keep a small copy for good: few enough calls that memory stays small.
 constexpr std::size_t LEAKING_CALLS = 50000;
 
@@ -57,21 +48,16 @@ constexpr std::size_t LEAKING_CALLS = 50000;
 
 void bench::addCountryQueries()
 {
-    const auto mccs = roundsOf(textsOf(MccCountryTable::MCC), "999");
-    ADD_QUESTION(GetCountryCodeFromMcc, mccs);
-    ADD_QUESTION(GetCountryNameFromMcc, mccs);
-    ADD_QUESTION(GetMccFromCountryCode, roundsOf(textsOf(MccCountryTable::ALPHA2), "zz"));
-    ADD_QUESTION(GetMccFromServiceCountryCode,
-                 roundsOf(textsOf(ServiceCountryTable::LOCALE), "zz_ZZ"));
-    ADD_QUESTION(GetServiceCountryCodeFromMcc, roundsOf(textsOf(ServiceCountryTable::MCC), "999"));
+    forEachConversion([](const char* name, auto question, const auto& keys, const auto&,
+                         const char* noMatch) {
+        addRounds(name, roundsOf(textsOf(keys), noMatch), askAndFree<decltype(question)::value>);
+    });
     const auto callingCodes = roundsOf(textsOf(CallingCodeTable::CALLING_CODE), "999");
-    ADD_QUESTION(GetCountryCallingCodeFromMcc, roundsOf(textsOf(CallingCodeTable::MCC), "999"));
-    ADD_QUESTION(GetAlpha3CountryCodeFromMcc, roundsOf(textsOf(Alpha3CountryTable::MCC), "999"));
-    ADD_QUESTION(GetMccFromCountryCallingCode, callingCodes);
     addRounds("GetCountryNameFromCountryCallingCode", callingCodes,
               askAndFree<&CoreSystem::GetCountryNameFromCountryCallingCode>, LEAKING_CALLS);
     addRounds("GetCountryNameAlpha2FromCountryCallingCode", callingCodes, askAlpha2OfCallingCode,
               LEAKING_CALLS);
+    const auto mccs = roundsOf(textsOf(MccCountryTable::MCC), "999");
     addRounds("IsValidMcc", mccs, askIsValidMcc);
     addRounds("IsMoSupportMcc", mccs, askIsMoSupportMcc);
 }

@@ -1,33 +1,53 @@
 // SPDX-License-Identifier: Apache-2.0
 // bench_calls [Google Benchmark options]   times every case
-// bench_calls --list                       names them
-// bench_calls --repeat NAME COUNT          runs one case COUNT times and nothing else
+// bench_calls --count                      runs every case the same number of times, for callgrind
+// bench_calls --pages                      asks once, then shows what the library's pages cost
 #include "Cases.h"
 
-#include <cstdio>
 #include <cstdlib>
-#include <cstring>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+#include <string>
 
+#include <CoreSystem.h>
 #include <coresystem_port.h>
+#include <valgrind/callgrind.h>
 
 namespace {
 
-int list()
+// One dump a case, named after it: the instructions of COUNTED_CALLS calls, after as many to warm
+// up.
+int countAll()
 {
-    for (const bench::Case& each : bench::cases())
-        std::puts(each.name.c_str());
+    for (const bench::Case& each : bench::cases()) {
+        each.repeat(bench::COUNTED_CALLS);
+        CALLGRIND_ZERO_STATS;
+        each.repeat(bench::COUNTED_CALLS);
+        CALLGRIND_DUMP_STATS_AT(each.name.c_str());
+    }
     return EXIT_SUCCESS;
 }
 
-int repeat(const char* name, const char* count)
+// Permissions and private dirty memory of each mapping of the library.
+int showPages()
 {
-    for (const bench::Case& each : bench::cases())
-        if (each.name == name) {
-            each.repeat(std::strtoul(count, nullptr, 10));
-            return EXIT_SUCCESS;
-        }
-    std::fprintf(stderr, "no case %s\n", name);
-    return EXIT_FAILURE;
+    char* country = nullptr;
+    CoreSystem::GetInstance()->GetCountryCodeFromMcc("450", &country);
+    std::free(country);
+
+    std::ifstream mappings("/proc/self/smaps");
+    std::string permissions;
+    for (std::string line; std::getline(mappings, line);) {
+        std::istringstream words(line);
+        std::string first, second;
+        words >> first >> second;
+        if (first.back() != ':')
+            permissions = line.find("/libcoresystem.so") != std::string::npos ? second : "";
+        else if (first == "Private_Dirty:" && !permissions.empty())
+            std::cout << permissions << '\t' << second << '\n';
+    }
+    return EXIT_SUCCESS;
 }
 
 int timeAll(int argc, char** argv)
@@ -53,9 +73,10 @@ int main(int argc, char** argv)
     bench::addSharedParts();
     bench::addCountryQueries();
     bench::addPeers();
-    if (argc == 2 && std::strcmp(argv[1], "--list") == 0)
-        return list();
-    if (argc == 4 && std::strcmp(argv[1], "--repeat") == 0)
-        return repeat(argv[2], argv[3]);
+    const std::string mode = argc == 2 ? argv[1] : "";
+    if (mode == "--count")
+        return countAll();
+    if (mode == "--pages")
+        return showPages();
     return timeAll(argc, argv);
 }

@@ -12,10 +12,7 @@
 #include <phonenumbers/phonenumberutil.h>
 #include <unicode/uloc.h>
 
-#include "tables/Alpha3CountryTable.h"
-#include "tables/CallingCodeTable.h"
-#include "tables/MccCountryTable.h"
-#include "tables/ServiceCountryTable.h"
+#include "Conversions.h"
 
 using namespace coresystem;
 using i18n::phonenumbers::PhoneNumberUtil;
@@ -37,22 +34,6 @@ void addHashMap(const std::string& question, const Keys& keys, const Values& val
         benchmark::DoNotOptimize(answer);
         std::free(answer);
     });
-}
-
-void addHashMaps()
-{
-    namespace Mcc = MccCountryTable;
-    namespace Service = ServiceCountryTable;
-    namespace Calling = CallingCodeTable;
-    namespace Alpha3 = Alpha3CountryTable;
-    addHashMap("GetCountryCodeFromMcc", Mcc::MCC, Mcc::ALPHA2, "999");
-    addHashMap("GetCountryNameFromMcc", Mcc::MCC, Mcc::NAME, "999");
-    addHashMap("GetMccFromCountryCode", Mcc::ALPHA2, Mcc::MCC, "zz");
-    addHashMap("GetMccFromServiceCountryCode", Service::LOCALE, Service::MCC, "zz_ZZ");
-    addHashMap("GetServiceCountryCodeFromMcc", Service::MCC, Service::LOCALE, "999");
-    addHashMap("GetCountryCallingCodeFromMcc", Calling::MCC, Calling::CALLING_CODE, "999");
-    addHashMap("GetAlpha3CountryCodeFromMcc", Alpha3::MCC, Alpha3::ALPHA3, "999");
-    addHashMap("GetMccFromCountryCallingCode", Calling::CALLING_CODE, Calling::MCC, "999");
 }
 
 std::string upper(std::string text)
@@ -113,7 +94,8 @@ void addIcu()
 
 void bench::addPeers()
 {
-    addHashMaps();
+    forEachConversion([](const char* name, auto, const auto& keys, const auto& values,
+                         const char* noMatch) { addHashMap(name, keys, values, noMatch); });
     addLibphonenumber();
     addIcu();
 }

@@ -9,60 +9,65 @@
 
 #include <CoreLogger.h>
 #include <CoreMutexLock.h>
-#include <CoreSystem.h>
 
+#include "Conversions.h"
 #include "Log.h"
-#include "tables/MccCountryTable.h"
 
 using namespace coresystem;
 
 namespace {
 
-void withDebugMode(int mode, const char* text)
+void debugLine(std::size_t)
 {
-    // Set once; asking it back is what each line does anyway.
-    static int current = 0;
-    if (current != mode) {
-        current = mode;
-        CoreLogger::GetInstance()->SetDebugMode(mode);
-    }
-    DEBUG_LINE("countrycode : %s", text);
+    DEBUG_LINE("countrycode : %s", "kr");
+}
+
+// Off again after each: the cases run in any order. The switching is no part that counts.
+void debugLineOn(std::size_t)
+{
+    CoreLogger::GetInstance()->SetDebugMode(1);
+    debugLine(0);
+    CoreLogger::GetInstance()->SetDebugMode(0);
 }
 
 std::mutex firstLock;
 std::mutex secondLock;
 
 // Two locks, the scan, the copy, all in this program: no library call but those of the C library.
-void floorQuery(const char* key)
+template <class Keys, class Values>
+void addFloor(const std::string& question, const Keys& keys, const Values& values,
+              const char* noMatch)
 {
-    {
-        const std::lock_guard<std::mutex> lock(firstLock);
-        benchmark::ClobberMemory();
-    }
-    {
-        const std::lock_guard<std::mutex> lock(secondLock);
-        benchmark::ClobberMemory();
-    }
-    const std::size_t row = findFirst(MccCountryTable::MCC, key);
-    char* const answer =
-        row < MccCountryTable::ROWS ? strdup(MccCountryTable::ALPHA2.cells[row]) : nullptr;
-    benchmark::DoNotOptimize(answer);
-    std::free(answer);
+    bench::addRounds("floor " + question, bench::roundsOf(bench::textsOf(keys), noMatch),
+                     [&keys, &values](const char* key) {
+                         {
+                             const std::lock_guard<std::mutex> lock(firstLock);
+                             benchmark::ClobberMemory();
+                         }
+                         {
+                             const std::lock_guard<std::mutex> lock(secondLock);
+                             benchmark::ClobberMemory();
+                         }
+                         const std::size_t row = findFirst(keys, key);
+                         char* const answer =
+                             row < Keys::rows ? strdup(values.cells[row]) : nullptr;
+                         benchmark::DoNotOptimize(answer);
+                         std::free(answer);
+                     });
 }
 
 } // namespace
 
 void bench::addSharedParts()
 {
-    addRounds("floor", roundsOf(textsOf(MccCountryTable::MCC), "999"), floorQuery);
+    forEachConversion([](const char* name, auto, const auto& keys, const auto& values,
+                         const char* noMatch) { addFloor(name, keys, values, noMatch); });
     addCase("GetInstance/-",
             [](std::size_t) { benchmark::DoNotOptimize(CoreSystem::GetInstance()); });
     addCase("lock by name/-", [](std::size_t) {
         const CoreMutexLock lock("CoreSystem.cpp::GetInstance");
         benchmark::ClobberMemory();
     });
-    addCase("debug line off/-", [](std::size_t) { withDebugMode(0, "kr"); });
-    addCase("debug line on/-", [](std::size_t) { withDebugMode(1, "kr"); });
-    // Off again for what is measured next.
-    addCase("debug line off again/-", [](std::size_t) { withDebugMode(0, "kr"); });
+    addCase("debug line off/-", debugLine);
+    addCase("debug line on/-", debugLineOn);
 }
