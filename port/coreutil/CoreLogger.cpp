@@ -42,8 +42,10 @@ CoreLogger::CoreLogger()
 
 CoreLogger* CoreLogger::GetInstance()
 {
-    static CoreLogger instance;
-    return &instance;
+    // Paid by every debug line, also when it is off. Made behind a pointer, it costs the compilers
+    // fewer instructions to hand out than an object in place.
+    static CoreLogger* const instance = new CoreLogger;
+    return instance;
 }
 
 int CoreLogger::GetDebugMode()
