@@ -60,9 +60,10 @@ NamedLock& namedLock(const char* name)
     static auto& locks = *new std::map<std::string, NamedLock>;
     const AllocationPause pause;
     const std::lock_guard<std::mutex> guard(mutex);
-    NamedLock& lock = locks[name];
-    lock.name = name;
-    return lock;
+    const auto [entry, added] = locks.try_emplace(name);
+    if (added) // other threads read the name later, without this guard
+        entry->second.name = name;
+    return entry->second;
 }
 
 void acquire(void* mutex)
