@@ -43,6 +43,14 @@ typedef enum {
 } system_settings_key_e;
 
 typedef enum {
+    SYSTEM_SETTINGS_FONT_SIZE_SMALL = 0,
+    SYSTEM_SETTINGS_FONT_SIZE_NORMAL = 1,
+    SYSTEM_SETTINGS_FONT_SIZE_LARGE = 2,
+    SYSTEM_SETTINGS_FONT_SIZE_HUGE = 3,
+    SYSTEM_SETTINGS_FONT_SIZE_GIANT = 4
+} system_settings_font_size_e;
+
+typedef enum {
     SYSTEM_SETTINGS_ERROR_NONE = TIZEN_ERROR_NONE,
     SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER = TIZEN_ERROR_INVALID_PARAMETER,
     SYSTEM_SETTINGS_ERROR_OUT_OF_MEMORY = TIZEN_ERROR_OUT_OF_MEMORY,
@@ -58,6 +66,10 @@ typedef enum {
  * cannot be read; NOT_SUPPORTED: this device has no such setting. Any thread.
  */
 int system_settings_get_value_string(system_settings_key_e key, char** value);
+
+/* The same for a switch and for a number. */
+int system_settings_get_value_bool(system_settings_key_e key, bool* value);
+int system_settings_get_value_int(system_settings_key_e key, int* value);
 
 #ifdef __cplusplus
 }

@@ -13,6 +13,8 @@ struct Error {
     enum class Kind {
         NotAvailable, // no service serves it here, or the one that should did not
         NotSupported, // this kind of device has no such thing
+        Denied,       // the caller may not know
+        NoSim,        // the slot has no card that can be read
     };
     Kind kind;
     std::string reason; // for people, without a final period
@@ -26,6 +28,16 @@ inline Error notAvailable(std::string reason)
 inline Error notSupported(std::string reason)
 {
     return {Error::Kind::NotSupported, std::move(reason)};
+}
+
+inline Error denied(std::string reason)
+{
+    return {Error::Kind::Denied, std::move(reason)};
+}
+
+inline Error noSim(std::string reason)
+{
+    return {Error::Kind::NoSim, std::move(reason)};
 }
 
 template <typename T>
@@ -60,11 +72,15 @@ Result<T> orElse(const Error& first, const Result<T>& second)
     return Error{second.error().kind, first.reason + "; " + second.error().reason};
 }
 
-// A text that a backend answers, and the service or file that served it.
-struct Fact {
-    std::string value; // no NUL inside; may be empty only where a device file says so
+// What a backend answers, and the service or file that served it.
+template <typename T>
+struct Sourced {
+    T value;
     std::string source;
 };
+
+// A text: no NUL inside; may be empty only where a device file says so.
+using Fact = Sourced<std::string>;
 
 } // namespace port
 

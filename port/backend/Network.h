@@ -1,0 +1,71 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections. Any thread.
+#ifndef PORT_BACKEND_NETWORK_H
+#define PORT_BACKEND_NETWORK_H
+
+#include "Result.h"
+
+namespace port {
+
+enum class CellularState {
+    OutOfService,
+    FlightMode,
+    RoamingOff,        // abroad, and data is not allowed there
+    CallOnlyAvailable, // registered for calls, not for data
+    Available,         // data can be had, and is not connected
+    Connected,
+};
+
+// Of a radio that carries connections, Wi-Fi or Bluetooth.
+enum class LinkState { Deactivated, Disconnected, Connected };
+
+enum class WifiConnection { Failure, Disconnected, Association, Configuration, Connected };
+
+class Network {
+public:
+    virtual ~Network() = default;
+
+    /// NotSupported: this device has no such radio; so for each of these.
+    virtual Result<Sourced<CellularState>> cellular()
+    {
+        return notSupported("no cellular radio");
+    }
+    virtual Result<Sourced<LinkState>> wifi()
+    {
+        return notSupported("no Wi-Fi");
+    }
+    /// The finer state of the Wi-Fi connection.
+    virtual Result<Sourced<WifiConnection>> wifiConnection()
+    {
+        return notSupported("no Wi-Fi");
+    }
+    /// Connections over Bluetooth.
+    virtual Result<Sourced<LinkState>> bluetooth()
+    {
+        return notSupported("no Bluetooth");
+    }
+    /// Whether all radios are switched off together.
+    virtual Result<Sourced<bool>> flightMode()
+    {
+        return notSupported("no flight mode");
+    }
+    /// Whether data over the cellular network is switched on, as the device's status tells it.
+    virtual Result<Sourced<bool>> packetData()
+    {
+        return notSupported("no cellular radio");
+    }
+    /// The same as the user's setting tells it.
+    virtual Result<Sourced<bool>> mobileData()
+    {
+        return notSupported("no cellular radio");
+    }
+    /// Whether data over the cellular network is allowed abroad.
+    virtual Result<Sourced<bool>> dataRoaming()
+    {
+        return notSupported("no cellular radio");
+    }
+};
+
+} // namespace port
+
+#endif

@@ -1,0 +1,105 @@
+// SPDX-License-Identifier: Apache-2.0
+// SIM slots, their cards and modems. Both generations of the platform's telephony interface ask
+// here, so that they always agree. Any thread.
+#ifndef PORT_BACKEND_TELEPHONY_H
+#define PORT_BACKEND_TELEPHONY_H
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "Result.h"
+
+namespace port {
+
+// A SIM slot. The same slot keeps its name for as long as its modem is there.
+using SlotName = std::string;
+
+// How far a card is initialised.
+enum class CardStatus {
+    Absent,
+    Removed,
+    Error,
+    Initializing,
+    Ready,
+    PinRequired,
+    PukRequired,
+    Blocked,       // the PUK was wrong too often
+    NetworkLocked, // bound to another network, operator or device
+    PoweredOff,
+    Unknown,
+};
+
+struct Card {
+    CardStatus status = CardStatus::Unknown;
+    bool changed = false; // another card than before; meaningful when ready
+};
+
+// The parts of an IMSI (ITU E.212), digits only.
+struct Imsi {
+    std::string mcc;  // three digits
+    std::string mnc;  // two or three
+    std::string msin; // up to ten
+};
+
+enum class Service { InService, OutOfService, EmergencyOnly };
+
+// Subscriptions by 0-based slot; nothing where it is not known.
+struct Subscriptions {
+    std::optional<int> network; // the default of the network
+    std::optional<int> data;    // the default for data
+    enum class Voice { Unknown, CurrentNetwork, AskAlways, Slot1, Slot2 };
+    Voice voice = Voice::Unknown;
+};
+
+class Telephony {
+public:
+    virtual ~Telephony() = default;
+
+    /// The slots of the device, the primary one first; none when the service knows no modem.
+    /// NotSupported: this device has no telephony; NotAvailable: no service answers.
+    virtual Result<Sourced<std::vector<SlotName>>> slots()
+    {
+        return notSupported("no telephony");
+    }
+    virtual Result<Sourced<Card>> card(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    /// NoSim: there is no card, or it is locked or not ready; the reason says which.
+    virtual Result<Sourced<Imsi>> imsi(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    /// The card's own number; nothing when the card holds none. NoSim as imsi().
+    virtual Result<Sourced<std::optional<std::string>>> number(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    /// The modem's IMEI (3GPP TS 23.003), with or without a card.
+    virtual Result<Fact> imei(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    virtual Result<Sourced<Service>> service(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    virtual Result<Sourced<bool>> roaming(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+    virtual Result<Sourced<Subscriptions>> subscriptions()
+    {
+        return notSupported("no telephony");
+    }
+    /// Whether text messages can be sent and received.
+    virtual Result<Sourced<bool>> smsReady(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
+};
+
+} // namespace port
+
+#endif
