@@ -9,8 +9,14 @@
 
 #include <coresystem_port.h>
 
+#include "Clock.h"
+#include "Configuration.h"
 #include "DeviceInfo.h"
+#include "Network.h"
+#include "Packages.h"
 #include "Settings.h"
+#include "Storage.h"
+#include "Telephony.h"
 
 namespace port {
 
@@ -21,6 +27,12 @@ public:
     virtual std::string name() const = 0;
     virtual DeviceInfo& deviceInfo() = 0;
     virtual Settings& settings() = 0;
+    virtual Telephony& telephony() = 0;
+    virtual Network& network() = 0;
+    virtual Storage& storage() = 0;
+    virtual Packages& packages() = 0;
+    virtual Configuration& configuration() = 0;
+    virtual Clock& clock() = 0;
 
     virtual std::string deviceFile() const
     {

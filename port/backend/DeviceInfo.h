@@ -31,6 +31,11 @@ public:
     {
         return notSupported("no model name");
     }
+    /// Serial number of the board, as its maker gave it.
+    virtual Result<Fact> serial()
+    {
+        return notSupported("no serial number");
+    }
 };
 
 } // namespace port

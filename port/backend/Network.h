@@ -3,6 +3,9 @@
 #ifndef PORT_BACKEND_NETWORK_H
 #define PORT_BACKEND_NETWORK_H
 
+#include <functional>
+#include <memory>
+
 #include "Result.h"
 
 namespace port {
@@ -20,6 +23,12 @@ enum class CellularState {
 enum class LinkState { Deactivated, Disconnected, Connected };
 
 enum class WifiConnection { Failure, Disconnected, Association, Configuration, Connected };
+
+// Something that is watched for as long as this lives.
+class Watch {
+public:
+    virtual ~Watch() = default;
+};
 
 class Network {
 public:
@@ -63,6 +72,14 @@ public:
     virtual Result<Sourced<bool>> dataRoaming()
     {
         return notSupported("no cellular radio");
+    }
+
+    /// Calls `changed` whenever one of the answers may have changed, on a thread of the watch's
+    /// own, one call at a time, until the watch is destroyed; destroying it waits for a call that
+    /// runs. Null when changes cannot be watched.
+    virtual std::unique_ptr<Watch> watch(std::function<void()>)
+    {
+        return nullptr;
     }
 };
 

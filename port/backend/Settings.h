@@ -7,6 +7,8 @@
 
 namespace port {
 
+enum class FontSize { Small, Normal, Large, Huge, Giant };
+
 class Settings {
 public:
     virtual ~Settings() = default;
@@ -20,6 +22,11 @@ public:
     virtual Result<Fact> language()
     {
         return notSupported("no display language");
+    }
+    /// Size of the text on the display.
+    virtual Result<Sourced<FontSize>> fontSize()
+    {
+        return notSupported("no font size");
     }
 };
 

@@ -27,6 +27,30 @@ public:
     {
         return settings_;
     }
+    Telephony& telephony() override
+    {
+        return telephony_;
+    }
+    Network& network() override
+    {
+        return network_;
+    }
+    Storage& storage() override
+    {
+        return storage_;
+    }
+    Packages& packages() override
+    {
+        return packages_;
+    }
+    Configuration& configuration() override
+    {
+        return configuration_;
+    }
+    Clock& clock() override
+    {
+        return clock_;
+    }
 
     std::vector<Service> findServices() override
     {
@@ -61,6 +85,12 @@ private:
     Bus bus_;
     LinuxDeviceInfo deviceInfo_{bus_, ""};
     LinuxSettings settings_{bus_};
+    Telephony telephony_;
+    Network network_;
+    Storage storage_;
+    Packages packages_;
+    Configuration configuration_;
+    Clock clock_;
 };
 
 } // namespace

@@ -26,6 +26,30 @@ public:
     {
         return settings_;
     }
+    Telephony& telephony() override
+    {
+        return telephony_;
+    }
+    Network& network() override
+    {
+        return network_;
+    }
+    Storage& storage() override
+    {
+        return storage_;
+    }
+    Packages& packages() override
+    {
+        return packages_;
+    }
+    Configuration& configuration() override
+    {
+        return configuration_;
+    }
+    Clock& clock() override
+    {
+        return clock_;
+    }
     std::string deviceFile() const override
     {
         return file_.path();
@@ -48,6 +72,12 @@ private:
     DeviceFile file_;
     SimulatedDeviceInfo deviceInfo_{file_};
     SimulatedSettings settings_{file_};
+    Telephony telephony_;
+    Network network_;
+    Storage storage_;
+    Packages packages_;
+    Configuration configuration_;
+    Clock clock_;
 };
 
 } // namespace
