@@ -16,12 +16,8 @@ std::map<coresystem_port::Question, coresystem_port::Origin>& origins()
 
 } // namespace
 
-void port::recordOrigin(coresystem_port::Question question, const Result<Fact>& answer)
+void port::recordOrigin(coresystem_port::Question question, coresystem_port::Origin origin)
 {
-    coresystem_port::Origin origin;
-    origin.available = static_cast<bool>(answer);
-    (answer ? origin.source : origin.reason) =
-        answer ? answer.value().source : answer.error().reason;
     const std::lock_guard<std::mutex> lock(mutex);
     origins()[question] = std::move(origin);
 }

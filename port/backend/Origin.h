@@ -3,13 +3,25 @@
 #ifndef PORT_BACKEND_ORIGIN_H
 #define PORT_BACKEND_ORIGIN_H
 
+#include <utility>
+
 #include <coresystem_port.h>
 
 #include "Result.h"
 
 namespace port {
 
-void recordOrigin(coresystem_port::Question question, const Result<Fact>& answer);
+void recordOrigin(coresystem_port::Question question, coresystem_port::Origin origin);
+
+template <typename T>
+void recordOrigin(coresystem_port::Question question, const Result<Sourced<T>>& answer)
+{
+    coresystem_port::Origin origin;
+    origin.available = static_cast<bool>(answer);
+    (answer ? origin.source : origin.reason) =
+        answer ? answer.value().source : answer.error().reason;
+    recordOrigin(question, std::move(origin));
+}
 
 } // namespace port
 

@@ -23,6 +23,18 @@ enum class Question {
     PlatformVersion,
     ModelName,
     Language,
+    FontSize,
+    FlightMode,
+    DataRoaming,
+    PacketData,
+    MobileData,
+    Cellular,
+    Wifi,
+    Bluetooth,
+    SalesCode,
+    CurrentTime,
+    Storage,
+    PackageVersion, ///< of the package that was asked for last
 };
 
 /// Where an answer came from, or why there was none.

@@ -5,6 +5,8 @@
 
 #include <cstring>
 #include <new>
+#include <string>
+#include <type_traits>
 
 #include <tizen_error.h>
 
@@ -13,36 +15,64 @@
 
 namespace port {
 
-// The platform's code for a backend's error.
-inline int errorCode(Error::Kind kind, int notSupportedCode)
+// What one family of the platform's interface answers for a backend's errors.
+struct Codes {
+    int failed; // there was no answer
+    int notSupported;
+    int denied = TIZEN_ERROR_PERMISSION_DENIED;
+    int noSim = failed;
+};
+
+inline int codeOf(Error::Kind kind, const Codes& codes)
 {
-    return kind == Error::Kind::NotSupported ? notSupportedCode : TIZEN_ERROR_IO_ERROR;
+    switch (kind) {
+    case Error::Kind::NotSupported:
+        return codes.notSupported;
+    case Error::Kind::Denied:
+        return codes.denied;
+    case Error::Kind::NoSim:
+        return codes.noSim;
+    case Error::Kind::NotAvailable:
+        break;
+    }
+    return codes.failed;
 }
 
 // Runs a shim's body; no exception leaves it.
 template <typename Body>
-int guarded(Body body)
+int guarded(Body body, int failed = TIZEN_ERROR_IO_ERROR)
 {
     try {
         return body();
     } catch (const std::bad_alloc&) {
         return TIZEN_ERROR_OUT_OF_MEMORY;
     } catch (...) {
-        return TIZEN_ERROR_IO_ERROR;
+        return failed;
     }
 }
 
-// Hands a text out in malloc memory; the slot stays untouched on failure.
-inline int handOut(coresystem_port::Question question, const Result<Fact>& answer, char** slot,
-                   int notSupportedCode)
+// Copies a text into malloc memory.
+inline int handOutCopy(const std::string& text, char** slot)
 {
-    recordOrigin(question, answer);
-    if (!answer)
-        return errorCode(answer.error().kind, notSupportedCode);
-    char* const copy = strdup(answer.value().value.c_str());
+    char* const copy = strdup(text.c_str());
     if (copy == nullptr)
         return TIZEN_ERROR_OUT_OF_MEMORY;
     *slot = copy;
+    return TIZEN_ERROR_NONE;
+}
+
+// Hands a value out, a text as a copy; the slot stays untouched on failure.
+template <typename T, typename Slot>
+int handOut(coresystem_port::Question question, const Result<Sourced<T>>& answer, Slot* slot,
+            const Codes& codes)
+{
+    recordOrigin(question, answer);
+    if (!answer)
+        return codeOf(answer.error().kind, codes);
+    if constexpr (std::is_same_v<Slot, char*>)
+        return handOutCopy(answer.value().value, slot);
+    else
+        *slot = static_cast<Slot>(answer.value().value);
     return TIZEN_ERROR_NONE;
 }
 

@@ -11,6 +11,10 @@ namespace {
 using coresystem_port::Question;
 using port::DeviceInfo;
 
+// This interface has no code for "not supported".
+constexpr port::Codes CODES{SYSTEM_INFO_ERROR_IO_ERROR, SYSTEM_INFO_ERROR_IO_ERROR,
+                            SYSTEM_INFO_ERROR_PERMISSION_DENIED};
+
 struct KeyRow {
     std::string_view key;
     Question question;
@@ -33,9 +37,8 @@ int system_info_get_platform_string(const char* key, char** value)
     return port::guarded([&]() -> int {
         for (const KeyRow& row : KEYS)
             if (row.key == key)
-                // This interface has no code for "not supported".
                 return port::handOut(row.question, (port::backend().deviceInfo().*row.read)(),
-                                     value, SYSTEM_INFO_ERROR_IO_ERROR);
+                                     value, CODES);
         return SYSTEM_INFO_ERROR_INVALID_PARAMETER;
     });
 }

@@ -2,23 +2,28 @@
 #include <system_settings.h>
 
 #include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Keys.h"
 
 namespace {
 
 using coresystem_port::Question;
-using port::Settings;
+using port::backend;
+using port::FontSize;
+using port::KeyRow;
 
-struct KeyRow {
-    int key;
-    Question question{};
-    port::Result<port::Fact> (Settings::*read)() = nullptr;
-};
+constexpr port::Codes CODES{SYSTEM_SETTINGS_ERROR_IO_ERROR, SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED,
+                            SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED};
 
-// Every setting that is a text. No device of the port has those without a reader.
-constexpr KeyRow STRING_KEYS[] = {
-    {SYSTEM_SETTINGS_KEY_DEVICE_NAME, Question::DeviceName, &Settings::deviceName},
-    {SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, Question::Language, &Settings::language},
+static_assert(static_cast<int>(FontSize::Small) == SYSTEM_SETTINGS_FONT_SIZE_SMALL &&
+                  static_cast<int>(FontSize::Giant) == SYSTEM_SETTINGS_FONT_SIZE_GIANT,
+              "both count the sizes alike");
+
+// Every setting, by type.
+constexpr KeyRow<std::string> STRING_KEYS[] = {
+    {SYSTEM_SETTINGS_KEY_DEVICE_NAME, Question::DeviceName,
+     [] { return backend().settings().deviceName(); }},
+    {SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, Question::Language,
+     [] { return backend().settings().language(); }},
     {SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE},
     {SYSTEM_SETTINGS_KEY_WALLPAPER_HOME_SCREEN},
     {SYSTEM_SETTINGS_KEY_WALLPAPER_LOCK_SCREEN},
@@ -31,34 +36,44 @@ constexpr KeyRow STRING_KEYS[] = {
     {SYSTEM_SETTINGS_KEY_SOUND_NOTIFICATION},
 };
 
-const KeyRow* findStringKey(int key)
-{
-    for (const KeyRow& row : STRING_KEYS)
-        if (row.key == key)
-            return &row;
-    return nullptr;
-}
+constexpr KeyRow<bool> BOOL_KEYS[] = {
+    {SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED, Question::MobileData,
+     [] { return backend().network().mobileData(); }},
+    {SYSTEM_SETTINGS_KEY_MOTION_ACTIVATION},
+    {SYSTEM_SETTINGS_KEY_USB_DEBUGGING_ENABLED},
+    {SYSTEM_SETTINGS_KEY_LOCALE_TIMEFORMAT_24HOUR},
+    {SYSTEM_SETTINGS_KEY_SOUND_LOCK},
+    {SYSTEM_SETTINGS_KEY_SOUND_SILENT_MODE},
+    {SYSTEM_SETTINGS_KEY_SOUND_TOUCH},
+    {SYSTEM_SETTINGS_KEY_DISPLAY_SCREEN_ROTATION_AUTO},
+    {SYSTEM_SETTINGS_KEY_MOTION_ENABLED},
+    {SYSTEM_SETTINGS_KEY_NETWORK_WIFI_NOTIFICATION},
+    {SYSTEM_SETTINGS_KEY_NETWORK_FLIGHT_MODE},
+};
 
-// A caller may pass a number that the enumeration lacks: it is looked at as the int it is.
-int numberOf(const system_settings_key_e& key)
-{
-    int number = 0;
-    static_assert(sizeof number == sizeof key, "the platform's enumerations are int-sized");
-    std::memcpy(&number, &key, sizeof number);
-    return number;
-}
+constexpr KeyRow<FontSize> INT_KEYS[] = {
+    {SYSTEM_SETTINGS_KEY_FONT_SIZE, Question::FontSize,
+     [] { return backend().settings().fontSize(); }},
+    {SYSTEM_SETTINGS_KEY_TAP_AND_HOLD_DELAY},
+    {SYSTEM_SETTINGS_KEY_TIME_CHANGED},
+    {SYSTEM_SETTINGS_KEY_SCREEN_BACKLIGHT_TIME},
+    {SYSTEM_SETTINGS_KEY_SOUND_NOTIFICATION_REPETITION_PERIOD},
+    {SYSTEM_SETTINGS_KEY_LOCK_STATE},
+};
 
 } // namespace
 
 int system_settings_get_value_string(system_settings_key_e key, char** value)
 {
-    const KeyRow* const row = findStringKey(numberOf(key));
-    if (row == nullptr || value == nullptr)
-        return SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER;
-    if (row->read == nullptr)
-        return SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED;
-    return port::guarded([&]() -> int {
-        return port::handOut(row->question, (port::backend().settings().*row->read)(), value,
-                             SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED);
-    });
+    return port::readKey(STRING_KEYS, key, value, CODES);
+}
+
+int system_settings_get_value_bool(system_settings_key_e key, bool* value)
+{
+    return port::readKey(BOOL_KEYS, key, value, CODES);
+}
+
+int system_settings_get_value_int(system_settings_key_e key, int* value)
+{
+    return port::readKey(INT_KEYS, key, value, CODES);
 }

@@ -197,6 +197,50 @@ TEST_F(ShimTest, TextSettingsThatNoDeviceHasAreNotSupported)
         EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedSetting(key)) << key;
 }
 
+// The result of a read that must leave its value alone.
+template <typename Read, typename Key, typename Value>
+int failedRead(Read read, int key, Value before)
+{
+    Value value = before;
+    Key number{};
+    std::memcpy(&number, &key, sizeof number);
+    const int result = read(number, &value);
+    EXPECT_EQ(before, value);
+    return result;
+}
+
+int failedSwitch(int key)
+{
+    return failedRead<decltype(system_settings_get_value_bool)*, system_settings_key_e>(
+        system_settings_get_value_bool, key, true);
+}
+
+int failedNumber(int key)
+{
+    return failedRead<decltype(system_settings_get_value_int)*, system_settings_key_e>(
+        system_settings_get_value_int, key, 77);
+}
+
+TEST_F(ShimTest, SwitchesAndNumbersHaveKeysOfTheirOwn)
+{
+    for (const int key : {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_FONT_SIZE),
+                          static_cast<int>(SYSTEM_SETTINGS_KEY_DEVICE_NAME),
+                          static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 1000})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSwitch(key)) << key;
+    for (const int key : {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED),
+                          static_cast<int>(SYSTEM_SETTINGS_KEY_DEVICE_NAME),
+                          static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 1000})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedNumber(key)) << key;
+}
+
+TEST_F(ShimTest, SwitchesAndNumbersThatNoDeviceHasAreNotSupported)
+{
+    for (const int key : {5, 7, 14, 17, 18, 19, 20, 22, 23, 24})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedSwitch(key)) << key;
+    for (const int key : {9, 16, 25, 27, 28})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedNumber(key)) << key;
+}
+
 TEST_F(ShimTest, AbsentFactIsAnIoErrorWithAReason)
 {
     describe("");
@@ -212,13 +256,18 @@ TEST_F(ShimTest, AbsentFactIsAnIoErrorWithAReason)
 
 TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
 {
-    const auto code = [](const port::Error& error, int notSupported) {
+    const auto code = [](const port::Error& error, const port::Codes& codes) {
         return failure([&](char** answer) {
-            return port::handOut(Question::Language, error, answer, notSupported);
+            return port::handOut(Question::Language, port::Result<port::Fact>(error), answer,
+                                 codes);
         });
     };
-    EXPECT_EQ(-5, code(port::notAvailable("why"), -7));
-    EXPECT_EQ(-7, code(port::notSupported("why"), -7));
+    EXPECT_EQ(-1, code(port::notAvailable("why"), {-1, -2}));
+    EXPECT_EQ(-2, code(port::notSupported("why"), {-1, -2}));
+    EXPECT_EQ(-13, code(port::denied("why"), {-1, -2}));
+    EXPECT_EQ(-3, code(port::denied("why"), {-1, -2, -3}));
+    EXPECT_EQ(-1, code(port::noSim("why"), {-1, -2, -3}));
+    EXPECT_EQ(-4, code(port::noSim("why"), {-1, -2, -3, -4}));
     EXPECT_EQ("why", lastOrigin(Question::Language).reason);
 }
 
@@ -226,6 +275,7 @@ TEST_F(ShimTest, NoExceptionLeavesAShim)
 {
     EXPECT_EQ(-12, port::guarded([]() -> int { throw std::bad_alloc(); }));
     EXPECT_EQ(-5, port::guarded([]() -> int { throw 1; }));
+    EXPECT_EQ(-6, port::guarded([]() -> int { throw 1; }, -6));
     EXPECT_EQ(3, port::guarded([]() -> int { return 3; }));
 }
 
