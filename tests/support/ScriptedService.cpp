@@ -35,10 +35,16 @@ void ownName(GDBusConnection* connection, const std::string& name)
         throw std::runtime_error("cannot own " + name);
 }
 
-bool isGetAll(GDBusMessage* message)
+const char GET_ALL[] = "GetAll";
+
+std::string keyOf(const std::string& method, const std::string& path)
 {
-    return g_dbus_message_get_message_type(message) == G_DBUS_MESSAGE_TYPE_METHOD_CALL &&
-           g_strcmp0(g_dbus_message_get_member(message), "GetAll") == 0;
+    return path.empty() ? method : method + " " + path;
+}
+
+GVariant* parsed(const std::string& body)
+{
+    return g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr);
 }
 
 } // namespace
@@ -61,15 +67,28 @@ ScriptedService::~ScriptedService()
     g_object_unref(connection_);
 }
 
+GDBusMessage* ScriptedService::State::reply(GDBusMessage* question, bool& known)
+{
+    const std::string method = g_dbus_message_get_member(question);
+    const std::lock_guard<std::mutex> lock(mutex);
+    auto script = scripts.find(keyOf(method, g_dbus_message_get_path(question)));
+    if (script == scripts.end())
+        script = scripts.find(method);
+    known = script != scripts.end();
+    return known ? script->second(question) : nullptr;
+}
+
 // Runs on the connection's own thread, so a test may block in a call meanwhile.
 GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessage* message,
                                          gboolean incoming, gpointer state)
 {
-    if (!incoming || !isGetAll(message))
+    if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
-    const auto& shared = *static_cast<std::shared_ptr<State>*>(state);
-    const std::lock_guard<std::mutex> lock(shared->mutex);
-    GDBusMessage* const reply = shared->script(message);
+    bool known = false;
+    GDBusMessage* const reply =
+        (*static_cast<std::shared_ptr<State>*>(state))->reply(message, known);
+    if (!known)
+        return message;
     if (reply != nullptr) {
         g_dbus_connection_send_message(connection, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
                                        nullptr);
@@ -84,25 +103,38 @@ void ScriptedService::releaseState(gpointer state)
     delete static_cast<std::shared_ptr<State>*>(state);
 }
 
-void ScriptedService::follow(Script script)
+void ScriptedService::follow(const std::string& key, Script script)
 {
     const std::lock_guard<std::mutex> lock(state_->mutex);
-    state_->script = std::move(script);
+    state_->scripts[key] = std::move(script);
 }
 
 void ScriptedService::answer(const std::string& body)
 {
-    follow([body](GDBusMessage* question) {
+    answerTo(GET_ALL, body);
+}
+
+void ScriptedService::answerTo(const std::string& method, const std::string& body,
+                               const std::string& path)
+{
+    follow(keyOf(method, path), [body](GDBusMessage* question) {
         GDBusMessage* const reply = g_dbus_message_new_method_reply(question);
-        g_dbus_message_set_body(reply,
-                                g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr));
+        g_dbus_message_set_body(reply, parsed(body));
         return reply;
     });
 }
 
+void ScriptedService::emit(const std::string& path, const std::string& interface,
+                           const std::string& signal, const std::string& body)
+{
+    g_dbus_connection_emit_signal(connection_, nullptr, path.c_str(), interface.c_str(),
+                                  signal.c_str(), parsed(body), nullptr);
+    g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
+}
+
 void ScriptedService::fail(const std::string& errorName, const std::string& message)
 {
-    follow([errorName, message](GDBusMessage* question) {
+    follow(GET_ALL, [errorName, message](GDBusMessage* question) {
         return g_dbus_message_new_method_error_literal(question, errorName.c_str(),
                                                        message.c_str());
     });
@@ -113,9 +145,9 @@ void ScriptedService::keepSilent()
     whenAsked([] {});
 }
 
-void ScriptedService::whenAsked(std::function<void()> act)
+void ScriptedService::whenAsked(std::function<void()> act, const std::string& method)
 {
-    follow([act](GDBusMessage*) -> GDBusMessage* {
+    follow(method, [act](GDBusMessage*) -> GDBusMessage* {
         act();
         return nullptr;
     });

@@ -4,14 +4,15 @@
 #define TESTS_SUPPORT_SCRIPTED_SERVICE_H
 
 #include <functional>
+#include <map>
 #include <memory>
 #include <mutex>
 #include <string>
 
 #include <gio/gio.h>
 
-/// Owns a name from construction to destruction and answers every GetAll sent to it, at first with
-/// no properties.
+/// Owns a name from construction to destruction and answers the method calls that it has a script
+/// for; at first every GetAll, with no properties.
 class ScriptedService {
 public:
     ScriptedService(const std::string& address, const std::string& name);
@@ -21,12 +22,17 @@ public:
 
     /// The whole body of the reply in GVariant text form: "({'Hostname': <'box'>},)". Any type.
     void answer(const std::string& body);
+    /// The same for any method; `path` narrows it to one object.
+    void answerTo(const std::string& method, const std::string& body, const std::string& path = "");
+    /// Sends a signal; `body` as in answer().
+    void emit(const std::string& path, const std::string& interface, const std::string& signal,
+              const std::string& body);
     /// Answers with a D-Bus error.
     void fail(const std::string& errorName, const std::string& message);
     /// Takes the question and never answers.
     void keepSilent();
     /// Runs something when it is asked, and never answers.
-    void whenAsked(std::function<void()> act);
+    void whenAsked(std::function<void()> act, const std::string& method = "GetAll");
     /// Leaves the bus when it is asked, as a daemon that dies does.
     void leaveWhenAsked();
 
@@ -36,13 +42,15 @@ private:
     // Shared with the connection's thread, which may still be at it after the object's end.
     struct State {
         std::mutex mutex;
-        Script script;
+        std::map<std::string, Script> scripts; // by method, or method and path
+
+        GDBusMessage* reply(GDBusMessage* question, bool& known);
     };
 
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
                                    gpointer state);
     static void releaseState(gpointer state);
-    void follow(Script script);
+    void follow(const std::string& key, Script script);
 
     const std::shared_ptr<State> state_ = std::make_shared<State>();
     GDBusConnection* const connection_;
