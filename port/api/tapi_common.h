@@ -14,7 +14,7 @@ typedef struct tapi_handle TapiHandle;
 
 /*
  * The names of all modems, one a SIM slot, ended by null; null when the service cannot be asked.
- * The list and its names are the platform's. Any thread.
+ * The list and its names are the platform's and stay as they are until the process ends. Any thread.
  */
 char** tel_get_cp_name_list(void);
 

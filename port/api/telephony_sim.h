@@ -24,9 +24,10 @@ typedef enum {
 int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state);
 
 /*
- * Reads the card's own phone number; *number is malloc memory that the caller frees, null when the
- * card holds none. Errors as telephony_sim_get_state(), and SIM_NOT_AVAILABLE: no usable card. Any
- * thread.
+ * Reads the card's own phone number; *number is malloc memory that the caller frees. Errors as
+ * telephony_sim_get_state(), and SIM_NOT_AVAILABLE: no usable card. A card that holds no number is
+ * OPERATION_FAILED with null stored; some platforms succeed with null. Any other failure leaves
+ * *number untouched. Any thread.
  */
 int telephony_sim_get_subscriber_number(telephony_h handle, char** number);
 

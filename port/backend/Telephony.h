@@ -24,8 +24,13 @@ enum class CardStatus {
     Ready,
     PinRequired,
     PukRequired,
-    Blocked,       // the PUK was wrong too often
-    NetworkLocked, // bound to another network, operator or device
+    Blocked,         // the PUK was wrong too often
+    NetworkLocked,   // bound to a network (3GPP TS 22.022), and so the four that follow
+    SubsetLocked,    // to a part of a network
+    ProviderLocked,  // to a service provider
+    CorporateLocked, // to a corporation
+    DeviceLocked,    // to another device
+    Crashed,
     PoweredOff,
     Unknown,
 };
@@ -71,7 +76,8 @@ public:
     {
         return notSupported("no telephony");
     }
-    /// The card's own number; nothing when the card holds none. NoSim as imsi().
+    /// The card's own number; nothing when the card holds none, empty where a device file wants
+    /// the platform to succeed without one. NoSim as imsi().
     virtual Result<Sourced<std::optional<std::string>>> number(const SlotName&)
     {
         return notSupported("no telephony");

@@ -35,6 +35,15 @@ enum class Question {
     CurrentTime,
     Storage,
     PackageVersion, ///< of the package that was asked for last
+    SimSlots,
+    SimCard, ///< this and what follows: of the slot that was asked last
+    SimIdentity,
+    PhoneNumber,
+    Imei,
+    NetworkService,
+    Roaming,
+    SmsReadiness,
+    Subscriptions,
 };
 
 /// Where an answer came from, or why there was none.

@@ -21,6 +21,8 @@ struct Codes {
     int notSupported;
     int denied = TIZEN_ERROR_PERMISSION_DENIED;
     int noSim = failed;
+    int noMemory = TIZEN_ERROR_OUT_OF_MEMORY;
+    int invalid = TIZEN_ERROR_INVALID_PARAMETER;
 };
 
 inline int codeOf(Error::Kind kind, const Codes& codes)
@@ -40,12 +42,12 @@ inline int codeOf(Error::Kind kind, const Codes& codes)
 
 // Runs a shim's body; no exception leaves it.
 template <typename Body>
-int guarded(Body body, int failed = TIZEN_ERROR_IO_ERROR)
+int guarded(Body body, int failed = TIZEN_ERROR_IO_ERROR, int noMemory = TIZEN_ERROR_OUT_OF_MEMORY)
 {
     try {
         return body();
     } catch (const std::bad_alloc&) {
-        return TIZEN_ERROR_OUT_OF_MEMORY;
+        return noMemory;
     } catch (...) {
         return failed;
     }
@@ -61,19 +63,28 @@ inline int handOutCopy(const std::string& text, char** slot)
     return TIZEN_ERROR_NONE;
 }
 
+// Notes where an answer came from and passes its value to `take`, whose result is the shim's; an
+// error has a code.
+template <typename T, typename Take>
+int pass(coresystem_port::Question question, const Result<Sourced<T>>& answer, const Codes& codes,
+         Take take)
+{
+    recordOrigin(question, answer);
+    return answer ? take(answer.value().value) : codeOf(answer.error().kind, codes);
+}
+
 // Hands a value out, a text as a copy; the slot stays untouched on failure.
 template <typename T, typename Slot>
 int handOut(coresystem_port::Question question, const Result<Sourced<T>>& answer, Slot* slot,
             const Codes& codes)
 {
-    recordOrigin(question, answer);
-    if (!answer)
-        return codeOf(answer.error().kind, codes);
-    if constexpr (std::is_same_v<Slot, char*>)
-        return handOutCopy(answer.value().value, slot);
-    else
-        *slot = static_cast<Slot>(answer.value().value);
-    return TIZEN_ERROR_NONE;
+    return pass(question, answer, codes, [slot](const T& value) -> int {
+        if constexpr (std::is_same_v<Slot, char*>)
+            return handOutCopy(value, slot);
+        else
+            *slot = static_cast<Slot>(value);
+        return TIZEN_ERROR_NONE;
+    });
 }
 
 } // namespace port

@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: Apache-2.0
+// What both generations of the telephony interface share.
+#ifndef PORT_SHIM_TELEPHONY_H
+#define PORT_SHIM_TELEPHONY_H
+
+#include <telephony.h>
+
+#include "../backend/Backend.h"
+#include "HandOut.h"
+#include "Handles.h"
+
+namespace port {
+
+/// What the newer interface says of a card in a status that the older one tells in detail.
+inline telephony_sim_state_e simState(CardStatus status)
+{
+    switch (status) {
+    case CardStatus::Ready:
+        return TELEPHONY_SIM_STATE_AVAILABLE;
+    case CardStatus::PinRequired:
+    case CardStatus::PukRequired:
+    case CardStatus::Blocked:
+    case CardStatus::NetworkLocked:
+    case CardStatus::SubsetLocked:
+    case CardStatus::ProviderLocked:
+    case CardStatus::CorporateLocked:
+    case CardStatus::DeviceLocked:
+        return TELEPHONY_SIM_STATE_LOCKED;
+    case CardStatus::Absent:
+    case CardStatus::Removed:
+    case CardStatus::Error:
+    case CardStatus::Crashed:
+    case CardStatus::PoweredOff:
+        return TELEPHONY_SIM_STATE_UNAVAILABLE;
+    case CardStatus::Initializing:
+    case CardStatus::Unknown:
+        break;
+    }
+    return TELEPHONY_SIM_STATE_UNKNOWN;
+}
+
+/// Asks the slot that a handle stands for; `take` puts the value into *out and gives the result.
+template <typename Handle, typename T, typename Out, typename Take>
+int askSlot(const Codes& codes, Handle handle, coresystem_port::Question question,
+            Result<Sourced<T>> (Telephony::*ask)(const SlotName&), Out* out, Take take)
+{
+    return guarded(
+        [&]() -> int {
+            const auto slot = Handles<Handle, SlotName>::find(handle);
+            if (!slot || out == nullptr)
+                return codes.invalid;
+            return pass(question, (backend().telephony().*ask)(*slot), codes,
+                        [&](const T& value) { return take(value, *out); });
+        },
+        codes.failed, codes.noMemory);
+}
+
+/// Lists of telephony_init() that were not released yet.
+std::size_t liveTelephonyLists();
+
+} // namespace port
+
+#endif

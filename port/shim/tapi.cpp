@@ -1,0 +1,292 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <algorithm>
+#include <cstring>
+#include <memory>
+
+#include <ITapiCall.h>
+#include <ITapiNetText.h>
+#include <ITapiNetwork.h>
+#include <ITapiSim.h>
+#include <tapi_common.h>
+
+#include "Telephony.h"
+
+namespace {
+
+using coresystem_port::Question;
+using port::CardStatus;
+using port::Codes;
+using port::Subscriptions;
+using port::Telephony;
+
+using ModemHandles = port::Handles<TapiHandle*, port::SlotName>;
+
+constexpr Codes CODES{TAPI_API_OPERATION_FAILED,  TAPI_API_NOT_SUPPORTED,
+                      TAPI_API_ACCESS_DENIED,     TAPI_API_SIM_NOT_INITIALIZED,
+                      TAPI_API_SYSTEM_OUT_OF_MEM, TAPI_API_INVALID_PTR};
+
+port::Result<port::Sourced<std::vector<port::SlotName>>> askSlots()
+{
+    auto slots = port::backend().telephony().slots();
+    port::recordOrigin(Question::SimSlots, slots);
+    return slots;
+}
+
+// The names as the platform hands them out. An application never releases a list, so every one that
+// was handed out stays: one for each set of modems that the machine had.
+class NameList {
+public:
+    explicit NameList(std::vector<port::SlotName> names) : names_(std::move(names))
+    {
+        for (port::SlotName& name : names_)
+            pointers_.push_back(name.data());
+        pointers_.push_back(nullptr);
+    }
+
+    char** pointers()
+    {
+        return pointers_.data();
+    }
+
+private:
+    std::vector<port::SlotName> names_;
+    std::vector<char*> pointers_;
+};
+
+char** keep(const std::vector<port::SlotName>& names)
+{
+    static std::mutex mutex;
+    static auto& kept = *new std::map<std::vector<port::SlotName>, std::unique_ptr<NameList>>;
+    const std::lock_guard<std::mutex> lock(mutex);
+    std::unique_ptr<NameList>& list = kept[names];
+    if (list == nullptr)
+        list = std::make_unique<NameList>(names);
+    return list->pointers();
+}
+
+// The name itself, or the first when none is asked for; null when there is no such modem.
+const port::SlotName* findModem(const std::vector<port::SlotName>& names, const char* name)
+{
+    const auto found =
+        name != nullptr ? std::find(names.begin(), names.end(), name) : names.begin();
+    return found != names.end() ? &*found : nullptr;
+}
+
+TelSimCardStatus_t cardStatus(CardStatus status)
+{
+    switch (status) {
+    case CardStatus::Absent:
+        return TAPI_SIM_STATUS_CARD_NOT_PRESENT;
+    case CardStatus::Removed:
+        return TAPI_SIM_STATUS_CARD_REMOVED;
+    case CardStatus::Error:
+        return TAPI_SIM_STATUS_CARD_ERROR;
+    case CardStatus::Initializing:
+        return TAPI_SIM_STATUS_SIM_INITIALIZING;
+    case CardStatus::Ready:
+        return TAPI_SIM_STATUS_SIM_INIT_COMPLETED;
+    case CardStatus::PinRequired:
+        return TAPI_SIM_STATUS_SIM_PIN_REQUIRED;
+    case CardStatus::PukRequired:
+        return TAPI_SIM_STATUS_SIM_PUK_REQUIRED;
+    case CardStatus::Blocked:
+        return TAPI_SIM_STATUS_CARD_BLOCKED;
+    case CardStatus::NetworkLocked:
+        return TAPI_SIM_STATUS_SIM_NCK_REQUIRED;
+    case CardStatus::SubsetLocked:
+        return TAPI_SIM_STATUS_SIM_NSCK_REQUIRED;
+    case CardStatus::ProviderLocked:
+        return TAPI_SIM_STATUS_SIM_SPCK_REQUIRED;
+    case CardStatus::CorporateLocked:
+        return TAPI_SIM_STATUS_SIM_CCK_REQUIRED;
+    case CardStatus::DeviceLocked:
+        return TAPI_SIM_STATUS_SIM_LOCK_REQUIRED;
+    case CardStatus::Crashed:
+        return TAPI_SIM_STATUS_CARD_CRASHED;
+    case CardStatus::PoweredOff:
+        return TAPI_SIM_STATUS_CARD_POWEROFF;
+    case CardStatus::Unknown:
+        break;
+    }
+    return TAPI_SIM_STATUS_UNKNOWN;
+}
+
+// Why a card cannot be read.
+int unreadable(CardStatus status)
+{
+    if (status == CardStatus::Blocked)
+        return TAPI_API_SIM_PERM_BLOCKED;
+    switch (port::simState(status)) {
+    case TELEPHONY_SIM_STATE_LOCKED:
+        return TAPI_API_SIM_LOCKED;
+    case TELEPHONY_SIM_STATE_UNAVAILABLE:
+        return TAPI_API_SIM_NOT_FOUND;
+    default:
+        return TAPI_API_SIM_NOT_INITIALIZED;
+    }
+}
+
+// Whole or not at all: a part of an identity is another identity.
+template <std::size_t Size>
+bool copyWhole(const std::string& digits, char (&field)[Size])
+{
+    if (digits.size() >= Size)
+        return false;
+    std::memcpy(field, digits.c_str(), digits.size() + 1);
+    return true;
+}
+
+int handOutImsi(const port::Imsi& imsi, TelSimImsiInfo_t& slot)
+{
+    TelSimImsiInfo_t parts = {};
+    if (!copyWhole(imsi.mcc, parts.szMcc) || !copyWhole(imsi.mnc, parts.szMnc) ||
+        !copyWhole(imsi.msin, parts.szMsin))
+        return TAPI_API_OPERATION_FAILED;
+    slot = parts;
+    return TAPI_API_SUCCESS;
+}
+
+// The interface knows two slots by name.
+template <typename Subs>
+Subs slotName(const std::optional<int>& slot, Subs first, Subs second, Subs unknown)
+{
+    if (slot == 0)
+        return first;
+    return slot == 1 ? second : unknown;
+}
+
+TelNetworkDefaultSubs_t networkSubscription(const Subscriptions& all)
+{
+    return slotName(all.network, TAPI_NETWORK_DEFAULT_SUBS_SIM1, TAPI_NETWORK_DEFAULT_SUBS_SIM2,
+                    TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN);
+}
+
+TelNetworkDefaultDataSubs_t dataSubscription(const Subscriptions& all)
+{
+    return slotName(all.data, TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM1,
+                    TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2, TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN);
+}
+
+TelCallPreferredVoiceSubs_t voiceSubscription(const Subscriptions& all)
+{
+    switch (all.voice) {
+    case Subscriptions::Voice::CurrentNetwork:
+        return TAPI_CALL_PREFERRED_VOICE_SUBS_CURRENT_NETWORK;
+    case Subscriptions::Voice::AskAlways:
+        return TAPI_CALL_PREFERRED_VOICE_SUBS_ASK_ALWAYS;
+    case Subscriptions::Voice::Slot1:
+        return TAPI_CALL_PREFERRED_VOICE_SUBS_SIM1;
+    case Subscriptions::Voice::Slot2:
+        return TAPI_CALL_PREFERRED_VOICE_SUBS_SIM2;
+    case Subscriptions::Voice::Unknown:
+        break;
+    }
+    return TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN;
+}
+
+template <typename Subs>
+int askSubscription(TapiHandle* handle, Subs (*choose)(const Subscriptions&), Subs* subs)
+{
+    return port::guarded(
+        [&]() -> int {
+            if (!ModemHandles::find(handle) || subs == nullptr)
+                return TAPI_API_INVALID_PTR;
+            return port::pass(Question::Subscriptions, port::backend().telephony().subscriptions(),
+                              CODES, [&](const Subscriptions& all) {
+                                  *subs = choose(all);
+                                  return TAPI_API_SUCCESS;
+                              });
+        },
+        CODES.failed, CODES.noMemory);
+}
+
+// The reason why a handle's card cannot be read, by asking for its status.
+int askWhyUnreadable(TapiHandle* handle)
+{
+    int code = TAPI_API_SIM_NOT_INITIALIZED;
+    const int failure = port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, &code,
+                                      [](const port::Card& card, int& slot) {
+                                          slot = unreadable(card.status);
+                                          return TAPI_API_SUCCESS;
+                                      });
+    return failure == TAPI_API_SUCCESS ? code : failure;
+}
+
+} // namespace
+
+char** tel_get_cp_name_list(void)
+{
+    char** list = nullptr;
+    port::guarded([&]() -> int {
+        if (const auto slots = askSlots())
+            list = keep(slots.value().value);
+        return TAPI_API_SUCCESS;
+    });
+    return list;
+}
+
+TapiHandle* tel_init(const char* cp_name)
+{
+    TapiHandle* handle = nullptr;
+    port::guarded([&]() -> int {
+        const auto slots = askSlots();
+        const port::SlotName* const name =
+            slots ? findModem(slots.value().value, cp_name) : nullptr;
+        if (name != nullptr)
+            handle = ModemHandles::open(*name);
+        return TAPI_API_SUCCESS;
+    });
+    return handle;
+}
+
+int tel_deinit(TapiHandle* handle)
+{
+    return port::guarded(
+        [&]() -> int {
+            return ModemHandles::close(handle) ? TAPI_API_SUCCESS : TAPI_API_INVALID_PTR;
+        },
+        CODES.failed, CODES.noMemory);
+}
+
+int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
+{
+    const int result =
+        port::askSlot(CODES, handle, Question::SimIdentity, &Telephony::imsi, imsi, handOutImsi);
+    return result == CODES.noSim ? askWhyUnreadable(handle) : result;
+}
+
+int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed)
+{
+    if (card_changed == nullptr)
+        return TAPI_API_INVALID_PTR;
+    return port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, status,
+                         [&](const port::Card& card, TelSimCardStatus_t& slot) {
+                             slot = cardStatus(card.status);
+                             *card_changed = card.changed ? 1 : 0;
+                             return TAPI_API_SUCCESS;
+                         });
+}
+
+int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subs)
+{
+    return askSubscription(handle, networkSubscription, subs);
+}
+
+int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subs)
+{
+    return askSubscription(handle, dataSubscription, subs);
+}
+
+int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subs)
+{
+    return askSubscription(handle, voiceSubscription, subs);
+}
+
+int tel_check_sms_device_status(TapiHandle* handle, int* ready)
+{
+    return port::askSlot(CODES, handle, Question::SmsReadiness, &Telephony::smsReady, ready,
+                         [](bool isReady, int& slot) {
+                             slot = isReady ? 1 : 0;
+                             return TAPI_API_SUCCESS;
+                         });
+}

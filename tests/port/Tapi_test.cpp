@@ -1,0 +1,395 @@
+// SPDX-License-Identifier: Apache-2.0
+// The older telephony functions over a backend that answers what a test says.
+#include <new>
+
+#include <ITapiCall.h>
+#include <ITapiNetText.h>
+#include <ITapiNetwork.h>
+#include <ITapiSim.h>
+#include <gmock/gmock.h>
+#include <tapi_common.h>
+#include <telephony.h>
+
+#include "coresystem_port.h"
+#include "shim/Handles.h"
+#include "support/FakeBackend.h"
+#include "support/Together.h"
+
+using coresystem_port::lastOrigin;
+using coresystem_port::Question;
+using port::CardStatus;
+using port::Subscriptions;
+using testing::Each;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+using ModemHandles = port::Handles<TapiHandle*, port::SlotName>;
+
+class TapiTest : public testing::Test {
+protected:
+    void setCard(CardStatus value, bool isAnother = false)
+    {
+        telephony.cardAnswer = answered(port::Card{value, isAnother});
+    }
+
+    FakedBackend backend;
+    FakeTelephony& telephony = backend.fakeTelephony;
+    TelSimImsiInfo_t imsi = {};
+    TelSimCardStatus_t status = TAPI_SIM_STATUS_CARD_CRASHED;
+    int changed = 7;
+};
+
+// A handle on the first modem that is released with the test.
+class TapiHandleTest : public TapiTest {
+protected:
+    TapiHandleTest()
+    {
+        telephony.questions.clear();
+    }
+    ~TapiHandleTest() override
+    {
+        EXPECT_EQ(0, tel_deinit(handle));
+        EXPECT_EQ(0U, ModemHandles::live());
+    }
+
+    TapiHandle* const handle = tel_init("modem0");
+};
+
+std::vector<std::string> textsOf(char** list)
+{
+    std::vector<std::string> texts;
+    for (; *list != nullptr; ++list)
+        texts.emplace_back(*list);
+    return texts;
+}
+
+TEST_F(TapiTest, NamesAreListedInOrder)
+{
+    EXPECT_THAT(textsOf(tel_get_cp_name_list()), ElementsAre("modem0", "modem1"));
+    EXPECT_THAT(telephony.questions, ElementsAre("slots"));
+    EXPECT_EQ("test", lastOrigin(Question::SimSlots).source);
+}
+
+TEST_F(TapiTest, NoModemIsAListWithoutNames)
+{
+    telephony.slotsAnswer = answered(FakeTelephony::Names{});
+    ASSERT_NE(nullptr, tel_get_cp_name_list());
+    EXPECT_THAT(textsOf(tel_get_cp_name_list()), IsEmpty());
+}
+
+TEST_F(TapiTest, NoServiceIsNoList)
+{
+    for (const port::Error& error :
+         {port::notAvailable("no service"), port::denied("no"), port::notSupported("a tablet")}) {
+        telephony.slotsAnswer = error;
+        EXPECT_EQ(nullptr, tel_get_cp_name_list());
+        EXPECT_EQ(error.reason, lastOrigin(Question::SimSlots).reason);
+    }
+}
+
+TEST_F(TapiTest, ListsStayAndAreNotMultiplied)
+{
+    char** const first = tel_get_cp_name_list();
+    telephony.slotsAnswer = answered(FakeTelephony::Names{"other"});
+    char** const second = tel_get_cp_name_list();
+    EXPECT_NE(first, second);
+    EXPECT_THAT(textsOf(second), ElementsAre("other"));
+    EXPECT_THAT(textsOf(first), ElementsAre("modem0", "modem1"));
+    telephony.slotsAnswer = answered(FakeTelephony::Names{"modem0", "modem1"});
+    EXPECT_EQ(first, tel_get_cp_name_list());
+}
+
+TEST_F(TapiTest, ModemIsOpenedByItsName)
+{
+    TapiHandle* const handle = tel_init("modem1");
+    ASSERT_NE(nullptr, handle);
+    telephony.questions.clear();
+    EXPECT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_THAT(telephony.questions, ElementsAre("imsi modem1"));
+    EXPECT_EQ(0, tel_deinit(handle));
+}
+
+TEST_F(TapiTest, NoNameIsTheFirstModem)
+{
+    TapiHandle* const handle = tel_init(nullptr);
+    ASSERT_NE(nullptr, handle);
+    telephony.questions.clear();
+    EXPECT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_THAT(telephony.questions, ElementsAre("imsi modem0"));
+    EXPECT_EQ(0, tel_deinit(handle));
+}
+
+TEST_F(TapiTest, UnknownModemsAreNotOpened)
+{
+    for (const char* const name : {"", "modem", "modem00", "MODEM0", " modem0"})
+        EXPECT_EQ(nullptr, tel_init(name)) << name;
+    telephony.slotsAnswer = answered(FakeTelephony::Names{});
+    EXPECT_EQ(nullptr, tel_init(nullptr));
+    telephony.slotsAnswer = port::notAvailable("no service");
+    EXPECT_EQ(nullptr, tel_init("modem0"));
+    EXPECT_EQ(nullptr, tel_init(nullptr));
+    EXPECT_EQ(0U, ModemHandles::live());
+}
+
+TEST_F(TapiTest, EachOpenIsAHandleOfItsOwnAndCounted)
+{
+    TapiHandle* const first = tel_init("modem0");
+    TapiHandle* const second = tel_init("modem0");
+    EXPECT_NE(first, second);
+    EXPECT_EQ(2U, ModemHandles::live());
+    EXPECT_EQ(0, tel_deinit(first));
+    EXPECT_EQ(1U, ModemHandles::live());
+    EXPECT_EQ(0, tel_deinit(second));
+    EXPECT_EQ(0U, ModemHandles::live());
+}
+
+// The result of every function that takes a handle.
+std::vector<int> askAll(TapiHandle* handle)
+{
+    TelSimImsiInfo_t imsi = {};
+    TelSimCardStatus_t status = TAPI_SIM_STATUS_UNKNOWN;
+    TelNetworkDefaultSubs_t network = TAPI_NETWORK_DEFAULT_SUBS_SIM2;
+    TelNetworkDefaultDataSubs_t data = TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2;
+    TelCallPreferredVoiceSubs_t voice = TAPI_CALL_PREFERRED_VOICE_SUBS_ASK_ALWAYS;
+    int number = 7;
+    std::vector<int> results = {tel_get_sim_imsi(handle, &imsi),
+                                tel_get_sim_init_info(handle, &status, &number),
+                                tel_get_network_default_subscription(handle, &network),
+                                tel_get_network_default_data_subscription(handle, &data),
+                                tel_get_call_preferred_voice_subscription(handle, &voice),
+                                tel_check_sms_device_status(handle, &number)};
+    EXPECT_STREQ("", imsi.szMcc);
+    EXPECT_EQ(TAPI_SIM_STATUS_UNKNOWN, status);
+    EXPECT_EQ(TAPI_NETWORK_DEFAULT_SUBS_SIM2, network);
+    EXPECT_EQ(TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2, data);
+    EXPECT_EQ(TAPI_CALL_PREFERRED_VOICE_SUBS_ASK_ALWAYS, voice);
+    EXPECT_EQ(7, number);
+    return results;
+}
+
+TEST_F(TapiTest, NullReleasedAndForeignHandlesAreInvalid)
+{
+    TapiHandle* const released = tel_init("modem0");
+    EXPECT_EQ(0, tel_deinit(released));
+    telephony_handle_list_s list = {};
+    ASSERT_EQ(0, telephony_init(&list));
+    TapiHandle* otherKind = nullptr;
+    std::memcpy(&otherKind, list.handle, sizeof otherKind);
+    telephony.questions.clear();
+    int onTheStack = 0;
+    for (TapiHandle* const handle : {static_cast<TapiHandle*>(nullptr), released, otherKind,
+                                     reinterpret_cast<TapiHandle*>(&onTheStack)}) {
+        EXPECT_THAT(askAll(handle), Each(-2));
+        EXPECT_EQ(-2, tel_deinit(handle));
+    }
+    EXPECT_THAT(telephony.questions, IsEmpty());
+    EXPECT_EQ(0, telephony_deinit(&list));
+}
+
+TEST_F(TapiHandleTest, NullSlotsAreInvalid)
+{
+    EXPECT_EQ(-2, tel_get_sim_imsi(handle, nullptr));
+    EXPECT_EQ(-2, tel_get_sim_init_info(handle, nullptr, &changed));
+    EXPECT_EQ(-2, tel_get_sim_init_info(handle, &status, nullptr));
+    EXPECT_EQ(-2, tel_get_network_default_subscription(handle, nullptr));
+    EXPECT_EQ(-2, tel_get_network_default_data_subscription(handle, nullptr));
+    EXPECT_EQ(-2, tel_get_call_preferred_voice_subscription(handle, nullptr));
+    EXPECT_EQ(-2, tel_check_sms_device_status(handle, nullptr));
+    EXPECT_THAT(telephony.questions, IsEmpty());
+}
+
+TEST_F(TapiHandleTest, EveryErrorHasItsCode)
+{
+    const struct {
+        port::Error error;
+        int code;
+    } rows[] = {{port::notAvailable("gone"), -17},
+                {port::notSupported("no radio"), -3},
+                {port::denied("private"), -19}};
+    for (const auto& row : rows) {
+        telephony.imsiAnswer = row.error;
+        telephony.cardAnswer = row.error;
+        telephony.subscriptionsAnswer = row.error;
+        telephony.smsAnswer = row.error;
+        EXPECT_THAT(askAll(handle), Each(row.code));
+        for (const Question question : {Question::SimIdentity, Question::SimCard,
+                                        Question::Subscriptions, Question::SmsReadiness})
+            EXPECT_EQ(row.error.reason, lastOrigin(question).reason);
+    }
+}
+
+TEST_F(TapiHandleTest, ImsiComesInItsParts)
+{
+    telephony.imsiAnswer = answered(port::Imsi{"310", "260", "123456789"});
+    ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_STREQ("310", imsi.szMcc);
+    EXPECT_STREQ("260", imsi.szMnc);
+    EXPECT_STREQ("123456789", imsi.szMsin);
+    telephony.imsiAnswer = answered(port::Imsi{"001", "01", "0123456789"});
+    ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_STREQ("01", imsi.szMnc);
+    EXPECT_STREQ("0123456789", imsi.szMsin);
+    EXPECT_EQ("test", lastOrigin(Question::SimIdentity).source);
+}
+
+TEST_F(TapiHandleTest, ImsiThatDoesNotFitIsNotCut)
+{
+    for (const port::Imsi& tooLong :
+         {port::Imsi{"0010", "01", "0123456789"}, port::Imsi{"001", "0001", "0123456789"},
+          port::Imsi{"001", "01", "01234567890"}}) {
+        telephony.imsiAnswer = answered(tooLong);
+        EXPECT_EQ(-17, tel_get_sim_imsi(handle, &imsi));
+        EXPECT_STREQ("", imsi.szMcc);
+    }
+}
+
+TEST_F(TapiHandleTest, UnreadableCardSaysWhy)
+{
+    const struct {
+        CardStatus status;
+        int code;
+    } rows[] = {{CardStatus::Absent, -501},      {CardStatus::Removed, -501},
+                {CardStatus::Error, -501},       {CardStatus::PinRequired, -503},
+                {CardStatus::PukRequired, -503}, {CardStatus::NetworkLocked, -503},
+                {CardStatus::Blocked, -504},     {CardStatus::Initializing, -502},
+                {CardStatus::Unknown, -502},     {CardStatus::Ready, -502}};
+    telephony.imsiAnswer = port::noSim("why");
+    for (const auto& row : rows) {
+        setCard(row.status);
+        EXPECT_EQ(row.code, tel_get_sim_imsi(handle, &imsi)) << static_cast<int>(row.status);
+        EXPECT_STREQ("", imsi.szMcc);
+    }
+    telephony.cardAnswer = port::notAvailable("gone in between");
+    EXPECT_EQ(-17, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_EQ("why", lastOrigin(Question::SimIdentity).reason);
+}
+
+TEST_F(TapiHandleTest, EveryCardStatusHasItsNumber)
+{
+    const struct {
+        CardStatus status;
+        int number;
+    } rows[] = {{CardStatus::Error, 0},
+                {CardStatus::Absent, 1},
+                {CardStatus::Initializing, 2},
+                {CardStatus::Ready, 3},
+                {CardStatus::PinRequired, 4},
+                {CardStatus::PukRequired, 5},
+                {CardStatus::Blocked, 6},
+                {CardStatus::NetworkLocked, 7},
+                {CardStatus::SubsetLocked, 8},
+                {CardStatus::ProviderLocked, 9},
+                {CardStatus::CorporateLocked, 10},
+                {CardStatus::Removed, 11},
+                {CardStatus::DeviceLocked, 12},
+                {CardStatus::Crashed, 13},
+                {CardStatus::PoweredOff, 14},
+                {CardStatus::Unknown, 255}};
+    for (const auto& row : rows) {
+        setCard(row.status);
+        ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
+        EXPECT_EQ(row.number, static_cast<int>(status));
+        EXPECT_EQ(0, changed);
+    }
+    setCard(CardStatus::Ready, true);
+    ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
+    EXPECT_EQ(1, changed);
+}
+
+TEST_F(TapiHandleTest, BothGenerationsAgree)
+{
+    telephony_handle_list_s list = {};
+    ASSERT_EQ(0, telephony_init(&list));
+    for (int value = 0; value <= static_cast<int>(CardStatus::Unknown); ++value) {
+        setCard(static_cast<CardStatus>(value));
+        telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
+        ASSERT_EQ(0, telephony_sim_get_state(list.handle[0], &state));
+        ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
+        EXPECT_EQ(status == TAPI_SIM_STATUS_SIM_INIT_COMPLETED,
+                  state == TELEPHONY_SIM_STATE_AVAILABLE);
+    }
+    EXPECT_EQ(0, telephony_deinit(&list));
+}
+
+TEST_F(TapiHandleTest, SubscriptionsAreNumberedFromTheFirstSlot)
+{
+    const struct {
+        std::optional<int> slot;
+        int name;
+    } rows[] = {{std::nullopt, -1}, {0, 0}, {1, 1}, {2, -1}};
+    for (const auto& row : rows) {
+        Subscriptions all;
+        all.network = row.slot;
+        telephony.subscriptionsAnswer = answered(all);
+        TelNetworkDefaultSubs_t network = TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN;
+        TelNetworkDefaultDataSubs_t data = TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM1;
+        ASSERT_EQ(0, tel_get_network_default_subscription(handle, &network));
+        ASSERT_EQ(0, tel_get_network_default_data_subscription(handle, &data));
+        EXPECT_EQ(row.name, static_cast<int>(network));
+        EXPECT_EQ(TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN, data);
+        std::swap(all.network, all.data);
+        telephony.subscriptionsAnswer = answered(all);
+        ASSERT_EQ(0, tel_get_network_default_data_subscription(handle, &data));
+        EXPECT_EQ(row.name, static_cast<int>(data));
+    }
+}
+
+TEST_F(TapiHandleTest, EveryVoicePreferenceHasItsNumber)
+{
+    using Voice = Subscriptions::Voice;
+    const struct {
+        Voice voice;
+        int number;
+    } rows[] = {{Voice::Unknown, -1},
+                {Voice::CurrentNetwork, 0},
+                {Voice::AskAlways, 1},
+                {Voice::Slot1, 2},
+                {Voice::Slot2, 3}};
+    for (const auto& row : rows) {
+        Subscriptions all;
+        all.voice = row.voice;
+        telephony.subscriptionsAnswer = answered(all);
+        TelCallPreferredVoiceSubs_t voice = TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN;
+        ASSERT_EQ(0, tel_get_call_preferred_voice_subscription(handle, &voice));
+        EXPECT_EQ(row.number, static_cast<int>(voice));
+    }
+}
+
+TEST_F(TapiHandleTest, SmsReadinessIsOneOrZero)
+{
+    for (const bool isReady : {true, false}) {
+        telephony.smsAnswer = answered(isReady);
+        int ready = 7;
+        ASSERT_EQ(0, tel_check_sms_device_status(handle, &ready));
+        EXPECT_EQ(isReady ? 1 : 0, ready);
+    }
+}
+
+TEST_F(TapiHandleTest, NoExceptionLeaves)
+{
+    telephony.before = [] { throw std::string("trouble"); };
+    EXPECT_EQ(nullptr, tel_get_cp_name_list());
+    EXPECT_EQ(nullptr, tel_init("modem0"));
+    EXPECT_THAT(askAll(handle), Each(-17));
+    telephony.before = [] { throw std::bad_alloc(); };
+    EXPECT_EQ(nullptr, tel_get_cp_name_list());
+    EXPECT_THAT(askAll(handle), Each(-5));
+}
+
+TEST_F(TapiTest, ThreadsMayOpenAskAndReleaseAtOnce)
+{
+    together(8, [](int number) {
+        for (int round = 0; round < 100; ++round) {
+            char** const names = tel_get_cp_name_list();
+            TapiHandle* const mine = tel_init(names[number % 2]);
+            TelSimImsiInfo_t parts = {};
+            EXPECT_EQ(0, tel_get_sim_imsi(mine, &parts));
+            EXPECT_EQ(0, tel_deinit(mine));
+        }
+    });
+    EXPECT_EQ(0U, ModemHandles::live());
+}
+
+} // namespace
