@@ -2,6 +2,8 @@
 #include "DeviceFile.h"
 
 #include <algorithm>
+#include <limits>
+#include <optional>
 #include <sstream>
 
 #include <dlog.h>
@@ -17,15 +19,6 @@ constexpr long SCHEMA = 1;
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024;
 constexpr std::size_t LINE_LIMIT = 1024;
 
-// Every key that a device file may hold.
-constexpr struct {
-    const char* section;
-    const char* key;
-} TEXT_KEYS[] = {
-    {"device", "platform_id"}, {"device", "platform_name"}, {"device", "platform_version"},
-    {"device", "model_name"},  {"settings", "device_name"}, {"settings", "language"},
-};
-
 struct Problem {
     toml::source_region where;
     std::string text;
@@ -35,22 +28,6 @@ std::string describe(const std::string& path, const Problem& problem)
 {
     return path + ":" + std::to_string(problem.where.begin.line) + ":" +
            std::to_string(problem.where.begin.column) + ": " + problem.text;
-}
-
-bool isSection(std::string_view name)
-{
-    for (const auto& row : TEXT_KEYS)
-        if (row.section == name)
-            return true;
-    return false;
-}
-
-bool isTextKey(std::string_view section, std::string_view key)
-{
-    for (const auto& row : TEXT_KEYS)
-        if (row.section == section && row.key == key)
-            return true;
-    return false;
 }
 
 // In quotes and on one line, whatever it holds.
@@ -71,29 +48,187 @@ void checkSchema(const toml::table& root)
         throw Problem{schema->source(), "this version reads schema = 1 only"};
 }
 
-void readKey(Device& device, const std::string& section, const toml::key& key,
-             const toml::node& node)
+using Content = decltype(Value::content);
+
+bool areDigits(std::string_view text)
 {
-    if (!isTextKey(section, key))
-        throw Problem{key.source(), "unknown key " + quoted(key) + " in [" + section + "]"};
-    const auto value = node.value_exact<std::string>();
-    if (!value)
-        throw Problem{node.source(), quoted(key) + " must be a text in quotes"};
-    if (value->find('\0') != std::string::npos)
-        throw Problem{node.source(), quoted(key) + " must not hold a NUL"};
-    device[{section, std::string(key.str())}] = {*value, node.source().begin.line};
+    return text.find_first_not_of("0123456789") == std::string_view::npos;
 }
 
-void readSection(Device& device, const toml::key& name, const toml::node& node)
+// As a card holds it (3GPP TS 31.102, EF_MSISDN): at most 20 digits, * and #, after a plus sign.
+bool isNumber(std::string_view text)
 {
-    if (!isSection(name))
-        throw Problem{name.source(), "unknown key " + quoted(name)};
-    const toml::table* const section = node.as_table();
-    if (section == nullptr)
-        throw Problem{node.source(), "[" + std::string(name.str()) + "] must be a section"};
-    for (const auto& [key, value] : *section)
-        readKey(device, std::string(name.str()), key, value);
+    if (text.substr(0, 1) == "+")
+        text.remove_prefix(1);
+    return !text.empty() && text.size() <= 20 &&
+           text.find_first_not_of("0123456789*#") == std::string_view::npos;
 }
+
+bool isWithin(const Type& type, std::int64_t number)
+{
+    return type.least <= number && number <= type.most;
+}
+
+// "one of" that a person may write, in the order of the schema.
+std::string listOf(const Names& names)
+{
+    std::string list;
+    for (const Name& row : names)
+        list += (list.empty() ? "" : ", ") + quoted(row.name);
+    return list;
+}
+
+std::string rangeOf(const Type& type)
+{
+    if (type.most >= std::numeric_limits<int>::max())
+        return "from " + std::to_string(type.least);
+    return "from " + std::to_string(type.least) + " to " + std::to_string(type.most);
+}
+
+std::string countOf(const Type& type)
+{
+    return (type.least == type.most ? "" : std::to_string(type.least) + " to ") +
+           std::to_string(type.most);
+}
+
+// What a key must be, for its writer.
+std::string expected(const Type& type)
+{
+    switch (type.kind) {
+    case Type::Kind::Text:
+        return "a text in quotes";
+    case Type::Kind::Digits:
+        return countOf(type) + " digits in quotes";
+    case Type::Kind::Number:
+        return "a phone number in quotes, or \"null\"";
+    case Type::Kind::Switch:
+        return "true or false";
+    case Type::Kind::Whole:
+        return "a whole number " + rangeOf(type);
+    case Type::Kind::Name:
+        break;
+    }
+    return "one of " + listOf(type.names) +
+           (type.most < type.least ? "" : ", or a whole number " + rangeOf(type));
+}
+
+std::optional<Content> readText(const Type& type, const std::string& text)
+{
+    switch (type.kind) {
+    case Type::Kind::Digits:
+        return areDigits(text) && isWithin(type, static_cast<std::int64_t>(text.size()))
+                   ? std::optional<Content>(text)
+                   : std::nullopt;
+    case Type::Kind::Number:
+        if (text == "null") // the platform succeeds without a number
+            return std::string();
+        return isNumber(text) ? std::optional<Content>(text) : std::nullopt;
+    case Type::Kind::Name:
+        for (const Name& row : type.names)
+            if (row.name == text)
+                return row.value;
+        return std::nullopt;
+    case Type::Kind::Text:
+        return text;
+    default:
+        return std::nullopt;
+    }
+}
+
+// Nothing when the node is not of the type.
+std::optional<Content> readNode(const Type& type, const toml::node& node)
+{
+    if (const auto text = node.value_exact<std::string>())
+        return readText(type, *text);
+    if (const auto flag = node.value_exact<bool>(); flag && type.kind == Type::Kind::Switch)
+        return *flag;
+    if (const auto number = node.value_exact<std::int64_t>();
+        number && (type.kind == Type::Kind::Whole || type.kind == Type::Kind::Name) &&
+        isWithin(type, *number))
+        return *number;
+    return std::nullopt;
+}
+
+// Reads the tables of a file into a device.
+class Reader {
+public:
+    explicit Reader(const std::string& path) : path_(path) {}
+
+    Device read(const toml::table& root)
+    {
+        checkSchema(root);
+        for (const SectionRow* row = beginSections(); row != endSections(); ++row)
+            if (row->form != Form::List)
+                device_.sections.emplace(row->name, Section(titleOf(*row), path_));
+        for (const auto& [key, node] : root)
+            if (key != "schema")
+                readSection(key, node);
+        return std::move(device_);
+    }
+
+private:
+    static std::string titleOf(const SectionRow& row)
+    {
+        const std::string name(row.name);
+        return row.form == Form::List ? "[[" + name + "]]" : "[" + name + "]";
+    }
+
+    std::string sourceOf(const toml::node& node) const
+    {
+        return path_ + ":" + std::to_string(node.source().begin.line);
+    }
+
+    void readSection(const toml::key& name, const toml::node& node)
+    {
+        const SectionRow* const row = findSection(name.str());
+        if (row == nullptr)
+            throw Problem{name.source(), "unknown key " + quoted(name)};
+        if (row->form == Form::List) {
+            readList(*row, node);
+            return;
+        }
+        if (!node.is_table())
+            throw Problem{node.source(), titleOf(*row) + " must be a section"};
+        readKeys(*row, *node.as_table(), device_.sections.find(row->name)->second);
+    }
+
+    void readList(const SectionRow& row, const toml::node& node)
+    {
+        const toml::array* const list = node.as_array();
+        if (list == nullptr)
+            throw Problem{node.source(), titleOf(row) + " must be a list of sections"};
+        for (const toml::node& element : *list) {
+            if (!element.is_table())
+                throw Problem{element.source(), titleOf(row) + " must be a list of sections"};
+            Section section(titleOf(row), sourceOf(element));
+            readKeys(row, *element.as_table(), section);
+            device_.slots.push_back(std::move(section));
+        }
+    }
+
+    void readKeys(const SectionRow& row, const toml::table& table, Section& section)
+    {
+        for (const auto& [key, node] : table)
+            section.set(std::string(key.str()), readValue(row, key, node));
+    }
+
+    Value readValue(const SectionRow& row, const toml::key& key, const toml::node& node)
+    {
+        const Type* const type = findKey(row, key.str());
+        if (type == nullptr)
+            throw Problem{key.source(), "unknown key " + quoted(key) + " in " + titleOf(row)};
+        std::optional<Content> content = readNode(*type, node);
+        if (!content)
+            throw Problem{node.source(), quoted(key) + " must be " + expected(*type)};
+        const auto* const text = std::get_if<std::string>(&*content);
+        if (text != nullptr && text->find('\0') != std::string::npos)
+            throw Problem{node.source(), quoted(key) + " must not hold a NUL"};
+        return {std::move(*content), sourceOf(node)};
+    }
+
+    const std::string& path_;
+    Device device_;
+};
 
 // Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the
 // line (and on nested values, TOML_MAX_NESTED_VALUES) keeps that from using up the stack.
@@ -115,12 +250,7 @@ Result<Device> parseDevice(const std::string& text, const std::string& path)
     try {
         checkLines(text);
         const toml::table root = toml::parse(text, path);
-        checkSchema(root);
-        Device device;
-        for (const auto& [key, node] : root)
-            if (key != "schema")
-                readSection(device, key, node);
-        return device;
+        return Reader(path).read(root);
     } catch (const toml::parse_error& error) {
         return notAvailable(describe(path, {error.source(), std::string(error.description())}));
     } catch (const Problem& problem) {
@@ -162,17 +292,6 @@ void DeviceFile::report(const std::string& problem)
     }
     if (!problem.empty())
         processLog().write(DLOG_ERROR, "coresystem-port", problem);
-}
-
-Result<Fact> DeviceFile::text(const std::string& section, const std::string& key)
-{
-    const Result<std::shared_ptr<const Device>> now = device();
-    if (!now)
-        return now.error();
-    const auto found = now.value()->find({section, key});
-    if (found == now.value()->end())
-        return notAvailable(path_ + ": [" + section + "] has no " + key);
-    return Fact{found->second.value, path_ + ":" + std::to_string(found->second.line)};
 }
 
 } // namespace port::simulator

@@ -3,23 +3,14 @@
 #ifndef PORT_SIMULATOR_DEVICE_FILE_H
 #define PORT_SIMULATOR_DEVICE_FILE_H
 
-#include <map>
 #include <memory>
 #include <mutex>
 #include <string>
 
 #include "../backend/Result.h"
+#include "Device.h"
 
 namespace port::simulator {
-
-// A text of the device file and the line it stands in.
-struct Text {
-    std::string value;
-    unsigned line = 0;
-};
-
-// What a device file says: texts by section and key. A key that is absent is not there.
-using Device = std::map<std::pair<std::string, std::string>, Text>;
 
 /// Parses the text of a device file; `path` is for messages only. The error's reason is
 /// FILE:LINE:COLUMN: text.
@@ -40,8 +31,15 @@ public:
     /// of it: one line, and no other until the problem changes or goes away.
     Result<std::shared_ptr<const Device>> device();
 
-    /// One text of it.
-    Result<Fact> text(const std::string& section, const std::string& key);
+    /// One value of it; see Section::get().
+    template <typename T>
+    Result<Sourced<T>> get(const std::string& section, const std::string& key)
+    {
+        const Result<std::shared_ptr<const Device>> now = device();
+        if (!now)
+            return now.error();
+        return now.value()->section(section).template get<T>(key);
+    }
 
 private:
     Result<std::shared_ptr<const Device>> read();

@@ -14,19 +14,19 @@ public:
 
     Result<Fact> platformId() override
     {
-        return file_.text("device", "platform_id");
+        return file_.get<std::string>("device", "platform_id");
     }
     Result<Fact> platformName() override
     {
-        return file_.text("device", "platform_name");
+        return file_.get<std::string>("device", "platform_name");
     }
     Result<Fact> platformVersion() override
     {
-        return file_.text("device", "platform_version");
+        return file_.get<std::string>("device", "platform_version");
     }
     Result<Fact> modelName() override
     {
-        return file_.text("device", "model_name");
+        return file_.get<std::string>("device", "model_name");
     }
 
 private:

@@ -14,11 +14,11 @@ public:
 
     Result<Fact> deviceName() override
     {
-        return file_.text("settings", "device_name");
+        return file_.get<std::string>("settings", "device_name");
     }
     Result<Fact> language() override
     {
-        return file_.text("settings", "language");
+        return file_.get<std::string>("settings", "language");
     }
 
 private:

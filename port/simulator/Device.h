@@ -1,0 +1,85 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a device file says, as values that know where they stand.
+#ifndef PORT_SIMULATOR_DEVICE_H
+#define PORT_SIMULATOR_DEVICE_H
+
+#include <cstdint>
+#include <map>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <variant>
+#include <vector>
+
+#include "../backend/Result.h"
+#include "Schema.h"
+
+namespace port::simulator {
+
+struct Value {
+    std::variant<std::string, bool, std::int64_t> content;
+    std::string source; // FILE:LINE
+};
+
+class Section {
+public:
+    Section(std::string title, std::string source)
+        : title_(std::move(title)), source_(std::move(source))
+    {
+    }
+
+    /// Where it stands as FILE:LINE, or the file when it is not there.
+    const std::string& source() const
+    {
+        return source_;
+    }
+
+    void set(const std::string& key, Value value)
+    {
+        values_[key] = std::move(value);
+    }
+
+    /// Null when the key is absent.
+    const Value* find(const std::string& key) const
+    {
+        const auto found = values_.find(key);
+        return found != values_.end() ? &found->second : nullptr;
+    }
+
+    /// A value of the type that the schema gives the key: std::string, bool, std::int64_t, or the
+    /// enumeration behind its names.
+    template <typename T>
+    Result<Sourced<T>> get(const std::string& key) const
+    {
+        const Value* const value = find(key);
+        if (value == nullptr)
+            return notAvailable(source_ + ": " + title_ + " has no " + key);
+        if constexpr (std::is_same_v<T, std::string> || std::is_same_v<T, bool>) {
+            return Sourced<T>{std::get<T>(value->content), value->source};
+        } else {
+            const auto number = std::get<std::int64_t>(value->content);
+            if (number == NOT_SUPPORTED)
+                return notSupported(value->source + ": this device has no " + key);
+            return Sourced<T>{static_cast<T>(number), value->source};
+        }
+    }
+
+private:
+    std::string title_; // [name]
+    std::string source_;
+    std::map<std::string, Value> values_;
+};
+
+struct Device {
+    std::map<std::string, Section, std::less<>> sections; // every one, there or not
+    std::vector<Section> slots;
+
+    const Section& section(const std::string& name) const
+    {
+        return sections.find(name)->second;
+    }
+};
+
+} // namespace port::simulator
+
+#endif

@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a device file may say: its sections, their keys and the type of each.
+#ifndef PORT_SIMULATOR_SCHEMA_H
+#define PORT_SIMULATOR_SCHEMA_H
+
+#include <cstdint>
+#include <limits>
+#include <string_view>
+
+namespace port::simulator {
+
+// The value of the name "not_supported": this device has no such thing.
+constexpr std::int64_t NOT_SUPPORTED = std::numeric_limits<std::int64_t>::min();
+
+// A name in quotes and the number that it is kept as, which is an enumerator's.
+struct Name {
+    std::string_view name;
+    std::int64_t value;
+};
+
+struct Names {
+    const Name* rows;
+    std::size_t count;
+
+    const Name* begin() const
+    {
+        return rows;
+    }
+    const Name* end() const
+    {
+        return rows + count;
+    }
+};
+
+struct Type {
+    enum class Kind {
+        Text,   // in quotes, without a NUL
+        Digits, // in quotes, from `least` to `most` of them
+        Number, // a phone number in quotes, or "null"
+        Switch, // true or false
+        Whole,  // a whole number from `least` to `most`
+        Name,   // one of `names` in quotes, or a whole number from `least` to `most`
+    };
+    Kind kind;
+    std::int64_t least = 0;
+    std::int64_t most = -1; // below `least`: no number at all
+    Names names = {nullptr, 0};
+};
+
+enum class Form {
+    Section, // [name]
+    List,    // [[name]], any number of them
+    Free,    // [name] with keys of any name
+};
+
+struct SectionRow {
+    std::string_view name;
+    Form form;
+};
+
+const SectionRow* findSection(std::string_view name);
+
+/// The type of a key; null when the section has no such key.
+const Type* findKey(const SectionRow& section, std::string_view key);
+
+/// All sections in order, for `for`.
+const SectionRow* beginSections();
+const SectionRow* endSections();
+
+} // namespace port::simulator
+
+#endif
