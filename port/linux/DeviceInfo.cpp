@@ -3,6 +3,8 @@
 
 #include <algorithm>
 #include <array>
+#include <iterator>
+#include <string_view>
 
 #include "Files.h"
 #include "GLibTypes.h"
@@ -61,6 +63,52 @@ std::string toHex(const Id& id)
     return text;
 }
 
+// What firmware says when its maker gave no number, in small letters.
+constexpr std::string_view NO_SERIALS[] = {
+    "to be filled by o.e.m.",
+    "default string",
+    "system serial number",
+    "chassis serial number",
+    "serial number",
+    "not specified",
+    "not applicable",
+    "not available",
+    "n/a",
+    "none",
+    "null",
+    "unknown",
+    "invalid",
+    "oem",
+    "o.e.m.",
+    "empty",
+    "0123456789",
+    "1234567890",
+    "123456789",
+    "12345678",
+};
+
+std::string inSmallLetters(std::string text)
+{
+    std::transform(text.begin(), text.end(), text.begin(),
+                   [](char letter) { return g_ascii_tolower(letter); });
+    return text;
+}
+
+// "0000000", "XXXX", "-" and the like.
+bool repeatsOneCharacter(const std::string& text)
+{
+    return text.find_first_not_of(text.front()) == std::string::npos;
+}
+
+std::string problemOfSerial(const std::string& text)
+{
+    const std::string small = inSmallLetters(text);
+    const bool isNone =
+        repeatsOneCharacter(small) ||
+        std::find(std::begin(NO_SERIALS), std::end(NO_SERIALS), small) != std::end(NO_SERIALS);
+    return isNone ? "\"" + text + "\" is no serial number" : "";
+}
+
 } // namespace
 
 Result<Fact> LinuxDeviceInfo::platformId()
@@ -99,6 +147,11 @@ Result<Fact> LinuxDeviceInfo::modelName()
 {
     const Result<Fact> model = bus_.textProperty(HOSTNAME1, {"HardwareModel"});
     return model ? model : orElse(model.error(), readFirst(root_, HARDWARE_MODEL));
+}
+
+Result<Fact> LinuxDeviceInfo::serial()
+{
+    return readFirst(root_, SERIAL_NUMBER, &problemOfSerial);
 }
 
 } // namespace port::linux_backend

@@ -17,6 +17,7 @@ public:
     Result<Fact> platformName() override;
     Result<Fact> platformVersion() override;
     Result<Fact> modelName() override;
+    Result<Fact> serial() override;
 
 private:
     Result<Fact> osRelease(const char* variable);

@@ -27,12 +27,14 @@ std::string readText(const std::string& path, std::string& problem)
 
 } // namespace
 
-Result<Fact> readFirst(const std::string& root, Places places)
+Result<Fact> readFirst(const std::string& root, Places places, TextCheck check)
 {
     std::string problems;
     for (const char* const place : places) {
         std::string problem;
         const std::string text = readText(root + place, problem);
+        if (problem.empty() && check != nullptr)
+            problem = check(text);
         if (problem.empty())
             return Fact{text, place};
         problems += (problems.empty() ? "" : ", ") + std::string(place) + ": " + problem;

@@ -27,6 +27,10 @@ struct GLibRelease {
         g_source_destroy(source);
         g_source_unref(source);
     }
+    void operator()(GKeyFile* keyFile) const
+    {
+        g_key_file_unref(keyFile);
+    }
     void operator()(GHmac* hmac) const
     {
         g_hmac_unref(hmac);

@@ -2,16 +2,26 @@
 // This machine's real services.
 #include "../backend/Backend.h"
 #include "Bus.h"
+#include "Clock.h"
+#include "Configuration.h"
 #include "DeviceInfo.h"
 #include "Files.h"
 #include "Hostname1.h"
 #include "Locale1.h"
+#include "Packages.h"
 #include "Settings.h"
+#include "Storage.h"
 
 namespace port::linux_backend {
 namespace {
 
 using coresystem_port::Service;
+
+std::vector<std::string> configurationFiles()
+{
+    return {std::string(g_get_user_config_dir()) + "/coresystem/vconf.ini",
+            "/etc/coresystem/vconf.ini"};
+}
 
 class LinuxBackend : public Backend {
 public:
@@ -63,6 +73,9 @@ public:
             file(OS_RELEASE, "platform name and version", "no platform name and version"),
             file(MACHINE_ID, "platform identifier", "no platform identifier"),
             file(HARDWARE_MODEL, "hardware model", "the model is hostname1's only"),
+            probe(*SERIAL_NUMBER.begin(), deviceInfo_.serial(), "device serial",
+                  "no device serial"),
+            probe(DPKG_STATUS, packages_.version(""), "installed packages", "no package is known"),
         };
     }
 
@@ -82,15 +95,24 @@ private:
         return {*places.begin(), false, read.error().reason, serves, consequence};
     }
 
+    // Of something that can only be told by asking.
+    template <typename T>
+    static Service probe(const char* name, const Result<T>& answer, const char* serves,
+                         const char* consequence)
+    {
+        return {answer ? answer.value().source : name, static_cast<bool>(answer),
+                answer ? "readable" : answer.error().reason, serves, consequence};
+    }
+
     Bus bus_;
     LinuxDeviceInfo deviceInfo_{bus_, ""};
     LinuxSettings settings_{bus_};
     Telephony telephony_;
     Network network_;
-    Storage storage_;
-    Packages packages_;
-    Configuration configuration_;
-    Clock clock_;
+    LinuxStorage storage_{g_get_user_data_dir()};
+    LinuxPackages packages_{""};
+    LinuxConfiguration configuration_{configurationFiles()};
+    LinuxClock clock_;
 };
 
 } // namespace

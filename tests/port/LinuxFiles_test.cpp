@@ -184,6 +184,38 @@ TEST_F(LinuxFilesTest, AbsentModelNamesEveryPlace)
                                 "/proc/device-tree/model: No such file or directory")));
 }
 
+TEST_F(LinuxFilesTest, SerialComesFromTheDeviceTreeThenFromDmi)
+{
+    tree.write("/sys/class/dmi/id/product_serial", "SN-4711 \n");
+    EXPECT_EQ("SN-4711 </sys/class/dmi/id/product_serial>", show(device.serial()));
+    tree.write("/proc/device-tree/serial-number", std::string("10000000c0ffee\0", 15));
+    EXPECT_EQ("10000000c0ffee </proc/device-tree/serial-number>", show(device.serial()));
+}
+
+TEST_F(LinuxFilesTest, PlaceholderIsNoSerial)
+{
+    tree.write("/sys/class/dmi/id/product_serial", "PF0ABCDE\n");
+    for (const char* const text :
+         {"To be filled by O.E.M.", "TO BE FILLED BY O.E.M.", "Default string",
+          "System Serial Number", "Not Specified", "None", "n/a", "0", "0000000000000000",
+          "XXXXXXX", "xXxX", "-", ".....", "0123456789", "123456789"}) {
+        tree.write("/proc/device-tree/serial-number", text);
+        EXPECT_EQ("PF0ABCDE </sys/class/dmi/id/product_serial>", show(device.serial())) << text;
+    }
+    tree.write("/sys/class/dmi/id/product_serial", "Default string\n");
+    tree.write("/proc/device-tree/serial-number", std::string("0\0", 2));
+    EXPECT_EQ("error: /proc/device-tree/serial-number: \"0\" is no serial number, "
+              "/sys/class/dmi/id/product_serial: \"Default string\" is no serial number",
+              show(device.serial()));
+}
+
+TEST_F(LinuxFilesTest, AbsentSerialNamesEveryPlace)
+{
+    EXPECT_EQ("error: /proc/device-tree/serial-number: No such file or directory, "
+              "/sys/class/dmi/id/product_serial: No such file or directory",
+              show(device.serial()));
+}
+
 TEST_F(LinuxFilesTest, OddFilesAreNamedAndNeverWaitedFor)
 {
     const std::string path = tree.path("/etc/os-release");

@@ -1,0 +1,133 @@
+// SPDX-License-Identifier: Apache-2.0
+// Installed packages, from a made-up package database and from this machine's own.
+#include <gmock/gmock.h>
+#include <unistd.h>
+
+#include "linux/Packages.h"
+#include "support/Program.h"
+#include "support/TemporaryTree.h"
+
+using port::linux_backend::DPKG_STATUS;
+using port::linux_backend::LinuxPackages;
+using testing::StartsWith;
+
+namespace {
+
+const std::string SHELL = "Package: shell\nStatus: install ok installed\nArchitecture: amd64\n"
+                          "Version: 2:5.2.15-2+b8\nDescription: a shell\n"
+                          " Package: hidden\n Status: install ok installed\n Version: 9\n\n";
+
+std::string stanza(const std::string& name, const std::string& status, const std::string& version)
+{
+    return "Package: " + name + "\nStatus: " + status + "\nVersion: " + version + "\n\n";
+}
+
+class LinuxPackagesTest : public testing::Test {
+protected:
+    // "VERSION <SOURCE>", "not installed" or "error: REASON".
+    std::string versionIn(const std::string& status, const std::string& name)
+    {
+        tree.write(DPKG_STATUS, status);
+        return version(name);
+    }
+    std::string version(const std::string& name)
+    {
+        const auto answer = LinuxPackages(tree.root()).version(name);
+        if (!answer)
+            return "error: " + answer.error().reason;
+        const auto& found = answer.value().value;
+        return found ? *found + " <" + answer.value().source + ">" : "not installed";
+    }
+
+    const TemporaryTree tree;
+};
+
+TEST_F(LinuxPackagesTest, VersionOfAnInstalledPackageIsTold)
+{
+    const std::string status = stanza("aaa", "install ok installed", "1") + SHELL +
+                               stanza("zzz", "hold ok installed", "3");
+    EXPECT_EQ("2:5.2.15-2+b8 </var/lib/dpkg/status>", versionIn(status, "shell"));
+    EXPECT_EQ("1 </var/lib/dpkg/status>", version("aaa"));
+}
+
+TEST_F(LinuxPackagesTest, OnlyAFullyInstalledPackageCounts)
+{
+    for (const char* const state :
+         {"deinstall ok config-files", "install ok half-installed", "install ok unpacked",
+          "install reinstreq installed", "install ok not-installed", "Install ok installed", ""})
+        EXPECT_EQ("not installed", versionIn(stanza("shell", state, "1"), "shell")) << state;
+}
+
+TEST_F(LinuxPackagesTest, NameIsMatchedExactly)
+{
+    tree.write(DPKG_STATUS, SHELL);
+    for (const std::string& name :
+         {std::string("shel"), std::string("shell2"), std::string("Shell"), std::string("hidden"),
+          std::string(""), std::string(" shell"), std::string("shell\nVersion: 1"),
+          std::string("../../etc/passwd"), std::string("a shell"), std::string("*"),
+          std::string("$(reboot)"), std::string("shell:amd64"), std::string(10000000, 'x')})
+        EXPECT_EQ("not installed", version(name)) << name.substr(0, 100);
+}
+
+TEST_F(LinuxPackagesTest, ArchitectureThatIsInstalledTellsTheVersion)
+{
+    EXPECT_EQ("2 </var/lib/dpkg/status>",
+              versionIn(stanza("lib", "deinstall ok config-files", "1") +
+                            stanza("lib", "install ok installed", "2"),
+                        "lib"));
+}
+
+TEST_F(LinuxPackagesTest, EmptyDatabaseHasNoPackages)
+{
+    EXPECT_EQ("not installed", versionIn("", "shell"));
+}
+
+TEST_F(LinuxPackagesTest, NoCutOfTheDatabaseEverGivesAFalseAnswer)
+{
+    const std::string whole = stanza("aaa", "install ok installed", "1.2.3") + SHELL;
+    const std::size_t first = whole.find("\n\n") + 2;
+    for (std::size_t length = 1; length < whole.size(); ++length) {
+        const std::string cut = whole.substr(0, length);
+        // A cut between two packages cannot be seen.
+        const std::string expected =
+            length == first
+                ? "not installed"
+                : "error: /var/lib/dpkg/status: it is cut off in the middle of a package";
+        EXPECT_EQ(expected, versionIn(cut, "shell")) << cut;
+        EXPECT_EQ(length < first
+                      ? "error: /var/lib/dpkg/status: it is cut off in the middle of a package"
+                      : "1.2.3 </var/lib/dpkg/status>",
+                  version("aaa"))
+            << cut;
+    }
+}
+
+TEST_F(LinuxPackagesTest, OddDatabasesAreTold)
+{
+    EXPECT_EQ("error: /var/lib/dpkg/status: No such file or directory", version("shell"));
+    EXPECT_EQ("error: /var/lib/dpkg/status: it holds no version of shell",
+              versionIn("Package: shell\nStatus: install ok installed\n\n", "shell"));
+    EXPECT_EQ("error: /var/lib/dpkg/status: it holds no version of shell",
+              versionIn("Package: shell\nStatus: install ok installed\nVersion: \n\n", "shell"));
+    EXPECT_EQ("error: /var/lib/dpkg/status: it is cut off in the middle of a package",
+              versionIn(std::string(100000, '\x01'), "shell"));
+    tree.remove(DPKG_STATUS);
+    tree.write(std::string(DPKG_STATUS) + "/x", "");
+    EXPECT_EQ("error: /var/lib/dpkg/status: Is a directory", version("shell"));
+}
+
+TEST_F(LinuxPackagesTest, MachinesOwnDatabaseAgreesWithItsPackageManager)
+{
+    if (access(DPKG_STATUS, R_OK) != 0)
+        GTEST_SKIP() << "needs a machine with dpkg";
+    for (const char* const name : {"dpkg", "g++", "libc6", "base-files"}) {
+        const auto answer = LinuxPackages("").version(name);
+        ASSERT_TRUE(answer) << answer.error().reason;
+        const std::string expected =
+            outputOf(std::string("dpkg-query -W -f '${db:Status-Status} ${Version}\\n' ") + name +
+                     " | sed -n 's/^installed //p' | head -n 1");
+        EXPECT_EQ(expected, answer.value().value.value_or("") + "\n") << name;
+    }
+}
+
+} // namespace
