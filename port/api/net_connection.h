@@ -59,8 +59,8 @@ int connection_destroy(connection_h connection);
 
 /*
  * Each reads one state, which stays untouched on failure. INVALID_PARAMETER: a null argument or no
- * handle; NOT_SUPPORTED: this device has no such radio; PERMISSION_DENIED (Wi-Fi and Bluetooth);
- * OPERATION_FAILED. Any thread.
+ * handle; NOT_SUPPORTED: this device has no such radio; PERMISSION_DENIED; OPERATION_FAILED. Any
+ * thread.
  */
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state);
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state);

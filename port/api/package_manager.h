@@ -25,7 +25,8 @@ typedef void (*package_manager_size_info_receive_cb)(const char* package_id,
 
 /*
  * Asks for the size of a package; without a callback only the result counts. INVALID_PARAMETER: a
- * null name; NO_SUCH_PACKAGE; IO_ERROR: the packages cannot be read; PERMISSION_DENIED. Any thread.
+ * null name; NO_SUCH_PACKAGE; IO_ERROR: the packages cannot be read; SYSTEM_ERROR: there is a
+ * callback, and the sizes are not known; PERMISSION_DENIED. Any thread.
  */
 int package_manager_get_package_size_info(const char* package_id,
                                           package_manager_size_info_receive_cb callback,

@@ -69,7 +69,7 @@ int runtime_info_get_value_int(runtime_info_key_e key, int* value);
 /*
  * Sets the one callback of a key, in place of the one before. It is called on changes only, on the
  * GLib main context that was thread-default at registration. INVALID_PARAMETER: unknown key or null
- * callback. Any thread.
+ * callback; NOT_SUPPORTED: changes of this key are not told. Any thread.
  */
 int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback,
                                 void* user_data);

@@ -9,7 +9,7 @@
 extern "C" {
 #endif
 
-/* An access point; valid during the call that passes it. */
+/* An access point; valid during the call that passes it, null when it is not known. */
 typedef void* wifi_ap_h;
 
 typedef enum {

@@ -1,0 +1,120 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "ChangeEvents.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "../backend/Backend.h"
+#include "Registration.h"
+
+namespace port {
+namespace {
+
+using Value = std::optional<int>;
+
+template <auto read>
+Value value(Network& network)
+{
+    const auto answer = (network.*read)();
+    return answer ? Value(static_cast<int>(answer.value().value)) : std::nullopt;
+}
+
+Value wifiDevice(Network& network)
+{
+    const auto state = network.wifi();
+    return state ? Value(state.value().value != LinkState::Deactivated) : std::nullopt;
+}
+
+constexpr struct {
+    Change change;
+    Value (*read)(Network&);
+} FACTS[] = {
+    {Change::WifiDevice, wifiDevice},
+    {Change::WifiConnection, value<&Network::wifiConnection>},
+    {Change::WifiStatus, value<&Network::wifi>},
+    {Change::PacketData, value<&Network::packetData>},
+    {Change::FlightMode, value<&Network::flightMode>},
+    {Change::DataRoaming, value<&Network::dataRoaming>},
+};
+
+std::size_t indexOf(Change change)
+{
+    return static_cast<std::size_t>(change);
+}
+
+} // namespace
+
+ChangeEvents::Slot& ChangeEvents::slotOf(Change change)
+{
+    return slots_[indexOf(change)];
+}
+
+bool ChangeEvents::isWatched()
+{
+    if (watch_ == nullptr)
+        watch_ = network_.watch([this] { tell(); });
+    return watch_ != nullptr;
+}
+
+bool ChangeEvents::isIdle() const
+{
+    return std::none_of(slots_.begin(), slots_.end(),
+                        [](const Slot& slot) { return slot.registration != nullptr; });
+}
+
+bool ChangeEvents::set(Change change, Callback callback)
+{
+    auto registration = std::make_shared<Registration>(std::move(callback));
+    {
+        const std::lock_guard<std::mutex> lifecycle(lifecycle_);
+        if (!isWatched())
+            return false;
+        const std::lock_guard<std::mutex> reading(reading_);
+        Slot& slot = slotOf(change);
+        if (const Value now = FACTS[indexOf(change)].read(network_))
+            slot.value = now;
+        std::swap(slot.registration, registration);
+    }
+    if (registration != nullptr)
+        registration->close();
+    return true;
+}
+
+void ChangeEvents::unset(Change change)
+{
+    Slot removed;
+    {
+        const std::lock_guard<std::mutex> lifecycle(lifecycle_);
+        std::unique_ptr<Watch> needless; // ends after the lock that its calls take
+        const std::lock_guard<std::mutex> reading(reading_);
+        std::swap(slotOf(change), removed);
+        if (isIdle())
+            needless.swap(watch_);
+    }
+    if (removed.registration != nullptr)
+        removed.registration->close();
+}
+
+void ChangeEvents::tell()
+{
+    const std::lock_guard<std::mutex> reading(reading_);
+    for (const auto& fact : FACTS) {
+        Slot& slot = slotOf(fact.change);
+        if (slot.registration == nullptr)
+            continue;
+        const Value now = fact.read(network_);
+        if (!now || now == slot.value)
+            continue;
+        slot.value = now;
+        slot.registration->post(*now);
+    }
+}
+
+ChangeEvents& changeEvents()
+{
+    // Never destroyed: the watch may still call while the process ends.
+    static ChangeEvents& only = *new ChangeEvents(backend().network());
+    return only;
+}
+
+} // namespace port

@@ -1,0 +1,65 @@
+// SPDX-License-Identifier: Apache-2.0
+// Tells the callbacks of this process of changes of the network.
+#ifndef PORT_EVENTS_CHANGE_EVENTS_H
+#define PORT_EVENTS_CHANGE_EVENTS_H
+
+#include <array>
+#include <functional>
+#include <memory>
+#include <mutex>
+#include <optional>
+
+#include "../backend/Network.h"
+
+namespace port {
+
+class Registration;
+
+// What can be told, in the order in which it is told when several facts change at once.
+enum class Change { WifiDevice, WifiConnection, WifiStatus, PacketData, FlightMode, DataRoaming };
+
+/// One callback for each change. The backend is watched only while there is a callback. Any thread,
+/// also from inside a callback.
+///
+/// Two callbacks on two threads that remove each other wait for each other for ever.
+class ChangeEvents {
+public:
+    /// Is given the new value: of WifiDevice and the switches 0 or 1, of WifiConnection a
+    /// WifiConnection, of WifiStatus a LinkState.
+    using Callback = std::function<void(int value)>;
+
+    explicit ChangeEvents(Network& network) : network_(network) {}
+
+    /// Sets the callback of a change, in place of the one before. It is called on the GLib main
+    /// context that is the thread's default now, whenever the value differs from the one that could
+    /// be read last; the first one is read now. False when changes cannot be watched.
+    bool set(Change change, Callback callback);
+
+    /// Removes the callback of a change, if there is one, and the events that wait for it. A call
+    /// of it that runs on another thread has ended when this returns.
+    void unset(Change change);
+
+private:
+    struct Slot {
+        std::shared_ptr<Registration> registration;
+        std::optional<int> value; // the last that could be read
+    };
+
+    Slot& slotOf(Change change);
+    bool isWatched();
+    bool isIdle() const;
+    void tell();
+
+    Network& network_;
+    std::mutex lifecycle_; // of the watch; never held while waiting for a callback
+    std::unique_ptr<Watch> watch_;
+    std::mutex reading_; // of values, so that an older one never comes after a newer one
+    std::array<Slot, 6> slots_;
+};
+
+/// The events of this process's backend.
+ChangeEvents& changeEvents();
+
+} // namespace port
+
+#endif
