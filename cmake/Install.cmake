@@ -10,6 +10,12 @@ install(TARGETS coreutil_cipher LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 
 install(FILES ${PROJECT_SOURCE_DIR}/include/CoreSystem.h
               ${PROJECT_SOURCE_DIR}/port/include/coresystem_port.h TYPE INCLUDE)
+# The platform's own headers that the public ones include; an SDK has them, an ordinary machine has not.
+set(platform_headers_dir ${CMAKE_INSTALL_INCLUDEDIR}/coresystem-platform)
+foreach(header TelCall TelNetwork TelSim telephony telephony_common telephony_modem telephony_network
+    telephony_sim tizen tizen_error tizen_type)
+  install(FILES ${PROJECT_SOURCE_DIR}/port/api/${header}.h DESTINATION ${platform_headers_dir})
+endforeach()
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/port/coreutil/include/
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/coreutil FILES_MATCHING PATTERN "*.h")
 
@@ -22,13 +28,15 @@ install(FILES ${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake DESTINATION ${
 
 # Writes NAME.pc; it holds no absolute path, so an installed tree can be moved.
 function(coresystem_install_pkg_config name library description)
+  set(more_cflags ${ARGN})
   set(pkg_config_dir ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
   file(RELATIVE_PATH up /${pkg_config_dir} /)
   string(REGEX REPLACE "/$" "" up "${up}")
   configure_file(${PROJECT_SOURCE_DIR}/cmake/package.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
   install(FILES ${PROJECT_BINARY_DIR}/${name}.pc DESTINATION ${pkg_config_dir})
 endfunction()
-coresystem_install_pkg_config(coresystem coresystem "${PROJECT_DESCRIPTION}")
+coresystem_install_pkg_config(coresystem coresystem "${PROJECT_DESCRIPTION}"
+  "-I\${includedir}/coresystem-platform")
 coresystem_install_pkg_config(coresystem-port coresystem-port
   "Which backend answers on this machine, and where answers come from")
 coresystem_install_pkg_config(coreutil coreutil "Logger state, log cipher and named mutexes")

@@ -5,6 +5,12 @@
 #define CORESYSTEM_CORE_SYSTEM_H
 
 #include <string>
+#include <vector>
+
+#include <TelCall.h>
+#include <TelNetwork.h>
+#include <TelSim.h>
+#include <telephony.h>
 
 #if defined(__GNUC__)
 #define CORESYSTEM_API __attribute__((visibility("default")))
@@ -83,6 +89,109 @@ public:
     CORESYSTEM_API int GetDeviceLanguageCode(char** languageCode, bool convertToISO639);
 
     /// \}
+    /// \name SIM cards
+    ///
+    /// Slots are 0-based. Each question goes through the slots in order, and asks the platform
+    /// anew: a card that was inserted, removed or unlocked since shows at once. A locked card is no
+    /// available one. On the device they need the privilege
+    /// "http://tizen.org/privilege/telephony"; without it they answer as if there were no card.
+    /// \{
+
+    /// Whether any slot holds an available card. Writes an error line for each slot before it that
+    /// does not.
+    CORESYSTEM_API bool IsSimAvailable();
+
+    /// The same question without error lines, asked of every slot.
+    CORESYSTEM_API bool IsSimExist();
+
+    /// Mobile country code (ITU E.212), three digits, of the first available card.
+    /// \param[out] mcc a copy; left as it was on failure, so set it to null before.
+    /// \return 0, or 4 for any failure: no telephony service, no available card, or the card cannot
+    ///         be read.
+    CORESYSTEM_API int GetMCCFromSim(char** mcc);
+
+    /// Mobile network code (ITU E.212), two or three digits as the platform gives them, of the
+    /// first available card. Out-parameter and result as GetMCCFromSim().
+    CORESYSTEM_API int GetMNCFromSim(char** mnc);
+
+    /// The first available card's own phone number. It never reaches the log.
+    /// \param[out] phoneNumber a copy; left as it was on failure, so set it to null before.
+    /// \return 0, or -39841791 (SIM not available) when no card tells its number, which many do
+    /// not.
+    ///         Also 0, with `phoneNumber` left as it was, when there is no telephony service:
+    ///         callers rely on it as it is.
+    CORESYSTEM_API int GetPhoneNumberFromSim(char** phoneNumber);
+
+    /// \}
+    /// \name Modem and network
+    /// \{
+
+    /// The IMEI (3GPP TS 23.003) of the first modem that tells it.
+    /// \param[out] imei the IMEI. When no modem tells one, a made-up text of 15 characters: the
+    /// local
+    ///             time zone's offset from UTC in seconds, "-" for west, filled up with "0" at the
+    ///             end ("324000000000000" for UTC+9).
+    /// \return always 0.
+    CORESYSTEM_API int GetIMEI(char** imei);
+
+    /// Whether the card in a slot is abroad.
+    /// \param slot 0-based.
+    /// \param[out] roaming the answer; left as it was when `slot` is not in service or not there.
+    /// \return whether `roaming` was answered.
+    CORESYSTEM_API bool GetRoamingStatus(int slot, bool* roaming);
+
+    /// \}
+    /// \name The platform's telephony, as it is
+    ///
+    /// Thin wrappers: one or two calls of the platform under the lock of all SIM access. Nothing is
+    /// checked, so every argument must be valid unless its method says otherwise. A `bool` result
+    /// is true when the platform answered 0; the out-parameters are written by the platform only.
+    ///
+    /// Each call with a modem's name opens a handle on that modem which is never closed. A null
+    /// name is the first modem's.
+    /// \{
+
+    /// Fills `list` with one handle a slot; release it with DeinitHandleList().
+    CORESYSTEM_API bool InitHandleList(telephony_handle_list_s* list);
+
+    /// The names of all modems by slot, ended by null; null when the telephony service is not
+    /// there. The list and its names are the platform's: do not free them.
+    CORESYSTEM_API char** GetCpNameList();
+
+    /// Releases what InitHandleList() filled.
+    CORESYSTEM_API bool DeinitHandleList(telephony_handle_list_s* list);
+
+    /// Whether the card in `slot` has finished initialising.
+    /// \param slot below the number of names of GetCpNameList(); false when it is negative or there
+    ///             is no list.
+    /// \param[out] status how far it has come, also when the answer is false.
+    CORESYSTEM_API bool IsAvaliableState(int slot, TelSimCardStatus_t* status);
+
+    /// The subscription that serves by default.
+    CORESYSTEM_API bool GetMainSimSubscription(char* cpName, TelNetworkDefaultSubs_t* subscription);
+
+    /// The subscription that serves data by default.
+    CORESYSTEM_API bool GetDefaultDataSubscription(char* cpName,
+                                                   TelNetworkDefaultDataSubs_t* subscription);
+
+    /// The subscription preferred for calls.
+    CORESYSTEM_API bool GetCallPreferredSubscription(char* cpName,
+                                                     TelCallPreferredVoiceSubs_t* subscription);
+
+    /// Whether text messages can be sent and received: `ready` is 1 or 0.
+    CORESYSTEM_API bool CheckSmsEnabled(char* cpName, int* ready);
+
+    /// The parts of a card's IMSI (ITU E.212), as digits: MCC, MNC and MSIN. The three strings are
+    /// written on success only; a failure writes an error line.
+    CORESYSTEM_API bool GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc,
+                                   std::string* msin);
+
+    /// The phone number of the card in one slot.
+    /// \param handle one element of a list's handles.
+    /// \param[out] number the platform's own string, which the caller frees.
+    CORESYSTEM_API bool GetPhoneNumber(telephony_data** handle, char** number);
+
+    /// \}
     /// \name Countries
     ///
     /// Conversions between mobile country codes (MCC, ITU E.212), ISO 3166-1 alpha-2 codes in lower
@@ -146,6 +255,18 @@ private:
     int GetTagStartPosition(const std::string& value, const std::string& tag);
     std::string GetValueFromPosition(const std::string& value, int start, int end);
     void GetISO639LangCodeFromDeviceLang(const std::string& upperCode, const char** iso639);
+
+    // Whether slots 0 and 1 both hold an available card.
+    bool IsDualSimAvailable();
+    // As GetMCCFromSim(char**): the IMSI in one piece.
+    int GetIMSIFromSim(char** imsi);
+
+    // The answer of every slot that has one, in slot order, appended as `strdup` copies that the
+    // caller frees. `count` is how many were appended; it is left as it was without telephony.
+    void GetMCCFromSim(std::vector<char*>& mccs, int* count);
+    void GetMNCFromSim(std::vector<char*>& mncs, int* count);
+    void GetIMSIFromSim(std::vector<char*>& imsis, int* count);
+    void GetPhoneNumberFromSim(std::vector<char*>& phoneNumbers, int* count);
 
     static CoreSystem* instance_;
 };

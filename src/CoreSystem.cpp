@@ -4,10 +4,13 @@
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <new>
 
 #include <system_info.h>
 #include <system_settings.h>
+
+#include <CoreUtil.h>
 
 #include "Log.h"
 #include "SimManager.h"
@@ -66,6 +69,129 @@ __attribute__((noinline)) const char* keptMccOfCallingCode(const char* countryCa
     char* mcc = nullptr;
     SimManager::GetInstance()->GetMccFromCountryCallingCode(countryCallingCode, &mcc);
     return mcc;
+}
+
+// What the identity questions answer without a handle list.
+const int NO_HANDLES = 4;
+
+// A SIM identity question: how one slot is read, and what the walks over the slots make of it. The
+// texts and the differences between the rows are meant.
+struct SimRead {
+    int (SimManager::*read)(telephony_handle_list_s list, int slot, char** value);
+    int codeWithoutHandles;
+    bool freesIntermediate; // the manager's copy; kept where false
+    bool showsValue;        // IMSI and phone number are nobody's to log
+    const char* found;      // takes the value where it is shown; null for no line
+    const char* added;      // takes the value where it is shown, and the count
+};
+
+const SimRead MCC_READ = {
+    &SimManager::GetMCCFromSim, NO_HANDLES, false, true, "GetMCCFromSim mcc: [%s]",
+    "ADD MCC: [%s] count: [%d]"};
+const SimRead MNC_READ = {
+    &SimManager::GetMNCFromSim, NO_HANDLES, false, true, "GetMNCFromSim mcc: [%s]",
+    "ADD MNC: [%s] count: [%d]"};
+const SimRead IMSI_READ = {
+    &SimManager::GetIMSIFromSim, NO_HANDLES, true, false, "GetIMSIFromSim IMSI exist",
+    "ADD IMSI count: [%d]"};
+const SimRead PHONE_NUMBER_READ = {&SimManager::GetPhoneNumberFromSim, 0, true, false, nullptr,
+                                   "ADD PhoneNumber count: [%d]"};
+
+char* copyOf(const char* text)
+{
+    return text != nullptr ? strdup(text) : nullptr;
+}
+
+void writeFoundLine(const SimRead& row, const LogSite& site, const char* value)
+{
+    if (row.showsValue)
+        DEBUG_LINE_AT(site, row.found, value);
+    else if (row.found != nullptr)
+        DEBUG_LINE_AT(site, "%s", row.found);
+}
+
+// Hands the value of the first slot that yields one to the caller.
+int readFirstSlot(const SimRead& row, const LogSite& site, char** value)
+{
+    telephony_handle_list_s list = {0, nullptr};
+    if (!SimManager::GetInstance()->SuccessToInitTelephonyHandle(&list))
+        return row.codeWithoutHandles;
+    int result = row.codeWithoutHandles;
+    char* intermediate = nullptr;
+    for (int slot = 0; static_cast<unsigned int>(slot) < list.count; ++slot) {
+        intermediate = nullptr;
+        result = (SimManager::GetInstance()->*row.read)(list, slot, &intermediate);
+        if (result == 0) {
+            *value = copyOf(intermediate);
+            writeFoundLine(row, site, *value);
+            break;
+        }
+    }
+    SimManager::GetInstance()->DeleteTelephonyHandle(list);
+    if (row.freesIntermediate)
+        std::free(intermediate);
+    return result;
+}
+
+// Appends the value of every slot that yields one.
+void readAllSlots(const SimRead& row, const LogSite& site, std::vector<char*>& values, int* count)
+{
+    telephony_handle_list_s list = {0, nullptr};
+    if (!SimManager::GetInstance()->SuccessToInitTelephonyHandle(&list))
+        return;
+    *count = 0;
+    for (int slot = 0; static_cast<unsigned int>(slot) < list.count; ++slot) {
+        char* intermediate = nullptr;
+        if ((SimManager::GetInstance()->*row.read)(list, slot, &intermediate) != 0)
+            continue;
+        values.push_back(copyOf(intermediate));
+        ++*count;
+        if (row.showsValue)
+            DEBUG_LINE_AT(site, row.added, values.back(), *count);
+        else
+            DEBUG_LINE_AT(site, row.added, *count);
+        if (row.freesIntermediate)
+            std::free(intermediate);
+    }
+    SimManager::GetInstance()->DeleteTelephonyHandle(list);
+}
+
+const std::size_t IMEI_LENGTH = 15; // 3GPP TS 23.003
+
+// The first one that a modem tells, as the platform allocated it; null when none does.
+char* imeiOfFirstModem(const telephony_handle_list_s& list, const LogSite& site)
+{
+    for (int slot = 0; static_cast<unsigned int>(slot) < list.count; ++slot) {
+        char* imei = nullptr;
+        if (telephony_modem_get_imei(list.handle[slot], &imei) == TELEPHONY_ERROR_NONE &&
+            imei != nullptr) {
+            DEBUG_LINE_AT(site, "Slot%d IMEI exist", slot);
+            return imei;
+        }
+    }
+    return nullptr;
+}
+
+int offsetFromUtc()
+{
+    tzset(); // localtime_r() need not notice another zone by itself
+    const std::time_t now = std::time(nullptr);
+    std::tm local = {};
+    localtime_r(&now, &local);
+    return static_cast<int>(local.tm_gmtoff);
+}
+
+// Made of the zone alone, so that it stays the same as long as the zone does: meant.
+char* fallbackImei()
+{
+    try {
+        std::string text = CoreUtil::GetInstance()->intToStr(offsetFromUtc());
+        while (text.size() < IMEI_LENGTH)
+            text += '0';
+        return strdup(text.c_str());
+    } catch (const std::bad_alloc&) {
+        return nullptr; // no exception crosses the interface
+    }
 }
 
 } // namespace
@@ -318,4 +444,166 @@ bool CoreSystem::IsMoSupportMcc(const char* mcc)
         return false;
     }
     return SimManager::GetInstance()->IsMoSupportMcc(mcc);
+}
+
+bool CoreSystem::IsSimAvailable()
+{
+    DEBUG_LINE("CoreSystem IsSimAvailable()");
+    telephony_handle_list_s list = {0, nullptr};
+    if (!SimManager::GetInstance()->SuccessToInitTelephonyHandle(&list))
+        return false;
+    bool available = false;
+    for (int slot = 0; !available && static_cast<unsigned int>(slot) < list.count; ++slot)
+        available = SimManager::GetInstance()->IsSimAvailable(list, slot);
+    SimManager::GetInstance()->DeleteTelephonyHandle(list);
+    return available;
+}
+
+bool CoreSystem::IsDualSimAvailable()
+{
+    DEBUG_LINE("CoreSystem IsDualSimAvailable()");
+    telephony_handle_list_s list = {0, nullptr};
+    if (!SimManager::GetInstance()->SuccessToInitTelephonyHandle(&list))
+        return false;
+    if (list.count < 2) {
+        ERROR_LINE("[Single Sim Device] Not support Dual Sim.");
+        return false; // the list stays as it is, unlike on the other ways out: meant
+    }
+    const bool both = SimManager::GetInstance()->IsSimAvailable(list, 0) &&
+                      SimManager::GetInstance()->IsSimAvailable(list, 1);
+    DEBUG_LINE(both ? "DualSimAvailable." : "NO DualSim MODE");
+    SimManager::GetInstance()->DeleteTelephonyHandle(list);
+    return both;
+}
+
+bool CoreSystem::IsSimExist()
+{
+    return SimManager::GetInstance()->IsSimExist();
+}
+
+int CoreSystem::GetMCCFromSim(char** mcc)
+{
+    DEBUG_LINE("CoreSystem::GetMCCFromSim");
+    return readFirstSlot(MCC_READ, LOG_SITE, mcc);
+}
+
+int CoreSystem::GetMNCFromSim(char** mnc)
+{
+    DEBUG_LINE("GetMCCFromSim [Vector]TYPE"); // another method's: meant
+    return readFirstSlot(MNC_READ, LOG_SITE, mnc);
+}
+
+int CoreSystem::GetIMSIFromSim(char** imsi)
+{
+    DEBUG_LINE("CoreSystem::GetIMSIFromSim");
+    return readFirstSlot(IMSI_READ, LOG_SITE, imsi);
+}
+
+int CoreSystem::GetPhoneNumberFromSim(char** phoneNumber)
+{
+    DEBUG_LINE("CoreSystem::GetPhoneNumberFromSim");
+    return readFirstSlot(PHONE_NUMBER_READ, LOG_SITE, phoneNumber);
+}
+
+void CoreSystem::GetMCCFromSim(std::vector<char*>& mccs, int* count)
+{
+    DEBUG_LINE("GetMCCFromSim [Vector]TYPE");
+    readAllSlots(MCC_READ, LOG_SITE, mccs, count);
+}
+
+void CoreSystem::GetMNCFromSim(std::vector<char*>& mncs, int* count)
+{
+    DEBUG_LINE("GetMNCFromSim [Vector]TYPE");
+    readAllSlots(MNC_READ, LOG_SITE, mncs, count);
+}
+
+void CoreSystem::GetIMSIFromSim(std::vector<char*>& imsis, int* count)
+{
+    DEBUG_LINE("GetIMSIFromSim [Vector]TYPE");
+    readAllSlots(IMSI_READ, LOG_SITE, imsis, count);
+}
+
+void CoreSystem::GetPhoneNumberFromSim(std::vector<char*>& phoneNumbers, int* count)
+{
+    DEBUG_LINE("GetPhoneNumberListFromSim [Vector]TYPE"); // "List" in this one only: meant
+    readAllSlots(PHONE_NUMBER_READ, LOG_SITE, phoneNumbers, count);
+}
+
+int CoreSystem::GetIMEI(char** imei)
+{
+    DEBUG_LINE("CoreSystem::GetIMEI");
+    char* value = nullptr;
+    telephony_handle_list_s list = {0, nullptr};
+    if (SimManager::GetInstance()->SuccessToInitTelephonyHandle(&list)) {
+        DEBUG_LINE("GetTelephonyHandle. handle count : %d", static_cast<int>(list.count));
+        value = imeiOfFirstModem(list, LOG_SITE);
+        SimManager::GetInstance()->DeleteTelephonyHandle(list);
+    } else {
+        ERROR_LINE("telephony_init Failed. Start to get IMEI from current time");
+    }
+    *imei = value != nullptr ? value : fallbackImei();
+    return 0;
+}
+
+bool CoreSystem::GetRoamingStatus(int slot, bool* roaming)
+{
+    DEBUG_LINE("CoreSystem::GetRoamingStatus");
+    if (!SimManager::GetInstance()->GetRoamingStatus(slot, roaming)) {
+        DEBUG_LINE("GetRoamingStatus Failed");
+        return false;
+    }
+    DEBUG_LINE(*roaming ? "GetRoamingStatus : [Roaming]" : "GetRoamingStatus : [Not Roaming]");
+    return true;
+}
+
+bool CoreSystem::InitHandleList(telephony_handle_list_s* list)
+{
+    return SimManager::GetInstance()->InitHandleList(list);
+}
+
+char** CoreSystem::GetCpNameList()
+{
+    return SimManager::GetInstance()->GetCpNameList();
+}
+
+bool CoreSystem::DeinitHandleList(telephony_handle_list_s* list)
+{
+    return SimManager::GetInstance()->DeinitHandleList(list);
+}
+
+bool CoreSystem::IsAvaliableState(int slot, TelSimCardStatus_t* status)
+{
+    return SimManager::GetInstance()->IsAvaliableState(slot, status);
+}
+
+bool CoreSystem::GetMainSimSubscription(char* cpName, TelNetworkDefaultSubs_t* subscription)
+{
+    return SimManager::GetInstance()->GetMainSimSubscription(cpName, subscription);
+}
+
+bool CoreSystem::GetDefaultDataSubscription(char* cpName, TelNetworkDefaultDataSubs_t* subscription)
+{
+    return SimManager::GetInstance()->GetDefaultDataSubscription(cpName, subscription);
+}
+
+bool CoreSystem::GetCallPreferredSubscription(char* cpName,
+                                              TelCallPreferredVoiceSubs_t* subscription)
+{
+    return SimManager::GetInstance()->GetCallPreferredSubscription(cpName, subscription);
+}
+
+bool CoreSystem::CheckSmsEnabled(char* cpName, int* ready)
+{
+    return SimManager::GetInstance()->CheckSmsEnabled(cpName, ready);
+}
+
+bool CoreSystem::GetSimInfo(const char* cpName, std::string* mcc, std::string* mnc,
+                            std::string* msin)
+{
+    return SimManager::GetInstance()->GetSimInfo(cpName, mcc, mnc, msin);
+}
+
+bool CoreSystem::GetPhoneNumber(telephony_data** handle, char** number)
+{
+    return SimManager::GetInstance()->GetPhoneNumber(handle, number);
 }

@@ -64,6 +64,11 @@ int main()
     good &= expect("backend", "simulator", coresystem_port::backendName());
     good &= expect("origin of the device name", "device.toml:5",
                    coresystem_port::lastOrigin(coresystem_port::Question::DeviceName).source);
+    telephony_handle_list_s slots = {0, nullptr};
+    good &= expect("a handle list", "none of this device",
+                   CoreSystem::GetInstance()->InitHandleList(&slots) && slots.count > 0
+                       ? "of some slots"
+                       : "none of this device");
     good &= expect("number", "42", CoreUtil::GetInstance()->intToStr(42));
     good &= expect("cipher", "a line", throughTheCipher("a line"));
     return good ? EXIT_SUCCESS : EXIT_FAILURE;

@@ -1,15 +1,28 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "FakePlatform.h"
 
+#include <algorithm>
 #include <cstdio>
 
 #include <gtest/gtest.h>
 
+#include <ITapiCall.h>
+#include <ITapiNetText.h>
+#include <ITapiNetwork.h>
+#include <ITapiSim.h>
 #include <dlog.h>
 #include <system_info.h>
 #include <system_settings.h>
 
 using namespace fake;
+
+struct telephony_data {
+    unsigned int slot;
+};
+
+struct tapi_handle {
+    std::string name;
+};
 
 namespace {
 
@@ -96,7 +109,40 @@ std::string describe(const LogLine& line)
     return isDebugLine(line) || format == line.plain ? text : text + " <- " + format;
 }
 
+// Never released: a handle that is used after its release is named all the same.
+telephony_h handleOfSlot(unsigned int slot)
+{
+    static std::mutex mutex;
+    static auto& slots = *new std::map<unsigned int, telephony_data>;
+    const std::lock_guard<std::mutex> lock(mutex);
+    return &slots.try_emplace(slot, telephony_data{slot}).first->second;
+}
+
+TapiHandle* handleOfModem(const char* name)
+{
+    static std::mutex mutex;
+    static auto& modems = *new std::map<std::string, tapi_handle>;
+    const std::string key = name != nullptr ? name : "null";
+    const std::lock_guard<std::mutex> lock(mutex);
+    return &modems.try_emplace(key, tapi_handle{key}).first->second;
+}
+
+std::string nameOf(const TapiHandle* handle)
+{
+    return handle != nullptr ? "modem " + handle->name : "no modem";
+}
+
 } // namespace
+
+void fake::writeArgument(std::ostream& out, telephony_h handle)
+{
+    out << "slot " << handle->slot;
+}
+
+void fake::writeArgument(std::ostream& out, TapiHandle* handle)
+{
+    out << nameOf(handle);
+}
 
 FakePlatform& fake::platform()
 {
@@ -108,10 +154,13 @@ void FakePlatform::reset()
 {
     forgetEvents();
     answers_.clear();
+    handles_.clear();
+    setModems(std::nullopt);
     debugMode = 0;
     tag.reset();
     cipherThrows = false;
     logResult = 0;
+    cardChanged = 0;
     onEvent = nullptr;
     ledger().clear();
 }
@@ -137,6 +186,50 @@ FakePlatform::Answer FakePlatform::answerTo(const std::string& call)
         return found->second;
     ADD_FAILURE() << "no answer was set for " << call;
     return {-1, {}};
+}
+
+std::any FakePlatform::valueOf(const std::string& call)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return answers_[call].value;
+}
+
+Texts FakePlatform::liveHandles() const
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return Texts(handles_.begin(), handles_.end());
+}
+
+void FakePlatform::addHandle(const std::string& handle)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    handles_.insert(handle);
+}
+
+void FakePlatform::removeHandle(const std::string& handle)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    const auto found = handles_.find(handle);
+    if (found != handles_.end())
+        handles_.erase(found);
+    else
+        ADD_FAILURE() << handle << " was released but is not open";
+}
+
+void FakePlatform::setModems(const std::optional<Texts>& names)
+{
+    modems_ = names;
+    modemPointers_.clear();
+    if (modems_) {
+        for (std::string& name : *modems_)
+            modemPointers_.push_back(name.data());
+        modemPointers_.push_back(nullptr);
+    }
+}
+
+char** FakePlatform::modemNames()
+{
+    return modems_ ? modemPointers_.data() : nullptr;
 }
 
 void FakePlatform::record(Event::Kind kind, const std::string& text, const LogLine& line)
@@ -226,6 +319,119 @@ int system_info_get_platform_string(const char* key, char** value)
 int system_settings_get_value_string(system_settings_key_e key, char** value)
 {
     return platform().reply(value, "system_settings_get_value_string", key);
+}
+
+// A list's array is one allocation, so that a leak or a double release shows to the sanitizers too.
+int telephony_init(telephony_handle_list_s* list)
+{
+    const AllocationPause pause;
+    const int result = platform().call("telephony_init");
+    const std::any value = platform().valueOf("telephony_init()");
+    if (const auto* const count = std::any_cast<unsigned int>(&value)) {
+        list->count = *count;
+        list->handle = new telephony_h[*count];
+        for (unsigned int slot = 0; slot < *count; ++slot)
+            list->handle[slot] = handleOfSlot(slot);
+        platform().addHandle("list of " + std::to_string(*count));
+    }
+    return result;
+}
+
+int telephony_deinit(telephony_handle_list_s* list)
+{
+    const AllocationPause pause;
+    const std::string text =
+        list->handle != nullptr ? "list of " + std::to_string(list->count) : "no list";
+    const int result = platform().call("telephony_deinit", text);
+    if (list->handle != nullptr) {
+        platform().removeHandle(text);
+        delete[] list->handle;
+    }
+    return result;
+}
+
+int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
+{
+    return platform().reply(state, "telephony_sim_get_state", handle);
+}
+
+int telephony_sim_get_subscriber_number(telephony_h handle, char** number)
+{
+    return platform().reply(number, "telephony_sim_get_subscriber_number", handle);
+}
+
+int telephony_modem_get_imei(telephony_h handle, char** imei)
+{
+    return platform().reply(imei, "telephony_modem_get_imei", handle);
+}
+
+int telephony_network_get_service_state(telephony_h handle,
+                                        telephony_network_service_state_e* state)
+{
+    return platform().reply(state, "telephony_network_get_service_state", handle);
+}
+
+int telephony_network_get_roaming_status(telephony_h handle, bool* roaming)
+{
+    return platform().reply(roaming, "telephony_network_get_roaming_status", handle);
+}
+
+char** tel_get_cp_name_list(void)
+{
+    const AllocationPause pause;
+    platform().record(Event::Kind::CALL, "tel_get_cp_name_list()");
+    return platform().modemNames();
+}
+
+// The answer says whether there is such a modem: 0 opens it.
+TapiHandle* tel_init(const char* cp_name)
+{
+    const AllocationPause pause;
+    if (platform().call("tel_init", cp_name) != 0)
+        return nullptr;
+    platform().addHandle(std::string("modem ") + (cp_name != nullptr ? cp_name : "null"));
+    return handleOfModem(cp_name);
+}
+
+int tel_deinit(TapiHandle* handle)
+{
+    const AllocationPause pause;
+    const int result = platform().call("tel_deinit", handle);
+    platform().removeHandle(nameOf(handle));
+    return result;
+}
+
+int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
+{
+    return platform().reply(imsi, "tel_get_sim_imsi", handle);
+}
+
+int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed)
+{
+    const AllocationPause pause;
+    const int result = platform().reply(status, "tel_get_sim_init_info", handle);
+    *card_changed = platform().cardChanged;
+    return result;
+}
+
+int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subs)
+{
+    return platform().reply(subs, "tel_get_network_default_subscription", handle);
+}
+
+int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subs)
+{
+    return platform().reply(subs, "tel_get_network_default_data_subscription", handle);
+}
+
+int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subs)
+{
+    return platform().reply(subs, "tel_get_call_preferred_voice_subscription", handle);
+}
+
+int tel_check_sms_device_status(TapiHandle* handle, int* ready)
+{
+    return platform().reply(ready, "tel_check_sms_device_status", handle);
 }
 
 } // extern "C"

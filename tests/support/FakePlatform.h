@@ -21,9 +21,13 @@
 #include <map>
 #include <mutex>
 #include <optional>
+#include <set>
 #include <sstream>
 #include <string>
 #include <vector>
+
+#include <tapi_common.h>
+#include <telephony.h>
 
 #include "FailingAllocation.h"
 #include "Ledger.h"
@@ -73,8 +77,14 @@ public:
     std::optional<std::string> tag;
     bool cipherThrows = false;
     int logResult = 0;
+    int cardChanged = 0; // what tel_get_sim_init_info() tells beside the status
     // Called after each event outside LOGGER and CIPHER, on the thread of the event.
     std::function<void(const Event&)> onEvent;
+
+    // The handles that nobody has released yet, sorted: "list of COUNT", "modem NAME".
+    Texts liveHandles() const;
+    // The modem names that tel_get_cp_name_list() gives, ended by null; none gives null.
+    void setModems(const std::optional<Texts>& names);
 
     // \name What happened
     std::vector<Event> events() const;
@@ -92,6 +102,10 @@ public:
     // The same for a function that hands a value out through `slot`.
     template <class Value, class... Arguments>
     int reply(Value* slot, const char* function, const Arguments&... arguments);
+    std::any valueOf(const std::string& call);
+    void addHandle(const std::string& handle);
+    void removeHandle(const std::string& handle);
+    char** modemNames();
 
 private:
     struct Answer {
@@ -103,6 +117,9 @@ private:
     mutable std::mutex mutex_;
     std::vector<Event> events_;
     std::map<std::string, Answer> answers_;
+    std::multiset<std::string> handles_;
+    std::optional<Texts> modems_;
+    std::vector<char*> modemPointers_;
 };
 
 FakePlatform& platform();
@@ -116,6 +133,9 @@ inline void writeArgument(std::ostream& out, const char* text)
 {
     out << (text != nullptr ? text : "null");
 }
+// "slot 0", "slot 1", ... of a handle of a list; "modem NAME" of a handle of tel_init().
+void writeArgument(std::ostream& out, telephony_h handle);
+void writeArgument(std::ostream& out, TapiHandle* handle);
 template <class Value>
 void writeArgument(std::ostream& out, const Value& value)
 {
