@@ -72,7 +72,7 @@ private:
 
 struct Device {
     std::map<std::string, Section, std::less<>> sections; // every one, there or not
-    std::vector<Section> slots;
+    std::vector<Section> slots;                           // each with a cp_name of its own
 
     const Section& section(const std::string& name) const
     {

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <limits>
 #include <optional>
+#include <set>
 #include <sstream>
 
 #include <dlog.h>
@@ -69,6 +70,11 @@ bool isWithin(const Type& type, std::int64_t number)
     return type.least <= number && number <= type.most;
 }
 
+bool isLongEnough(const Type& type, const std::string& text)
+{
+    return static_cast<std::int64_t>(text.size()) >= type.least;
+}
+
 // "one of" that a person may write, in the order of the schema.
 std::string listOf(const Names& names)
 {
@@ -96,7 +102,7 @@ std::string expected(const Type& type)
 {
     switch (type.kind) {
     case Type::Kind::Text:
-        return "a text in quotes";
+        return type.least > 0 ? "a text in quotes that is not empty" : "a text in quotes";
     case Type::Kind::Digits:
         return countOf(type) + " digits in quotes";
     case Type::Kind::Number:
@@ -129,7 +135,7 @@ std::optional<Content> readText(const Type& type, const std::string& text)
                 return row.value;
         return std::nullopt;
     case Type::Kind::Text:
-        return text;
+        return isLongEnough(type, text) ? std::optional<Content>(text) : std::nullopt;
     default:
         return std::nullopt;
     }
@@ -202,8 +208,30 @@ private:
                 throw Problem{element.source(), titleOf(row) + " must be a list of sections"};
             Section section(titleOf(row), sourceOf(element));
             readKeys(row, *element.as_table(), section);
+            completeSlot(section, *element.as_table());
             device_.slots.push_back(std::move(section));
         }
+    }
+
+    // What holds between a slot's keys, and between slots.
+    void completeSlot(Section& slot, const toml::table& table)
+    {
+        // An IMSI has 15 digits at most (ITU E.212).
+        if (lengthOf(slot, "mnc") == 3 && lengthOf(slot, "msin") > 9)
+            throw Problem{table.get("msin")->source(),
+                          "\"msin\" must be 1 to 9 digits in quotes after an mnc of three"};
+        if (slot.find("cp_name") == nullptr)
+            slot.set("cp_name", {"cp" + std::to_string(device_.slots.size()), slot.source()});
+        const auto* const written = table.get("cp_name");
+        if (!modems_.insert(slot.get<std::string>("cp_name").value().value).second)
+            throw Problem{(written != nullptr ? *written : table).source(),
+                          "every slot must have another cp_name"};
+    }
+
+    static std::size_t lengthOf(const Section& section, const char* key)
+    {
+        const auto text = section.get<std::string>(key);
+        return text ? text.value().value.size() : 0;
     }
 
     void readKeys(const SectionRow& row, const toml::table& table, Section& section)
@@ -228,6 +256,7 @@ private:
 
     const std::string& path_;
     Device device_;
+    std::set<std::string> modems_;
 };
 
 // Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the

@@ -104,6 +104,7 @@ constexpr Name WIFI_CONNECTIONS[] = {
 constexpr std::int64_t ANY = std::numeric_limits<std::int64_t>::max();
 
 constexpr Type TEXT{Type::Kind::Text};
+constexpr Type SOME_TEXT{Type::Kind::Text, 1};
 constexpr Type SWITCH{Type::Kind::Switch};
 constexpr Type NUMBER{Type::Kind::Number};
 
@@ -164,7 +165,7 @@ constexpr KeyRow KEYS[] = {
     {"slot", "service", oneOf(SERVICES)},
     {"slot", "roaming", SWITCH},
     {"slot", "sms", SWITCH},
-    {"slot", "cp_name", TEXT},
+    {"slot", "cp_name", SOME_TEXT},
     {"slot", "denied", SWITCH},
 
     {"subscriptions", "network", oneOf(UNKNOWN_SLOT, 0, 1)},

@@ -34,7 +34,7 @@ struct Names {
 
 struct Type {
     enum class Kind {
-        Text,   // in quotes, without a NUL
+        Text,   // in quotes, without a NUL, `least` bytes or longer
         Digits, // in quotes, from `least` to `most` of them
         Number, // a phone number in quotes, or "null"
         Switch, // true or false

@@ -4,6 +4,7 @@
 #include "DeviceFile.h"
 #include "DeviceInfo.h"
 #include "Settings.h"
+#include "Telephony.h"
 
 namespace port::simulator {
 namespace {
@@ -72,7 +73,7 @@ private:
     DeviceFile file_;
     SimulatedDeviceInfo deviceInfo_{file_};
     SimulatedSettings settings_{file_};
-    Telephony telephony_;
+    SimulatedTelephony telephony_{file_};
     Network network_;
     Storage storage_;
     Packages packages_;

@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+// SIM slots from the sections [[slot]] and [subscriptions] of a device file.
+#ifndef PORT_SIMULATOR_TELEPHONY_H
+#define PORT_SIMULATOR_TELEPHONY_H
+
+#include "../backend/Telephony.h"
+#include "DeviceFile.h"
+
+namespace port::simulator {
+
+class SimulatedTelephony : public Telephony {
+public:
+    explicit SimulatedTelephony(DeviceFile& file) : file_(file) {}
+
+    Result<Sourced<std::vector<SlotName>>> slots() override;
+    Result<Sourced<Card>> card(const SlotName& name) override;
+    Result<Sourced<Imsi>> imsi(const SlotName& name) override;
+    Result<Sourced<std::optional<std::string>>> number(const SlotName& name) override;
+    Result<Fact> imei(const SlotName& name) override;
+    Result<Sourced<Service>> service(const SlotName& name) override;
+    Result<Sourced<bool>> roaming(const SlotName& name) override;
+    Result<Sourced<Subscriptions>> subscriptions() override;
+    Result<Sourced<bool>> smsReady(const SlotName& name) override;
+
+private:
+    Result<std::shared_ptr<const Device>> device();
+    Result<Section> slot(const SlotName& name);
+    template <typename T>
+    Result<Sourced<T>> get(const SlotName& name, const char* key);
+
+    DeviceFile& file_;
+};
+
+} // namespace port::simulator
+
+#endif

@@ -1,0 +1,223 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a device file may say, and how it is told what it may not.
+#include "simulator/DeviceFile.h"
+#include "support/DeviceFileTest.h"
+
+using port::CardStatus;
+using port::CellularState;
+using port::FontSize;
+using port::LinkState;
+using port::simulator::DeviceFile;
+using testing::EndsWith;
+using testing::HasSubstr;
+
+namespace {
+
+class SimulatorSchemaTest : public DeviceFileTest {
+protected:
+    // A value that is not what a key may be.
+    std::string refusal(const std::string& section, const std::string& assignment)
+    {
+        return problemOf(section + "\n" + assignment + "\n");
+    }
+
+    DeviceFile file{path};
+};
+
+TEST_F(SimulatorSchemaTest, EveryKindOfValueIsReadWithItsLine)
+{
+    describe(
+        "[device]\nserial = 'R58'\ntelephony = false\n[settings]\nfont_size = 'huge'\n"
+        "utc_offset = -18000\n[network]\ncellular = 'call_only_available'\nwifi = 'connected'\n"
+        "[storage]\nblocks = 9223372036854775807\n");
+    expectAnswer("R58", line(3), file.get<std::string>("device", "serial"));
+    expectAnswer(false, line(4), file.get<bool>("device", "telephony"));
+    expectAnswer(FontSize::Huge, line(6), file.get<FontSize>("settings", "font_size"));
+    expectAnswer(-18000, line(7), file.get<int>("settings", "utc_offset"));
+    expectAnswer(CellularState::CallOnlyAvailable, line(9),
+                 file.get<CellularState>("network", "cellular"));
+    expectAnswer(LinkState::Connected, line(10), file.get<LinkState>("network", "wifi"));
+    expectAnswer(std::numeric_limits<std::int64_t>::max(), line(12),
+                 file.get<std::int64_t>("storage", "blocks"));
+}
+
+TEST_F(SimulatorSchemaTest, AbsentKeyAndAbsentSectionAreNotAvailable)
+{
+    describe("[network]\n");
+    for (const char* const key : {"cellular", "bluetooth"})
+        expectError(port::Error::Kind::NotAvailable, path + ": [network] has no " + key,
+                    file.get<LinkState>("network", key));
+    expectError(port::Error::Kind::NotAvailable, path + ": [storage] has no blocks",
+                file.get<std::int64_t>("storage", "blocks"));
+}
+
+TEST_F(SimulatorSchemaTest, DeviceMayLackARadio)
+{
+    describe("[network]\nwifi = 'not_supported'\n");
+    expectError(port::Error::Kind::NotSupported, line(3) + ": this device has no wifi",
+                file.get<LinkState>("network", "wifi"));
+}
+
+TEST_F(SimulatorSchemaTest, SwitchesAreTrueOrFalse)
+{
+    const std::string refused = " must be true or false";
+    for (const char* const value : {"'true'", "0", "1", "'on'", "[true]"})
+        EXPECT_EQ(":3:15: \"flight_mode\"" + refused,
+                  refusal("[settings]", "flight_mode = " + std::string(value)))
+            << value;
+    for (const char* const key : {"flight_mode", "data_roaming", "mobile_data", "packet_data"})
+        EXPECT_EQ("", refusal("[settings]", std::string(key) + " = true"));
+    EXPECT_EQ("", refusal("[device]", "telephony = true"));
+}
+
+TEST_F(SimulatorSchemaTest, WholeNumbersHaveBounds)
+{
+    const std::string refused = ":3:14: \"utc_offset\" must be a whole number from -86399 to 86399";
+    for (const char* const value : {"86400", "-86400", "1.5", "'0'", "true", "1e3"})
+        EXPECT_EQ(refused, refusal("[settings]", "utc_offset = " + std::string(value))) << value;
+    for (const char* const value : {"86399", "-86399", "0"})
+        EXPECT_EQ("", refusal("[settings]", "utc_offset = " + std::string(value)));
+    for (const char* const key : {"block_size", "fragment_size", "blocks", "available_blocks"}) {
+        EXPECT_THAT(refusal("[storage]", std::string(key) + " = -1"),
+                    EndsWith(" must be a whole number from 0"));
+        EXPECT_EQ("", refusal("[storage]", std::string(key) + " = 9223372036854775807"));
+    }
+}
+
+TEST_F(SimulatorSchemaTest, NamesAreListedWhenOneIsUnknown)
+{
+    EXPECT_EQ(":3:8: \"wifi\" must be one of \"deactivated\", \"disconnected\", \"connected\", "
+              "\"not_supported\"",
+              refusal("[network]", "wifi = 'on'"));
+    EXPECT_THAT(refusal("[network]", "wifi = 1"), HasSubstr(":3:8: \"wifi\" must be one of "));
+    EXPECT_EQ(":3:13: \"font_size\" must be one of \"small\", \"normal\", \"large\", \"huge\", "
+              "\"giant\", or a whole number from 5",
+              refusal("[settings]", "font_size = 4"));
+    EXPECT_EQ(":3:8: \"data\" must be one of \"unknown\", or a whole number from 0 to 1",
+              refusal("[subscriptions]", "data = 2"));
+}
+
+TEST_F(SimulatorSchemaTest, EveryNameIsTaken)
+{
+    const struct {
+        const char* section;
+        const char* key;
+        std::vector<const char*> names;
+    } rows[] = {
+        {"settings", "font_size", {"small", "normal", "large", "huge", "giant"}},
+        {"network",
+         "cellular",
+         {"out_of_service", "flight_mode", "roaming_off", "call_only_available", "available",
+          "connected", "not_supported"}},
+        {"network", "wifi", {"deactivated", "disconnected", "connected", "not_supported"}},
+        {"network", "bluetooth", {"deactivated", "disconnected", "connected", "not_supported"}},
+        {"network",
+         "wifi_connection",
+         {"failure", "disconnected", "association", "configuration", "connected", "not_supported"}},
+        {"subscriptions", "voice", {"unknown", "current_network", "ask_always", "slot0", "slot1"}},
+        {"subscriptions", "network", {"unknown"}},
+        {"subscriptions", "data", {"unknown"}},
+    };
+    for (const auto& row : rows)
+        for (std::size_t i = 0; i < row.names.size(); ++i) {
+            const std::string name = row.names[i];
+            describe("[" + std::string(row.section) + "]\n" + row.key + " = '" + name + "'\n");
+            const auto value = file.get<std::int64_t>(row.section, row.key);
+            ASSERT_EQ("", backend->deviceFileProblem());
+            if (name == "not_supported")
+                EXPECT_EQ(port::Error::Kind::NotSupported, value.error().kind);
+            else if (row.names.size() == 1)
+                EXPECT_EQ(-1, value.value().value);
+            else
+                EXPECT_EQ(static_cast<std::int64_t>(i), value.value().value) << name;
+        }
+}
+
+TEST_F(SimulatorSchemaTest, FontSizesBeyondTheNamedOnesArePassedThrough)
+{
+    describe("[settings]\nfont_size = 7\n");
+    expectAnswer(static_cast<FontSize>(7), line(3), file.get<FontSize>("settings", "font_size"));
+}
+
+TEST_F(SimulatorSchemaTest, DigitsAreCounted)
+{
+    const auto refused = [this](const std::string& assignment) {
+        return refusal("[[slot]]", assignment);
+    };
+    for (const char* const mcc : {"'45'", "'4500'", "'45a'", "''", "450", "' 45'"})
+        EXPECT_EQ(":3:7: \"mcc\" must be 3 digits in quotes", refused("mcc = " + std::string(mcc)))
+            << mcc;
+    for (const char* const mnc : {"'1'", "'0001'", "'0x'", "5"})
+        EXPECT_EQ(":3:7: \"mnc\" must be 2 to 3 digits in quotes",
+                  refused("mnc = " + std::string(mnc)))
+            << mnc;
+    for (const char* const msin : {"''", "'01234567890'", "'-1'", "5"})
+        EXPECT_EQ(":3:8: \"msin\" must be 1 to 10 digits in quotes",
+                  refused("msin = " + std::string(msin)))
+            << msin;
+    for (const char* const imei : {"'4901542032375'", "'49015420323751812'", "490154203237518"})
+        EXPECT_EQ(":3:8: \"imei\" must be 14 to 16 digits in quotes",
+                  refused("imei = " + std::string(imei)))
+            << imei;
+    EXPECT_EQ("", refused("mcc = '001'\nmnc = '01'\nmsin = '0123456789'"));
+}
+
+TEST_F(SimulatorSchemaTest, ImsiHasFifteenDigitsAtMost)
+{
+    EXPECT_EQ(":4:8: \"msin\" must be 1 to 9 digits in quotes after an mnc of three",
+              refusal("[[slot]]", "mnc = '260'\nmsin = '0123456789'"));
+    EXPECT_EQ("", refusal("[[slot]]", "mnc = '260'\nmsin = '012345678'"));
+    EXPECT_EQ("", refusal("[[slot]]", "mnc = '26'\nmsin = '0123456789'"));
+}
+
+TEST_F(SimulatorSchemaTest, NumbersAreDialable)
+{
+    const std::string refused = ":3:10: \"number\" must be a phone number in quotes, or \"null\"";
+    for (const char* const number :
+         {"''", "'+'", "'12 34'", "'++1'", "'1+1'", "'nil'", "5", "'123456789012345678901'"})
+        EXPECT_EQ(refused, refusal("[[slot]]", "number = " + std::string(number))) << number;
+    for (const char* const number : {"'+15550100'", "'*100#'", "'7'", "'null'"})
+        EXPECT_EQ("", refusal("[[slot]]", "number = " + std::string(number))) << number;
+}
+
+TEST_F(SimulatorSchemaTest, ModemNamesDifferFromSlotToSlot)
+{
+    EXPECT_EQ(":5:11: every slot must have another cp_name",
+              problemOf("[[slot]]\ncp_name = 'a'\n[[slot]]\ncp_name = 'a'\n"));
+    EXPECT_EQ(":3:11: \"cp_name\" must be a text in quotes that is not empty",
+              problemOf("[[slot]]\ncp_name = ''\n"));
+    EXPECT_EQ(":4:1: every slot must have another cp_name", // the second one's own name is cp1
+              problemOf("[[slot]]\ncp_name = 'cp1'\n[[slot]]\n"));
+    EXPECT_EQ("", problemOf("[[slot]]\n[[slot]]\ncp_name = 'cp2'\n"));
+}
+
+TEST_F(SimulatorSchemaTest, SlotsAreAList)
+{
+    EXPECT_EQ(":2:1: [[slot]] must be a list of sections", problemOf("[slot]\n"));
+    EXPECT_EQ(":2:8: [[slot]] must be a list of sections", problemOf("slot = 'x'\n"));
+    EXPECT_EQ(":2:9: [[slot]] must be a list of sections", problemOf("slot = [1]\n"));
+    EXPECT_EQ(":3:1: unknown key \"colour\" in [[slot]]", problemOf("[[slot]]\ncolour = 1\n"));
+    EXPECT_EQ("", problemOf("slot = [{}, {}]\n"));
+    EXPECT_EQ("", problemOf("slot = []\n"));
+}
+
+TEST_F(SimulatorSchemaTest, PackagesHaveNamesOfTheirOwn)
+{
+    describe("[packages]\n\"org.example.app\" = '1.2'\n'with blank' = ''\n");
+    expectAnswer("1.2", line(3), file.get<std::string>("packages", "org.example.app"));
+    expectAnswer("", line(4), file.get<std::string>("packages", "with blank"));
+    ASSERT_TRUE(file.device());
+    EXPECT_EQ(nullptr, file.device().value()->section("packages").find("other"));
+    EXPECT_EQ(":3:7: \"app\" must be a text in quotes", problemOf("[packages]\napp = 1\n"));
+    EXPECT_THAT(problemOf("[packages]\norg.app = '1'\n"),
+                EndsWith("\"org\" must be a text in quotes"));
+}
+
+TEST_F(SimulatorSchemaTest, NulIsRefusedInAnyText)
+{
+    EXPECT_EQ(":3:7: \"app\" must not hold a NUL", problemOf("[packages]\napp = \"1\\u0000\"\n"));
+    EXPECT_EQ(":3:11: \"cp_name\" must not hold a NUL",
+              problemOf("[[slot]]\ncp_name = \"a\\u0000\"\n"));
+}
+
+} // namespace

@@ -1,0 +1,257 @@
+// SPDX-License-Identifier: Apache-2.0
+// SIM slots of a device file.
+#include "support/DeviceFileTest.h"
+
+using port::Card;
+using port::CardStatus;
+using port::Error;
+using port::Imsi;
+using port::Service;
+using port::Subscriptions;
+using port::Telephony;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using testing::StartsWith;
+
+namespace {
+
+class SimulatorTelephonyTest : public DeviceFileTest {
+protected:
+    // The kind of error of every question about a slot.
+    std::vector<Error::Kind> errorsOf(const std::string& name)
+    {
+        std::vector<Error::Kind> kinds;
+        const auto add = [&](const auto& answer) {
+            if (!answer) {
+                kinds.push_back(answer.error().kind);
+                EXPECT_THAT(answer.error().reason, StartsWith(path + ":"));
+            }
+        };
+        add(telephony.card(name));
+        add(telephony.imsi(name));
+        add(telephony.number(name));
+        add(telephony.imei(name));
+        add(telephony.service(name));
+        add(telephony.roaming(name));
+        add(telephony.smsReady(name));
+        return kinds;
+    }
+
+    Telephony& telephony = backend->telephony();
+};
+
+TEST_F(SimulatorTelephonyTest, SlotsComeInOrderUnderTheirNames)
+{
+    describe("[[slot]]\ncp_name = 'b'\n[[slot]]\n[[slot]]\ncp_name = 'a'\n");
+    expectAnswer(std::vector<port::SlotName>{"b", "cp1", "a"}, path, telephony.slots());
+}
+
+TEST_F(SimulatorTelephonyTest, FileWithoutSlotsIsADeviceWithoutAModem)
+{
+    for (const char* const facts : {"", "[device]\ntelephony = true\n", "slot = []\n"}) {
+        describe(facts);
+        expectAnswer(std::vector<port::SlotName>{}, path, telephony.slots());
+    }
+}
+
+TEST_F(SimulatorTelephonyTest, DeviceMayHaveNoTelephony)
+{
+    describe("[device]\ntelephony = false\n[[slot]]\n");
+    const std::string reason = line(3) + ": this device has no telephony";
+    expectError(Error::Kind::NotSupported, reason, telephony.slots());
+    expectError(Error::Kind::NotSupported, reason, telephony.subscriptions());
+    EXPECT_THAT(errorsOf("cp0"),
+                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::NotSupported)));
+}
+
+TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
+{
+    describe("[[slot]]\nsim = 'available'\nmcc = '450'\nmnc = '05'\nmsin = '0123456789'\n"
+             "number = '+15550100'\nimei = '490154203237518'\nservice = 'in_service'\n"
+             "roaming = true\nsms = false\ncard_changed = true\n");
+    const auto card = telephony.card("cp0");
+    ASSERT_TRUE(card);
+    EXPECT_EQ(CardStatus::Ready, card.value().value.status);
+    EXPECT_TRUE(card.value().value.changed);
+    EXPECT_EQ(line(3), card.value().source);
+    const auto imsi = telephony.imsi("cp0");
+    ASSERT_TRUE(imsi);
+    EXPECT_EQ("450", imsi.value().value.mcc);
+    EXPECT_EQ("05", imsi.value().value.mnc);
+    EXPECT_EQ("0123456789", imsi.value().value.msin);
+    EXPECT_EQ(line(4), imsi.value().source);
+    expectAnswer(std::optional<std::string>("+15550100"), line(7), telephony.number("cp0"));
+    expectAnswer("490154203237518", line(8), telephony.imei("cp0"));
+    expectAnswer(Service::InService, line(9), telephony.service("cp0"));
+    expectAnswer(true, line(10), telephony.roaming("cp0"));
+    expectAnswer(false, line(11), telephony.smsReady("cp0"));
+}
+
+TEST_F(SimulatorTelephonyTest, AbsentKeysOfASlotAreNotAvailable)
+{
+    describe("[[slot]]\n");
+    EXPECT_THAT(errorsOf("cp0"),
+                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::NotAvailable)));
+    expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
+                telephony.card("cp0"));
+    expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
+                telephony.imsi("cp0"));
+}
+
+TEST_F(SimulatorTelephonyTest, ImsiIsWholeOrNotAvailable)
+{
+    const std::string parts[] = {"mcc = '450'\n", "mnc = '05'\n", "msin = '1'\n"};
+    for (int missing = 0; missing < 3; ++missing) {
+        std::string facts = "[[slot]]\nsim = 'available'\n";
+        for (int i = 0; i < 3; ++i)
+            facts += i == missing ? "" : parts[i];
+        describe(facts);
+        expectError(Error::Kind::NotAvailable,
+                    line(2) + ": [[slot]] has no " +
+                        parts[missing].substr(0, parts[missing].find(' ')),
+                    telephony.imsi("cp0"));
+    }
+}
+
+TEST_F(SimulatorTelephonyTest, UnknownSlotIsNotAvailable)
+{
+    describe("[[slot]]\nsim = 'available'\n");
+    for (const char* const name : {"cp1", "", "cp", "CP0"})
+        expectError(Error::Kind::NotAvailable, path + ": no slot " + name, telephony.card(name));
+}
+
+TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatus)
+{
+    const struct {
+        const char* sim;
+        CardStatus status;
+    } rows[] = {
+        {"available", CardStatus::Ready},
+        {"locked", CardStatus::PinRequired},
+        {"pin", CardStatus::PinRequired},
+        {"puk", CardStatus::PukRequired},
+        {"blocked", CardStatus::Blocked},
+        {"network_locked", CardStatus::NetworkLocked},
+        {"absent", CardStatus::Absent},
+        {"removed", CardStatus::Removed},
+        {"error", CardStatus::Error},
+        {"powered_off", CardStatus::PoweredOff},
+        {"initializing", CardStatus::Initializing},
+        {"unknown", CardStatus::Unknown},
+    };
+    for (const auto& row : rows) {
+        describe("[[slot]]\nsim = '" + std::string(row.sim) + "'\nmcc = '450'\nmnc = '05'\n" +
+                 "msin = '1'\nnumber = '5'\n");
+        const auto card = telephony.card("cp0");
+        ASSERT_TRUE(card) << row.sim;
+        EXPECT_EQ(row.status, card.value().value.status) << row.sim;
+        const bool isReady = row.status == CardStatus::Ready;
+        EXPECT_EQ(isReady, static_cast<bool>(telephony.imsi("cp0")));
+        EXPECT_EQ(isReady, static_cast<bool>(telephony.number("cp0")));
+        if (!isReady) {
+            EXPECT_EQ(Error::Kind::NoSim, telephony.imsi("cp0").error().kind);
+            EXPECT_EQ(Error::Kind::NoSim, telephony.number("cp0").error().kind);
+        }
+    }
+}
+
+TEST_F(SimulatorTelephonyTest, CardThatCannotBeReadSaysWhy)
+{
+    const struct {
+        const char* status;
+        const char* reason;
+    } rows[] = {
+        {"card_error", "the SIM card cannot be used"},
+        {"card_not_present", "there is no SIM card"},
+        {"sim_initializing", "the SIM card is not ready yet"},
+        {"sim_pin_required", "the SIM card is locked: it wants a PIN"},
+        {"sim_puk_required", "the SIM card is locked: it wants a PUK"},
+        {"card_blocked", "the SIM card is locked for good"},
+        {"sim_nck_required", "the SIM card is locked to a network, provider or device"},
+        {"sim_nsck_required", "the SIM card is locked to a network, provider or device"},
+        {"sim_spck_required", "the SIM card is locked to a network, provider or device"},
+        {"sim_cck_required", "the SIM card is locked to a network, provider or device"},
+        {"card_removed", "there is no SIM card"},
+        {"sim_lock_required", "the SIM card is locked to a network, provider or device"},
+        {"card_crashed", "the SIM card cannot be used"},
+        {"card_poweroff", "the SIM card is switched off"},
+        {"unknown", "the SIM card is not ready yet"},
+    };
+    for (const auto& row : rows) {
+        describe("[[slot]]\nsim = 'available'\ninit_status = '" + std::string(row.status) + "'\n");
+        expectError(Error::Kind::NoSim, line(4) + ": " + row.reason, telephony.imsi("cp0"));
+    }
+}
+
+TEST_F(SimulatorTelephonyTest, DetailedStatusGoesBeforeTheState)
+{
+    describe("[[slot]]\nsim = 'absent'\ninit_status = 'sim_init_completed'\n");
+    const auto card = telephony.card("cp0");
+    ASSERT_TRUE(card);
+    EXPECT_EQ(CardStatus::Ready, card.value().value.status);
+    EXPECT_EQ(line(4), card.value().source);
+    EXPECT_FALSE(card.value().value.changed);
+}
+
+TEST_F(SimulatorTelephonyTest, CardWithoutANumberIsNoError)
+{
+    describe("[[slot]]\nsim = 'available'\n");
+    expectAnswer(std::nullopt, line(2), telephony.number("cp0"));
+    describe("[[slot]]\nsim = 'available'\nnumber = 'null'\n");
+    expectAnswer(std::optional<std::string>(""), line(4), telephony.number("cp0"));
+}
+
+TEST_F(SimulatorTelephonyTest, PrivateSlotDeniesEveryQuestion)
+{
+    describe("[[slot]]\nsim = 'available'\ndenied = true\n[[slot]]\nsim = 'absent'\n");
+    EXPECT_THAT(errorsOf("cp0"),
+                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::Denied)));
+    EXPECT_TRUE(telephony.card("cp1"));
+}
+
+TEST_F(SimulatorTelephonyTest, SubscriptionsAreUnknownWhereTheFileIsSilent)
+{
+    describe("[[slot]]\n");
+    const auto all = telephony.subscriptions();
+    ASSERT_TRUE(all);
+    EXPECT_EQ(std::nullopt, all.value().value.network);
+    EXPECT_EQ(std::nullopt, all.value().value.data);
+    EXPECT_EQ(Subscriptions::Voice::Unknown, all.value().value.voice);
+    describe("[subscriptions]\nnetwork = 'unknown'\ndata = 'unknown'\nvoice = 'unknown'\n");
+    EXPECT_EQ(std::nullopt, telephony.subscriptions().value().value.network);
+    EXPECT_EQ(std::nullopt, telephony.subscriptions().value().value.data);
+}
+
+TEST_F(SimulatorTelephonyTest, SubscriptionsNameSlots)
+{
+    describe("[subscriptions]\nnetwork = 0\ndata = 1\nvoice = 'ask_always'\n");
+    const auto all = telephony.subscriptions();
+    ASSERT_TRUE(all);
+    EXPECT_EQ(0, all.value().value.network);
+    EXPECT_EQ(1, all.value().value.data);
+    EXPECT_EQ(Subscriptions::Voice::AskAlways, all.value().value.voice);
+    EXPECT_EQ(path, all.value().source);
+}
+
+TEST_F(SimulatorTelephonyTest, ProblemOfTheFileIsTheReasonOfEveryQuestion)
+{
+    describe("[[slot]]\nsim = 'here'\n");
+    const std::string reason = backend->deviceFileProblem();
+    EXPECT_THAT(reason, StartsWith(line(3) + ":7: "));
+    expectError(Error::Kind::NotAvailable, reason, telephony.slots());
+    expectError(Error::Kind::NotAvailable, reason, telephony.card("cp0"));
+    expectError(Error::Kind::NotAvailable, reason, telephony.subscriptions());
+}
+
+TEST_F(SimulatorTelephonyTest, EditIsSeenByTheNextQuestion)
+{
+    describe("[[slot]]\nsim = 'absent'\n");
+    EXPECT_EQ(CardStatus::Absent, telephony.card("cp0").value().value.status);
+    describe("[[slot]]\nsim = 'available'\n");
+    EXPECT_EQ(CardStatus::Ready, telephony.card("cp0").value().value.status);
+    describe("");
+    EXPECT_THAT(telephony.slots().value().value, IsEmpty());
+    EXPECT_FALSE(telephony.card("cp0"));
+}
+
+} // namespace
