@@ -18,27 +18,49 @@ std::string messageOf(GError& error)
     return error.message;
 }
 
+// A main context of this thread's own, in which GLib's answers arrive.
+class PrivateContext {
+public:
+    PrivateContext() : context_(g_main_context_new())
+    {
+        g_main_context_push_thread_default(context_.get());
+    }
+    ~PrivateContext()
+    {
+        g_main_context_pop_thread_default(context_.get());
+    }
+    PrivateContext(const PrivateContext&) = delete;
+    PrivateContext& operator=(const PrivateContext&) = delete;
+
+    void attach(GSource* source) const
+    {
+        g_source_attach(source, context_.get());
+    }
+    template <typename Predicate>
+    void runUntil(Predicate done) const
+    {
+        while (!done())
+            g_main_context_iteration(context_.get(), TRUE);
+    }
+
+private:
+    Owned<GMainContext> context_;
+};
+
 // Connecting has no time-out of its own: a timer on a private main context cancels it.
 class TimedConnect {
 public:
     explicit TimedConnect(const char* address)
-        : context_(g_main_context_new()), cancellable_(g_cancellable_new()),
-          timer_(g_timeout_source_new(Bus::CONNECT_TIMEOUT_MS))
+        : cancellable_(g_cancellable_new()), timer_(g_timeout_source_new(Bus::CONNECT_TIMEOUT_MS))
     {
-        g_main_context_push_thread_default(context_.get());
         g_source_set_callback(timer_.get(), &TimedConnect::onTimeout, this, nullptr);
-        g_source_attach(timer_.get(), context_.get());
+        context_.attach(timer_.get());
         g_dbus_connection_new_for_address(
             address,
             static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
                                               G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
             nullptr, cancellable_.get(), &TimedConnect::onReady, this);
-        while (!done_)
-            g_main_context_iteration(context_.get(), TRUE);
-    }
-    ~TimedConnect()
-    {
-        g_main_context_pop_thread_default(context_.get());
+        context_.runUntil([this] { return done_; });
     }
     TimedConnect(const TimedConnect&) = delete;
     TimedConnect& operator=(const TimedConnect&) = delete;
@@ -68,7 +90,7 @@ private:
         connect.done_ = true;
     }
 
-    Owned<GMainContext> context_;
+    PrivateContext context_;
     Owned<GCancellable> cancellable_;
     Owned<GSource> timer_;
     Owned<GError> error_;
@@ -95,7 +117,89 @@ Error callError(const char* name, GError& error)
         return notAvailable(service + " is not on the system bus");
     if (g_error_matches(&error, G_IO_ERROR, G_IO_ERROR_TIMED_OUT))
         return notAvailable(service + " did not answer in time");
+    if (g_error_matches(&error, G_DBUS_ERROR, G_DBUS_ERROR_ACCESS_DENIED) ||
+        g_error_matches(&error, G_DBUS_ERROR, G_DBUS_ERROR_AUTH_FAILED))
+        return denied(service + ": " + messageOf(error));
     return notAvailable(service + ": " + messageOf(error));
+}
+
+Owned<GDBusMessage> messageOf(const Question& question)
+{
+    const BusObject& object = question.object;
+    Owned<GDBusMessage> message(g_dbus_message_new_method_call(object.name, object.path,
+                                                               object.interface, question.method));
+    if (question.arguments)
+        g_dbus_message_set_body(message.get(), question.arguments.get());
+    if (object.start == Start::Never)
+        g_dbus_message_set_flags(message.get(), G_DBUS_MESSAGE_FLAGS_NO_AUTO_START);
+    return message;
+}
+
+// Sends several questions and waits until each is answered, or its time is over.
+class Exchange {
+public:
+    Exchange(GDBusConnection* bus, const std::vector<Question>& questions, int timeoutMs)
+        : questions_(questions), calls_(questions.size())
+    {
+        for (std::size_t i = 0; i < calls_.size(); ++i)
+            g_dbus_connection_send_message_with_reply(
+                bus, messageOf(questions[i]).get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE, timeoutMs,
+                nullptr, nullptr, &Exchange::onReply, &calls_[i]);
+        context_.runUntil([this] {
+            return std::all_of(calls_.begin(), calls_.end(),
+                               [](const Call& call) { return call.reply || call.error; });
+        });
+    }
+
+    std::vector<Result<Reply>> replies()
+    {
+        std::vector<Result<Reply>> all;
+        for (std::size_t i = 0; i < calls_.size(); ++i)
+            all.push_back(replyTo(questions_[i], calls_[i]));
+        return all;
+    }
+
+private:
+    struct Call {
+        Owned<GDBusMessage> reply;
+        Owned<GError> error;
+    };
+
+    static void onReply(GObject* bus, GAsyncResult* result, gpointer target)
+    {
+        auto& call = *static_cast<Call*>(target);
+        call.reply.reset(g_dbus_connection_send_message_with_reply_finish(
+            reinterpret_cast<GDBusConnection*>(bus), result, Out(call.error)));
+    }
+
+    static Result<Reply> replyTo(const Question& question, Call& call)
+    {
+        if (call.reply)
+            g_dbus_message_to_gerror(call.reply.get(), Out(call.error));
+        if (call.error)
+            return callError(question.object.name, *call.error);
+        GVariant* const body = g_dbus_message_get_body(call.reply.get());
+        if (body == nullptr || !g_variant_is_of_type(body, G_VARIANT_TYPE(question.replyType)))
+            return notAvailable(std::string(question.object.name) + ": the reply to " +
+                                question.method + " is of another type");
+        const char* const sender = g_dbus_message_get_sender(call.reply.get());
+        return Reply{share(g_variant_ref(body)), sender != nullptr ? sender : ""};
+    }
+
+    const PrivateContext context_;
+    const std::vector<Question>& questions_;
+    std::vector<Call> calls_;
+};
+
+int millisecondsUntil(gint64 end)
+{
+    return static_cast<int>(std::max<gint64>(0, end - g_get_monotonic_time()) / 1000);
+}
+
+bool hasFailure(const std::vector<Result<Reply>>& replies)
+{
+    return std::any_of(replies.begin(), replies.end(),
+                       [](const Result<Reply>& reply) { return !reply; });
 }
 
 // "hostname1" of "org.freedesktop.hostname1".
@@ -105,20 +209,53 @@ std::string shortName(const BusObject& object)
     return std::string(name.substr(name.rfind('.') + 1));
 }
 
-Result<std::string> textOf(const Variant& properties, const char* name)
+Question namesOfBus(const char* method)
 {
-    const Owned<GVariant> value(g_variant_lookup_value(properties.get(), name, nullptr));
-    if (!value)
-        return notAvailable(std::string(name) + " is missing");
-    if (!g_variant_is_of_type(value.get(), G_VARIANT_TYPE_STRING))
-        return notAvailable(std::string(name) + " is no text");
-    const std::string text = g_variant_get_string(value.get(), nullptr);
-    if (text.empty())
-        return notAvailable(std::string(name) + " is empty");
-    return text;
+    return {BUS_ITSELF, method, nullptr, "(as)"};
+}
+
+bool isListed(const Reply& names, const char* name)
+{
+    const Variant list = share(g_variant_get_child_value(names.body.get(), 0));
+    for (std::size_t i = 0; i < g_variant_n_children(list.get()); ++i) {
+        const Variant item = share(g_variant_get_child_value(list.get(), i));
+        if (std::string_view(name) == g_variant_get_string(item.get(), nullptr))
+            return true;
+    }
+    return false;
+}
+
+// Looks into the names that are on the bus, and those that could be.
+Result<std::string> stateIn(const std::vector<Result<Reply>>& lists, const BusObject& service)
+{
+    for (const Result<Reply>& list : lists)
+        if (!list)
+            return list.error();
+    if (isListed(lists[0].value(), service.name))
+        return std::string("running");
+    if (!isListed(lists[1].value(), service.name))
+        return notAvailable("not on the system bus");
+    if (service.start == Start::Never)
+        return notAvailable("installed, but not running");
+    return std::string("starts on demand");
 }
 
 } // namespace
+
+Question propertiesOf(const BusObject& object)
+{
+    const BusObject target = {object.name, object.path, "org.freedesktop.DBus.Properties",
+                              object.start};
+    return {target, "GetAll", share(g_variant_ref_sink(g_variant_new("(s)", object.interface))),
+            "(a{sv})"};
+}
+
+Question objectsBelow(const BusObject& manager)
+{
+    const BusObject target = {manager.name, manager.path, "org.freedesktop.DBus.ObjectManager",
+                              manager.start};
+    return {target, "GetManagedObjects", nullptr, "(a{oa{sa{sv}}})"};
+}
 
 bool Bus::isOwnedByThisProcess()
 {
@@ -144,48 +281,42 @@ Result<Connection> Bus::connection()
     return fresh;
 }
 
-Result<Variant> Bus::call(const BusObject& object, const char* method, GVariant* arguments,
-                          const char* replyType)
+std::vector<Result<Reply>> Bus::ask(const std::vector<Question>& questions, int timeoutMs)
 {
-    const Variant sunkArguments(g_variant_ref_sink(arguments), GLibRelease());
-    const GDBusCallFlags flags =
-        object.start == Start::Never ? G_DBUS_CALL_FLAGS_NO_AUTO_START : G_DBUS_CALL_FLAGS_NONE;
+    const gint64 end = g_get_monotonic_time() + timeoutMs * G_GINT64_CONSTANT(1000);
     for (bool again = true;; again = false) {
         const Result<Connection> bus = connection();
         if (!bus)
-            return bus.error();
-        Owned<GError> error;
-        GVariant* const reply = g_dbus_connection_call_sync(
-            bus.value().get(), object.name, object.path, object.interface, method,
-            sunkArguments.get(), G_VARIANT_TYPE(replyType), flags, CALL_TIMEOUT_MS, nullptr,
-            Out(error));
-        if (reply != nullptr)
-            return Variant(reply, GLibRelease());
+            return {questions.size(), bus.error()};
+        std::vector<Result<Reply>> replies =
+            Exchange(bus.value().get(), questions, millisecondsUntil(end)).replies();
         // A bus that was restarted shows only now: ask the new one.
-        if (!again || !g_dbus_connection_is_closed(bus.value().get()))
-            return callError(object.name, *error);
+        if (!again || !hasFailure(replies) || !g_dbus_connection_is_closed(bus.value().get()))
+            return replies;
     }
 }
 
-Result<Variant> Bus::properties(const BusObject& object)
+Result<Reply> Bus::ask(const Question& question)
 {
-    const BusObject target = {object.name, object.path, "org.freedesktop.DBus.Properties",
-                              object.start};
-    const Result<Variant> reply =
-        call(target, "GetAll", g_variant_new("(s)", object.interface), "(a{sv})");
+    return ask(std::vector<Question>{question}).front();
+}
+
+Result<Properties> Bus::properties(const BusObject& object)
+{
+    const Result<Reply> reply = ask(propertiesOf(object));
     if (!reply)
-        return reply;
-    return Variant(g_variant_get_child_value(reply.value().get(), 0), GLibRelease());
+        return reply.error();
+    return propertiesIn(reply.value().body);
 }
 
 Result<Fact> Bus::textProperty(const BusObject& object, std::initializer_list<const char*> names)
 {
-    const Result<Variant> all = properties(object);
+    const Result<Properties> all = properties(object);
     if (!all)
         return all.error();
     std::string problems;
     for (const char* const name : names) {
-        const Result<std::string> text = textOf(all.value(), name);
+        const Result<std::string> text = all.value().text(name);
         if (text)
             return Fact{text.value(), shortName(object) + " " + name};
         problems += (problems.empty() ? ": " : ", ") + text.error().reason;
@@ -193,32 +324,14 @@ Result<Fact> Bus::textProperty(const BusObject& object, std::initializer_list<co
     return notAvailable(shortName(object) + problems);
 }
 
-Result<std::vector<std::string>> Bus::names(const char* method)
+std::vector<Result<std::string>> Bus::statesOf(const std::vector<BusObject>& services)
 {
-    const Result<Variant> reply = call(BUS_ITSELF, method, g_variant_new("()"), "(as)");
-    if (!reply)
-        return reply.error();
-    std::vector<std::string> found;
-    const Owned<GVariant> list(g_variant_get_child_value(reply.value().get(), 0));
-    for (std::size_t i = 0; i < g_variant_n_children(list.get()); ++i) {
-        const Owned<GVariant> name(g_variant_get_child_value(list.get(), i));
-        found.push_back(g_variant_get_string(name.get(), nullptr));
-    }
-    return found;
-}
-
-Result<std::string> Bus::stateOf(const std::string& name)
-{
-    const char* const states[][2] = {{"ListNames", "running"},
-                                     {"ListActivatableNames", "starts on demand"}};
-    for (const auto& [method, state] : states) {
-        const Result<std::vector<std::string>> listed = names(method);
-        if (!listed)
-            return listed.error();
-        if (std::count(listed.value().begin(), listed.value().end(), name) != 0)
-            return std::string(state);
-    }
-    return notAvailable("not on the system bus");
+    const std::vector<Result<Reply>> lists =
+        ask({namesOfBus("ListNames"), namesOfBus("ListActivatableNames")});
+    std::vector<Result<std::string>> states;
+    for (const BusObject& service : services)
+        states.push_back(stateIn(lists, service));
+    return states;
 }
 
 } // namespace port::linux_backend

@@ -17,22 +17,41 @@
 
 #include "../backend/Result.h"
 #include "GLibTypes.h"
+#include "Properties.h"
 
 namespace port::linux_backend {
 
 using Connection = std::shared_ptr<GDBusConnection>;
-using Variant = std::shared_ptr<GVariant>;
 
 // Whether asking a service may start it. hostname1 and locale1 live only while they are asked, so
 // the bus starts them on purpose; nothing else ever is.
 enum class Start { WhenAsked, Never };
 
-// A service of the system bus that is asked for its properties.
+// An object of a service of the system bus, and one of its interfaces.
 struct BusObject {
     const char* name;
     const char* path;
     const char* interface;
     Start start;
+};
+
+// One method call. The texts of its object outlive it.
+struct Question {
+    BusObject object;
+    const char* method;
+    Variant arguments; // a tuple; null for none
+    const char* replyType;
+};
+
+/// All properties of the object's interface; the reply is an (a{sv}).
+Question propertiesOf(const BusObject& object);
+
+/// All objects below this one, which is an object manager; the reply is an (a{oa{sa{sv}}}).
+Question objectsBelow(const BusObject& manager);
+
+struct Reply {
+    Variant body;
+    std::string sender; // which no other process of this bus ever has
 };
 
 class Bus {
@@ -41,21 +60,25 @@ public:
     static constexpr int CONNECT_TIMEOUT_MS = 500;
     static constexpr int CALL_TIMEOUT_MS = 1000;
 
-    /// All properties of an object's interface, as a{sv}.
-    Result<Variant> properties(const BusObject& object);
+    /// Asks several questions in one round trip: all are sent before the first reply is awaited.
+    /// The replies stand in the order of the questions. `timeoutMs` is for all of them together,
+    /// connecting left out.
+    std::vector<Result<Reply>> ask(const std::vector<Question>& questions,
+                                   int timeoutMs = CALL_TIMEOUT_MS);
+    Result<Reply> ask(const Question& question);
+
+    /// All properties of an object's interface.
+    Result<Properties> properties(const BusObject& object);
 
     /// The first of several properties that is a text and not empty; the error says what is wrong
     /// with each.
     Result<Fact> textProperty(const BusObject& object, std::initializer_list<const char*> names);
 
-    /// "running", "starts on demand", or the error why neither.
-    Result<std::string> stateOf(const std::string& name);
+    /// For each service "running", "starts on demand", or the error why neither.
+    std::vector<Result<std::string>> statesOf(const std::vector<BusObject>& services);
 
 private:
     Result<Connection> connection();
-    Result<Variant> call(const BusObject& object, const char* method, GVariant* arguments,
-                         const char* replyType);
-    Result<std::vector<std::string>> names(const char* method);
 
     bool isOwnedByThisProcess();
 

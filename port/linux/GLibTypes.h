@@ -47,10 +47,21 @@ struct GLibRelease {
     {
         g_object_unref(object);
     }
+    void operator()(GDBusMessage* object) const
+    {
+        g_object_unref(object);
+    }
 };
 
 template <typename T>
 using Owned = std::unique_ptr<T, GLibRelease>;
+using Variant = std::shared_ptr<GVariant>;
+
+// Takes over one reference; null stays null.
+inline Variant share(GVariant* variant)
+{
+    return variant != nullptr ? Variant(variant, GLibRelease()) : nullptr;
+}
 
 // Receives an out-parameter of a GLib call: `call(…, Out(error))`.
 template <typename T>

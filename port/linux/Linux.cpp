@@ -8,9 +8,12 @@
 #include "Files.h"
 #include "Hostname1.h"
 #include "Locale1.h"
+#include "ModemManager.h"
+#include "NetworkManager.h"
 #include "Packages.h"
 #include "Settings.h"
 #include "Storage.h"
+#include "Telephony.h"
 
 namespace port::linux_backend {
 namespace {
@@ -64,12 +67,15 @@ public:
 
     std::vector<Service> findServices() override
     {
-        return {
-            onBus(
-                HOSTNAME1, "device name, hardware model",
-                "the device name is the kernel's host name, the model DMI's or the device tree's"),
-            onBus(LOCALE1, "display language",
-                  "the language is that of LC_ALL, LC_MESSAGES or LANG"),
+        std::vector<Service> found = findOnBus({
+            {HOSTNAME1, "device name, hardware model",
+             "the device name is the kernel's host name, the model DMI's or the device tree's"},
+            {LOCALE1, "display language", "the language is that of LC_ALL, LC_MESSAGES or LANG"},
+            {MODEM_MANAGER, "SIM cards, IMEI, roaming", "no telephony"},
+            {NETWORK_MANAGER, "the SIM card for data",
+             "nobody tells which SIM card carries the data"},
+        });
+        const std::vector<Service> onDisk = {
             file(OS_RELEASE, "platform name and version", "no platform name and version"),
             file(MACHINE_ID, "platform identifier", "no platform identifier"),
             file(HARDWARE_MODEL, "hardware model", "the model is hostname1's only"),
@@ -77,14 +83,29 @@ public:
                   "no device serial"),
             probe(DPKG_STATUS, packages_.version(""), "installed packages", "no package is known"),
         };
+        found.insert(found.end(), onDisk.begin(), onDisk.end());
+        return found;
     }
 
 private:
-    Service onBus(const BusObject& object, const char* serves, const char* consequence)
+    struct BusService {
+        BusObject object;
+        const char* serves;
+        const char* consequence;
+    };
+
+    std::vector<Service> findOnBus(const std::vector<BusService>& services)
     {
-        const Result<std::string> state = bus_.stateOf(object.name);
-        return {object.name, static_cast<bool>(state), state ? state.value() : state.error().reason,
-                serves, consequence};
+        std::vector<BusObject> objects;
+        for (const BusService& service : services)
+            objects.push_back(service.object);
+        const std::vector<Result<std::string>> states = bus_.statesOf(objects);
+        std::vector<Service> found;
+        for (std::size_t i = 0; i < services.size(); ++i)
+            found.push_back({objects[i].name, static_cast<bool>(states[i]),
+                             states[i] ? states[i].value() : states[i].error().reason,
+                             services[i].serves, services[i].consequence});
+        return found;
     }
 
     static Service file(Places places, const char* serves, const char* consequence)
@@ -107,7 +128,7 @@ private:
     Bus bus_;
     LinuxDeviceInfo deviceInfo_{bus_, ""};
     LinuxSettings settings_{bus_};
-    Telephony telephony_;
+    LinuxTelephony telephony_{bus_};
     Network network_;
     LinuxStorage storage_{g_get_user_data_dir()};
     LinuxPackages packages_{""};

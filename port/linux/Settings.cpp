@@ -21,28 +21,25 @@ std::optional<std::string> localeName(const std::string& text)
 }
 
 // The value among locale1's assignments, "LANG=de_DE.UTF-8".
-std::optional<std::string> assigned(GVariant* locale, const std::string& variable)
+std::optional<std::string> assigned(const std::vector<std::string>& locale,
+                                    const std::string& variable)
 {
-    for (std::size_t i = 0; i < g_variant_n_children(locale); ++i) {
-        const Owned<GVariant> item(g_variant_get_child_value(locale, i));
-        const std::string assignment = g_variant_get_string(item.get(), nullptr);
+    for (const std::string& assignment : locale)
         if (assignment.compare(0, variable.size() + 1, variable + "=") == 0)
             return localeName(assignment.substr(variable.size() + 1));
-    }
     return std::nullopt;
 }
 
 Result<Fact> languageOfMachine(Bus& bus)
 {
-    const Result<Variant> properties = bus.properties(LOCALE1);
+    const Result<Properties> properties = bus.properties(LOCALE1);
     if (!properties)
         return properties.error();
-    const Owned<GVariant> locale(
-        g_variant_lookup_value(properties.value().get(), "Locale", G_VARIANT_TYPE_STRING_ARRAY));
+    const Result<std::vector<std::string>> locale = properties.value().texts("Locale");
     if (!locale)
         return notAvailable("locale1: Locale is missing or no list of texts");
     for (const char* const variable : {"LC_MESSAGES", "LANG"})
-        if (const auto name = assigned(locale.get(), variable))
+        if (const auto name = assigned(locale.value(), variable))
             return Fact{*name, std::string("locale1 ") + variable};
     return notAvailable("locale1: Locale sets no language");
 }

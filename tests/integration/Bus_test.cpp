@@ -368,9 +368,17 @@ TEST_F(BusTest, StateOfAServiceIsTold)
 {
     daemon.addActivatable("com.example.Other", "/bin/false");
     startService();
-    EXPECT_EQ("running", bus.stateOf(HOSTNAME1.name).value());
-    EXPECT_EQ("starts on demand", bus.stateOf("com.example.Other").value());
-    EXPECT_EQ("not on the system bus", bus.stateOf("com.example.None").error().reason);
+    BusObject other = {"com.example.Other", "/com/example", "com.example.Other", Start::WhenAsked};
+    BusObject neverStarted = other;
+    neverStarted.start = Start::Never;
+    BusObject missing = other;
+    missing.name = "com.example.None";
+    const auto states = bus.statesOf({HOSTNAME1, other, neverStarted, missing});
+    ASSERT_EQ(4U, states.size());
+    EXPECT_EQ("running", states[0].value());
+    EXPECT_EQ("starts on demand", states[1].value());
+    EXPECT_EQ("installed, but not running", states[2].error().reason);
+    EXPECT_EQ("not on the system bus", states[3].error().reason);
 }
 
 TEST_F(BusTest, ConnectionIsNotTheSharedOne)

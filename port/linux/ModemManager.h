@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: Apache-2.0
+// The modems that ModemManager knows.
+#ifndef PORT_LINUX_MODEM_MANAGER_H
+#define PORT_LINUX_MODEM_MANAGER_H
+
+#include <string>
+#include <vector>
+
+#include <ModemManager/ModemManager.h>
+
+#include "Bus.h"
+#include "Properties.h"
+
+namespace port::linux_backend {
+
+constexpr BusObject MODEM_MANAGER = {MM_DBUS_SERVICE, MM_DBUS_PATH, MM_DBUS_INTERFACE,
+                                     Start::Never};
+
+// A modem as it was when ModemManager told of it.
+class Modem {
+public:
+    Modem(Object object, Properties modem);
+
+    /// The object of this modem.
+    const std::string& path() const
+    {
+        return object_.path();
+    }
+    /// The physical device, such as a path in sysfs: the same after ModemManager was started again.
+    /// The object's path where the modem tells none.
+    const std::string& device() const
+    {
+        return device_;
+    }
+    /// The objects of the SIMs, one for each SIM slot; empty where a slot holds none.
+    const std::vector<std::string>& sims() const
+    {
+        return sims_;
+    }
+    /// The only one of those slots that is in use, 0-based; past the end when none is.
+    std::size_t activeSim() const
+    {
+        return activeSim_;
+    }
+
+    // Numbers, since a service may say what its enumeration lacks.
+    Result<std::int32_t> state() const;         // MMModemState
+    Result<std::uint32_t> failedReason() const; // MMModemStateFailedReason
+    Result<std::uint32_t> lock() const;         // MMModemLock
+    Result<std::uint32_t> retriesLeft(MMModemLock lock) const;
+    bool isPoweredOff() const;
+    Result<std::uint32_t> registration() const; // MMModem3gppRegistrationState
+    Result<std::string> equipmentIdentifier() const;
+    Result<std::vector<std::string>> ownNumbers() const;
+    bool hasMessaging() const;
+
+private:
+    void readSims();
+
+    Object object_;
+    Properties modem_;
+    std::string device_;
+    std::vector<std::string> sims_;
+    std::size_t activeSim_ = 0;
+};
+
+/// The modems in the reply to objectsBelow(MODEM_MANAGER), ordered by device.
+Result<std::vector<Modem>> modemsIn(const Reply& reply);
+
+} // namespace port::linux_backend
+
+#endif
