@@ -1,0 +1,398 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/AtModem.h"
+
+#include <algorithm>
+#include <cstddef>
+#include <cstring>
+#include <stdexcept>
+
+#include <poll.h>
+#include <sys/eventfd.h>
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+namespace {
+
+const char OK[] = "OK";
+const char ERROR[] = "ERROR";
+// 27.007, 9.2.1
+const char SIM_NOT_INSERTED[] = "+CME ERROR: 10";
+const char SIM_PIN_REQUIRED[] = "+CME ERROR: 11";
+const char SIM_PUK_REQUIRED[] = "+CME ERROR: 12";
+const char INCORRECT_PASSWORD[] = "+CME ERROR: 16";
+
+const char* const DOMAINS[] = {"+CREG", "+CGREG", "+CEREG"};
+
+int listenAt(const std::string& port)
+{
+    sockaddr_un address = {};
+    address.sun_family = AF_UNIX;
+    // An abstract name: it begins with a zero byte, and the word "abstract:" is part of it.
+    port.copy(address.sun_path + 1, sizeof address.sun_path - 1);
+    const auto size = static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + 1 + port.size());
+    const int listener = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    if (bind(listener, reinterpret_cast<sockaddr*>(&address), size) != 0 ||
+        listen(listener, 8) != 0)
+        throw std::runtime_error("cannot listen at " + port);
+    return listener;
+}
+
+std::string information(const std::string& text)
+{
+    return text + "\n" + OK;
+}
+
+// Digits as a card stores them: two to a byte, the first in the lower half.
+std::string swapped(std::string digits)
+{
+    if (digits.size() % 2 != 0)
+        digits += 'F';
+    for (std::size_t i = 0; i + 1 < digits.size(); i += 2)
+        std::swap(digits[i], digits[i + 1]);
+    return digits;
+}
+
+// "\r\n" around each line of an answer.
+std::string framed(const std::string& answer)
+{
+    std::string text;
+    for (std::size_t begin = 0; begin <= answer.size();) {
+        const std::size_t end = std::min(answer.find('\n', begin), answer.size());
+        text += "\r\n" + answer.substr(begin, end - begin) + "\r\n";
+        begin = end + 1;
+    }
+    return text;
+}
+
+// The commands of a line, which semicolons part.
+std::vector<std::string> commandsOf(const std::string& line)
+{
+    std::vector<std::string> commands(1);
+    bool quoted = false;
+    for (const char c : line) {
+        quoted ^= c == '"';
+        if (c == ';' && !quoted)
+            commands.emplace_back();
+        else
+            commands.back() += c;
+    }
+    return commands;
+}
+
+} // namespace
+
+// A command is its name and one of the forms "=?", "?", "=" or none, as 27.007 has them.
+struct AtModem::Row {
+    const char* command;
+    const char* text; // the whole answer; null: the handler's
+    Handler handler = nullptr;
+};
+
+const AtModem::Row AtModem::ROWS[] = {
+    {"+GCAP", "+GCAP: +CGSM\nOK"},
+    {"I", "Simulated modem\n+GCAP: +CGSM\nOK"},
+    {"+CGMI", "Simulations\nOK"},
+    {"+CGMM", "AT modem\nOK"},
+    {"+CGMR", "1.0\nOK"},
+    {"+CGSN", nullptr, &AtModem::imei},
+    {"+WS46=?", "+WS46: (12,22,28,25,29)\nOK"},
+    {"+IFC=?", "+IFC: (0-2),(0-2)\nOK"},
+    {"+CSCS=?", "+CSCS: (\"IRA\")\nOK"},
+    {"+CSCS?", "+CSCS: \"IRA\"\nOK"},
+    {"+CFUN=?", "+CFUN: (0,1,4),(0,1)\nOK"},
+    {"+CFUN?", "+CFUN: 1\nOK"},
+    // the card
+    {"+CPIN?", nullptr, &AtModem::lock},
+    {"+CPIN=", nullptr, &AtModem::unlock},
+    {"+CLCK=?", "+CLCK: (\"SC\")\nOK"},
+    {"+CLCK=", nullptr, &AtModem::facility},
+    {"+CSIM=", nullptr, &AtModem::retries},
+    {"+CRSM=", nullptr, &AtModem::file},
+    {"+CIMI", nullptr, &AtModem::imsi},
+    {"+CNUM", nullptr, &AtModem::number},
+    // the network
+    {"+CREG=?", "+CREG: (0-2)\nOK"},
+    {"+CGREG=?", "+CGREG: (0-2)\nOK"},
+    {"+CEREG=?", "+CEREG: (0-2)\nOK"},
+    {"+CREG?", nullptr, &AtModem::readRegistration<0>},
+    {"+CGREG?", nullptr, &AtModem::readRegistration<1>},
+    {"+CEREG?", nullptr, &AtModem::readRegistration<2>},
+    {"+CREG=", nullptr, &AtModem::reportRegistration<0>},
+    {"+CGREG=", nullptr, &AtModem::reportRegistration<1>},
+    {"+CEREG=", nullptr, &AtModem::reportRegistration<2>},
+    {"+COPS?", nullptr, &AtModem::operatorName},
+    {"+CSQ", "+CSQ: 20,99\nOK"},
+    {"+CGATT?", nullptr, &AtModem::attached},
+    {"+CGDCONT=?", "+CGDCONT: (1-11),\"IP\",,,(0-2),(0-3)\nOK"},
+    {"+CGDCONT?", "+CGDCONT: 1,\"IP\",\"internet\",\"\",0,0\nOK"},
+    {"+CGACT?", "+CGACT: 1,0\nOK"},
+    // messages
+    {"+CNMI=?", nullptr, &AtModem::messageFormats},
+    {"+CMGF=?", "+CMGF: (0,1)\nOK"},
+    {"+CPMS=?", "+CPMS: (\"SM\",\"ME\"),(\"SM\",\"ME\"),(\"SM\",\"ME\")\nOK"},
+    {"+CPMS?", "+CPMS: \"ME\",0,10,\"ME\",0,10,\"ME\",0,10\nOK"},
+    {"+CPMS=", "+CPMS: 0,10,0,10,0,10\nOK"},
+    {"+CMGL=", OK},
+    // settings that change nothing that is asked for
+    {"E", OK},
+    {"V", OK},
+    {"X", OK},
+    {"Z", OK},
+    {"&", OK},
+    {"+CMEE=", OK},
+    {"+CSCS=", OK},
+    {"+IFC=", OK},
+    {"+CFUN=", OK},
+    {"+COPS=", OK},
+    {"+CGEREP=", OK},
+    {"+CTZR=", OK},
+    {"+CTZU=", OK},
+    {"+CNMI=", OK},
+    {"+CMGF=", OK},
+    {"+CLIP=", OK},
+    {"+CRC=", OK},
+    {"+CCWA=", OK},
+    {"+CUSD=", OK},
+};
+
+AtModem::AtModem(const std::string& name, const State& state)
+    : port_("abstract:at-modem-" + std::to_string(getpid()) + "-" + name), socket_(listenAt(port_)),
+      stop_(eventfd(0, EFD_CLOEXEC)), state_(state), thread_(&AtModem::serve, this)
+{
+}
+
+AtModem::~AtModem()
+{
+    eventfd_write(stop_, 1);
+    thread_.join();
+    for (const Caller& caller : callers_)
+        close(caller.descriptor);
+    close(socket_);
+    close(stop_);
+}
+
+void AtModem::change(const std::function<void(State&)>& edit)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    const int before = registration();
+    edit(state_);
+    if (registration() == before)
+        return;
+    for (const auto& [command, mode] : reports_)
+        if (mode != "0")
+            say("\r\n" + registrationLine(command, "") + "\r\n");
+}
+
+void AtModem::serve()
+{
+    for (;;) {
+        std::vector<pollfd> watched = {{stop_, POLLIN, 0}, {socket_, POLLIN, 0}};
+        for (const Caller& caller : callers_)
+            watched.push_back({caller.descriptor, POLLIN, 0});
+        poll(watched.data(), watched.size(), -1);
+        if (watched[0].revents != 0)
+            return;
+        const std::lock_guard<std::mutex> lock(mutex_);
+        for (std::size_t i = watched.size(); i > 2; --i)
+            if (watched[i - 1].revents != 0 && !hear(callers_[i - 3]))
+                callers_.erase(callers_.begin() + static_cast<std::ptrdiff_t>(i - 3));
+        if (watched[1].revents != 0)
+            acceptCaller();
+    }
+}
+
+void AtModem::acceptCaller()
+{
+    const int descriptor = accept4(socket_, nullptr, nullptr, SOCK_CLOEXEC);
+    if (descriptor >= 0)
+        callers_.push_back({descriptor, ""});
+}
+
+// False when the caller hung up.
+bool AtModem::hear(Caller& caller)
+{
+    char block[1024];
+    const ssize_t size = recv(caller.descriptor, block, sizeof block, 0);
+    if (size <= 0) {
+        close(caller.descriptor);
+        return false;
+    }
+    caller.received.append(block, static_cast<std::size_t>(size));
+    for (std::size_t end; (end = caller.received.find('\r')) != std::string::npos;) {
+        const std::string reply = answer(caller.received.substr(0, end));
+        caller.received.erase(0, end + 1);
+        send(caller.descriptor, reply.data(), reply.size(), MSG_NOSIGNAL);
+    }
+    return true;
+}
+
+void AtModem::say(const std::string& text) const
+{
+    for (const Caller& caller : callers_)
+        send(caller.descriptor, text.data(), text.size(), MSG_NOSIGNAL);
+}
+
+// The answer to a line is that to its commands, up to the first that fails.
+std::string AtModem::answer(const std::string& line)
+{
+    const std::size_t begin = line.find("AT");
+    if (begin == std::string::npos)
+        return "";
+    std::string texts;
+    std::string last = OK;
+    for (const std::string& command : commandsOf(line.substr(begin + 2))) {
+        const std::string reply = answerTo(command);
+        const std::size_t split = reply.rfind('\n');
+        last = reply.substr(split == std::string::npos ? 0 : split + 1);
+        texts += split == std::string::npos ? "" : reply.substr(0, split + 1);
+        if (last != OK)
+            break;
+    }
+    return framed(texts + last);
+}
+
+std::string AtModem::answerTo(const std::string& command)
+{
+    if (command.empty())
+        return OK;
+    for (const Row& row : ROWS) {
+        const std::string known = row.command;
+        const bool takesArgument = known.back() == '=' || (known.size() == 1 && known != "I");
+        if (takesArgument ? command.compare(0, known.size(), known) != 0 : command != known)
+            continue;
+        return row.text != nullptr ? row.text : (this->*row.handler)(command.substr(known.size()));
+    }
+    return ERROR;
+}
+
+bool AtModem::isLocked() const
+{
+    return !state_.pin.empty();
+}
+
+std::string AtModem::cardError() const
+{
+    if (!state_.hasSim)
+        return SIM_NOT_INSERTED;
+    if (!isLocked())
+        return "";
+    return state_.pinRetries > 0 ? SIM_PIN_REQUIRED : SIM_PUK_REQUIRED;
+}
+
+int AtModem::registration() const
+{
+    return cardError().empty() ? state_.registration : 0;
+}
+
+std::string AtModem::registrationLine(const std::string& command, const std::string& mode) const
+{
+    const int stat = registration();
+    const bool isRegistered = stat == 1 || stat == 5;
+    const auto asked = reports_.find(command);
+    const bool hasPlace = isRegistered && asked != reports_.end() && asked->second == "2";
+    return command + ": " + mode + std::to_string(stat) +
+           (hasPlace ? ",\"1234\",\"001122BB\",7" : "");
+}
+
+std::string AtModem::imei(const std::string&)
+{
+    return information(state_.imei);
+}
+
+std::string AtModem::imsi(const std::string&)
+{
+    return cardError().empty() ? information(state_.imsi) : cardError();
+}
+
+std::string AtModem::number(const std::string&)
+{
+    if (!cardError().empty() || state_.number.empty())
+        return cardError().empty() ? OK : cardError();
+    return information("+CNUM: \"\",\"" + state_.number + "\"," +
+                       (state_.number.front() == '+' ? "145" : "129"));
+}
+
+std::string AtModem::lock(const std::string&)
+{
+    if (!state_.hasSim)
+        return SIM_NOT_INSERTED;
+    if (!isLocked())
+        return information("+CPIN: READY");
+    return information(state_.pinRetries > 0 ? "+CPIN: SIM PIN" : "+CPIN: SIM PUK");
+}
+
+std::string AtModem::unlock(const std::string& argument)
+{
+    if (state_.pinRetries > 0 && argument == "\"" + state_.pin + "\"") {
+        state_.pin.clear();
+        return OK;
+    }
+    state_.pinRetries = std::max(0, state_.pinRetries - 1);
+    return INCORRECT_PASSWORD;
+}
+
+std::string AtModem::facility(const std::string& argument)
+{
+    if (argument.compare(0, 6, "\"SC\",2") != 0)
+        return ERROR;
+    return information(isLocked() ? "+CLCK: 1" : "+CLCK: 0");
+}
+
+// VERIFY and UNBLOCK CHV without data (51.011, 9.2.9 and 9.2.13): the card tells the retries left.
+std::string AtModem::retries(const std::string& argument)
+{
+    const bool unblock = argument.find("\"002C") != std::string::npos;
+    const int left = unblock ? state_.pukRetries : state_.pinRetries;
+    return information(std::string("+CSIM: 4,\"63C") + "0123456789ABCDEF"[left] + "\"");
+}
+
+// READ BINARY of the card's number, of the length of its MNC, and of its operator's name
+// (51.011, 10.1.1, 10.3.18 and 10.3.11); no other file is there.
+std::string AtModem::file(const std::string& argument)
+{
+    if (!cardError().empty())
+        return cardError();
+    std::string content;
+    if (argument.compare(0, 9, "176,12258") == 0)
+        content = swapped("8901010123456789012");
+    else if (argument.compare(0, 9, "176,28589") == 0)
+        content = "0000000" + std::to_string(state_.mncLength);
+    else if (argument.compare(0, 9, "176,28486") == 0)
+        content = "0153494D" + std::string(26, 'F');
+    else
+        return information("+CRSM: 148,4");
+    return information("+CRSM: 144,0,\"" + content + "\"");
+}
+
+std::string AtModem::operatorName(const std::string&)
+{
+    if (registration() != 1 && registration() != 5)
+        return information("+COPS: 0");
+    return information("+COPS: 0,2,\"" + state_.network + "\",7");
+}
+
+std::string AtModem::attached(const std::string&)
+{
+    return information(registration() == 1 || registration() == 5 ? "+CGATT: 1" : "+CGATT: 0");
+}
+
+std::string AtModem::messageFormats(const std::string&)
+{
+    return state_.hasMessages ? information("+CNMI: (0-2),(0-3),(0,2),(0-2),(0,1)") : ERROR;
+}
+
+template <int DOMAIN>
+std::string AtModem::readRegistration(const std::string&)
+{
+    const auto report = reports_.find(DOMAINS[DOMAIN]);
+    const std::string mode = report != reports_.end() ? report->second : "0";
+    return information(registrationLine(DOMAINS[DOMAIN], mode + ","));
+}
+
+template <int DOMAIN>
+std::string AtModem::reportRegistration(const std::string& argument)
+{
+    reports_[DOMAINS[DOMAIN]] = argument;
+    return OK;
+}

@@ -1,0 +1,94 @@
+// SPDX-License-Identifier: Apache-2.0
+// A simulated modem that speaks AT commands (3GPP TS 27.007, 27.005, 51.011).
+#ifndef TESTS_SUPPORT_AT_MODEM_H
+#define TESTS_SUPPORT_AT_MODEM_H
+
+#include <functional>
+#include <map>
+#include <mutex>
+#include <string>
+#include <thread>
+#include <vector>
+
+/// Listens on an abstract socket, as ModemManager's virtual ports do, from construction to
+/// destruction. Any number of connections; any thread.
+class AtModem {
+public:
+    struct State {
+        std::string imei = "490154203237518";
+        bool hasSim = true;
+        std::string imsi = "001010123456789";
+        int mncLength = 2;
+        std::string number = "+15551230001"; // empty: none on the card
+        std::string pin;                     // what the card asks for; empty: nothing
+        int pinRetries = 3;                  // with none left it asks for the PUK
+        int pukRetries = 10;
+        int registration = 1; // <stat> of +CREG: 1 home, 2 searching, 3 denied, 5 roaming
+        std::string network = "00101";
+        bool hasMessages = true;
+    };
+
+    AtModem(const std::string& name, const State& state);
+    ~AtModem();
+    AtModem(const AtModem&) = delete;
+    AtModem& operator=(const AtModem&) = delete;
+
+    /// As ModemManager takes it.
+    const std::string& port() const
+    {
+        return port_;
+    }
+    /// Changes the state and says by itself what a real modem would.
+    void change(const std::function<void(State&)>& edit);
+
+private:
+    using Handler = std::string (AtModem::*)(const std::string& argument);
+    struct Row;
+    struct Caller {
+        int descriptor;
+        std::string received;
+    };
+
+    void serve();
+    void acceptCaller();
+    bool hear(Caller& caller);
+    void say(const std::string& text) const;
+
+    std::string answer(const std::string& line);
+    std::string answerTo(const std::string& command);
+
+    bool isLocked() const;
+    std::string cardError() const;
+    int registration() const;
+    std::string registrationLine(const std::string& command, const std::string& mode) const;
+
+    std::string imei(const std::string&);
+    std::string imsi(const std::string&);
+    std::string number(const std::string&);
+    std::string lock(const std::string&);
+    std::string unlock(const std::string& argument);
+    std::string facility(const std::string& argument);
+    std::string retries(const std::string& argument);
+    std::string file(const std::string& argument);
+    std::string operatorName(const std::string&);
+    std::string attached(const std::string&);
+    std::string messageFormats(const std::string&);
+    template <int DOMAIN>
+    std::string readRegistration(const std::string&);
+    template <int DOMAIN>
+    std::string reportRegistration(const std::string& argument);
+
+    static const Row ROWS[];
+
+    const std::string port_;
+    const int socket_;
+    const int stop_;
+    std::mutex mutex_;
+    State state_;
+    std::map<std::string, std::string> reports_; // "+CREG" and its kind, and how much they report
+    bool namesAsNumbers_ = false;
+    std::vector<Caller> callers_;
+    std::thread thread_;
+};
+
+#endif

@@ -1,0 +1,213 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "support/ModemsOnBus.h"
+
+#include <csignal>
+#include <stdexcept>
+
+#include <fcntl.h>
+#include <sys/prctl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "linux/ModemManager.h"
+
+using port::linux_backend::Bus;
+using port::linux_backend::Modem;
+using port::linux_backend::MODEM_MANAGER;
+
+namespace {
+
+const char DAEMON[] = "/usr/sbin/ModemManager";
+const char POLICY_DAEMON[] = "/usr/lib/polkit-1/polkitd";
+constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
+
+GDBusConnection* connectTo(const std::string& address)
+{
+    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
+        address.c_str(),
+        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+        nullptr, nullptr, nullptr);
+    if (connection == nullptr)
+        throw std::runtime_error("no bus at " + address);
+    g_dbus_connection_set_exit_on_close(connection, FALSE);
+    return connection;
+}
+
+// The object of the modem on a device; empty while its state is not known yet.
+std::string settledModem(const std::string& device)
+{
+    Bus bus;
+    const auto reply = bus.ask(port::linux_backend::objectsBelow(MODEM_MANAGER));
+    if (!reply)
+        return "";
+    const auto modems = port::linux_backend::modemsIn(reply.value());
+    if (!modems)
+        return "";
+    for (const Modem& modem : modems.value()) {
+        const auto state = modem.state();
+        if (modem.device() == device && state && state.value() != MM_MODEM_STATE_UNKNOWN &&
+            state.value() != MM_MODEM_STATE_INITIALIZING)
+            return modem.path();
+    }
+    return "";
+}
+
+void onSignal(GDBusConnection*, const char*, const char*, const char*, const char*, GVariant*,
+              gpointer)
+{
+    // The context has run, which is all.
+}
+
+gboolean onTimeout(gpointer isOver)
+{
+    *static_cast<bool*>(isOver) = true;
+    return G_SOURCE_CONTINUE;
+}
+
+} // namespace
+
+ModemsOnBus::ModemsOnBus() : context_(g_main_context_new())
+{
+    // Only the policy daemon may let somebody switch a modem on.
+    bus_.addActivatable("org.freedesktop.PolicyKit1", std::string(POLICY_DAEMON) + " --no-debug");
+    bus_.start();
+    connection_ = connectTo(bus_.address());
+    start();
+}
+
+ModemsOnBus::~ModemsOnBus()
+{
+    kill();
+    g_dbus_connection_close_sync(connection_, nullptr, nullptr);
+    g_object_unref(connection_);
+    g_main_context_unref(context_);
+}
+
+std::string ModemsOnBus::obstacle()
+{
+    if (access(DAEMON, X_OK) != 0 || access(POLICY_DAEMON, X_OK) != 0)
+        return "needs ModemManager and polkitd (packages modemmanager, polkitd)";
+    return geteuid() == 0 ? "" : "needs root, whom polkitd lets switch a modem on";
+}
+
+void ModemsOnBus::run() const
+{
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
+    const int log = open(tree_.path("/log").c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+    if (log >= 0 && dup2(log, STDOUT_FILENO) >= 0 && dup2(log, STDERR_FILENO) >= 0)
+        execl(DAEMON, DAEMON, "--test-enable", "--test-no-udev", "--test-no-qrtr",
+              "--test-no-suspend-resume", "--log-level=WARN", static_cast<char*>(nullptr));
+    _exit(127);
+}
+
+void ModemsOnBus::start()
+{
+    process_ = fork();
+    if (process_ == 0)
+        run();
+    if (!waitUntil([this] { return hasName(); }))
+        throw std::runtime_error("ModemManager does not start");
+}
+
+void ModemsOnBus::kill()
+{
+    if (process_ == 0)
+        return;
+    ::kill(process_, SIGKILL);
+    waitpid(process_, nullptr, 0);
+    process_ = 0;
+}
+
+void ModemsOnBus::freeze() const
+{
+    ::kill(process_, SIGSTOP);
+    waitpid(process_, nullptr, WUNTRACED);
+}
+
+void ModemsOnBus::thaw() const
+{
+    ::kill(process_, SIGCONT);
+}
+
+bool ModemsOnBus::hasName() const
+{
+    GVariant* const reply =
+        call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
+             "NameHasOwner", g_variant_new("(s)", MODEM_MANAGER.name));
+    gboolean has = FALSE;
+    g_variant_get(reply, "(b)", &has);
+    g_variant_unref(reply);
+    return has != FALSE;
+}
+
+GVariant* ModemsOnBus::call(const std::string& name, const std::string& path, const char* interface,
+                            const char* method, GVariant* arguments) const
+{
+    GError* error = nullptr;
+    GVariant* const reply = g_dbus_connection_call_sync(
+        connection_, name.c_str(), path.c_str(), interface, method, arguments, nullptr,
+        G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, &error);
+    if (reply == nullptr) {
+        const std::string reason = error->message;
+        g_error_free(error);
+        throw std::runtime_error(std::string(method) + ": " + reason);
+    }
+    return reply;
+}
+
+void ModemsOnBus::setProfile(const std::string& id, const std::string& port) const
+{
+    const char* const ports[] = {port.c_str(), nullptr};
+    g_variant_unref(call(MODEM_MANAGER.name, MODEM_MANAGER.path, MM_DBUS_INTERFACE ".Test",
+                         "SetProfile", g_variant_new("(ss^as)", id.c_str(), "generic", ports)));
+}
+
+AtModem& ModemsOnBus::plugIn(const std::string& id, const AtModem::State& state)
+{
+    auto& modem = modems_[id];
+    modem.reset(); // before another listens in its place
+    modem = std::make_unique<AtModem>(id, state);
+    setProfile(id, modem->port());
+    return *modem;
+}
+
+AtModem& ModemsOnBus::add(const std::string& id, const AtModem::State& state)
+{
+    AtModem& modem = plugIn(id, state);
+    if (!waitUntil([&] { return !settledModem("/virtual/" + id).empty(); }))
+        throw std::runtime_error("ModemManager does not take the modem " + id);
+    return modem;
+}
+
+void ModemsOnBus::unplug(const std::string& id)
+{
+    setProfile(id, "abstract:nobody-listens");
+}
+
+void ModemsOnBus::enable(const std::string& id) const
+{
+    g_variant_unref(call(MODEM_MANAGER.name, settledModem("/virtual/" + id),
+                         MM_DBUS_INTERFACE_MODEM, "Enable", g_variant_new("(b)", TRUE)));
+}
+
+bool ModemsOnBus::waitUntil(const std::function<bool()>& condition) const
+{
+    bool isOver = false;
+    g_main_context_push_thread_default(context_);
+    const guint subscription =
+        g_dbus_connection_signal_subscribe(connection_, nullptr, nullptr, nullptr, nullptr, nullptr,
+                                           G_DBUS_SIGNAL_FLAGS_NONE, &onSignal, nullptr, nullptr);
+    GSource* const timer = g_timeout_source_new(PATIENCE_MS);
+    g_source_set_callback(timer, &onTimeout, &isOver, nullptr);
+    g_source_attach(timer, context_);
+    // Subscribed before the first look, so that no change is missed.
+    bool isMet = condition();
+    for (; !isMet && !isOver; isMet = condition())
+        g_main_context_iteration(context_, TRUE);
+    g_source_destroy(timer);
+    g_source_unref(timer);
+    g_dbus_connection_signal_unsubscribe(connection_, subscription);
+    g_main_context_pop_thread_default(context_);
+    return isMet;
+}
