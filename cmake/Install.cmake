@@ -9,11 +9,12 @@ install(TARGETS coresystem platform coreutil EXPORT coresystem)
 install(TARGETS coreutil_cipher LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 
 install(FILES ${PROJECT_SOURCE_DIR}/include/CoreSystem.h
+              ${PROJECT_SOURCE_DIR}/include/IConnectionStateListener.h
               ${PROJECT_SOURCE_DIR}/port/include/coresystem_port.h TYPE INCLUDE)
 # The platform's own headers that the public ones include; an SDK has them, an ordinary machine has not.
 set(platform_headers_dir ${CMAKE_INSTALL_INCLUDEDIR}/coresystem-platform)
 foreach(header TelCall TelNetwork TelSim telephony telephony_common telephony_modem telephony_network
-    telephony_sim tizen tizen_error tizen_type)
+    telephony_sim tizen tizen_error tizen_type wifi)
   install(FILES ${PROJECT_SOURCE_DIR}/port/api/${header}.h DESTINATION ${platform_headers_dir})
 endforeach()
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/port/coreutil/include/

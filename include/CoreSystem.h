@@ -4,6 +4,7 @@
 #ifndef CORESYSTEM_CORE_SYSTEM_H
 #define CORESYSTEM_CORE_SYSTEM_H
 
+#include <ctime>
 #include <string>
 #include <vector>
 
@@ -11,6 +12,8 @@
 #include <TelNetwork.h>
 #include <TelSim.h>
 #include <telephony.h>
+
+#include "IConnectionStateListener.h"
 
 #if defined(__GNUC__)
 #define CORESYSTEM_API __attribute__((visibility("default")))
@@ -72,6 +75,14 @@ public:
     /// \return 0 or a system information error, as GetTizenIdN().
     CORESYSTEM_API int GetModelName(char** modelName);
 
+    /// The serial number of the device's board, which the device daemon tells on the system bus.
+    /// Blocks until the daemon replies, at most for the bus library's own time-out (25 seconds).
+    /// \param[out] id the serial number; null on failure. Although it is const, the caller releases
+    ///             it with `free`.
+    /// \return 0, 1 no connection to the system bus, 2 no reply, an error reply or one without a
+    ///         text, 3 connecting took too long. A failure also writes error lines to the log.
+    CORESYSTEM_API int GetDeviceUniqueID(const char** id);
+
     /// \}
     /// \name Display language
     /// \{
@@ -87,6 +98,57 @@ public:
     /// read
     ///         `languageCode` is that of the default language, "EN" or "eng".
     CORESYSTEM_API int GetDeviceLanguageCode(char** languageCode, bool convertToISO639);
+
+    /// \}
+    /// \name Settings and status
+    /// A switch that cannot be read is off.
+    /// \{
+
+    /// Whether all radios are switched off together.
+    CORESYSTEM_API bool IsFlightMode();
+    /// Whether data over the cellular network is allowed abroad.
+    CORESYSTEM_API bool IsDataRoamingEnabled();
+    /// Whether data over the cellular network is switched on.
+    CORESYSTEM_API bool IsMobileData();
+
+    /// The sales code of the device's country-specific configuration.
+    /// \return the code, which the caller releases with `free`; null when the device has none.
+    CORESYSTEM_API char* GetCSC();
+
+    /// \}
+    /// \name Packages and storage
+    /// \{
+
+    /// The version of an installed package.
+    /// \param packageId the package's name, compared exactly.
+    /// \param[out] version a copy of the version text; left as it was on failure.
+    /// \return 0 or a package error: -18153359 no such package, -22 null name, -5 the packages
+    ///         cannot be read, -13 permission denied. A failure also writes an error line to the
+    ///         log.
+    CORESYSTEM_API int GetPackageVersion(const char* packageId, char** version);
+
+    /// Whether more than `requiredMegabytes` (of 1,048,576 bytes) of the internal storage are free
+    /// for applications; false for exactly as much, for a NaN, and when the storage cannot be read.
+    CORESYSTEM_API bool IsSystemMemoryAvailable(double requiredMegabytes);
+
+    /// \}
+    /// \name Connections
+    /// \{
+
+    /// Whether the device has a data connection: over the cellular network, over Wi-Fi when
+    /// `checkWifi`, over Bluetooth when `checkBT`. A network that can be had and is not connected
+    /// does not count, nor does one that cannot be read.
+    CORESYSTEM_API bool IsNetworkConnected(bool checkWifi, bool checkBT);
+
+    /// Sets the one listener that is told of connection changes, in place of the one before; null
+    /// ends it.
+    ///
+    /// The listener stays the caller's, who keeps it alive until null was set. On an ordinary Linux
+    /// machine no call of it runs on another thread any more when setting null returns; on a device
+    /// make sure of that before it is destroyed. Each call writes one plain line to the log.
+    /// \param userData is passed on to every call of the listener, unchanged.
+    CORESYSTEM_API void SetConnectionEventListener(IConnectionStateListener* listener,
+                                                   void* userData);
 
     /// \}
     /// \name SIM cards
@@ -255,6 +317,18 @@ private:
     int GetTagStartPosition(const std::string& value, const std::string& tag);
     std::string GetValueFromPosition(const std::string& value, int start, int end);
     void GetISO639LangCodeFromDeviceLang(const std::string& upperCode, const char** iso639);
+
+    // The platform's font size, 0 small to 4 giant, and its settings error code.
+    int GetFontSize(int* fontSize);
+    // Local time, broken down, and the platform's alarm error code.
+    int GetCurrentTime(struct tm* currentTime);
+    // Whether the platform knows the package.
+    bool IsPackageInstalled(const char* packageName);
+
+    // States as the connection enumerations number them.
+    int GetCellularNetworkState();
+    int GetWifiNetworkState();
+    int GetBTNetworkState();
 
     // Whether slots 0 and 1 both hold an available card.
     bool IsDualSimAvailable();

@@ -7,11 +7,19 @@
 #include <ctime>
 #include <new>
 
+#include <app_alarm.h>
+#include <package_info.h>
+#include <package_manager.h>
+#include <runtime_info.h>
+#include <storage.h>
 #include <system_info.h>
 #include <system_settings.h>
+#include <vconf.h>
 
 #include <CoreUtil.h>
 
+#include "ConnectionManager.h"
+#include "DBusManager.h"
 #include "Log.h"
 #include "SimManager.h"
 #include "Singleton.h"
@@ -37,6 +45,36 @@ int readPlatformString(const char* key, char** slot, const LogSite& site, const 
     *slot = value;
     DEBUG_LINE_AT(site, resultFormat, *slot);
     return result;
+}
+
+// Reads a switch; one that cannot be read is off, whatever the platform says of it.
+template <class Key>
+bool readSwitch(int (*read)(Key, bool*), Key key, const LogSite& site, const char* on,
+                const char* off)
+{
+    bool isOn = false;
+    read(key, &isOn);
+    DEBUG_LINE_AT(site, "%s", isOn ? on : off);
+    return isOn;
+}
+
+// Null for a number that is no font size.
+const char* lineOfFontSize(int fontSize)
+{
+    switch (fontSize) {
+    case SYSTEM_SETTINGS_FONT_SIZE_SMALL:
+        return "FontSize is small";
+    case SYSTEM_SETTINGS_FONT_SIZE_NORMAL:
+        return "FontSize is normal";
+    case SYSTEM_SETTINGS_FONT_SIZE_LARGE:
+        return "FontSize is large";
+    case SYSTEM_SETTINGS_FONT_SIZE_HUGE:
+        return "FontSize is huge";
+    case SYSTEM_SETTINGS_FONT_SIZE_GIANT:
+        return "FontSize is giant";
+    default:
+        return nullptr;
+    }
 }
 
 // ASCII only, whatever the locale.
@@ -606,4 +644,154 @@ bool CoreSystem::GetSimInfo(const char* cpName, std::string* mcc, std::string* m
 bool CoreSystem::GetPhoneNumber(telephony_data** handle, char** number)
 {
     return SimManager::GetInstance()->GetPhoneNumber(handle, number);
+}
+
+bool CoreSystem::IsFlightMode()
+{
+    DEBUG_LINE("CoreSystem::IsFlightMode");
+    return readSwitch(&runtime_info_get_value_bool, RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, LOG_SITE,
+                      "FlightMode ON", "FlightMode OFF");
+}
+
+bool CoreSystem::IsDataRoamingEnabled()
+{
+    DEBUG_LINE("CoreSystem::IsDataRoamingEnabled");
+    return readSwitch(&runtime_info_get_value_bool, RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED, LOG_SITE,
+                      "DataRoaming ON", "DataRoaming OFF");
+}
+
+bool CoreSystem::IsMobileData()
+{
+    DEBUG_LINE("CoreSystem::IsMobileData");
+    return readSwitch(&system_settings_get_value_bool, SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED,
+                      LOG_SITE, "MobileData ON", "MobileData OFF");
+}
+
+char* CoreSystem::GetCSC()
+{
+    DEBUG_LINE("CoreSystem::GetCSC");
+    return vconf_get_str(VCONFKEY_CSC_SALESCODE);
+}
+
+int CoreSystem::GetFontSize(int* fontSize)
+{
+    DEBUG_LINE("CoreSystem::GetFontSize");
+    int value = 0;
+    const int result = system_settings_get_value_int(SYSTEM_SETTINGS_KEY_FONT_SIZE, &value);
+    *fontSize = value; // also after a failed read: meant
+    const char* const line = lineOfFontSize(value);
+    if (line != nullptr)
+        DEBUG_LINE("%s", line);
+    return result;
+}
+
+int CoreSystem::GetCurrentTime(struct tm* currentTime)
+{
+    DEBUG_LINE("CoreSystem::GetCurrentTime");
+    struct tm now = {};
+    const int result = alarm_get_current_time(&now);
+    *currentTime = now; // also after a failed read: meant
+    DEBUG_LINE("currentTime : day %d,  %d:%d:%d", now.tm_mday, now.tm_hour, now.tm_min, now.tm_sec);
+    return result;
+}
+
+int CoreSystem::GetPackageVersion(const char* packageId, char** version)
+{
+    DEBUG_LINE("CoreSystem::GetPackageVersion");
+    package_info_h info = nullptr;
+    int result = package_info_create(packageId, &info);
+    if (result != PACKAGE_MANAGER_ERROR_NONE) {
+        ERROR_LINE("package_info_create failed [%d]", result);
+        return result;
+    }
+    char* text = nullptr;
+    result = package_info_get_version(info, &text);
+    if (result != PACKAGE_MANAGER_ERROR_NONE) {
+        ERROR_LINE("package_info_get_version failed [%d]", result);
+        return result; // the handle stays: meant
+    }
+    package_info_destroy(info);
+    *version = copyOf(text); // the platform's own text is never released: meant
+    DEBUG_LINE("packageVersion : %s", *version);
+    return PACKAGE_MANAGER_ERROR_NONE;
+}
+
+bool CoreSystem::IsPackageInstalled(const char* packageName)
+{
+    if (isEmpty(packageName)) {
+        ERROR_LINE("PackageName is empty. IsPackageInstalled finish.");
+        return false;
+    }
+    // Of the size only the result code counts: it tells whether there is such a package.
+    const int result = package_manager_get_package_size_info(packageName, nullptr, nullptr);
+    if (result == PACKAGE_MANAGER_ERROR_NONE) {
+        DEBUG_LINE("Package [%s] is installed", packageName);
+        return true;
+    }
+    if (result == PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE)
+        ERROR_LINE("No Such Package [%s]", packageName);
+    else
+        ERROR_LINE("Other Error Case.. [package_manager_error_e] code is %d", result);
+    return false;
+}
+
+bool CoreSystem::IsSystemMemoryAvailable(double requiredMegabytes)
+{
+    DEBUG_LINE("CoreSystem IsSystemMemoryAvailable");
+    struct statvfs fs = {};
+    if (storage_get_internal_memory_size(&fs) < 0) {
+        ERROR_LINE("Fail to get internal memory size");
+        return false;
+    }
+    // Multiplied as doubles: the fields have 32 bits on a device, and volumes are larger than that.
+    const double available = static_cast<double>(fs.f_bsize) * static_cast<double>(fs.f_bavail);
+    const double total = static_cast<double>(fs.f_frsize) * static_cast<double>(fs.f_blocks);
+    const double availableMegabytes = available / 1048576.0;
+    DEBUG_LINE("Total Memory : %lf byte, Avail Memory : %lf byte", total, available);
+    DEBUG_LINE("[convert] Avail Memory : %lf mb(%lf gb) ", availableMegabytes,
+               availableMegabytes / 1024.0);
+    if (availableMegabytes > requiredMegabytes) {
+        DEBUG_LINE("Avail Memory is upper %lf", requiredMegabytes);
+        return true;
+    }
+    DEBUG_LINE("Total mem under %lf", requiredMegabytes);
+    return false;
+}
+
+bool CoreSystem::IsNetworkConnected(bool checkWifi, bool checkBT)
+{
+    DEBUG_LINE("CoreSystem IsNetworkConnected");
+    return ConnectionManager::GetInstance()->IsNetworkConnected(checkWifi, checkBT);
+}
+
+int CoreSystem::GetCellularNetworkState()
+{
+    DEBUG_LINE("CoreSystem GetCellularNetworkState");
+    return ConnectionManager::GetInstance()->GetCellularNetworkState();
+}
+
+int CoreSystem::GetWifiNetworkState()
+{
+    DEBUG_LINE("CoreSystem GetWifiNetworkState");
+    return ConnectionManager::GetInstance()->GetWifiNetworkState();
+}
+
+int CoreSystem::GetBTNetworkState()
+{
+    DEBUG_LINE("CoreSystem GetBTNetworkState");
+    return ConnectionManager::GetInstance()->GetBTNetworkState();
+}
+
+void CoreSystem::SetConnectionEventListener(IConnectionStateListener* listener, void* userData)
+{
+    DEBUG_LINE("CoreSystem SetConnectionEventListener");
+    ConnectionManager::GetInstance()->SetConnectionEventListener(listener, userData);
+}
+
+int CoreSystem::GetDeviceUniqueID(const char** id)
+{
+    DEBUG_LINE("CoreSystem::GetDeviceUniqueID");
+    const int result = DBusManager::GetInstance()->GetDeviceUniqueID(const_cast<char**>(id));
+    DEBUG_LINE("DeviceUniqueID : %s", *id);
+    return result;
 }

@@ -3,6 +3,7 @@
 //
 //   DEBUG_LINE("deviceName : %s, ret : %d", name, ret);   only in debug mode, body enciphered
 //   ERROR_LINE("mcc is invalid");                         always, plain text
+//   NOTICE_LINE("Set Connection Change Callback");        always, plain text, at DLOG_INFO
 //
 // A source file whose lines carry another tag than "CoreSystem" defines CORESYSTEM_DEFAULT_TAG
 // before it includes this header.
@@ -40,6 +41,8 @@
     } while (false)
 
 #define ERROR_LINE(...) ::coresystem::writeErrorLine(LOG_SITE, LOG_PREFIX __VA_ARGS__)
+
+#define NOTICE_LINE(...) ::coresystem::writePlainLine(DLOG_INFO, LOG_SITE, LOG_PREFIX __VA_ARGS__)
 
 namespace coresystem {
 
@@ -94,10 +97,17 @@ writeDebugLine(const LogSite& site, const char* format, ...)
 
 // The format is one literal that begins with LOG_PREFIX.
 template <typename... Arguments>
-CORESYSTEM_COLD void writeErrorLine(const LogSite& site, const char* format, Arguments... arguments)
+CORESYSTEM_COLD void writePlainLine(int priority, const LogSite& site, const char* format,
+                                    Arguments... arguments)
 {
-    __dlog_print(LOG_ID_MAIN, DLOG_ERROR, logTag(site), format, logFileName(site),
-                 site.functionName, site.lineNumber, arguments...);
+    __dlog_print(LOG_ID_MAIN, priority, logTag(site), format, logFileName(site), site.functionName,
+                 site.lineNumber, arguments...);
+}
+
+template <typename... Arguments>
+void writeErrorLine(const LogSite& site, const char* format, Arguments... arguments)
+{
+    writePlainLine(DLOG_ERROR, site, format, arguments...);
 }
 
 } // namespace coresystem

@@ -10,9 +10,14 @@
 #include <ITapiNetText.h>
 #include <ITapiNetwork.h>
 #include <ITapiSim.h>
+#include <app_alarm.h>
 #include <dlog.h>
+#include <net_connection.h>
+#include <package_manager.h>
+#include <storage.h>
 #include <system_info.h>
 #include <system_settings.h>
+#include <vconf.h>
 
 using namespace fake;
 
@@ -21,6 +26,10 @@ struct telephony_data {
 };
 
 struct tapi_handle {
+    std::string name;
+};
+
+struct package_info_s {
     std::string name;
 };
 
@@ -127,6 +136,22 @@ TapiHandle* handleOfModem(const char* name)
     return &modems.try_emplace(key, tapi_handle{key}).first->second;
 }
 
+package_info_h handleOfPackage(const std::string& name)
+{
+    static std::mutex mutex;
+    static auto& packages = *new std::map<std::string, package_info_s>;
+    const std::lock_guard<std::mutex> lock(mutex);
+    return &packages.try_emplace(name, package_info_s{name}).first->second;
+}
+
+char connectionHandle = 'c';
+
+// "connection" for the one there is.
+const char* nameOf(connection_h connection)
+{
+    return connection == &connectionHandle ? "connection" : "no connection";
+}
+
 std::string nameOf(const TapiHandle* handle)
 {
     return handle != nullptr ? "modem " + handle->name : "no modem";
@@ -137,6 +162,11 @@ std::string nameOf(const TapiHandle* handle)
 void fake::writeArgument(std::ostream& out, telephony_h handle)
 {
     out << "slot " << handle->slot;
+}
+
+void fake::writeArgument(std::ostream& out, package_info_h handle)
+{
+    out << "package " << handle->name;
 }
 
 void fake::writeArgument(std::ostream& out, TapiHandle* handle)
@@ -156,6 +186,7 @@ void FakePlatform::reset()
     answers_.clear();
     handles_.clear();
     setModems(std::nullopt);
+    callbacks = {};
     debugMode = 0;
     tag.reset();
     cipherThrows = false;
@@ -432,6 +463,156 @@ int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferr
 int tel_check_sms_device_status(TapiHandle* handle, int* ready)
 {
     return platform().reply(ready, "tel_check_sms_device_status", handle);
+}
+
+int system_settings_get_value_bool(system_settings_key_e key, bool* value)
+{
+    return platform().reply(value, "system_settings_get_value_bool", key);
+}
+
+int system_settings_get_value_int(system_settings_key_e key, int* value)
+{
+    return platform().reply(value, "system_settings_get_value_int", key);
+}
+
+int runtime_info_get_value_bool(runtime_info_key_e key, bool* value)
+{
+    return platform().reply(value, "runtime_info_get_value_bool", key);
+}
+
+int runtime_info_get_value_int(runtime_info_key_e key, int* value)
+{
+    return platform().reply(value, "runtime_info_get_value_int", key);
+}
+
+int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback,
+                                void* user_data)
+{
+    platform().callbacks.runtime[key] = {callback, user_data};
+    return platform().call("runtime_info_set_changed_cb", key);
+}
+
+int runtime_info_unset_changed_cb(runtime_info_key_e key)
+{
+    platform().callbacks.runtime.erase(key);
+    return platform().call("runtime_info_unset_changed_cb", key);
+}
+
+int wifi_initialize(void)
+{
+    return platform().call("wifi_initialize");
+}
+
+int wifi_set_device_state_changed_cb(wifi_device_state_changed_cb callback, void* user_data)
+{
+    platform().callbacks.wifiDevice = callback;
+    platform().callbacks.wifiDeviceData = user_data;
+    return platform().call("wifi_set_device_state_changed_cb");
+}
+
+int wifi_unset_device_state_changed_cb(void)
+{
+    platform().callbacks.wifiDevice = nullptr;
+    return platform().call("wifi_unset_device_state_changed_cb");
+}
+
+int wifi_set_connection_state_changed_cb(wifi_connection_state_changed_cb callback, void* user_data)
+{
+    platform().callbacks.wifiConnection = callback;
+    platform().callbacks.wifiConnectionData = user_data;
+    return platform().call("wifi_set_connection_state_changed_cb");
+}
+
+int wifi_unset_connection_state_changed_cb(void)
+{
+    platform().callbacks.wifiConnection = nullptr;
+    return platform().call("wifi_unset_connection_state_changed_cb");
+}
+
+// The answer says whether a handle is made: 0 makes it.
+int connection_create(connection_h* connection)
+{
+    const AllocationPause pause;
+    const int result = platform().call("connection_create");
+    if (result == 0) {
+        *connection = &connectionHandle;
+        platform().addHandle(nameOf(*connection));
+    }
+    return result;
+}
+
+int connection_destroy(connection_h connection)
+{
+    const AllocationPause pause;
+    if (connection == &connectionHandle)
+        platform().removeHandle(nameOf(connection));
+    return platform().call("connection_destroy", nameOf(connection));
+}
+
+int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state)
+{
+    return platform().reply(state, "connection_get_cellular_state", nameOf(connection));
+}
+
+int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state)
+{
+    return platform().reply(state, "connection_get_wifi_state", nameOf(connection));
+}
+
+int connection_get_bt_state(connection_h connection, connection_bt_state_e* state)
+{
+    return platform().reply(state, "connection_get_bt_state", nameOf(connection));
+}
+
+char* vconf_get_str(const char* key)
+{
+    char* value = nullptr;
+    platform().reply(&value, "vconf_get_str", key);
+    return value;
+}
+
+int alarm_get_current_time(struct tm* date)
+{
+    return platform().reply(date, "alarm_get_current_time");
+}
+
+int storage_get_internal_memory_size(struct statvfs* buf)
+{
+    return platform().reply(buf, "storage_get_internal_memory_size");
+}
+
+// The answer says whether there is such a package: 0 makes a handle.
+int package_info_create(const char* package_id, package_info_h* info)
+{
+    const AllocationPause pause;
+    const int result = platform().call("package_info_create", package_id);
+    if (result == 0) {
+        *info = handleOfPackage(package_id);
+        platform().addHandle("package " + (*info)->name);
+    }
+    return result;
+}
+
+int package_info_get_version(package_info_h info, char** version)
+{
+    return platform().reply(version, "package_info_get_version", info);
+}
+
+int package_info_destroy(package_info_h info)
+{
+    const AllocationPause pause;
+    const int result = platform().call("package_info_destroy", info);
+    platform().removeHandle("package " + info->name);
+    return result;
+}
+
+int package_manager_get_package_size_info(const char* package_id,
+                                          package_manager_size_info_receive_cb callback,
+                                          void* user_data)
+{
+    EXPECT_EQ(callback, nullptr);
+    EXPECT_EQ(user_data, nullptr);
+    return platform().call("package_manager_get_package_size_info", package_id);
 }
 
 } // extern "C"

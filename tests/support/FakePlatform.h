@@ -26,8 +26,11 @@
 #include <string>
 #include <vector>
 
+#include <package_info.h>
+#include <runtime_info.h>
 #include <tapi_common.h>
 #include <telephony.h>
+#include <wifi.h>
 
 #include "FailingAllocation.h"
 #include "Ledger.h"
@@ -81,7 +84,18 @@ public:
     // Called after each event outside LOGGER and CIPHER, on the thread of the event.
     std::function<void(const Event&)> onEvent;
 
-    // The handles that nobody has released yet, sorted: "list of COUNT", "modem NAME".
+    // What is registered now; null for nothing.
+    struct Callbacks {
+        wifi_device_state_changed_cb wifiDevice = nullptr;
+        void* wifiDeviceData = nullptr;
+        wifi_connection_state_changed_cb wifiConnection = nullptr;
+        void* wifiConnectionData = nullptr;
+        std::map<int, std::pair<runtime_info_changed_cb, void*>> runtime; // by key
+    };
+    Callbacks callbacks;
+
+    // The handles that nobody has released yet, sorted: "connection", "list of COUNT", "modem
+    // NAME", "package NAME".
     Texts liveHandles() const;
     // The modem names that tel_get_cp_name_list() gives, ended by null; none gives null.
     void setModems(const std::optional<Texts>& names);
@@ -136,6 +150,8 @@ inline void writeArgument(std::ostream& out, const char* text)
 // "slot 0", "slot 1", ... of a handle of a list; "modem NAME" of a handle of tel_init().
 void writeArgument(std::ostream& out, telephony_h handle);
 void writeArgument(std::ostream& out, TapiHandle* handle);
+// "package NAME" of a handle of package_info_create().
+void writeArgument(std::ostream& out, package_info_h handle);
 template <class Value>
 void writeArgument(std::ostream& out, const Value& value)
 {
