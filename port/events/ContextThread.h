@@ -9,11 +9,9 @@
 #include <mutex>
 #include <thread>
 
-#include "../linux/GLibTypes.h"
+#include "../common/GLibTypes.h"
 
 namespace port {
-
-using linux_backend::Owned;
 
 /// The context is the thread's default one. Not to be used or destroyed by a task of its own.
 class ContextThread {

@@ -10,11 +10,9 @@
 #include <mutex>
 #include <thread>
 
-#include "../linux/GLibTypes.h"
+#include "../common/GLibTypes.h"
 
 namespace port {
-
-using linux_backend::Owned;
 
 class Registration : public std::enable_shared_from_this<Registration> {
 public:

@@ -31,14 +31,21 @@ public:
     /// of it: one line, and no other until the problem changes or goes away.
     Result<std::shared_ptr<const Device>> device();
 
-    /// One value of it; see Section::get().
-    template <typename T>
-    Result<Sourced<T>> get(const std::string& section, const std::string& key)
+    /// What a function of the device tells.
+    template <typename T, typename Function>
+    Result<Sourced<T>> ask(Function function)
     {
         const Result<std::shared_ptr<const Device>> now = device();
         if (!now)
             return now.error();
-        return now.value()->section(section).template get<T>(key);
+        return function(*now.value());
+    }
+
+    /// One value of it; see Section::get().
+    template <typename T>
+    Result<Sourced<T>> get(const std::string& section, const std::string& key)
+    {
+        return ask<T>([&](const Device& now) { return now.section(section).template get<T>(key); });
     }
 
 private:

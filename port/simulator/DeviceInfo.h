@@ -28,6 +28,10 @@ public:
     {
         return file_.get<std::string>("device", "model_name");
     }
+    Result<Fact> serial() override
+    {
+        return file_.get<std::string>("device", "serial");
+    }
 
 private:
     DeviceFile& file_;

@@ -20,6 +20,10 @@ public:
     {
         return file_.get<std::string>("settings", "language");
     }
+    Result<Sourced<FontSize>> fontSize() override
+    {
+        return file_.get<FontSize>("settings", "font_size");
+    }
 
 private:
     DeviceFile& file_;

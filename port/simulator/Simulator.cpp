@@ -1,9 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 // A device described in a TOML file.
 #include "../backend/Backend.h"
+#include "Clock.h"
+#include "Configuration.h"
 #include "DeviceFile.h"
 #include "DeviceInfo.h"
+#include "Network.h"
+#include "Packages.h"
 #include "Settings.h"
+#include "Storage.h"
 #include "Telephony.h"
 
 namespace port::simulator {
@@ -74,11 +79,11 @@ private:
     SimulatedDeviceInfo deviceInfo_{file_};
     SimulatedSettings settings_{file_};
     SimulatedTelephony telephony_{file_};
-    Network network_;
-    Storage storage_;
-    Packages packages_;
-    Configuration configuration_;
-    Clock clock_;
+    SimulatedNetwork network_{file_};
+    SimulatedStorage storage_{file_};
+    SimulatedPackages packages_{file_};
+    SimulatedConfiguration configuration_{file_};
+    SimulatedClock clock_{file_};
 };
 
 } // namespace

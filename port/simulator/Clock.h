@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: Apache-2.0
+// The machine's clock in the time zone of a device file.
+#ifndef PORT_SIMULATOR_CLOCK_H
+#define PORT_SIMULATOR_CLOCK_H
+
+#include "../backend/Clock.h"
+#include "DeviceFile.h"
+
+namespace port::simulator {
+
+/// A moment broken down at an offset in seconds east of UTC; the zone's name is the offset,
+/// "+0530".
+std::tm timeAt(std::time_t moment, std::int64_t offset);
+
+class SimulatedClock : public Clock {
+public:
+    explicit SimulatedClock(DeviceFile& file) : file_(file) {}
+
+    Result<Sourced<std::tm>> now() override;
+
+private:
+    DeviceFile& file_;
+};
+
+} // namespace port::simulator
+
+#endif

@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections from the sections [network] and [settings] of a device file.
+#ifndef PORT_SIMULATOR_NETWORK_H
+#define PORT_SIMULATOR_NETWORK_H
+
+#include "../backend/Network.h"
+#include "DeviceFile.h"
+
+namespace port::simulator {
+
+// What a key says holds, also in flight mode. A radio without a key is off in flight mode; a Wi-Fi
+// connection without one is as its radio's state tells.
+class SimulatedNetwork : public Network {
+public:
+    explicit SimulatedNetwork(DeviceFile& file) : file_(file) {}
+
+    Result<Sourced<CellularState>> cellular() override;
+    Result<Sourced<LinkState>> wifi() override;
+    Result<Sourced<WifiConnection>> wifiConnection() override;
+    Result<Sourced<LinkState>> bluetooth() override;
+    Result<Sourced<bool>> flightMode() override;
+    Result<Sourced<bool>> packetData() override;
+    Result<Sourced<bool>> mobileData() override;
+    Result<Sourced<bool>> dataRoaming() override;
+
+    std::unique_ptr<Watch> watch(std::function<void()> changed) override;
+
+private:
+    DeviceFile& file_;
+};
+
+} // namespace port::simulator
+
+#endif
