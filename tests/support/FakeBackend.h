@@ -10,15 +10,8 @@
 #include <vector>
 
 #include "backend/Backend.h"
-
-template <typename T>
-using Answer = port::Result<port::Sourced<T>>;
-
-template <typename T>
-Answer<T> answered(T value)
-{
-    return port::Sourced<T>{std::move(value), "test"};
-}
+#include "support/Answer.h"
+#include "support/FakeNetwork.h"
 
 class FakeTelephony : public port::Telephony {
 public:
@@ -89,9 +82,72 @@ private:
     std::mutex mutex_;
 };
 
+// One answer for each of the other interfaces.
+class FakeStorage : public port::Storage {
+public:
+    Answer<port::VolumeSize> internalAnswer = answered(port::VolumeSize{4096, 1024, 40, 5});
+
+    Answer<port::VolumeSize> internal() override
+    {
+        return internalAnswer;
+    }
+};
+
+class FakePackages : public port::Packages {
+public:
+    using Version = std::optional<std::string>;
+
+    std::function<Answer<Version>(const std::string&)> versionAnswer = [](const std::string&) {
+        return answered(Version("1.0"));
+    };
+
+    Answer<Version> version(const std::string& name) override
+    {
+        return versionAnswer(name);
+    }
+};
+
+class FakeConfiguration : public port::Configuration {
+public:
+    std::function<Answer<std::string>(const std::string&)> textAnswer = [](const std::string& key) {
+        return answered("value of " + key);
+    };
+
+    Answer<std::string> text(const std::string& key) override
+    {
+        return textAnswer(key);
+    }
+};
+
+class FakeClock : public port::Clock {
+public:
+    Answer<std::tm> nowAnswer = answered(std::tm{});
+
+    Answer<std::tm> now() override
+    {
+        return nowAnswer;
+    }
+};
+
+class FakeSettings : public port::Settings {
+public:
+    Answer<port::FontSize> fontSizeAnswer = answered(port::FontSize::Normal);
+
+    Answer<port::FontSize> fontSize() override
+    {
+        return fontSizeAnswer;
+    }
+};
+
 class FakeBackend : public port::Backend {
 public:
     FakeTelephony fakeTelephony;
+    FakeSettings fakeSettings;
+    FakeNetwork fakeNetwork;
+    FakeStorage fakeStorage;
+    FakePackages fakePackages;
+    FakeConfiguration fakeConfiguration;
+    FakeClock fakeClock;
 
     std::string name() const override
     {
@@ -103,7 +159,7 @@ public:
     }
     port::Settings& settings() override
     {
-        return settings_;
+        return fakeSettings;
     }
     port::Telephony& telephony() override
     {
@@ -111,23 +167,23 @@ public:
     }
     port::Network& network() override
     {
-        return network_;
+        return fakeNetwork;
     }
     port::Storage& storage() override
     {
-        return storage_;
+        return fakeStorage;
     }
     port::Packages& packages() override
     {
-        return packages_;
+        return fakePackages;
     }
     port::Configuration& configuration() override
     {
-        return configuration_;
+        return fakeConfiguration;
     }
     port::Clock& clock() override
     {
-        return clock_;
+        return fakeClock;
     }
     std::vector<coresystem_port::Service> findServices() override
     {
@@ -136,12 +192,6 @@ public:
 
 private:
     port::DeviceInfo deviceInfo_;
-    port::Settings settings_;
-    port::Network network_;
-    port::Storage storage_;
-    port::Packages packages_;
-    port::Configuration configuration_;
-    port::Clock clock_;
 };
 
 /// While it lives, this is the process's backend.

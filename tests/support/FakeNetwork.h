@@ -1,0 +1,124 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections that answer, and change, as a test says.
+#ifndef TESTS_SUPPORT_FAKE_NETWORK_H
+#define TESTS_SUPPORT_FAKE_NETWORK_H
+
+#include <functional>
+#include <memory>
+#include <mutex>
+#include <utility>
+
+#include "backend/Network.h"
+#include "support/Answer.h"
+
+class FakeNetwork : public port::Network {
+public:
+    struct Answers {
+        Answer<port::CellularState> cellular = answered(port::CellularState::OutOfService);
+        Answer<port::LinkState> wifi = answered(port::LinkState::Disconnected);
+        Answer<port::WifiConnection> wifiConnection = answered(port::WifiConnection::Disconnected);
+        Answer<port::LinkState> bluetooth = answered(port::LinkState::Deactivated);
+        Answer<bool> flightMode = answered(false);
+        Answer<bool> packetData = answered(false);
+        Answer<bool> mobileData = answered(false);
+        Answer<bool> dataRoaming = answered(false);
+    };
+
+    bool watchable = true;
+
+    /// Changes the answers, and tells whoever watches.
+    void change(const std::function<void(Answers&)>& edit)
+    {
+        {
+            const std::lock_guard<std::mutex> lock(mutex_);
+            edit(answers_);
+        }
+        tell();
+    }
+    void tell()
+    {
+        const std::lock_guard<std::mutex> lock(telling_);
+        if (changed_)
+            changed_();
+    }
+    int watches()
+    {
+        const std::lock_guard<std::mutex> lock(telling_);
+        return watches_;
+    }
+
+    Answer<port::CellularState> cellular() override
+    {
+        return get(&Answers::cellular);
+    }
+    Answer<port::LinkState> wifi() override
+    {
+        return get(&Answers::wifi);
+    }
+    Answer<port::WifiConnection> wifiConnection() override
+    {
+        return get(&Answers::wifiConnection);
+    }
+    Answer<port::LinkState> bluetooth() override
+    {
+        return get(&Answers::bluetooth);
+    }
+    Answer<bool> flightMode() override
+    {
+        return get(&Answers::flightMode);
+    }
+    Answer<bool> packetData() override
+    {
+        return get(&Answers::packetData);
+    }
+    Answer<bool> mobileData() override
+    {
+        return get(&Answers::mobileData);
+    }
+    Answer<bool> dataRoaming() override
+    {
+        return get(&Answers::dataRoaming);
+    }
+
+    std::unique_ptr<port::Watch> watch(std::function<void()> changed) override
+    {
+        if (!watchable)
+            return nullptr;
+        return std::make_unique<OneWatch>(*this, std::move(changed));
+    }
+
+private:
+    class OneWatch : public port::Watch {
+    public:
+        OneWatch(FakeNetwork& network, std::function<void()> changed) : network_(network)
+        {
+            const std::lock_guard<std::mutex> lock(network_.telling_);
+            ++network_.watches_;
+            network_.changed_ = std::move(changed);
+        }
+        ~OneWatch() override
+        {
+            const std::lock_guard<std::mutex> lock(network_.telling_);
+            --network_.watches_;
+            network_.changed_ = nullptr;
+        }
+
+    private:
+        FakeNetwork& network_;
+    };
+
+    template <typename T>
+    T get(T Answers::*answer)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        return answers_.*answer;
+    }
+
+    std::mutex mutex_;
+    Answers answers_;
+    std::mutex telling_; // held during a call, so that the end of a watch waits for it
+    std::function<void()> changed_;
+    int watches_ = 0;
+};
+
+#endif
