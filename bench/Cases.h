@@ -103,6 +103,9 @@ std::vector<const char*> textsOf(const Column& column)
     return texts;
 }
 
+/// Times every case as Google Benchmark's options say, or with --count repeats each for callgrind.
+int runCases(int argc, char** argv);
+
 void addCountryQueries();
 void addPeers();
 void addSharedParts();

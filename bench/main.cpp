@@ -12,22 +12,8 @@
 
 #include <CoreSystem.h>
 #include <coresystem_port.h>
-#include <valgrind/callgrind.h>
 
 namespace {
-
-// One dump a case, named after it: the instructions of COUNTED_CALLS calls, after as many to warm
-// up.
-int countAll()
-{
-    for (const bench::Case& each : bench::cases()) {
-        each.repeat(bench::COUNTED_CALLS);
-        CALLGRIND_ZERO_STATS;
-        each.repeat(bench::COUNTED_CALLS);
-        CALLGRIND_DUMP_STATS_AT(each.name.c_str());
-    }
-    return EXIT_SUCCESS;
-}
 
 // Permissions and private dirty memory of each mapping of the library.
 int showPages()
@@ -50,20 +36,6 @@ int showPages()
     return EXIT_SUCCESS;
 }
 
-int timeAll(int argc, char** argv)
-{
-    for (const bench::Case& each : bench::cases()) {
-        auto* const registered = benchmark::RegisterBenchmark(each.name.c_str(), each.time);
-        if (each.fixedIterations != 0)
-            registered->Iterations(static_cast<benchmark::IterationCount>(each.fixedIterations));
-    }
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv))
-        return EXIT_FAILURE;
-    benchmark::RunSpecifiedBenchmarks();
-    return EXIT_SUCCESS;
-}
-
 } // namespace
 
 int main(int argc, char** argv)
@@ -73,10 +45,7 @@ int main(int argc, char** argv)
     bench::addSharedParts();
     bench::addCountryQueries();
     bench::addPeers();
-    const std::string mode = argc == 2 ? argv[1] : "";
-    if (mode == "--count")
-        return countAll();
-    if (mode == "--pages")
+    if (argc == 2 && std::string(argv[1]) == "--pages")
         return showPages();
-    return timeAll(argc, argv);
+    return bench::runCases(argc, argv);
 }

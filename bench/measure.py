@@ -71,6 +71,16 @@ def call_instructions(program):
     return counts
 
 
+def service_cases(program):
+    """(name, elapsed us, messages) of every case over real services; none where they cannot run."""
+    done = subprocess.run([program], text=True, capture_output=True)
+    if done.returncode != 0:
+        print(done.stderr, file=sys.stderr)
+        return []
+    rows = (line.split("\t") for line in done.stdout.splitlines())
+    return [(name, float(time), float(messages)) for name, time, messages in rows]
+
+
 def start_instructions(program):
     result = subprocess.run(["valgrind", "--tool=callgrind", "--callgrind-out-file=/dev/null",
                              program], check=True, text=True, capture_output=True)
@@ -119,7 +129,7 @@ def package_version(package):
 
 def machine():
     packages = ["libbenchmark-dev", "libphonenumber-dev", "libicu-dev", "libglib2.0-dev",
-                "libc6", "valgrind"]
+                "libmm-glib-dev", "modemmanager", "libc6", "valgrind"]
     yield f"- Processor: {cpu_model()}, {os.cpu_count()} cores; load {os.getloadavg()[1]:.1f} " \
           "(5 minutes) at the end of the run"
     yield f"- Kernel: {platform.release()}; compiler: {output_of('c++', '--version').splitlines()[0]}"
@@ -150,6 +160,21 @@ def call_tables(times, counts):
     yield from table(["peer: ns / instructions"] + KEYS, map(row, peers))
     yield ""
     yield from table(["part", "ns / instructions"], ([name, cell(name + "/-")] for name in SHARED))
+
+
+def facade_table(times, counts):
+    yield from table(["question, over a platform that costs nothing", "ns", "instructions"],
+                     ([name.removesuffix("/-"), f"{time:.0f}", f"{counts[name]:.0f}"]
+                      for name, time in times.items()))
+
+
+def service_table(cases):
+    if not cases:
+        yield "The real services could not be started here."
+        return
+    yield from table(["question, over the real service", "elapsed us", "messages"],
+                     ([name, f"{time:.0f}", f"{messages:.0f}" if messages else ""]
+                      for name, time, messages in cases))
 
 
 def verdict(value, limit, unit=""):
@@ -205,6 +230,7 @@ def report(build):
     start = starts(binaries)
     times = call_times(f"{binaries}/bench_calls")
     counts = call_instructions(f"{binaries}/bench_calls")
+    facade = f"{binaries}/bench_facade"
     memory = memory_of(build, binaries)
     loaded = libraries_loaded(f"{binaries}/first_answer")
 
@@ -213,6 +239,10 @@ def report(build):
     yield from table(["aim", "measured", "result"], aims(times, counts, start, memory))
     yield ""
     yield from call_tables(times, counts)
+    yield ""
+    yield from facade_table(call_times(facade), call_instructions(facade))
+    yield ""
+    yield from service_table(service_cases(f"{binaries}/bench_services"))
     yield ""
     yield from table(["process start to exit", "elapsed us", "processor us", "instructions"],
                      ([name, f"{run[0]:.0f}", f"{run[1]:.0f}", f"{run[2]:,}"] for name, run in

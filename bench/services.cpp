@@ -1,0 +1,176 @@
+// SPDX-License-Identifier: Apache-2.0
+// bench_services   asks the machine's real services on a private system bus: a line a case, its
+// name,
+//                  the median of elapsed microseconds and the messages sent for one answer, with
+//                  tabs between.
+//
+// The question, the same through the service's own client library, and through its own command.
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <cstdlib>
+#include <functional>
+#include <iostream>
+#include <string>
+#include <vector>
+
+#include <dlfcn.h>
+#include <libmm-glib.h>
+
+#include <CoreSystem.h>
+#include <coresystem_port.h>
+
+#include "support/ModemsOnBus.h"
+
+namespace {
+
+std::atomic<long> messagesSent{0};
+
+} // namespace
+
+// Stands before GLib's own, so that every message of the port is counted.
+extern "C" __attribute__((visibility("default"))) void
+g_dbus_connection_send_message_with_reply(GDBusConnection* connection, GDBusMessage* message,
+                                          GDBusSendMessageFlags flags, gint timeout,
+                                          volatile guint32* serial, GCancellable* cancellable,
+                                          GAsyncReadyCallback callback, gpointer userData)
+{
+    static const auto original =
+        reinterpret_cast<decltype(&g_dbus_connection_send_message_with_reply)>(
+            dlsym(RTLD_NEXT, "g_dbus_connection_send_message_with_reply"));
+    ++messagesSent;
+    original(connection, message, flags, timeout, serial, cancellable, callback, userData);
+}
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+struct Case {
+    std::string name;
+    std::function<bool()> ask; // false when the answer was not the right one
+    int rounds;
+};
+
+double microsecondsOf(const Case& each)
+{
+    const Clock::time_point begin = Clock::now();
+    if (!each.ask()) {
+        std::cerr << each.name << ": a wrong answer\n";
+        std::exit(EXIT_FAILURE);
+    }
+    return std::chrono::duration<double, std::micro>(Clock::now() - begin).count();
+}
+
+void measure(const Case& each)
+{
+    microsecondsOf(each); // warms up
+    const long messagesBefore = messagesSent;
+    std::vector<double> times;
+    for (int i = 0; i < each.rounds; ++i)
+        times.push_back(microsecondsOf(each));
+    std::nth_element(times.begin(), times.begin() + each.rounds / 2, times.end());
+    std::cout << each.name << '\t' << times[static_cast<std::size_t>(each.rounds) / 2] << '\t'
+              << static_cast<double>(messagesSent - messagesBefore) / each.rounds << '\n';
+}
+
+CoreSystem& library()
+{
+    return *CoreSystem::GetInstance();
+}
+
+bool answers(int (CoreSystem::*method)(char**), const std::string& wanted)
+{
+    char* answer = nullptr;
+    const bool good = (library().*method)(&answer) == 0 && answer != nullptr && wanted == answer;
+    std::free(answer);
+    return good;
+}
+
+bool asksRoaming()
+{
+    bool roaming = true;
+    return library().GetRoamingStatus(0, &roaming) && !roaming;
+}
+
+bool asksSimInfo()
+{
+    std::string mcc, mnc, msin;
+    char** const names = library().GetCpNameList();
+    return names != nullptr && library().GetSimInfo(names[0], &mcc, &mnc, &msin) && mcc == "001";
+}
+
+// The MCC and MNC of the first modem's card, as the service's client library has them.
+bool asksClientLibrary(MMManager* manager)
+{
+    GList* const objects = g_dbus_object_manager_get_objects(G_DBUS_OBJECT_MANAGER(manager));
+    bool good = false;
+    if (MMModem* const modem =
+            objects != nullptr ? mm_object_get_modem(MM_OBJECT(objects->data)) : nullptr) {
+        if (MMSim* const sim = mm_modem_get_sim_sync(modem, nullptr, nullptr)) {
+            good = std::string(mm_sim_get_operator_identifier(sim)) == "00101";
+            g_object_unref(sim);
+        }
+        g_object_unref(modem);
+    }
+    g_list_free_full(objects, g_object_unref);
+    return good;
+}
+
+MMManager* newManager(GDBusConnection* connection)
+{
+    return mm_manager_new_sync(connection, G_DBUS_OBJECT_MANAGER_CLIENT_FLAGS_DO_NOT_AUTO_START,
+                               nullptr, nullptr);
+}
+
+bool asksNewClient(GDBusConnection* connection)
+{
+    MMManager* const manager = newManager(connection);
+    const bool good = asksClientLibrary(manager);
+    g_object_unref(manager);
+    return good;
+}
+
+bool runs(const char* command)
+{
+    return std::system(command) == 0; // NOLINT(cert-env33-c): a fixed text
+}
+
+void measureSimQuestions()
+{
+    ModemsOnBus modems;
+    modems.add("home");
+    modems.enable("home");
+    GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_dbus_connection_set_exit_on_close(connection, FALSE);
+
+    const Case cases[] = {
+        {"IsSimAvailable", [] { return library().IsSimAvailable(); }, 1000},
+        {"GetMCCFromSim", [] { return answers(&CoreSystem::GetMCCFromSim, "001"); }, 1000},
+        {"GetMNCFromSim", [] { return answers(&CoreSystem::GetMNCFromSim, "01"); }, 1000},
+        {"GetPhoneNumberFromSim",
+         [] { return answers(&CoreSystem::GetPhoneNumberFromSim, "+15551230001"); }, 1000},
+        {"GetIMEI", [] { return answers(&CoreSystem::GetIMEI, "490154203237518"); }, 1000},
+        {"GetRoamingStatus", asksRoaming, 1000},
+        {"GetCpNameList and GetSimInfo", asksSimInfo, 1000},
+        {"libmm-glib, a new client", [&] { return asksNewClient(connection); }, 300},
+        {"mmcli", [] { return runs("mmcli -m any -K >/dev/null"); }, 50},
+    };
+    for (const Case& each : cases)
+        measure(each);
+    g_object_unref(connection);
+}
+
+} // namespace
+
+int main()
+{
+    const std::string obstacle = ModemsOnBus::obstacle();
+    if (!obstacle.empty()) {
+        std::cerr << obstacle << '\n';
+        return EXIT_FAILURE;
+    }
+    coresystem_port::setLogSink(coresystem_port::LogSink::None);
+    measureSimQuestions();
+    return EXIT_SUCCESS;
+}
