@@ -1,0 +1,146 @@
+// SPDX-License-Identifier: Apache-2.0
+// The package functions over a backend that answers what a test says.
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+#include <package_manager.h>
+
+#include "coresystem_port.h"
+#include "shim/HandleKinds.h"
+#include "support/FakeBackend.h"
+
+using coresystem_port::lastOrigin;
+using coresystem_port::Question;
+using port::InstalledPackages;
+using testing::ElementsAreArray;
+
+namespace {
+
+using Version = FakePackages::Version;
+
+class PackagesTest : public testing::Test {
+protected:
+    ~PackagesTest() override
+    {
+        EXPECT_EQ(0U, InstalledPackages::live());
+        free(version);
+    }
+
+    void answer(const Answer<Version>& version_)
+    {
+        backend.fakePackages.versionAnswer = [version_](const std::string&) { return version_; };
+    }
+
+    // Both functions that take a name fail alike.
+    void expectFailure(int code)
+    {
+        package_info_h none = nullptr;
+        EXPECT_EQ(code, package_info_create("app", &none));
+        EXPECT_EQ(nullptr, none);
+        EXPECT_EQ(code, package_manager_get_package_size_info("app", nullptr, nullptr));
+    }
+
+    FakedBackend backend;
+    package_info_h info = nullptr;
+    char* version = nullptr;
+};
+
+TEST_F(PackagesTest, VersionIsTheOneOfTheHandlesPackage)
+{
+    ASSERT_EQ(0, package_info_create("app", &info));
+    EXPECT_EQ("test", lastOrigin(Question::PackageVersion).source);
+    answer(answered(Version("2.0"))); // an update does not change what the handle tells
+    ASSERT_EQ(0, package_info_get_version(info, &version));
+    EXPECT_STREQ("1.0", version);
+    EXPECT_EQ(1U, InstalledPackages::live());
+    EXPECT_EQ(0, package_info_destroy(info));
+}
+
+TEST_F(PackagesTest, EachCallHandsOutACopyOfItsOwn)
+{
+    char* second = nullptr;
+    ASSERT_EQ(0, package_info_create("app", &info));
+    ASSERT_EQ(0, package_info_get_version(info, &version));
+    ASSERT_EQ(0, package_info_get_version(info, &second));
+    EXPECT_NE(version, second);
+    free(second);
+    EXPECT_EQ(0, package_info_destroy(info));
+}
+
+TEST_F(PackagesTest, NamesGoThroughUnchanged)
+{
+    const std::vector<std::string> names = {
+        "",
+        " app ",
+        "a\nb",
+        "../../etc/passwd",
+        "$(touch x); `id` | cat",
+        std::string(10000000, 'x'),
+    };
+    std::vector<std::string> asked;
+    backend.fakePackages.versionAnswer = [&asked](const std::string& name) {
+        asked.push_back(name);
+        return answered(Version());
+    };
+    for (const std::string& name : names)
+        EXPECT_EQ(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE,
+                  package_manager_get_package_size_info(name.c_str(), nullptr, nullptr));
+    EXPECT_THAT(asked, ElementsAreArray(names));
+}
+
+TEST_F(PackagesTest, FailuresHaveTheirCodes)
+{
+    answer(answered(Version()));
+    expectFailure(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE);
+    EXPECT_EQ("test: not installed", lastOrigin(Question::PackageVersion).reason);
+    answer(port::notAvailable("why"));
+    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR);
+    EXPECT_EQ("why", lastOrigin(Question::PackageVersion).reason);
+    answer(port::notSupported("why"));
+    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR);
+    answer(port::denied("why"));
+    expectFailure(PACKAGE_MANAGER_ERROR_PERMISSION_DENIED);
+}
+
+TEST_F(PackagesTest, NullArgumentsAreInvalid)
+{
+    EXPECT_EQ(-22, package_info_create(nullptr, &info));
+    EXPECT_EQ(-22, package_info_create("app", nullptr));
+    EXPECT_EQ(-22, package_info_destroy(nullptr));
+    EXPECT_EQ(-22, package_info_get_version(nullptr, &version));
+    EXPECT_EQ(-22, package_manager_get_package_size_info(nullptr, nullptr, nullptr));
+    EXPECT_EQ(nullptr, version);
+}
+
+TEST_F(PackagesTest, ReleasedHandleIsInvalid)
+{
+    ASSERT_EQ(0, package_info_create("app", &info));
+    EXPECT_EQ(-22, package_info_get_version(info, nullptr));
+    ASSERT_EQ(0, package_info_destroy(info));
+    EXPECT_EQ(-22, package_info_destroy(info));
+    EXPECT_EQ(-22, package_info_get_version(info, &version));
+    EXPECT_EQ(nullptr, version);
+}
+
+TEST_F(PackagesTest, HandleOfAnotherKindIsInvalid)
+{
+    const connection_h connection = port::Connections::open({});
+    EXPECT_EQ(-22, package_info_destroy(static_cast<package_info_h>(connection)));
+    EXPECT_TRUE(port::Connections::close(connection));
+}
+
+TEST_F(PackagesTest, InstalledPackageIsKnownWithoutACallback)
+{
+    EXPECT_EQ(0, package_manager_get_package_size_info("app", nullptr, nullptr));
+}
+
+TEST_F(PackagesTest, SizesAreNotMadeUp)
+{
+    const auto never = [](const char*, const package_size_info_t*, void*) { ADD_FAILURE(); };
+    EXPECT_EQ(PACKAGE_MANAGER_ERROR_SYSTEM_ERROR,
+              package_manager_get_package_size_info("app", never, nullptr));
+}
+
+} // namespace
