@@ -3,91 +3,170 @@
 
 #include <algorithm>
 #include <cstdlib>
-#include <iterator>
+#include <functional>
+#include <optional>
 
 #include <coresystem_port.h>
 
-#include "Session.h"
+#include "Sims.h"
 
 namespace {
 
+using cli::Fact;
+using cli::Json;
+using cli::library;
+using coresystem_port::lastOrigin;
 using coresystem_port::Question;
 
-int readLanguageCode(CoreSystem& library, char** slot)
+// A text that the library handed out, which is released; nothing for null.
+std::optional<std::string> taken(char* slot)
 {
-    return library.GetDeviceLanguageCode(slot, false);
+    const auto text = slot != nullptr ? std::optional<std::string>(slot) : std::nullopt;
+    std::free(slot);
+    return text;
 }
 
-int readLanguageCodeIso(CoreSystem& library, char** slot)
+Fact answer(Question question, Json value)
 {
-    return library.GetDeviceLanguageCode(slot, true);
+    return {"", std::move(value), lastOrigin(question).source, ""};
 }
 
-template <int (CoreSystem::*method)(char**)>
-int read(CoreSystem& library, char** slot)
+Fact noAnswer(const std::string& reason)
 {
-    return (library.*method)(slot);
+    return {"", nullptr, "", reason};
+}
+
+// What applications get in place of an answer.
+std::string butTold(const std::string& reason, const std::string& told)
+{
+    return reason + "; applications are told " + told;
+}
+
+std::string reasonOf(Question question, int code)
+{
+    const std::string reason = lastOrigin(question).reason;
+    return reason.empty() ? "the platform answered with error " + std::to_string(code) : reason;
+}
+
+// A question that fails with a code of the platform.
+std::function<Fact()> text(Question question, int (CoreSystem::*read)(char**))
+{
+    return [=] {
+        char* slot = nullptr;
+        const int code = (library().*read)(&slot);
+        const auto value = taken(slot);
+        // After a failed read the slot holds nothing that the device said.
+        if (code != 0)
+            return noAnswer(reasonOf(question, code));
+        return value ? answer(question, *value) : noAnswer("out of memory");
+    };
+}
+
+std::optional<std::string> readLanguage(bool asIso639, int& code)
+{
+    char* slot = nullptr;
+    code = library().GetDeviceLanguageCode(&slot, asIso639);
+    return taken(slot);
+}
+
+std::string reasonOfNoIso639Code()
+{
+    int code = 0;
+    return "the language table has no ISO 639-2 code for \"" +
+           readLanguage(false, code).value_or("") + "\"";
+}
+
+// English when the platform does not say, which is not the device's language.
+std::function<Fact()> language(bool asIso639)
+{
+    return [=] {
+        int code = 0;
+        const auto value = readLanguage(asIso639, code);
+        if (code != 0)
+            return noAnswer(butTold(reasonOf(Question::Language, code), value.value_or("nothing")));
+        if (value)
+            return answer(Question::Language, *value);
+        return noAnswer(asIso639 ? reasonOfNoIso639Code() : "out of memory");
+    };
+}
+
+Fact askSimAvailable()
+{
+    const bool isAvailable = library().IsSimAvailable();
+    const auto slots = lastOrigin(Question::SimSlots);
+    const auto card = lastOrigin(Question::SimCard);
+    for (const auto& origin :
+         {slots, card}) // a card that cannot be asked may be there all the same
+        if (!isAvailable && !origin.reason.empty())
+            return noAnswer(butTold(origin.reason, "no"));
+    return {"", isAvailable, card.available ? card.source : slots.source, ""};
+}
+
+// The first slot's that has one.
+std::function<Fact()> ofSim(Question question, int (CoreSystem::*read)(char**))
+{
+    return [=] {
+        char* slot = nullptr;
+        const int code = (library().*read)(&slot);
+        const auto value = taken(slot); // success without telephony leaves it empty
+        return code == 0 && value ? answer(question, *value)
+                                  : noAnswer(cli::whyNoSlotAnswers(question));
+    };
+}
+
+// The country that issued the SIM, not the one where it is.
+Fact askSimCountry()
+{
+    const Fact mcc = ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)();
+    if (mcc.value.is_null())
+        return mcc;
+    const cli::Answer country = cli::askCountryOf(mcc.value.get<std::string>());
+    return {"", country.value, country.value.is_null() ? "" : mcc.source, country.reason};
+}
+
+// Never fails: without a modem that tells one, it is made of the time zone.
+Fact askImei()
+{
+    char* slot = nullptr;
+    library().GetIMEI(&slot);
+    const std::string imei = taken(slot).value_or("");
+    if (lastOrigin(Question::Imei).available)
+        return answer(Question::Imei, imei);
+    return noAnswer(butTold(cli::whyNoImei(), imei));
+}
+
+Fact askRoamingOfFirstSlot()
+{
+    const cli::Answer roaming = cli::askRoaming(0);
+    return roaming.value.is_null() ? noAnswer(roaming.reason)
+                                   : answer(Question::Roaming, roaming.value);
 }
 
 struct FactRow {
     const char* name;
-    Question question;
-    int (*read)(CoreSystem& library, char** slot);
-    const char* toldOnFailure; // what applications get when the platform does not answer
+    std::function<Fact()> ask;
+    bool isIdentity = false;
 };
 
-constexpr FactRow FACTS[] = {
-    {"device_name", Question::DeviceName, read<&CoreSystem::GetDeviceName>, nullptr},
-    {"tizen_id", Question::PlatformId, read<&CoreSystem::GetTizenIdN>, nullptr},
-    {"platform_name", Question::PlatformName, read<&CoreSystem::GetPlatformName>, nullptr},
-    {"sw_version", Question::PlatformVersion, read<&CoreSystem::GetSWVersion>, nullptr},
-    {"model_name", Question::ModelName, read<&CoreSystem::GetModelName>, nullptr},
-    {"language_code", Question::Language, readLanguageCode, "EN"},
-    {"language_code_iso639_2", Question::Language, readLanguageCodeIso, "eng"},
-};
-
-struct Answer {
-    int code;
-    std::optional<std::string> text;
-};
-
-Answer ask(const FactRow& row)
+const std::vector<FactRow>& facts()
 {
-    char* slot = nullptr;
-    const int code = row.read(cli::library(), &slot);
-    Answer answer{code, std::nullopt};
-    if (slot != nullptr)
-        answer.text = slot;
-    std::free(slot);
-    return answer;
-}
-
-std::string reasonOfFailure(const FactRow& row, int code)
-{
-    std::string reason = coresystem_port::lastOrigin(row.question).reason;
-    if (reason.empty())
-        reason = "the platform answered with error " + std::to_string(code);
-    if (row.toldOnFailure != nullptr)
-        reason += std::string("; applications are told ") + row.toldOnFailure;
-    return reason;
-}
-
-// The read succeeded, yet the library left the slot empty.
-std::string reasonOfSilence(const FactRow& row)
-{
-    if (row.read != readLanguageCodeIso)
-        return "out of memory";
-    char* slot = nullptr;
-    readLanguageCode(cli::library(), &slot);
-    const std::string language = slot != nullptr ? slot : "";
-    std::free(slot);
-    return "the language table has no ISO 639-2 code for \"" + language + "\"";
-}
-
-const FactRow& rowOf(const std::string& name)
-{
-    return *std::find_if(std::begin(FACTS), std::end(FACTS),
-                         [&](const FactRow& row) { return row.name == name; });
+    static const std::vector<FactRow> all = {
+        {"device_name", text(Question::DeviceName, &CoreSystem::GetDeviceName)},
+        {"tizen_id", text(Question::PlatformId, &CoreSystem::GetTizenIdN)},
+        {"platform_name", text(Question::PlatformName, &CoreSystem::GetPlatformName)},
+        {"sw_version", text(Question::PlatformVersion, &CoreSystem::GetSWVersion)},
+        {"model_name", text(Question::ModelName, &CoreSystem::GetModelName)},
+        {"language_code", language(false)},
+        {"language_code_iso639_2", language(true)},
+        {"sim_available", askSimAvailable},
+        {"sim_mcc", ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)},
+        {"sim_mnc", ofSim(Question::SimIdentity, &CoreSystem::GetMNCFromSim)},
+        {"sim_country", askSimCountry},
+        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim), true},
+        {"imei", askImei, true},
+        {"roaming", askRoamingOfFirstSlot},
+    };
+    return all;
 }
 
 } // namespace
@@ -95,19 +174,24 @@ const FactRow& rowOf(const std::string& name)
 std::vector<std::string> cli::factNames()
 {
     std::vector<std::string> names;
-    for (const FactRow& row : FACTS)
-        names.push_back(row.name);
+    for (const FactRow& row : facts())
+        names.emplace_back(row.name);
     return names;
 }
 
 cli::Fact cli::askFact(const std::string& name)
 {
-    const FactRow& row = rowOf(name);
-    const Answer answer = ask(row);
-    // After a failed read the slot holds a default or nothing, never the device's own answer.
-    if (answer.code != 0)
-        return {name, std::nullopt, "", reasonOfFailure(row, answer.code)};
-    if (!answer.text)
-        return {name, std::nullopt, "", reasonOfSilence(row)};
-    return {name, answer.text, coresystem_port::lastOrigin(row.question).source, ""};
+    const FactRow& row = *std::find_if(facts().begin(), facts().end(),
+                                       [&](const FactRow& each) { return each.name == name; });
+    Fact fact = row.ask();
+    fact.name = name;
+    fact.isIdentity = row.isIdentity;
+    return fact;
+}
+
+std::string cli::textOf(const Json& value)
+{
+    if (value.is_boolean())
+        return value.get<bool>() ? "yes" : "no";
+    return value.is_string() ? value.get<std::string>() : value.dump();
 }

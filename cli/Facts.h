@@ -3,17 +3,19 @@
 #ifndef CLI_FACTS_H
 #define CLI_FACTS_H
 
-#include <optional>
 #include <string>
 #include <vector>
+
+#include "Session.h"
 
 namespace cli {
 
 struct Fact {
     std::string name;
-    std::optional<std::string> value;
-    std::string source; // who served the value
-    std::string reason; // why there is no value
+    Json value;              // null when there is none
+    std::string source;      // who served the value
+    std::string reason;      // why there is no value
+    bool isIdentity = false; // of a person or a device: masked where it was not asked for by name
 };
 
 /// The names of all facts, in the order in which they are shown.
@@ -21,6 +23,9 @@ std::vector<std::string> factNames();
 
 /// Asks the library for one fact of factNames().
 Fact askFact(const std::string& name);
+
+/// The value as a user reads it; of a fact that has one.
+std::string textOf(const Json& value);
 
 } // namespace cli
 

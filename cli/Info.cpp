@@ -5,6 +5,7 @@
 #include "Commands.h"
 #include "Facts.h"
 #include "Session.h"
+#include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
 
@@ -14,10 +15,11 @@ namespace {
 // The whole reason was already told once, about the device file.
 std::vector<std::string> rowOf(const Fact& fact, bool deviceFileBad)
 {
-    if (!fact.value)
+    if (fact.value.is_null())
         return {fact.name, "not available",
                 "(" + (deviceFileBad ? "the device file is unusable" : fact.reason) + ")"};
-    return {fact.name, fact.value->empty() ? "\"\"" : *fact.value, fact.source};
+    const std::string text = textOf(fact.value);
+    return {fact.name, text.empty() ? "\"\"" : text, fact.source};
 }
 
 std::string infoText(const std::vector<Fact>& facts, bool deviceFileBad)
@@ -34,19 +36,28 @@ std::string infoJson(const std::vector<Fact>& facts)
     Json sources = Json::object();
     Json reasons = Json::object();
     for (const Fact& fact : facts) {
-        json[fact.name] = fact.value ? Json(*fact.value) : Json(nullptr);
-        fact.value ? sources[fact.name] = fact.source : reasons[fact.name] = fact.reason;
+        json[fact.name] = fact.value;
+        fact.value.is_null() ? reasons[fact.name] = fact.reason : sources[fact.name] = fact.source;
     }
     json["sources"] = sources;
     json["reasons"] = reasons;
     return jsonText(json);
 }
 
-ExitCode runInfo(const Invocation& invocation)
+std::vector<Fact> askAll(bool reveal)
 {
     std::vector<Fact> facts;
-    for (const std::string& name : factNames())
+    for (const std::string& name : factNames()) {
         facts.push_back(askFact(name));
+        if (facts.back().isIdentity && !reveal)
+            facts.back().value = masked(facts.back().value);
+    }
+    return facts;
+}
+
+ExitCode runInfo(const Invocation& invocation, bool reveal)
+{
+    const std::vector<Fact> facts = askAll(reveal);
     const bool deviceFileBad = reportDeviceFileProblem();
     writeOut(invocation.json ? infoJson(facts) : infoText(facts, deviceFileBad));
     return deviceFileBad ? BAD_DEVICE_FILE : SUCCESS;
@@ -74,9 +85,9 @@ ExitCode runGet(const Invocation& invocation, const std::string& name)
     const Fact fact = askFact(name);
     if (invocation.json)
         writeOut(infoJson({fact}));
-    else if (fact.value)
-        writeOut(printable(*fact.value) + "\n");
-    return fact.value ? SUCCESS : reportMissing(fact);
+    else if (!fact.value.is_null())
+        writeOut(printable(textOf(fact.value)) + "\n");
+    return fact.value.is_null() ? reportMissing(fact) : SUCCESS;
 }
 
 ExitCode listFacts()
@@ -112,10 +123,13 @@ void cli::addInfoCommands(CLI::App& app, Invocation& invocation)
 {
     CLI::App* const info =
         app.add_subcommand("info", "Print every fact about the device, with its source");
+    const auto reveal = std::make_shared<bool>(false);
+    info->add_flag("--reveal", *reveal, "Show the phone number and the IMEI, unmasked");
     info->add_flag("--json", invocation.json, "Print one JSON object");
     setFooter(*info, "Examples: coresystem info\n"
                      "          coresystem info --json --device phone.toml");
-    info->callback(
-        [&invocation] { invocation.command = [&invocation] { return runInfo(invocation); }; });
+    info->callback([&invocation, reveal] {
+        invocation.command = [&invocation, reveal] { return runInfo(invocation, *reveal); };
+    });
     addGet(app, invocation);
 }

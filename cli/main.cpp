@@ -18,6 +18,7 @@ const char* const FOOTER = R"(Examples:
   coresystem info                        every fact about this machine
   coresystem info --device phone.toml    every fact about a simulated device
   coresystem get device_name             one fact, for scripts
+  coresystem sim                         what applications may learn of the SIM cards
   coresystem country 340                 what the library makes of a country key
   coresystem log decipher --key key <log read a debug trace
   coresystem doctor                      what the answers rest on
@@ -43,6 +44,7 @@ struct Program {
         app.require_subcommand(0, 1);
         addInfoCommands(app, invocation);
         addCountryCommand(app, invocation);
+        addSimCommand(app, invocation);
         addLogCommands(app, invocation);
         addDoctorCommand(app, invocation);
         app.footer(FOOTER);

@@ -5,8 +5,9 @@ _coresystem_words()
 {
     local global='--device --verbose --help'
     case $1 in
-    '') echo "info get country log doctor --version $global" ;;
-    info | country | doctor) echo "--json $global" ;;
+    '') echo "info get country sim log doctor --version $global" ;;
+    info | sim) echo "--reveal --json $global" ;;
+    country | doctor) echo "--json $global" ;;
     get) echo "$("$2" get --list 2>/dev/null) --list --json $global" ;;
     log) echo "decipher $global" ;;
     decipher) echo "--key $global" ;;
@@ -28,7 +29,7 @@ _coresystem()
         case ${COMP_WORDS[i]} in
         --device | --key) ((i++)) ;;
         -*) ;;
-        info | get | country | log | doctor) [[ -z $command ]] && command=${COMP_WORDS[i]} ;;
+        info | get | country | sim | log | doctor) [[ -z $command ]] && command=${COMP_WORDS[i]} ;;
         decipher) [[ $command == log ]] && command=decipher ;;
         esac
     done

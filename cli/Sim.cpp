@@ -1,0 +1,185 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem sim`: what an application may learn of each SIM slot.
+#include <map>
+
+#include "Commands.h"
+#include "Session.h"
+#include "Sims.h"
+#include "Terminal.h"
+#include "Text.h"
+
+namespace cli {
+namespace {
+
+// What is told of a slot.
+struct Column {
+    const char* title;
+    const char* key; // in JSON
+    Answer SimSlot::*answer;
+    bool isIdentity;      // masked unless it is to be revealed
+    const char* yes = ""; // the words for true and false
+    const char* no = "";
+};
+
+constexpr Column COLUMNS[] = {
+    {"SIM", "status", &SimSlot::status, false},
+    {"MCC", "mcc", &SimSlot::mcc, false},
+    {"MNC", "mnc", &SimSlot::mnc, false},
+    {"MSIN", "msin", &SimSlot::msin, true},
+    {"number", "phone_number", &SimSlot::phoneNumber, true},
+    {"country", "country", &SimSlot::country, false},
+    {"network", "roaming", &SimSlot::roaming, false, "roaming", "home"},
+    {"SMS", "sms", &SimSlot::sms, false, "ready", "not ready"},
+};
+
+// A default slot.
+struct Subscription {
+    const char* title;
+    const char* key;
+    Answer Sims::*answer;
+};
+
+constexpr Subscription SUBSCRIPTIONS[] = {
+    {"network", "network", &Sims::network},
+    {"data", "data", &Sims::data},
+    {"calls", "voice", &Sims::voice},
+};
+
+Json shown(const Column& column, const SimSlot& slot, bool reveal)
+{
+    const Json& value = (slot.*column.answer).value;
+    return column.isIdentity && !reveal ? masked(value) : value;
+}
+
+std::string cellOf(const Column& column, const SimSlot& slot, bool reveal)
+{
+    const Json value = shown(column, slot, reveal);
+    if (value.is_boolean())
+        return value.get<bool>() ? column.yes : column.no;
+    return value.is_null() ? "-" : value.get<std::string>();
+}
+
+std::string slotsText(const std::vector<SimSlot>& slots, bool reveal)
+{
+    Rows rows = {{"slot", "modem"}};
+    for (const Column& column : COLUMNS)
+        rows[0].emplace_back(column.title);
+    for (const SimSlot& slot : slots) {
+        rows.push_back({std::to_string(slot.number), slot.modem});
+        for (const Column& column : COLUMNS)
+            rows.back().push_back(cellOf(column, slot, reveal));
+    }
+    return aligned(rows, "");
+}
+
+// Each reason once for a slot, with everything that it takes away.
+std::string reasonsText(const std::vector<SimSlot>& slots)
+{
+    Rows rows;
+    for (const SimSlot& slot : slots) {
+        std::map<std::string, std::size_t> rowOfReason;
+        for (const Column& column : COLUMNS) {
+            const Answer& answer = slot.*column.answer;
+            if (!answer.value.is_null())
+                continue;
+            const auto [found, isNew] = rowOfReason.emplace(answer.reason, rows.size());
+            if (isNew)
+                rows.push_back(
+                    {"slot " + std::to_string(slot.number), column.title, answer.reason});
+            else
+                rows[found->second][1] += std::string(", ") + column.title;
+        }
+    }
+    return rows.empty() ? "" : "\n" + heading("Not available") + "\n" + aligned(rows);
+}
+
+std::string subscriptionsText(const Sims& sims)
+{
+    Rows rows;
+    for (const Subscription& row : SUBSCRIPTIONS) {
+        const Answer& answer = sims.*row.answer;
+        rows.push_back({row.title, answer.value.is_null() ? "not available (" + answer.reason + ")"
+                                                          : answer.value.get<std::string>()});
+    }
+    return "\n" + heading("Default slots") + "\n" + aligned(rows);
+}
+
+bool hidesAnything(const std::vector<SimSlot>& slots)
+{
+    for (const SimSlot& slot : slots)
+        for (const Column& column : COLUMNS)
+            if (column.isIdentity && !(slot.*column.answer).value.is_null())
+                return true;
+    return false;
+}
+
+std::string simText(const Sims& sims, bool reveal)
+{
+    std::string text = backendLine() + "\n\n" + slotsText(sims.slots, reveal) +
+                       reasonsText(sims.slots) + subscriptionsText(sims);
+    if (!reveal && hidesAnything(sims.slots))
+        text += "\nWhat identifies the subscriber is masked; --reveal shows it.\n";
+    return text;
+}
+
+Json slotJson(const SimSlot& slot, bool reveal)
+{
+    Json json = {{"slot", slot.number}, {"modem", slot.modem}};
+    Json reasons = Json::object();
+    for (const Column& column : COLUMNS) {
+        const Answer& answer = slot.*column.answer;
+        json[column.key] = shown(column, slot, reveal);
+        if (answer.value.is_null())
+            reasons[column.key] = answer.reason;
+    }
+    json["reasons"] = reasons;
+    return json;
+}
+
+std::string simJson(const Sims& sims, bool reveal)
+{
+    Json json = jsonAnswer();
+    json["masked"] = !reveal;
+    json["slots"] = Json::array();
+    for (const SimSlot& slot : sims.slots)
+        json["slots"].push_back(slotJson(slot, reveal));
+    if (sims.slots.empty())
+        json["reason"] = sims.reason;
+    else
+        for (const Subscription& row : SUBSCRIPTIONS)
+            json["default_slots"][row.key] = (sims.*row.answer).value;
+    return jsonText(json);
+}
+
+ExitCode runSim(const Invocation& invocation, bool reveal)
+{
+    const Sims sims = askSims();
+    const bool deviceFileBad = reportDeviceFileProblem();
+    if (invocation.json)
+        writeOut(simJson(sims, reveal));
+    else if (!sims.slots.empty())
+        writeOut(simText(sims, reveal));
+    else if (!deviceFileBad)
+        complain("there is no SIM slot: " + printable(sims.reason));
+    if (deviceFileBad)
+        return BAD_DEVICE_FILE;
+    return sims.slots.empty() ? NOT_AVAILABLE : SUCCESS;
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addSimCommand(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const sim =
+        app.add_subcommand("sim", "Print what applications may learn of each SIM slot");
+    const auto reveal = std::make_shared<bool>(false);
+    sim->add_flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
+    sim->add_flag("--json", invocation.json, "Print one JSON object");
+    setFooter(*sim, "Examples: coresystem sim\n"
+                    "          coresystem sim --reveal --device phone.toml\n"
+                    "Exit code 3: there is no SIM slot; the reason is on standard error.");
+    sim->callback([&invocation, reveal] {
+        invocation.command = [&invocation, reveal] { return runSim(invocation, *reveal); };
+    });
+}

@@ -1,0 +1,233 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Sims.h"
+
+#include <cstdlib>
+
+namespace cli {
+namespace {
+
+using coresystem_port::lastOrigin;
+using coresystem_port::Question;
+
+// A number that no status has: what stays when none was read.
+constexpr auto NOT_READ = static_cast<TelSimCardStatus_t>(0x7f);
+
+// A number and the word for it.
+template <typename Number>
+struct Word {
+    Number number;
+    const char* word;
+};
+
+constexpr Word<TelSimCardStatus_t> STATUSES[] = {
+    {TAPI_SIM_STATUS_CARD_ERROR, "error"},
+    {TAPI_SIM_STATUS_CARD_NOT_PRESENT, "absent"},
+    {TAPI_SIM_STATUS_SIM_INITIALIZING, "initializing"},
+    {TAPI_SIM_STATUS_SIM_INIT_COMPLETED, "ready"},
+    {TAPI_SIM_STATUS_SIM_PIN_REQUIRED, "PIN required"},
+    {TAPI_SIM_STATUS_SIM_PUK_REQUIRED, "PUK required"},
+    {TAPI_SIM_STATUS_CARD_BLOCKED, "blocked"},
+    {TAPI_SIM_STATUS_SIM_NCK_REQUIRED, "network locked"},
+    {TAPI_SIM_STATUS_SIM_NSCK_REQUIRED, "network subset locked"},
+    {TAPI_SIM_STATUS_SIM_SPCK_REQUIRED, "service provider locked"},
+    {TAPI_SIM_STATUS_SIM_CCK_REQUIRED, "corporate locked"},
+    {TAPI_SIM_STATUS_CARD_REMOVED, "removed"},
+    {TAPI_SIM_STATUS_SIM_LOCK_REQUIRED, "device locked"},
+    {TAPI_SIM_STATUS_CARD_CRASHED, "crashed"},
+    {TAPI_SIM_STATUS_CARD_POWEROFF, "powered off"},
+    {TAPI_SIM_STATUS_UNKNOWN, "unknown"},
+};
+
+constexpr Word<TelNetworkDefaultSubs_t> NETWORK_SLOTS[] = {
+    {TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN, "unknown"},
+    {TAPI_NETWORK_DEFAULT_SUBS_SIM1, "slot 0"},
+    {TAPI_NETWORK_DEFAULT_SUBS_SIM2, "slot 1"},
+};
+
+constexpr Word<TelNetworkDefaultDataSubs_t> DATA_SLOTS[] = {
+    {TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN, "unknown"},
+    {TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM1, "slot 0"},
+    {TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM2, "slot 1"},
+};
+
+constexpr Word<TelCallPreferredVoiceSubs_t> VOICE_SLOTS[] = {
+    {TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN, "unknown"},
+    {TAPI_CALL_PREFERRED_VOICE_SUBS_CURRENT_NETWORK, "current network"},
+    {TAPI_CALL_PREFERRED_VOICE_SUBS_ASK_ALWAYS, "ask always"},
+    {TAPI_CALL_PREFERRED_VOICE_SUBS_SIM1, "slot 0"},
+    {TAPI_CALL_PREFERRED_VOICE_SUBS_SIM2, "slot 1"},
+};
+
+template <typename Number, std::size_t count>
+std::string wordOf(const Word<Number> (&words)[count], Number number)
+{
+    for (const Word<Number>& row : words)
+        if (row.number == number)
+            return row.word;
+    return std::to_string(static_cast<int>(number));
+}
+
+// The reason of a question that failed; it has none when the modem went away before it was asked.
+Answer unanswered(Question question)
+{
+    const std::string& reason = lastOrigin(question).reason;
+    return {nullptr, reason.empty() ? "the platform gave no answer" : reason};
+}
+
+Answer askStatus(int slot)
+{
+    TelSimCardStatus_t status = NOT_READ;
+    library().IsAvaliableState(slot, &status);
+    return status == NOT_READ ? unanswered(Question::SimCard)
+                              : Answer{wordOf(STATUSES, status), ""};
+}
+
+void askIdentity(SimSlot& slot)
+{
+    std::string mcc;
+    std::string mnc;
+    std::string msin;
+    if (library().GetSimInfo(slot.modem.c_str(), &mcc, &mnc, &msin)) {
+        slot.mcc = {mcc, ""};
+        slot.mnc = {mnc, ""};
+        slot.msin = {msin, ""};
+        slot.country = askCountryOf(mcc);
+        return;
+    }
+    slot.mcc = slot.mnc = slot.msin = slot.country = unanswered(Question::SimIdentity);
+}
+
+// The platform fails, or succeeds with nothing, when the card holds no number.
+Answer askPhoneNumber(telephony_h& handle)
+{
+    char* number = nullptr;
+    const bool wasRead = library().GetPhoneNumber(&handle, &number);
+    Answer answer = unanswered(Question::PhoneNumber);
+    if (wasRead && number != nullptr)
+        answer = {number, ""};
+    else if (lastOrigin(Question::PhoneNumber).available)
+        answer = {nullptr, "the SIM card holds no number"};
+    std::free(number);
+    return answer;
+}
+
+Answer askSms(char* modem)
+{
+    int ready = 0;
+    return library().CheckSmsEnabled(modem, &ready) ? Answer{ready != 0, ""}
+                                                    : unanswered(Question::SmsReadiness);
+}
+
+SimSlot askSlot(int number, char* modem, telephony_h& handle)
+{
+    SimSlot slot{};
+    slot.number = number;
+    slot.modem = modem;
+    slot.status = askStatus(number);
+    askIdentity(slot);
+    slot.phoneNumber = askPhoneNumber(handle);
+    slot.roaming = askRoaming(number);
+    slot.sms = askSms(modem);
+    return slot;
+}
+
+template <typename Number, std::size_t count>
+Answer askSubscription(char* modem, bool (CoreSystem::*ask)(char*, Number*),
+                       const Word<Number> (&words)[count])
+{
+    auto slot = words[0].number;
+    return (library().*ask)(modem, &slot) ? Answer{wordOf(words, slot), ""}
+                                          : unanswered(Question::Subscriptions);
+}
+
+void askSubscriptions(Sims& sims, char* modem)
+{
+    sims.network = askSubscription(modem, &CoreSystem::GetMainSimSubscription, NETWORK_SLOTS);
+    sims.data = askSubscription(modem, &CoreSystem::GetDefaultDataSubscription, DATA_SLOTS);
+    sims.voice = askSubscription(modem, &CoreSystem::GetCallPreferredSubscription, VOICE_SLOTS);
+}
+
+// Why there are no slots.
+std::string whyNoSlots()
+{
+    const coresystem_port::Origin slots = lastOrigin(Question::SimSlots);
+    return slots.available ? "the telephony service knows no modem" : slots.reason;
+}
+
+} // namespace
+} // namespace cli
+
+cli::Sims cli::askSims()
+{
+    Sims sims;
+    telephony_handle_list_s list = {0, nullptr};
+    char** const modems = library().InitHandleList(&list) ? library().GetCpNameList() : nullptr;
+    // Both are lists of the slots; the second one ends where a modem went away meanwhile.
+    for (unsigned int i = 0; modems != nullptr && i < list.count && modems[i] != nullptr; ++i)
+        sims.slots.push_back(askSlot(static_cast<int>(i), modems[i], list.handle[i]));
+    if (sims.slots.empty())
+        sims.reason = whyNoSlots();
+    else
+        askSubscriptions(sims, modems[0]);
+    library().DeinitHandleList(&list);
+    return sims;
+}
+
+std::string cli::whyNoSlotAnswers(Question question)
+{
+    char** const modems = library().GetCpNameList();
+    if (modems == nullptr || modems[0] == nullptr)
+        return whyNoSlots();
+    std::string states;
+    for (int slot = 0; modems[slot] != nullptr; ++slot) {
+        const Answer status = askStatus(slot);
+        if (status.value == "ready")
+            return lastOrigin(question).available ? "the SIM card holds none"
+                                                  : unanswered(question).reason;
+        states += (states.empty() ? "slot " : "; slot ") + std::to_string(slot) + ": " +
+                  (status.value.is_null() ? status.reason : status.value.get<std::string>());
+    }
+    return "no usable SIM card: " + states;
+}
+
+cli::Answer cli::askCountryOf(const std::string& mcc)
+{
+    const Silence silence; // of the MCCs that the table lacks
+    char* name = nullptr;
+    library().GetCountryNameFromMcc(mcc.c_str(), &name);
+    const Answer answer =
+        name != nullptr ? Answer{name, ""} : Answer{nullptr, "the country table has no MCC " + mcc};
+    std::free(name);
+    return answer;
+}
+
+std::string cli::whyNoImei()
+{
+    const std::string reason = lastOrigin(Question::Imei).reason;
+    return reason.empty() ? whyNoSlots() : reason;
+}
+
+cli::Answer cli::askRoaming(int slot)
+{
+    bool roaming = false;
+    if (library().GetRoamingStatus(slot, &roaming))
+        return {roaming, ""};
+    if (!lastOrigin(Question::SimSlots).available)
+        return {nullptr, whyNoSlots()};
+    const coresystem_port::Origin service = lastOrigin(Question::NetworkService);
+    if (service.available)
+        return lastOrigin(Question::Roaming).reason.empty()
+                   ? Answer{nullptr, "the slot is not in service"}
+                   : unanswered(Question::Roaming);
+    return service.reason.empty() ? Answer{nullptr, whyNoSlots()}
+                                  : unanswered(Question::NetworkService);
+}
+
+cli::Json cli::masked(const Json& value)
+{
+    if (!value.is_string())
+        return value;
+    auto text = value.get<std::string>();
+    const std::size_t hidden = text.size() > 4 ? text.size() - 2 : text.size();
+    return text.replace(0, hidden, hidden, '*');
+}
