@@ -195,7 +195,9 @@ private:
         }
         if (!node.is_table())
             throw Problem{node.source(), titleOf(*row) + " must be a section"};
-        readKeys(*row, *node.as_table(), device_.sections.find(row->name)->second);
+        Section section(titleOf(*row), sourceOf(node));
+        readKeys(*row, *node.as_table(), section);
+        device_.sections.find(row->name)->second = std::move(section);
     }
 
     void readList(const SectionRow& row, const toml::node& node)

@@ -49,7 +49,7 @@ Result<Sourced<WifiConnection>> SimulatedNetwork::wifiConnection()
 {
     return file_.ask<WifiConnection>([](const Device& device) {
         const Section& network = device.section("network");
-        if (network.find("wifi_connection") == nullptr && network.find("wifi") != nullptr)
+        if (network.find("wifi_connection") == nullptr)
             return connectionOf(radio(device, "wifi", LinkState::Deactivated));
         return network.get<WifiConnection>("wifi_connection");
     });

@@ -45,7 +45,7 @@ TEST_F(SimulatorSchemaTest, AbsentKeyAndAbsentSectionAreNotAvailable)
 {
     describe("[network]\n");
     for (const char* const key : {"cellular", "bluetooth"})
-        expectError(port::Error::Kind::NotAvailable, path + ": [network] has no " + key,
+        expectError(port::Error::Kind::NotAvailable, line(2) + ": [network] has no " + key,
                     file.get<LinkState>("network", key));
     expectError(port::Error::Kind::NotAvailable, path + ": [storage] has no blocks",
                 file.get<std::int64_t>("storage", "blocks"));

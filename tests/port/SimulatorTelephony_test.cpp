@@ -230,7 +230,7 @@ TEST_F(SimulatorTelephonyTest, SubscriptionsNameSlots)
     EXPECT_EQ(0, all.value().value.network);
     EXPECT_EQ(1, all.value().value.data);
     EXPECT_EQ(Subscriptions::Voice::AskAlways, all.value().value.voice);
-    EXPECT_EQ(path, all.value().source);
+    EXPECT_EQ(line(2), all.value().source);
 }
 
 TEST_F(SimulatorTelephonyTest, ProblemOfTheFileIsTheReasonOfEveryQuestion)
