@@ -97,6 +97,28 @@ int failRead(char** slot, int code, const LogSite& site, const char* failure)
     return code;
 }
 
+// A field that a longer text than foreseen fills to its end has no NUL.
+template <std::size_t size>
+std::size_t lengthOf(const char (&field)[size])
+{
+    return strnlen(field, size);
+}
+
+template <std::size_t size>
+char* append(char* end, const char (&field)[size])
+{
+    std::memcpy(end, field, lengthOf(field));
+    return end + lengthOf(field);
+}
+
+template <std::size_t size>
+char* copyOf(const char (&field)[size])
+{
+    char text[size + 1];
+    *append(text, field) = '\0';
+    return strdup(text);
+}
+
 // The MCC and the MNC are read alike.
 struct ImsiPart {
     char (TelSimImsiInfo_t::*field)[4];
@@ -110,18 +132,10 @@ int readImsiPart(SimManager& sim, const telephony_handle_list_s& list, int slot,
 {
     DEBUG_LINE_AT(site, part.entry, slot + 1);
     const bool wasRead = useImsiOfSlot(sim, list, slot, [&](const TelSimImsiInfo_t& imsi) {
-        *value = strdup(imsi.*part.field);
+        *value = copyOf(imsi.*part.field);
         DEBUG_LINE_AT(site, part.success, *value);
     });
     return wasRead ? 0 : failRead(value, READ_FAILED, site, part.failure);
-}
-
-template <std::size_t size>
-char* append(char* end, const char (&field)[size])
-{
-    const std::size_t length = strnlen(field, size);
-    std::memcpy(end, field, length);
-    return end + length;
 }
 
 // The three parts as they stand: no digit is added or cut.
@@ -467,9 +481,9 @@ bool SimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string* m
         return false;
     }
     try {
-        *mcc = imsi.szMcc;
-        *mnc = imsi.szMnc;
-        *msin = imsi.szMsin;
+        mcc->assign(imsi.szMcc, lengthOf(imsi.szMcc));
+        mnc->assign(imsi.szMnc, lengthOf(imsi.szMnc));
+        msin->assign(imsi.szMsin, lengthOf(imsi.szMsin));
     } catch (const std::bad_alloc&) {
         return false; // no exception crosses the interface
     }
