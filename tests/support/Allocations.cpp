@@ -106,14 +106,29 @@ void Ledger::clear()
     live_.clear();
 }
 
-std::vector<std::string> Ledger::live() const
+std::vector<std::string> Ledger::texts() const
 {
-    const std::lock_guard<std::mutex> lock(mutex_);
     std::vector<std::string> texts;
     for (const auto& entry : live_)
         texts.push_back(entry.second);
     std::sort(texts.begin(), texts.end());
     return texts;
+}
+
+std::vector<std::string> Ledger::live() const
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return texts();
+}
+
+std::vector<std::string> Ledger::freeAll()
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    const std::vector<std::string> freed = texts();
+    for (const auto& entry : live_)
+        __real_free(reinterpret_cast<void*>(~entry.first));
+    live_.clear();
+    return freed;
 }
 
 std::string Ledger::origin(const char* text) const

@@ -4,6 +4,7 @@
 #define CORESYSTEM_TESTS_SUPPORT_CORE_SYSTEM_INTERNALS_H
 
 #include <string>
+#include <vector>
 
 #include <CoreSystem.h>
 #include <SimManager.h>
@@ -31,6 +32,20 @@ struct CoreSystemInternals {
     static std::string valueFromPosition(const std::string& value, int start, int end)
     {
         return CoreSystem::instance_->GetValueFromPosition(value, start, end);
+    }
+
+    typedef int (CoreSystem::*SingleRead)(char** value);
+    typedef void (CoreSystem::*ListRead)(std::vector<char*>& values, int* count);
+
+    static constexpr SingleRead GET_IMSI = &CoreSystem::GetIMSIFromSim;
+    static constexpr ListRead LIST_MCCS = &CoreSystem::GetMCCFromSim;
+    static constexpr ListRead LIST_MNCS = &CoreSystem::GetMNCFromSim;
+    static constexpr ListRead LIST_IMSIS = &CoreSystem::GetIMSIFromSim;
+    static constexpr ListRead LIST_PHONE_NUMBERS = &CoreSystem::GetPhoneNumberFromSim;
+
+    static bool isDualSimAvailable()
+    {
+        return CoreSystem::instance_->IsDualSimAvailable();
     }
 
     static const char* iso639(const std::string& upperCode, const char* preset)

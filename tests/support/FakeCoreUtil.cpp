@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <new>
 #include <stdexcept>
 
 #include <gtest/gtest.h>
@@ -32,6 +33,11 @@ struct FormatBuffer {
 
     FormatBuffer()
     {
+        clear();
+    }
+
+    void clear()
+    {
         bytes.fill(UNTOUCHED);
     }
 
@@ -48,10 +54,12 @@ struct FormatBuffer {
 std::array<FormatBuffer, 64> buffers;
 std::atomic<int> nextIndex{3};
 
-// A named mutex; never destroyed.
+// A named mutex; never destroyed. Nobody takes it twice on one thread: the device's own need not be
+// recursive. The fake's is, so that a test fails and does not hang.
 struct NamedLock {
     std::string name;
     std::recursive_mutex mutex;
+    int depth = 0;
 };
 
 NamedLock& namedLock(const char* name)
@@ -66,23 +74,38 @@ NamedLock& namedLock(const char* name)
     return entry->second;
 }
 
-void acquire(void* mutex)
+// The texts around the name tell the two styles of locking apart.
+void acquire(void* mutex, const std::string& before, const std::string& after)
 {
-    const AllocationPause pause;
     auto& lock = *static_cast<NamedLock*>(mutex);
     lock.mutex.lock();
-    platform().record(Event::Kind::LOCK, "lock " + lock.name);
+    EXPECT_EQ(++lock.depth, 1) << lock.name << " was taken twice by one thread";
+    platform().record(Event::Kind::LOCK, before + lock.name + after);
 }
 
-void release(void* mutex)
+void release(void* mutex, const std::string& before, const std::string& after)
 {
-    const AllocationPause pause;
     auto& lock = *static_cast<NamedLock*>(mutex);
-    platform().record(Event::Kind::UNLOCK, "unlock " + lock.name);
+    platform().record(Event::Kind::UNLOCK, before + lock.name + after);
+    --lock.depth;
     lock.mutex.unlock();
 }
 
 } // namespace
+
+bool fake::isInFormatBuffer(const std::string& text)
+{
+    return std::any_of(buffers.begin(), buffers.end(), [&](const FormatBuffer& buffer) {
+        return std::search(buffer.bytes.begin(), buffer.bytes.end(), text.begin(), text.end()) !=
+               buffer.bytes.end();
+    });
+}
+
+void fake::clearFormatBuffers()
+{
+    for (FormatBuffer& buffer : buffers)
+        buffer.clear();
+}
 
 CoreLogger::CoreLogger() = default;
 
@@ -149,22 +172,26 @@ CoreMutex::~CoreMutex() = default;
 
 void CoreMutex::Lock()
 {
-    acquire(mutex_);
+    const AllocationPause pause;
+    acquire(mutex_, "", ".Lock()");
 }
 
 void CoreMutex::Unlock()
 {
-    release(mutex_);
+    const AllocationPause pause;
+    release(mutex_, "", ".Unlock()");
 }
 
 CoreMutexLock::CoreMutexLock(const char* name) : mutex_(&namedLock(name))
 {
-    acquire(mutex_);
+    const AllocationPause pause;
+    acquire(mutex_, "lock ", "");
 }
 
 CoreMutexLock::~CoreMutexLock()
 {
-    release(mutex_);
+    const AllocationPause pause;
+    release(mutex_, "unlock ", "");
 }
 
 CoreUtil::CoreUtil() = default;
@@ -178,5 +205,8 @@ CoreUtil* CoreUtil::GetInstance()
 std::string CoreUtil::intToStr(int number)
 {
     const AllocationPause pause;
+    platform().record(Event::Kind::CALL, callText("intToStr", number));
+    if (platform().numberTextThrows)
+        throw std::bad_alloc();
     return std::to_string(number);
 }

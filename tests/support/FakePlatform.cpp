@@ -152,6 +152,11 @@ const char* nameOf(connection_h connection)
     return connection == &connectionHandle ? "connection" : "no connection";
 }
 
+std::string nameOf(const telephony_handle_list_s& list)
+{
+    return list.handle != nullptr ? "list of " + std::to_string(list.count) : "no list";
+}
+
 std::string nameOf(const TapiHandle* handle)
 {
     return handle != nullptr ? "modem " + handle->name : "no modem";
@@ -161,7 +166,7 @@ std::string nameOf(const TapiHandle* handle)
 
 void fake::writeArgument(std::ostream& out, telephony_h handle)
 {
-    out << "slot " << handle->slot;
+    out << (handle != nullptr ? "slot " + std::to_string(handle->slot) : "no slot");
 }
 
 void fake::writeArgument(std::ostream& out, package_info_h handle)
@@ -185,14 +190,18 @@ void FakePlatform::reset()
     forgetEvents();
     answers_.clear();
     handles_.clear();
+    lists_.clear();
     setModems(std::nullopt);
     callbacks = {};
     debugMode = 0;
     tag.reset();
     cipherThrows = false;
+    numberTextThrows = false;
     logResult = 0;
+    now.reset();
     cardChanged = 0;
     onEvent = nullptr;
+    clearFormatBuffers();
     ledger().clear();
 }
 
@@ -217,6 +226,11 @@ FakePlatform::Answer FakePlatform::answerTo(const std::string& call)
         return found->second;
     ADD_FAILURE() << "no answer was set for " << call;
     return {-1, {}};
+}
+
+void fake::reportWrongType(const std::string& call)
+{
+    ADD_FAILURE() << "the answer to " << call << " has another type than its slot";
 }
 
 std::any FakePlatform::valueOf(const std::string& call)
@@ -245,6 +259,34 @@ void FakePlatform::removeHandle(const std::string& handle)
         handles_.erase(found);
     else
         ADD_FAILURE() << handle << " was released but is not open";
+}
+
+// Each array is one allocation, so that its use after the release shows to the sanitizers; one that
+// nobody releases belongs to the fake.
+telephony_handle_list_s FakePlatform::openList(unsigned int count)
+{
+    auto handles = std::make_unique<telephony_h[]>(count);
+    for (unsigned int slot = 0; slot < count; ++slot)
+        handles[slot] = handleOfSlot(slot);
+    const telephony_handle_list_s list = {count, handles.get()};
+    addHandle(nameOf(list));
+    const std::lock_guard<std::mutex> lock(mutex_);
+    lists_[list.handle] = std::move(handles);
+    return list;
+}
+
+bool FakePlatform::eraseList(const telephony_h* handles)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return lists_.erase(handles) > 0;
+}
+
+void FakePlatform::closeList(const telephony_handle_list_s& list)
+{
+    if (eraseList(list.handle))
+        removeHandle(nameOf(list));
+    else
+        ADD_FAILURE() << "a " << nameOf(list) << " was released that is not open";
 }
 
 void FakePlatform::setModems(const std::optional<Texts>& names)
@@ -352,32 +394,25 @@ int system_settings_get_value_string(system_settings_key_e key, char** value)
     return platform().reply(value, "system_settings_get_value_string", key);
 }
 
-// A list's array is one allocation, so that a leak or a double release shows to the sanitizers too.
 int telephony_init(telephony_handle_list_s* list)
 {
     const AllocationPause pause;
     const int result = platform().call("telephony_init");
     const std::any value = platform().valueOf("telephony_init()");
-    if (const auto* const count = std::any_cast<unsigned int>(&value)) {
-        list->count = *count;
-        list->handle = new telephony_h[*count];
-        for (unsigned int slot = 0; slot < *count; ++slot)
-            list->handle[slot] = handleOfSlot(slot);
-        platform().addHandle("list of " + std::to_string(*count));
-    }
+    if (const auto* const count = std::any_cast<unsigned int>(&value))
+        *list = platform().openList(*count);
+    else if (value.has_value())
+        reportWrongType("telephony_init()");
     return result;
 }
 
 int telephony_deinit(telephony_handle_list_s* list)
 {
     const AllocationPause pause;
-    const std::string text =
-        list->handle != nullptr ? "list of " + std::to_string(list->count) : "no list";
-    const int result = platform().call("telephony_deinit", text);
-    if (list->handle != nullptr) {
-        platform().removeHandle(text);
-        delete[] list->handle;
-    }
+    const int result = platform().call("telephony_deinit", nameOf(*list));
+    if (list->handle != nullptr)
+        platform().closeList(*list);
+    *list = {0, nullptr};
     return result;
 }
 
@@ -420,8 +455,9 @@ TapiHandle* tel_init(const char* cp_name)
     const AllocationPause pause;
     if (platform().call("tel_init", cp_name) != 0)
         return nullptr;
-    platform().addHandle(std::string("modem ") + (cp_name != nullptr ? cp_name : "null"));
-    return handleOfModem(cp_name);
+    TapiHandle* const handle = handleOfModem(cp_name);
+    platform().addHandle(nameOf(handle));
+    return handle;
 }
 
 int tel_deinit(TapiHandle* handle)
@@ -613,6 +649,19 @@ int package_manager_get_package_size_info(const char* package_id,
     EXPECT_EQ(callback, nullptr);
     EXPECT_EQ(user_data, nullptr);
     return platform().call("package_manager_get_package_size_info", package_id);
+}
+
+// The program's own calls of time() come here (the linker's --wrap).
+std::time_t __real_time(std::time_t* slot);
+std::time_t __wrap_time(std::time_t* slot);
+
+std::time_t __wrap_time(std::time_t* slot)
+{
+    if (!platform().now)
+        return __real_time(slot);
+    if (slot != nullptr)
+        *slot = *platform().now;
+    return *platform().now;
 }
 
 } // extern "C"

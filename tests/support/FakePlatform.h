@@ -17,8 +17,11 @@
 
 #include <any>
 #include <cstdarg>
+#include <cstring>
+#include <ctime>
 #include <functional>
 #include <map>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <set>
@@ -53,7 +56,8 @@ struct Event {
     enum class Kind { CALL, LOCK, UNLOCK, LOG, LOGGER, CIPHER };
     Kind kind;
     // CALL   "function(argument, argument)"
-    // LOCK   "lock NAME", UNLOCK "unlock NAME"
+    // LOCK   "lock NAME", UNLOCK "unlock NAME" of a scoped lock; "NAME.Lock()", "NAME.Unlock()" of
+    //        an explicit one
     // LOG    "debug FILE FUNCTION: PLAIN", likewise "error" and "notice"; where the format is not
     //        the plain text itself, "error FILE FUNCTION: PLAIN <- FORMAT"
     // LOGGER "GetDebugMode"; CIPHER "Encrypt(PLAIN)"
@@ -73,14 +77,17 @@ public:
 
     // \name What it answers
     // A value is written into the caller's slot whatever the result is; without one the slot stays
-    // as it was. A std::string becomes malloc memory that is entered in the ledger.
+    // as it was. A std::string becomes malloc memory that is entered in the ledger; an enumeration
+    // may be given as any int, listed or not.
     void answer(const std::string& call, int result, std::any value = {});
 
     int debugMode = 0;
     std::optional<std::string> tag;
     bool cipherThrows = false;
+    bool numberTextThrows = false;
     int logResult = 0;
-    int cardChanged = 0; // what tel_get_sim_init_info() tells beside the status
+    std::optional<std::time_t> now; // the machine's clock tells it otherwise
+    int cardChanged = 0;            // what tel_get_sim_init_info() tells beside the status
     // Called after each event outside LOGGER and CIPHER, on the thread of the event.
     std::function<void(const Event&)> onEvent;
 
@@ -117,6 +124,8 @@ public:
     template <class Value, class... Arguments>
     int reply(Value* slot, const char* function, const Arguments&... arguments);
     std::any valueOf(const std::string& call);
+    telephony_handle_list_s openList(unsigned int count);
+    void closeList(const telephony_handle_list_s& list);
     void addHandle(const std::string& handle);
     void removeHandle(const std::string& handle);
     char** modemNames();
@@ -127,16 +136,22 @@ private:
         std::any value;
     };
     Answer answerTo(const std::string& call);
+    bool eraseList(const telephony_h* handles);
 
     mutable std::mutex mutex_;
     std::vector<Event> events_;
     std::map<std::string, Answer> answers_;
     std::multiset<std::string> handles_;
+    std::map<const telephony_h*, std::unique_ptr<telephony_h[]>> lists_;
     std::optional<Texts> modems_;
     std::vector<char*> modemPointers_;
 };
 
 FakePlatform& platform();
+
+// Whether one of the logger's buffers holds the text.
+bool isInFormatBuffer(const std::string& text);
+void clearFormatBuffers();
 
 // What the fake cipher makes of a text, and back.
 std::string encipher(const std::string& plain);
@@ -147,7 +162,8 @@ inline void writeArgument(std::ostream& out, const char* text)
 {
     out << (text != nullptr ? text : "null");
 }
-// "slot 0", "slot 1", ... of a handle of a list; "modem NAME" of a handle of tel_init().
+// "slot 0", "slot 1", ... of a handle of a list, "modem NAME" of a handle of tel_init(); "no slot"
+// and "no modem" of null.
 void writeArgument(std::ostream& out, telephony_h handle);
 void writeArgument(std::ostream& out, TapiHandle* handle);
 // "package NAME" of a handle of package_info_create().
@@ -175,17 +191,40 @@ int FakePlatform::call(const char* function, const Arguments&... arguments)
     return answerTo(callText(function, arguments...)).result;
 }
 
+// Fails the test.
+void reportWrongType(const std::string& call);
+
+// Whether the value suits the slot; it is stored if so.
+template <class Value>
+bool store(const std::any& value, Value* slot)
+{
+    if constexpr (std::is_same_v<Value, char*>) {
+        if (const auto* const text = std::any_cast<std::string>(&value)) {
+            *slot = ledger().handOut(*text);
+            return true;
+        }
+    }
+    if constexpr (std::is_enum_v<Value>) {
+        static_assert(sizeof(Value) == sizeof(int), "the platform's enumerations are int-sized");
+        if (const auto* const number = std::any_cast<int>(&value)) {
+            std::memcpy(slot, number, sizeof *number);
+            return true;
+        }
+    }
+    const auto* const plain = std::any_cast<Value>(&value);
+    if (plain != nullptr)
+        *slot = *plain;
+    return plain != nullptr;
+}
+
 template <class Value, class... Arguments>
 int FakePlatform::reply(Value* slot, const char* function, const Arguments&... arguments)
 {
     const AllocationPause pause;
-    const Answer answer = answerTo(callText(function, arguments...));
-    if constexpr (std::is_same_v<Value, char*>) {
-        if (const auto* const text = std::any_cast<std::string>(&answer.value))
-            *slot = ledger().handOut(*text);
-    }
-    if (const auto* const value = std::any_cast<Value>(&answer.value))
-        *slot = *value;
+    const std::string call = callText(function, arguments...);
+    const Answer answer = answerTo(call);
+    if (answer.value.has_value() && !store(answer.value, slot))
+        reportWrongType(call);
     return answer.result;
 }
 

@@ -23,6 +23,8 @@ public:
     std::vector<std::string> live() const;
     // The same for one string; "" for anything else.
     std::string origin(const char* text) const;
+    // Frees what nobody has freed yet and tells what it was: for what the library keeps on purpose.
+    std::vector<std::string> freeAll();
 
     void addCopy(const char* text);
     void remove(const void* address);
@@ -30,6 +32,7 @@ public:
 
 private:
     void add(const char* text, const char* owner);
+    std::vector<std::string> texts() const;
 
     mutable std::mutex mutex_;
     std::map<std::uintptr_t, std::string> live_;

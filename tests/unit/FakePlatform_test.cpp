@@ -1,14 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 // The fake itself: a test that stands on it must fail when it should.
 #include <cstring>
+#include <ctime>
 
 #include <gtest/gtest-spi.h>
 
+#include <CoreLogger.h>
 #include <CoreMutex.h>
 #include <CoreMutexLock.h>
 #include <CoreUtil.h>
 #include <dlog.h>
 #include <system_info.h>
+#include <tapi_common.h>
+#include <telephony.h>
 
 #include "support/PlatformTest.h"
 
@@ -73,7 +77,7 @@ TEST_F(FakePlatformTest, CipherIsReversibleAndHidesEveryByte)
     EXPECT_EQ(encipher(plain).find_first_not_of("0123456789abcdef"), std::string::npos);
 }
 
-TEST_F(FakePlatformTest, LocksAreRecordedByName)
+TEST_F(FakePlatformTest, LocksAreRecordedByNameAndStyle)
 {
     {
         const CoreMutexLock scoped("one");
@@ -82,12 +86,138 @@ TEST_F(FakePlatformTest, LocksAreRecordedByName)
         other.Unlock();
     }
     EXPECT_THAT(platform().trace(),
-                ElementsAre("lock one", "lock two", "unlock two", "unlock one"));
+                ElementsAre("lock one", "two.Lock()", "two.Unlock()", "unlock one"));
+}
+
+TEST_F(FakePlatformTest, LockTakenTwiceFailsTheTest)
+{
+    const CoreMutexLock outer("one");
+    EXPECT_NONFATAL_FAILURE(const CoreMutexLock inner("one"), "one was taken twice");
+    CoreMutex other("one");
+    EXPECT_NONFATAL_FAILURE(other.Lock(), "one was taken twice");
+    other.Unlock();
 }
 
 TEST_F(FakePlatformTest, NumbersBecomeText)
 {
     EXPECT_EQ(CoreUtil::GetInstance()->intToStr(-12), "-12");
+    EXPECT_THAT(platform().trace(), ElementsAre("intToStr(-12)"));
+    platform().numberTextThrows = true;
+    EXPECT_THROW(CoreUtil::GetInstance()->intToStr(-12), std::bad_alloc);
+}
+
+TEST_F(FakePlatformTest, FormatBuffersAreSearchedWhole)
+{
+    CoreLogger& logger = *CoreLogger::GetInstance();
+    char* const buffer = logger.GetBuffer(logger.GetBufferIndex());
+    std::strcpy(buffer + 580, "at the end");
+    EXPECT_TRUE(isInFormatBuffer("at the end"));
+    EXPECT_FALSE(isInFormatBuffer("at the beginning"));
+    platform().reset();
+    EXPECT_FALSE(isInFormatBuffer("at the end"));
+}
+
+TEST_F(FakePlatformTest, ClockTellsTheTimeThatWasSet)
+{
+    EXPECT_GT(std::time(nullptr), 1000000);
+    platform().now = 12345;
+    std::time_t slot = 0;
+    EXPECT_EQ(std::time(&slot), 12345);
+    EXPECT_EQ(slot, 12345);
+    platform().reset();
+    EXPECT_GT(std::time(nullptr), 1000000);
+}
+
+TEST_F(FakePlatformTest, AnswerOfAnotherTypeFailsTheTest)
+{
+    platform().answer("read()", 0, 42L);
+    int value = 0;
+    EXPECT_NONFATAL_FAILURE(platform().reply(&value, "read"), "another type than its slot");
+    EXPECT_EQ(value, 0);
+    platform().answer("telephony_init()", 0, 2);
+    telephony_handle_list_s list = {0, nullptr};
+    EXPECT_NONFATAL_FAILURE(telephony_init(&list), "another type than its slot");
+    EXPECT_EQ(list.handle, nullptr);
+}
+
+TEST_F(FakePlatformTest, EnumerationsTakeEveryNumber)
+{
+    for (const int number : {0, 3, 7, -1}) {
+        platform().answer("read()", 0, number);
+        telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
+        EXPECT_EQ(platform().reply(&state, "read"), 0);
+        EXPECT_EQ(std::memcmp(&state, &number, sizeof number), 0) << number;
+    }
+    platform().answer("read()", 0, TELEPHONY_SIM_STATE_UNKNOWN);
+    telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
+    platform().reply(&state, "read");
+    EXPECT_EQ(state, TELEPHONY_SIM_STATE_UNKNOWN);
+}
+
+TEST_F(FakePlatformTest, OpenListsAreLiveUntilTheirRelease)
+{
+    platform().answer("telephony_init()", 0, 2u);
+    platform().answer("telephony_deinit(list of 2)", 0);
+    telephony_handle_list_s kept = {0, nullptr};
+    telephony_handle_list_s released = {0, nullptr};
+    EXPECT_EQ(telephony_init(&kept), 0);
+    EXPECT_EQ(telephony_init(&released), 0);
+    EXPECT_EQ(kept.count, 2u);
+    EXPECT_EQ(callText("ask", kept.handle[1]), "ask(slot 1)");
+    EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 2", "list of 2"));
+    EXPECT_EQ(telephony_deinit(&released), 0);
+    EXPECT_EQ(released.count, 0u);
+    EXPECT_EQ(released.handle, nullptr);
+    EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 2"));
+    platform().reset();
+    EXPECT_THAT(platform().liveHandles(), IsEmpty());
+}
+
+TEST_F(FakePlatformTest, SecondReleaseOfListFailsTheTest)
+{
+    platform().answer("telephony_init()", 0, 1u);
+    platform().answer("telephony_deinit(list of 1)", 0);
+    platform().answer("telephony_deinit(no list)", 0);
+    telephony_handle_list_s list = {0, nullptr};
+    telephony_init(&list);
+    telephony_handle_list_s copy = list;
+    telephony_handle_list_s other = {1, &list.handle[0] + 1};
+    EXPECT_NONFATAL_FAILURE(telephony_deinit(&other), "a list of 1 was released that is not open");
+    EXPECT_EQ(telephony_deinit(&list), 0);
+    EXPECT_EQ(telephony_deinit(&list), 0); // emptied: nothing to release
+    EXPECT_NONFATAL_FAILURE(telephony_deinit(&copy), "a list of 1 was released that is not open");
+}
+
+TEST_F(FakePlatformTest, SecondReleaseOfModemFailsTheTest)
+{
+    platform().answer("tel_init(cp0)", 0);
+    platform().answer("tel_init(null)", 0);
+    platform().answer("tel_init(cp1)", -1);
+    platform().answer("tel_deinit(modem cp0)", 0);
+    EXPECT_EQ(tel_init("cp1"), nullptr);
+    EXPECT_EQ(tel_init("cp0"), tel_init("cp0"));
+    tel_init(nullptr);
+    EXPECT_THAT(platform().liveHandles(), ElementsAre("modem cp0", "modem cp0", "modem null"));
+    TapiHandle* const handle = tel_init("cp0");
+    for (int i = 0; i < 3; ++i)
+        EXPECT_EQ(tel_deinit(handle), 0);
+    EXPECT_THAT(platform().liveHandles(), ElementsAre("modem null"));
+    EXPECT_NONFATAL_FAILURE(tel_deinit(handle), "modem cp0 was released but is not open");
+}
+
+TEST_F(FakePlatformTest, NullHandlesHaveTextsToo)
+{
+    EXPECT_EQ(callText("ask", telephony_h(nullptr), static_cast<TapiHandle*>(nullptr)),
+              "ask(no slot, no modem)");
+}
+
+TEST_F(FakePlatformTest, LedgerFreesWhatIsKept)
+{
+    ledger().handOut("a");
+    EXPECT_NE(strdup("b"), nullptr);
+    EXPECT_THAT(ledger().freeAll(), ElementsAre("copy: b", "platform: a"));
+    EXPECT_THAT(ledger().live(), IsEmpty());
+    EXPECT_THAT(ledger().freeAll(), IsEmpty());
 }
 
 TEST_F(FakePlatformTest, LedgerTellsOwnersApart)
@@ -143,6 +273,7 @@ TEST_F(FakePlatformTest, ResetForgetsEverything)
     platform().answer("call()", 0);
     platform().debugMode = 1;
     platform().tag = "Tag";
+    platform().numberTextThrows = true;
     platform().onEvent = [](const Event&) {};
     platform().call("call");
     char* const forgotten = ledger().handOut("text");
@@ -150,6 +281,7 @@ TEST_F(FakePlatformTest, ResetForgetsEverything)
     EXPECT_THAT(platform().events(), IsEmpty());
     EXPECT_EQ(platform().debugMode, 0);
     EXPECT_FALSE(platform().tag);
+    EXPECT_FALSE(platform().numberTextThrows);
     EXPECT_FALSE(platform().onEvent);
     EXPECT_THAT(ledger().live(), IsEmpty());
     EXPECT_NONFATAL_FAILURE(platform().call("call"), "no answer");

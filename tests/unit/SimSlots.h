@@ -1,0 +1,241 @@
+// SPDX-License-Identifier: Apache-2.0
+// A device with SIM slots over the fake platform, and what SimManager does to ask it: the parts
+// that the traces of all SIM questions are made of.
+#ifndef CORESYSTEM_TESTS_UNIT_SIM_SLOTS_H
+#define CORESYSTEM_TESTS_UNIT_SIM_SLOTS_H
+
+#include <algorithm>
+#include <climits>
+#include <cstring>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include <TelSim.h>
+#include <telephony.h>
+
+#include "support/PlatformTest.h"
+
+// Result codes of the platform, listed and not.
+const int PLATFORM_FAILURES[] = {-22, -13,       -1073741822, -39845887, -39841791,
+                                 -1,  INT32_MIN, 1,           INT32_MAX};
+
+// \name The device
+// The modem of slot N is "cpN".
+
+struct Card {
+    std::string mcc;
+    std::string mnc;
+    std::string msin;
+    std::string number;
+
+    std::string imsi() const
+    {
+        return mcc + mnc + msin;
+    }
+};
+
+const Card KOREAN_CARD = {"450", "05", "8173926450", "+821087654321"};
+const Card AMERICAN_CARD = {"310", "260", "907264815", "+12025550143"};
+
+inline std::string slotCall(const std::string& function, int slot)
+{
+    return function + "(slot " + std::to_string(slot) + ")";
+}
+
+inline std::string modemOf(int slot)
+{
+    return "cp" + std::to_string(slot);
+}
+
+inline std::string modemCall(const std::string& function, int slot)
+{
+    return function + "(modem " + modemOf(slot) + ")";
+}
+
+inline std::string initCall(int slot)
+{
+    return "tel_init(" + modemOf(slot) + ")";
+}
+
+inline std::string stateCall(int slot)
+{
+    return slotCall("telephony_sim_get_state", slot);
+}
+
+inline std::string numberCall(int slot)
+{
+    return slotCall("telephony_sim_get_subscriber_number", slot);
+}
+
+inline std::string imsiCall(int slot)
+{
+    return modemCall("tel_get_sim_imsi", slot);
+}
+
+inline std::string listName(unsigned int count)
+{
+    return "list of " + std::to_string(count);
+}
+
+inline std::string deinitCall(unsigned int count)
+{
+    return "telephony_deinit(" + listName(count) + ")";
+}
+
+// A field without room for its NUL is given without one.
+template <std::size_t size>
+void fillField(char (&field)[size], const std::string& text)
+{
+    std::memset(field, 0, size);
+    std::memcpy(field, text.data(), std::min(text.size(), size));
+}
+
+inline TelSimImsiInfo_t imsiInfo(const Card& card)
+{
+    TelSimImsiInfo_t info;
+    fillField(info.szMcc, card.mcc);
+    fillField(info.szMnc, card.mnc);
+    fillField(info.szMsin, card.msin);
+    return info;
+}
+
+// Telephony that reports `count` slots; what the slots answer is set apart.
+inline void setSlotCount(unsigned int count)
+{
+    fake::platform().answer("telephony_init()", 0, count);
+    fake::platform().answer(deinitCall(count), 0);
+}
+
+// Telephony that cannot be initialised.
+inline void setNoTelephony(int code = -1073741822)
+{
+    fake::platform().answer("telephony_init()", code);
+    fake::platform().answer("telephony_deinit(no list)", 0);
+}
+
+inline void setState(int slot, int state, int code = 0)
+{
+    fake::platform().answer(stateCall(slot), code, state);
+}
+
+inline void setCard(int slot, const Card& card)
+{
+    setState(slot, TELEPHONY_SIM_STATE_AVAILABLE);
+    fake::platform().answer(initCall(slot), 0);
+    fake::platform().answer(imsiCall(slot), 0, imsiInfo(card));
+    fake::platform().answer(modemCall("tel_deinit", slot), 0);
+    fake::platform().answer(numberCall(slot), 0, card.number);
+}
+
+const std::nullopt_t NO_CARD = std::nullopt;
+
+// A whole device: one slot each.
+inline void setSlots(const std::vector<std::optional<Card>>& cards)
+{
+    fake::Texts modems;
+    for (const std::optional<Card>& card : cards) {
+        const int slot = static_cast<int>(modems.size());
+        if (card)
+            setCard(slot, *card);
+        else
+            setState(slot, TELEPHONY_SIM_STATE_UNAVAILABLE);
+        modems.push_back(modemOf(slot));
+    }
+    fake::platform().setModems(modems);
+    setSlotCount(static_cast<unsigned int>(cards.size()));
+}
+
+// A list as telephony_init() fills it, for the calls that take one. The fake keeps it.
+inline telephony_handle_list_s openList(unsigned int count)
+{
+    return fake::platform().openList(count);
+}
+
+// \name What was done
+
+const std::string SIM_ACCESS = "CORE_MUTEX_NAME_SIM_ACCESS";
+
+// Locked around one platform call only.
+inline fake::Texts lockedAround(const std::string& call)
+{
+    return {SIM_ACCESS + ".Lock()", call, SIM_ACCESS + ".Unlock()"};
+}
+
+// Locked from the beginning to the end.
+inline fake::Texts lockedThroughout(const fake::Texts& trace)
+{
+    using fake::operator+;
+    return fake::Texts{"lock " + SIM_ACCESS} + trace + fake::Texts{"unlock " + SIM_ACCESS};
+}
+
+inline fake::Texts listTaken(unsigned int count)
+{
+    return {fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle", "SuccessToInitTelephonyHandle"),
+            "telephony_init()",
+            fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle",
+                                    "Success! telephony_init, handle count : " +
+                                        std::to_string(count))};
+}
+
+inline fake::Texts noListTaken()
+{
+    return {fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle", "SuccessToInitTelephonyHandle"),
+            "telephony_init()",
+            fake::SIM_MANAGER.error("SuccessToInitTelephonyHandle", "telephony_init Failed.")};
+}
+
+inline fake::Texts listReleased(unsigned int count)
+{
+    return {fake::SIM_MANAGER.debug("DeleteTelephonyHandle", "DeleteTelephonyHandle"),
+            deinitCall(count)};
+}
+
+// SimManager::IsSimAvailable() of one slot.
+inline fake::Texts availabilityAsked(int slot, unsigned int count, bool available)
+{
+    using fake::operator+;
+    const auto line = [](const std::string& text) {
+        return fake::SIM_MANAGER.debug("IsSimAvailable", text);
+    };
+    return fake::Texts{line("IsSimAvailable : slot " + std::to_string(slot + 1)),
+                       line("GetTelephonyHandle, handle count : " + std::to_string(count))} +
+           lockedAround(stateCall(slot)) +
+           fake::Texts{available
+                           ? line("SIM is available")
+                           : fake::SIM_MANAGER.error("IsSimAvailable", "Sim is not available")};
+}
+
+// Steps of the facade, each with the access to SimManager before it.
+inline fake::Texts accessed(const fake::Texts& step)
+{
+    using fake::operator+;
+    return fake::SIM_MANAGER.access() + step;
+}
+
+// \name What must not be told
+
+// The longest runs of the text that would identify a card.
+inline bool isTold(const std::string& secret)
+{
+    const auto holds = [&](const std::string& text) {
+        return text.find(secret) != std::string::npos;
+    };
+    const std::vector<fake::Event> events = fake::platform().events();
+    return fake::isInFormatBuffer(secret) ||
+           std::any_of(events.begin(), events.end(), [&](const fake::Event& event) {
+               return holds(event.text) || holds(event.line.text) || holds(event.line.plain);
+           });
+}
+
+// Whether any five digits in a row of the MSIN or of the number were formatted or logged.
+inline bool isIdentityTold(const Card& card)
+{
+    for (const std::string& secret : {card.msin, card.number})
+        for (std::size_t start = 0; start + 5 <= secret.size(); ++start)
+            if (isTold(secret.substr(start, 5)))
+                return true;
+    return false;
+}
+
+#endif
