@@ -65,6 +65,19 @@ LoggedCall availableCall(const std::string& name, const std::vector<int>& states
             accessed(listTaken(count)) + slotsAsked(states, asked) + accessed(listReleased(count)));
 }
 
+// Handed on without a line of the facade's own.
+LoggedCall existsCall(const std::string& name, int state, const std::string& stateName,
+                      bool expected)
+{
+    const auto line = [](const std::string& text) { return SIM_MANAGER.debug("IsSimExist", text); };
+    return simCall(
+        "SimExists" + name, [] { return coreSystem().IsSimExist(); }, [=] { setStates({state}); },
+        expected, {},
+        accessed(lockedThroughout({"telephony_init()", stateCall(0),
+                                   line("RESULT sim_get_state[0] : 0 | 0"),
+                                   line("SIM STATE[0] : " + stateName), deinitCall(1)})));
+}
+
 const std::string DUAL_ENTRY =
     CORE_SYSTEM.debug("IsDualSimAvailable", "CoreSystem IsDualSimAvailable()");
 
@@ -97,6 +110,8 @@ std::vector<LoggedCall> simCalls()
         simCall(
             "SimAvailableWithoutSlots", &isSimAvailable, [] { setSlotCount(0); }, false,
             {"list of 0"}, entry + accessed(noListTaken())),
+        existsCall("Present", AVAILABLE, "TELEPHONY_SIM_STATE_AVAILABLE", true),
+        existsCall("Locked", LOCKED, "TELEPHONY_SIM_STATE_LOCKED", false),
         dualCall("InBothSlots", {AVAILABLE, AVAILABLE}, 2, true),
         dualCall("InFirstSlotOnly", {AVAILABLE, ABSENT}, 2, false),
         dualCall("InSecondSlotOnlyAndItIsNotAsked", {ABSENT, AVAILABLE}, 1, false),

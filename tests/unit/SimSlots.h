@@ -215,7 +215,7 @@ inline fake::Texts accessed(const fake::Texts& step)
 
 // \name What must not be told
 
-// The longest runs of the text that would identify a card.
+// Whether the text was formatted or logged anywhere.
 inline bool isTold(const std::string& secret)
 {
     const auto holds = [&](const std::string& text) {
