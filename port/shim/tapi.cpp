@@ -40,7 +40,7 @@ public:
     {
         for (port::SlotName& name : names_)
             pointers_.push_back(name.data());
-        pointers_.push_back(nullptr);
+        pointers_.resize(names_.size() + ENDS, nullptr);
     }
 
     char** pointers()
@@ -49,6 +49,10 @@ public:
     }
 
 private:
+    // One end would do, but applications look at the place of a slot that they counted before, and
+    // its modem may be gone.
+    static constexpr std::size_t ENDS = 16;
+
     std::vector<port::SlotName> names_;
     std::vector<char*> pointers_;
 };

@@ -79,6 +79,14 @@ TEST_F(TapiTest, NoModemIsAListWithoutNames)
     EXPECT_THAT(textsOf(tel_get_cp_name_list()), IsEmpty());
 }
 
+TEST_F(TapiTest, PlaceOfASlotThatWentAwayHoldsNoName)
+{
+    telephony.slotsAnswer = answered(FakeTelephony::Names{});
+    char** const names = tel_get_cp_name_list();
+    for (int slot = 0; slot < 16; ++slot)
+        EXPECT_EQ(nullptr, names[slot]);
+}
+
 TEST_F(TapiTest, NoServiceIsNoList)
 {
     for (const port::Error& error :

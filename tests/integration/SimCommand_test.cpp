@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: Apache-2.0
+// The command `coresystem` asks the library, the port and the real ModemManager, each a process
+// away.
+#include <gmock/gmock.h>
+
+#include "linux/Telephony.h"
+#include "support/ModemsOnBus.h"
+#include "support/Program.h"
+
+using port::Service;
+using testing::HasSubstr;
+using testing::Not;
+
+namespace {
+
+class SimCommandTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (!ModemsOnBus::obstacle().empty())
+            GTEST_SKIP() << ModemsOnBus::obstacle();
+        modems = std::make_unique<ModemsOnBus>();
+    }
+
+    // Plugs a modem in, switches it on and waits until it is in service.
+    void addInService(const std::string& id, const AtModem::State& state)
+    {
+        modems->add(id, state);
+        modems->enable(id);
+        ASSERT_TRUE(modems->waitUntil([&] {
+            const auto service = telephony.service("/virtual/" + id);
+            return service && service.value().value == Service::InService;
+        }));
+    }
+
+    void addTwo()
+    {
+        AtModem::State korean;
+        korean.imsi = "450050123456789";
+        korean.network = "45005";
+        korean.number = "+821055500100";
+        addInService("a", korean);
+        AtModem::State american;
+        american.imei = "356938035643809";
+        american.imsi = "310260123456789";
+        american.mncLength = 3;
+        american.number = "";
+        american.network = "45005";
+        american.registration = 5;
+        addInService("b", american);
+    }
+
+    static std::string outputOfCommand(const std::string& arguments)
+    {
+        return outputOf("env -u CORESYSTEM_DEVICE TZ=UTC0 " COMMAND " " + arguments +
+                        "; echo \"[$?]\"");
+    }
+
+    std::unique_ptr<ModemsOnBus> modems;
+    port::linux_backend::Bus bus;
+    port::linux_backend::LinuxTelephony telephony{bus};
+};
+
+TEST_F(SimCommandTest, TwoModemsAreShownEachForItself)
+{
+    addTwo();
+    EXPECT_EQ("backend: linux (this machine's services)\n"
+              "\n"
+              "slot  modem       SIM    MCC  MNC  MSIN        number         country              "
+              "     network  SMS\n"
+              "0     /virtual/a  ready  450  05   ********89  ***********00  Korea, South         "
+              "     home     ready\n"
+              "1     /virtual/b  ready  310  260  *******89   -              United States of "
+              "America  roaming  ready\n"
+              "\n"
+              "Not available\n"
+              "  slot 1  number  the SIM card holds no number\n"
+              "\n"
+              "Default slots\n"
+              "  network  unknown\n"
+              "  data     unknown\n"
+              "  calls    unknown\n"
+              "\n"
+              "What identifies the subscriber is masked; --reveal shows it.\n"
+              "[0]\n",
+              outputOfCommand("sim"));
+    EXPECT_THAT(outputOfCommand("sim --reveal"),
+                HasSubstr("  450  05   0123456789  +821055500100  "));
+    EXPECT_EQ("490154203237518\n[0]\n", outputOfCommand("get imei"));
+    EXPECT_EQ("Korea, South\n[0]\n", outputOfCommand("get sim_country"));
+}
+
+TEST_F(SimCommandTest, KilledDaemonIsNamedAndNothingIsMadeUp)
+{
+    addTwo();
+    modems->kill();
+    EXPECT_THAT(outputOfCommand("sim"),
+                testing::AllOf(HasSubstr("there is no SIM slot: org.freedesktop.ModemManager1"),
+                               HasSubstr("[3]"), Not(HasSubstr("450"))));
+    EXPECT_THAT(outputOfCommand("get imei"),
+                HasSubstr("; applications are told 000000000000000\n[3]"));
+    EXPECT_THAT(outputOfCommand("get sim_mcc"),
+                HasSubstr("sim_mcc is not available: org.freedesktop.ModemManager1"));
+}
+
+} // namespace
