@@ -7,6 +7,8 @@ namespace {
 
 constexpr int PATIENCE_MS = 5000;
 constexpr guint32 PRIMARY_OWNER = 1;
+constexpr guint32 MAY_BE_REPLACED = 1;
+constexpr guint32 REPLACE = 2;
 
 GDBusConnection* connectTo(const std::string& address)
 {
@@ -24,8 +26,8 @@ void ownName(GDBusConnection* connection, const std::string& name)
 {
     GVariant* const reply = g_dbus_connection_call_sync(
         connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-        "RequestName", g_variant_new("(su)", name.c_str(), 0U), nullptr, G_DBUS_CALL_FLAGS_NONE,
-        PATIENCE_MS, nullptr, nullptr);
+        "RequestName", g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE), nullptr,
+        G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
     guint32 result = 0;
     if (reply != nullptr)
         g_variant_get(reply, "(u)", &result);
@@ -61,21 +63,50 @@ ScriptedService::ScriptedService(const std::string& address, const std::string& 
 
 ScriptedService::~ScriptedService()
 {
-    keepSilent();
+    {
+        // What a script refers to may end before the connection's thread does.
+        const std::lock_guard<std::mutex> lock(state_->mutex);
+        for (auto& [key, script] : state_->scripts)
+            script = [](GDBusMessage*) -> GDBusMessage* { return nullptr; };
+        for (GDBusMessage* const answer : state_->heldBack)
+            g_object_unref(answer);
+    }
     g_dbus_connection_remove_filter(connection_, filter_);
     g_dbus_connection_close_sync(connection_, nullptr, nullptr);
     g_object_unref(connection_);
 }
 
-GDBusMessage* ScriptedService::State::reply(GDBusMessage* question, bool& known)
+bool ScriptedService::State::answer(GDBusMessage* question)
 {
     const std::string method = g_dbus_message_get_member(question);
     const std::lock_guard<std::mutex> lock(mutex);
     auto script = scripts.find(keyOf(method, g_dbus_message_get_path(question)));
     if (script == scripts.end())
         script = scripts.find(method);
-    known = script != scripts.end();
-    return known ? script->second(question) : nullptr;
+    if (script == scripts.end())
+        return false;
+    ++timesAsked;
+    if (GDBusMessage* const answer = script->second(question))
+        heldBack.push_back(answer);
+    return true;
+}
+
+std::vector<GDBusMessage*> ScriptedService::State::answersThatAreDue()
+{
+    const std::lock_guard<std::mutex> lock(mutex);
+    std::vector<GDBusMessage*> due;
+    if (heldBack.size() >= together)
+        due.swap(heldBack);
+    return due;
+}
+
+void ScriptedService::sendAnswersOf(State& state, GDBusConnection* connection)
+{
+    for (GDBusMessage* const answer : state.answersThatAreDue()) {
+        g_dbus_connection_send_message(connection, answer, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                       nullptr);
+        g_object_unref(answer);
+    }
 }
 
 // Runs on the connection's own thread, so a test may block in a call meanwhile.
@@ -84,16 +115,10 @@ GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessa
 {
     if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
-    bool known = false;
-    GDBusMessage* const reply =
-        (*static_cast<std::shared_ptr<State>*>(state))->reply(message, known);
-    if (!known)
+    State& script = **static_cast<std::shared_ptr<State>*>(state);
+    if (!script.answer(message))
         return message;
-    if (reply != nullptr) {
-        g_dbus_connection_send_message(connection, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                       nullptr);
-        g_object_unref(reply);
-    }
+    sendAnswersOf(script, connection);
     g_object_unref(message);
     return nullptr;
 }
@@ -103,10 +128,32 @@ void ScriptedService::releaseState(gpointer state)
     delete static_cast<std::shared_ptr<State>*>(state);
 }
 
-void ScriptedService::follow(const std::string& key, Script script)
+void ScriptedService::follow(const std::string& method, Script script, const std::string& path)
 {
     const std::lock_guard<std::mutex> lock(state_->mutex);
-    state_->scripts[key] = std::move(script);
+    state_->scripts[keyOf(method, path)] = std::move(script);
+}
+
+GDBusMessage* ScriptedService::reply(GDBusMessage* question, const std::string& body)
+{
+    GDBusMessage* const message = g_dbus_message_new_method_reply(question);
+    g_dbus_message_set_body(message, parsed(body));
+    return message;
+}
+
+void ScriptedService::answerOnlyTogether(std::size_t count)
+{
+    {
+        const std::lock_guard<std::mutex> lock(state_->mutex);
+        state_->together = count;
+    }
+    sendAnswersOf(*state_, connection_);
+}
+
+int ScriptedService::timesAsked() const
+{
+    const std::lock_guard<std::mutex> lock(state_->mutex);
+    return state_->timesAsked;
 }
 
 void ScriptedService::answer(const std::string& body)
@@ -117,11 +164,8 @@ void ScriptedService::answer(const std::string& body)
 void ScriptedService::answerTo(const std::string& method, const std::string& body,
                                const std::string& path)
 {
-    follow(keyOf(method, path), [body](GDBusMessage* question) {
-        GDBusMessage* const reply = g_dbus_message_new_method_reply(question);
-        g_dbus_message_set_body(reply, parsed(body));
-        return reply;
-    });
+    follow(
+        method, [body](GDBusMessage* question) { return reply(question, body); }, path);
 }
 
 void ScriptedService::emit(const std::string& path, const std::string& interface,
@@ -132,17 +176,18 @@ void ScriptedService::emit(const std::string& path, const std::string& interface
     g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
 }
 
-void ScriptedService::fail(const std::string& errorName, const std::string& message)
+void ScriptedService::fail(const std::string& errorName, const std::string& message,
+                           const std::string& method)
 {
-    follow(GET_ALL, [errorName, message](GDBusMessage* question) {
+    follow(method, [errorName, message](GDBusMessage* question) {
         return g_dbus_message_new_method_error_literal(question, errorName.c_str(),
                                                        message.c_str());
     });
 }
 
-void ScriptedService::keepSilent()
+void ScriptedService::keepSilent(const std::string& method)
 {
-    whenAsked([] {});
+    whenAsked([] {}, method);
 }
 
 void ScriptedService::whenAsked(std::function<void()> act, const std::string& method)
@@ -153,7 +198,7 @@ void ScriptedService::whenAsked(std::function<void()> act, const std::string& me
     });
 }
 
-void ScriptedService::leaveWhenAsked()
+void ScriptedService::leaveWhenAsked(const std::string& method)
 {
-    whenAsked([this] { g_dbus_connection_close(connection_, nullptr, nullptr, nullptr); });
+    whenAsked([this] { g_dbus_connection_close(connection_, nullptr, nullptr, nullptr); }, method);
 }

@@ -8,6 +8,7 @@
 #include <memory>
 #include <mutex>
 #include <string>
+#include <vector>
 
 #include <gio/gio.h>
 
@@ -15,6 +16,10 @@
 /// for; at first every GetAll, with no properties.
 class ScriptedService {
 public:
+    /// What to answer to a question; null: nothing. It runs on the service's own thread.
+    using Script = std::function<GDBusMessage*(GDBusMessage* question)>;
+
+    /// Takes the name over from a scripted service that has it.
     ScriptedService(const std::string& address, const std::string& name);
     ~ScriptedService();
     ScriptedService(const ScriptedService&) = delete;
@@ -28,29 +33,41 @@ public:
     void emit(const std::string& path, const std::string& interface, const std::string& signal,
               const std::string& body);
     /// Answers with a D-Bus error.
-    void fail(const std::string& errorName, const std::string& message);
+    void fail(const std::string& errorName, const std::string& message,
+              const std::string& method = "GetAll");
     /// Takes the question and never answers.
-    void keepSilent();
+    void keepSilent(const std::string& method = "GetAll");
     /// Runs something when it is asked, and never answers.
     void whenAsked(std::function<void()> act, const std::string& method = "GetAll");
     /// Leaves the bus when it is asked, as a daemon that dies does.
-    void leaveWhenAsked();
+    void leaveWhenAsked(const std::string& method = "GetAll");
+    /// Answers as a test likes.
+    void follow(const std::string& method, Script script, const std::string& path = "");
+    static GDBusMessage* reply(GDBusMessage* question, const std::string& body);
+
+    /// Holds the answers back until there are so many, then gives them all; 1 gives them at once.
+    void answerOnlyTogether(std::size_t count);
+    /// How many questions it had a script for.
+    int timesAsked() const;
 
 private:
-    using Script = std::function<GDBusMessage*(GDBusMessage* question)>;
-
     // Shared with the connection's thread, which may still be at it after the object's end.
     struct State {
         std::mutex mutex;
         std::map<std::string, Script> scripts; // by method, or method and path
+        int timesAsked = 0;
+        std::size_t together = 1;
+        std::vector<GDBusMessage*> heldBack;
 
-        GDBusMessage* reply(GDBusMessage* question, bool& known);
+        /// Whether there is a script for it.
+        bool answer(GDBusMessage* question);
+        std::vector<GDBusMessage*> answersThatAreDue();
     };
 
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
                                    gpointer state);
     static void releaseState(gpointer state);
-    void follow(const std::string& key, Script script);
+    static void sendAnswersOf(State& state, GDBusConnection* connection);
 
     const std::shared_ptr<State> state_ = std::make_shared<State>();
     GDBusConnection* const connection_;

@@ -1,0 +1,782 @@
+// SPDX-License-Identifier: Apache-2.0
+// Telephony from services under the real names that say what no real one could be brought to say.
+#include "linux/Telephony.h"
+
+#include <chrono>
+#include <map>
+#include <thread>
+
+#include <gmock/gmock.h>
+
+#include "linux/ModemManager.h"
+#include "linux/NetworkManager.h"
+#include "support/PrivateBus.h"
+#include "support/ScriptedService.h"
+#include "support/TelephonyQuestions.h"
+#include "support/Together.h"
+
+using port::CardStatus;
+using port::Error;
+using port::Result;
+using port::Service;
+using port::SlotName;
+using port::Sourced;
+using port::linux_backend::Bus;
+using port::linux_backend::LinuxTelephony;
+using port::linux_backend::MODEM_MANAGER;
+using port::linux_backend::MOST_OBJECTS;
+using port::linux_backend::NETWORK_MANAGER;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+using testing::StartsWith;
+
+namespace {
+
+constexpr int SLACK_MS = 1000; // for slow machines and sanitizers
+
+const SlotName HOME = "/virtual/home";
+const char TREE[] = "GetManagedObjects";
+const char SIM_0[] = "/org/freedesktop/ModemManager1/SIM/0";
+const char SIM_1[] = "/org/freedesktop/ModemManager1/SIM/1";
+
+// GVariant texts by name; an empty one is left out.
+using Entries = std::map<std::string, std::string>;
+
+std::string dictionary(const Entries& entries, const std::string& type)
+{
+    std::string text;
+    for (const auto& [name, value] : entries)
+        if (!value.empty())
+            text += (text.empty() ? "" : ", ") + ("'" + name + "': ") + value;
+    return "@" + type + " {" + text + "}";
+}
+
+std::string propertiesText(const Entries& entries)
+{
+    return dictionary(entries, "a{sv}");
+}
+
+struct FakeModem {
+    std::string path = "/org/freedesktop/ModemManager1/Modem/0";
+    Entries modem = {
+        {"Device", "<'/virtual/home'>"},
+        {"State", "<int32 8>"}, // registered
+        {"StateFailedReason", "<uint32 0>"},
+        {"UnlockRequired", "<uint32 1>"}, // nothing
+        {"UnlockRetries", "<{uint32 2: uint32 3, 4: 10}>"},
+        {"PowerState", "<uint32 3>"}, // on
+        {"Sim", "<objectpath '" + std::string(SIM_0) + "'>"},
+        {"SimSlots", "<@ao []>"},
+        {"PrimarySimSlot", "<uint32 0>"},
+        {"EquipmentIdentifier", "<'490154203237518'>"},
+        {"OwnNumbers", "<['+15551230001']>"},
+    };
+    Entries network = {{"RegistrationState", "<uint32 1>"}}; // home
+    Entries interfaces = {};                                 // others
+
+    std::string text() const
+    {
+        Entries all = {{"org.freedesktop.ModemManager1.Modem", propertiesText(modem)},
+                       {"org.freedesktop.ModemManager1.Modem.Modem3gpp", propertiesText(network)},
+                       {"org.freedesktop.ModemManager1.Modem.Messaging", propertiesText({})}};
+        for (const auto& [name, properties] : interfaces)
+            all[name] = properties;
+        return "objectpath '" + path + "': " + dictionary(all, "a{sa{sv}}");
+    }
+};
+
+std::string treeOf(const std::vector<std::string>& objects)
+{
+    std::string text;
+    for (const std::string& object : objects)
+        text += (text.empty() ? "" : ", ") + object;
+    return "(@a{oa{sa{sv}}} {" + text + "},)";
+}
+
+std::string simOf(const std::string& imsi, const std::string& network)
+{
+    return "(" + propertiesText({{"Imsi", imsi}, {"OperatorIdentifier", network}}) + ",)";
+}
+
+template <typename Work>
+int millisecondsOf(Work work)
+{
+    const auto begin = std::chrono::steady_clock::now();
+    work();
+    const auto time = std::chrono::steady_clock::now() - begin;
+    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
+}
+
+template <typename T>
+T valueOf(const Result<Sourced<T>>& answer)
+{
+    return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
+}
+
+template <typename T>
+std::string reasonOf(const Result<T>& answer)
+{
+    return answer ? "there is an answer" : answer.error().reason;
+}
+
+std::string show(const Result<Sourced<port::Imsi>>& imsi)
+{
+    return imsi ? imsi.value().value.mcc + " " + imsi.value().value.mnc + " " +
+                      imsi.value().value.msin
+                : "error: " + imsi.error().reason;
+}
+
+class ScriptedModemsTest : public testing::Test {
+protected:
+    ScriptedModemsTest()
+    {
+        daemon.start();
+        service = std::make_unique<ScriptedService>(daemon.address(), MODEM_MANAGER.name);
+        tell({});
+        service->answer(simOf("<'001010123456789'>", "<'00101'>"));
+    }
+
+    void tell(const FakeModem& modem) const
+    {
+        tellAll({modem});
+    }
+    void tellAll(const std::vector<FakeModem>& modems) const
+    {
+        std::vector<std::string> objects;
+        for (const FakeModem& modem : modems)
+            objects.push_back(modem.text());
+        service->answerTo(TREE, treeOf(objects));
+    }
+    // With a different value of one property.
+    void tellChanged(const std::string& property, const std::string& value) const
+    {
+        FakeModem modem;
+        modem.modem[property] = value;
+        tell(modem);
+    }
+    void tellSlots(const std::string& paths, const std::string& primary) const
+    {
+        FakeModem modem;
+        modem.modem["SimSlots"] = paths;
+        modem.modem["PrimarySimSlot"] = primary;
+        tell(modem);
+    }
+
+    PrivateBus daemon;
+    std::unique_ptr<ScriptedService> service;
+    Bus bus;
+    LinuxTelephony telephony{bus};
+};
+
+const std::string THREE_SLOTS = "<[objectpath '" + std::string(SIM_0) + "', '/', '" + SIM_1 + "']>";
+
+TEST_F(ScriptedModemsTest, EverySimSlotOfAModemIsASlot)
+{
+    tellSlots(THREE_SLOTS, "<uint32 1>");
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME + "#1", HOME + "#2", HOME + "#3"));
+    EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME + "#1")).status);
+    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME + "#2")).status);
+    EXPECT_EQ(CardStatus::Unknown, valueOf(telephony.card(HOME + "#3")).status);
+    EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME + "#1")));
+    EXPECT_EQ("+15551230001", valueOf(telephony.number(HOME + "#1")));
+    EXPECT_EQ(Service::InService, valueOf(telephony.service(HOME + "#1")));
+    EXPECT_TRUE(valueOf(telephony.smsReady(HOME + "#1")));
+}
+
+TEST_F(ScriptedModemsTest, SlotThatIsNotInUseSaysSo)
+{
+    tellSlots(THREE_SLOTS, "<uint32 1>");
+    const char* const inUse = "the modem uses another of its SIM slots";
+    EXPECT_EQ("there is no SIM card", reasonOf(telephony.imsi(HOME + "#2")));
+    EXPECT_EQ(inUse, reasonOf(telephony.imsi(HOME + "#3")));
+    EXPECT_EQ(inUse, reasonOf(telephony.number(HOME + "#3")));
+    EXPECT_EQ(inUse, reasonOf(telephony.service(HOME + "#3")));
+    EXPECT_EQ(inUse, reasonOf(telephony.roaming(HOME + "#3")));
+    EXPECT_EQ(Error::Kind::NoSim, telephony.imsi(HOME + "#3").error().kind);
+    EXPECT_EQ(Error::Kind::NoSim, telephony.service(HOME + "#3").error().kind);
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME + "#3")));
+    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME + "#3")));
+}
+
+TEST_F(ScriptedModemsTest, PrimarySlotIsCountedFromOne)
+{
+    tellSlots(THREE_SLOTS, "<uint32 3>");
+    service->answerTo("GetAll", simOf("<'26201987654321'>", "<'26201'>"), SIM_1);
+    EXPECT_EQ("error: the modem uses another of its SIM slots", show(telephony.imsi(HOME + "#1")));
+    EXPECT_EQ("262 01 987654321", show(telephony.imsi(HOME + "#3")));
+}
+
+TEST_F(ScriptedModemsTest, NoSlotIsInUseWhenThePrimaryOneIsNone)
+{
+    for (const char* const primary : {"<uint32 0>", "<uint32 4>", "<uint32 4294967295>", "<'1'>"}) {
+        tellSlots(THREE_SLOTS, primary);
+        EXPECT_EQ(3U, valueOf(telephony.slots()).size()) << primary;
+        EXPECT_EQ(CardStatus::Unknown, valueOf(telephony.card(HOME + "#1")).status) << primary;
+        EXPECT_EQ(CardStatus::Unknown, valueOf(telephony.card(HOME + "#3")).status) << primary;
+    }
+}
+
+TEST_F(ScriptedModemsTest, SlotsComeInTheOrderOfTheirDevices)
+{
+    FakeModem first;
+    first.path = "/org/freedesktop/ModemManager1/Modem/10";
+    first.modem["Device"] = "<'/sys/a'>";
+    FakeModem second;
+    second.path = "/org/freedesktop/ModemManager1/Modem/9";
+    second.modem["Device"] = "<'/sys/b'>";
+    tellAll({second, first});
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre("/sys/a", "/sys/b"));
+}
+
+TEST_F(ScriptedModemsTest, ModemsOfOneDeviceHaveNamesOfTheirOwn)
+{
+    FakeModem older;
+    older.path = "/Modem/9";
+    FakeModem younger;
+    younger.path = "/Modem/10";
+    younger.modem["EquipmentIdentifier"] = "<'356938035643809'>";
+    tellAll({younger, older});
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME, HOME + "@/Modem/10"));
+    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
+    EXPECT_EQ("356938035643809", valueOf(telephony.imei(HOME + "@/Modem/10")));
+}
+
+TEST_F(ScriptedModemsTest, ModemWithoutADeviceIsNamedByItsObject)
+{
+    const std::string endless(100000, 'x');
+    for (const std::string& device :
+         {std::string(), std::string("<5>"), std::string("<''>"), "<'" + endless + "'>"}) {
+        tellChanged("Device", device);
+        EXPECT_THAT(valueOf(telephony.slots()),
+                    ElementsAre("/org/freedesktop/ModemManager1/Modem/0"));
+    }
+}
+
+TEST_F(ScriptedModemsTest, CardStatusFollowsTheModem)
+{
+    const struct {
+        Entries changes;
+        CardStatus status;
+        const char* reason; // of a card that cannot be read
+    } rows[] = {
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 0>"}},
+         CardStatus::Unknown,
+         "the modem failed"},
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 1>"}},
+         CardStatus::Unknown,
+         "the modem failed"},
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 2>"}},
+         CardStatus::Absent,
+         "there is no SIM card"},
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 3>"}},
+         CardStatus::Error,
+         "the SIM card cannot be used"},
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 4>"}},
+         CardStatus::Unknown,
+         "the modem failed"},
+        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 5>"}},
+         CardStatus::Absent,
+         "the eSIM holds no profile"},
+        {{{"State", "<0>"}}, CardStatus::Unknown, "the modem's state is not known"},
+        {{{"State", "<1>"}, {"UnlockRequired", "<uint32 0>"}},
+         CardStatus::Initializing,
+         "the SIM card is not ready yet"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 0>"}},
+         CardStatus::Initializing,
+         "the SIM card is not ready yet"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 1>"}},
+         CardStatus::Initializing,
+         "the SIM card is not ready yet"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 2>"}},
+         CardStatus::PinRequired,
+         "the SIM card is locked: it wants a PIN"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 4>"}},
+         CardStatus::PukRequired,
+         "the SIM card is locked: it wants a PUK"},
+        {{{"State", "<2>"},
+          {"UnlockRequired", "<uint32 4>"},
+          {"UnlockRetries", "<{uint32 4: uint32 0}>"}},
+         CardStatus::Blocked,
+         "the SIM card is locked for good"},
+        {{{"State", "<2>"},
+          {"UnlockRequired", "<uint32 4>"},
+          {"UnlockRetries", "<{uint32 2: uint32 0}>"}},
+         CardStatus::PukRequired,
+         "the SIM card is locked: it wants a PUK"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 4>"}, {"UnlockRetries", "<'none'>"}},
+         CardStatus::PukRequired,
+         "the SIM card is locked: it wants a PUK"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 6>"}},
+         CardStatus::NetworkLocked,
+         "the modem is locked to a network"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 16>"}},
+         CardStatus::NetworkLocked,
+         "the modem is locked to a network"},
+        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 17>"}},
+         CardStatus::Unknown,
+         "the modem's state is not known"},
+        {{{"State", "<8>"}, {"UnlockRequired", "<uint32 2>"}},
+         CardStatus::PinRequired,
+         "the SIM card is locked: it wants a PIN"},
+        {{{"State", "<3>"}, {"PowerState", "<uint32 1>"}},
+         CardStatus::PoweredOff,
+         "the modem is switched off"},
+        {{{"State", "<8>"}, {"Sim", "<objectpath '/'>"}},
+         CardStatus::Absent,
+         "there is no SIM card"},
+        {{{"State", "<12>"}}, CardStatus::Unknown, "the modem's state is not known"},
+        {{{"State", "<-2>"}}, CardStatus::Unknown, "the modem's state is not known"},
+    };
+    for (const auto& row : rows) {
+        FakeModem modem;
+        std::string shown;
+        for (const auto& [name, value] : row.changes) {
+            modem.modem[name] = value;
+            shown += name + value;
+        }
+        tell(modem);
+        EXPECT_EQ(row.status, valueOf(telephony.card(HOME)).status) << shown;
+        for (const auto& error : {errorOf(telephony.imsi(HOME)), errorOf(telephony.number(HOME))}) {
+            ASSERT_TRUE(error) << shown;
+            EXPECT_EQ(Error::Kind::NoSim, error->kind) << shown;
+            EXPECT_EQ(row.reason, error->reason) << shown;
+        }
+    }
+}
+
+TEST_F(ScriptedModemsTest, CardOfAWorkingModemIsReady)
+{
+    for (int state = 3; state <= 11; ++state)
+        for (const char* const lock : {"<uint32 0>", "<uint32 1>", "<uint32 3>", "<uint32 5>"}) {
+            FakeModem modem;
+            modem.modem["State"] = "<" + std::to_string(state) + ">";
+            modem.modem["UnlockRequired"] = lock;
+            tell(modem);
+            EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status) << state << lock;
+            EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME))) << state << lock;
+        }
+}
+
+TEST_F(ScriptedModemsTest, ServiceAndRoamingFollowTheRegistration)
+{
+    const struct {
+        int registration;
+        Service service;
+        bool roaming;
+    } rows[] = {
+        {0, Service::OutOfService, false},   {1, Service::InService, false},
+        {2, Service::OutOfService, false},   {3, Service::OutOfService, false},
+        {5, Service::InService, true},       {6, Service::InService, false},
+        {7, Service::InService, true},       {8, Service::EmergencyOnly, false},
+        {9, Service::InService, false},      {10, Service::InService, true},
+        {11, Service::EmergencyOnly, false},
+    };
+    for (const auto& row : rows) {
+        FakeModem modem;
+        modem.network["RegistrationState"] = "<uint32 " + std::to_string(row.registration) + ">";
+        tell(modem);
+        EXPECT_EQ(row.service, valueOf(telephony.service(HOME))) << row.registration;
+        EXPECT_EQ(row.roaming, valueOf(telephony.roaming(HOME))) << row.registration;
+    }
+}
+
+TEST_F(ScriptedModemsTest, UnknownRegistrationIsNotInvented)
+{
+    for (const char* const registration : {"<uint32 4>", "<uint32 12>", "<uint32 4294967295>"}) {
+        FakeModem modem;
+        modem.network["RegistrationState"] = registration;
+        tell(modem);
+        EXPECT_EQ("the modem's registration is not known", reasonOf(telephony.service(HOME)));
+        EXPECT_EQ(Error::Kind::NotAvailable, telephony.roaming(HOME).error().kind);
+        for (const char* const state : {"<-1>", "<2>", "<3>"}) { // failed, locked, disabled
+            modem.modem["State"] = state;
+            tell(modem);
+            EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME))) << state;
+            EXPECT_FALSE(valueOf(telephony.roaming(HOME))) << state;
+        }
+    }
+}
+
+TEST_F(ScriptedModemsTest, MessagesNeedARegisteredModemThatHandlesThem)
+{
+    for (int state = -1; state <= 11; ++state) {
+        tellChanged("State", "<" + std::to_string(state) + ">");
+        EXPECT_EQ(state >= 8, valueOf(telephony.smsReady(HOME))) << state;
+    }
+    FakeModem mute;
+    mute.interfaces["org.freedesktop.ModemManager1.Modem.Messaging"] = "";
+    tell(mute);
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, MissingInterfacesAreOrdinaryAnswers)
+{
+    FakeModem modem;
+    modem.interfaces["org.freedesktop.ModemManager1.Modem.Modem3gpp"] = "";
+    tell(modem);
+    EXPECT_EQ("/org/freedesktop/ModemManager1/Modem/0 has no Modem3gpp",
+              reasonOf(telephony.service(HOME)));
+    EXPECT_EQ(Error::Kind::NotAvailable, telephony.roaming(HOME).error().kind);
+    modem.interfaces["org.freedesktop.ModemManager1.Modem"] = "";
+    tell(modem);
+    EXPECT_THAT(valueOf(telephony.slots()), IsEmpty());
+    EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
+              reasonOf(telephony.imei(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, PropertiesOfAnotherTypeAreNamed)
+{
+    const struct {
+        const char* property;
+        const char* question;
+        const char* noun;
+    } rows[] = {
+        {"State", "card", "number"},
+        {"State", "imsi", "number"},
+        {"State", "smsReady", "number"},
+        {"UnlockRequired", "card", "number"},
+        {"UnlockRequired", "number", "number"},
+        {"OwnNumbers", "number", "list of texts"},
+        {"EquipmentIdentifier", "imei", "text"},
+    };
+    for (const auto& row : rows)
+        for (const auto& question : telephonyQuestions()) {
+            if (std::string(question.name) != row.question)
+                continue;
+            tellChanged(row.property, "<@a{sv} {}>");
+            const auto wrong = question.ask(telephony, HOME);
+            ASSERT_TRUE(wrong) << row.property;
+            EXPECT_EQ(Error::Kind::NotAvailable, wrong->kind) << row.property;
+            EXPECT_EQ(std::string(row.property) + " is no " + row.noun, wrong->reason);
+            tellChanged(row.property, "");
+            EXPECT_EQ(std::string(row.property) + " is missing",
+                      question.ask(telephony, HOME)->reason);
+        }
+}
+
+TEST_F(ScriptedModemsTest, FailureWithoutAReasonIsNamed)
+{
+    FakeModem modem;
+    modem.modem["State"] = "<-1>";
+    modem.modem["StateFailedReason"] = "";
+    tell(modem);
+    EXPECT_EQ("StateFailedReason is missing", reasonOf(telephony.card(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, ImeiHasDigitsOnly)
+{
+    for (const char* const good : {"49015420323751", "490154203237518", "4901542032375183"}) {
+        tellChanged("EquipmentIdentifier", std::string("<'") + good + "'>");
+        EXPECT_EQ(good, valueOf(telephony.imei(HOME)));
+    }
+    for (const char* const bad :
+         {"4901542032375", "49015420323751834", "49015420323751X", "0x12345678901234", " "}) {
+        tellChanged("EquipmentIdentifier", std::string("<'") + bad + "'>");
+        EXPECT_EQ("EquipmentIdentifier is no IMEI", reasonOf(telephony.imei(HOME)));
+    }
+    tellChanged("EquipmentIdentifier", "<''>");
+    EXPECT_EQ("EquipmentIdentifier is empty", reasonOf(telephony.imei(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, FirstNumberThatCanBeDialledIsTheOwnOne)
+{
+    const std::pair<const char*, std::optional<std::string>> rows[] = {
+        {"<@as []>", std::nullopt},
+        {"<['']>", std::nullopt},
+        {"<['', 'abc', '+49151', '+1']>", "+49151"},
+        {"<['*100#']>", "*100#"},
+    };
+    for (const auto& [numbers, first] : rows) {
+        tellChanged("OwnNumbers", numbers);
+        EXPECT_EQ(first, valueOf(telephony.number(HOME))) << numbers;
+    }
+}
+
+TEST_F(ScriptedModemsTest, ImsiIsDividedByTheOperatorsIdentifier)
+{
+    const std::string noFit = "error: Imsi does not fit OperatorIdentifier";
+    const std::string noCode = "error: OperatorIdentifier is no MCC and MNC";
+    const struct {
+        const char* imsi;
+        const char* network;
+        std::string shown;
+    } rows[] = {
+        {"<'001010123456789'>", "<'00101'>", "001 01 0123456789"},
+        {"<'310260987654321'>", "<'310260'>", "310 260 987654321"},
+        {"<'001011'>", "<'00101'>", "001 01 1"},
+        {"<'001010123456789'>", "<'00102'>", noFit},
+        {"<'00101'>", "<'00101'>", noFit},
+        {"<'0010'>", "<'00101'>", noFit},
+        {"<'0010101234567890'>", "<'00101'>", noFit},
+        {"<'00101012345678X'>", "<'00101'>", noFit},
+        {"<'001010123456789'>", "<'0010'>", noCode},
+        {"<'001010123456789'>", "<'0010101'>", noCode},
+        {"<'0010X0123456789'>", "<'0010X'>", noCode},
+        {"<''>", "<'00101'>", "error: Imsi is empty"},
+        {"<'001010123456789'>", "<''>", "error: OperatorIdentifier is empty"},
+        {"", "<'00101'>", "error: Imsi is missing"},
+        {"<'001010123456789'>", "", "error: OperatorIdentifier is missing"},
+        {"<5>", "<'00101'>", "error: Imsi is no text"},
+        {"<'001010123456789'>", "<['00101']>", "error: OperatorIdentifier is no text"},
+    };
+    for (const auto& row : rows) {
+        service->answer(simOf(row.imsi, row.network));
+        EXPECT_EQ(row.shown, show(telephony.imsi(HOME)));
+        EXPECT_EQ(row.shown, show(telephony.imsi(HOME))); // asked at once, and together
+    }
+}
+
+TEST_F(ScriptedModemsTest, ReasonsNeverHoldAnIdentity)
+{
+    const std::string imsi = "999990123456789";
+    service->answer(simOf("<'" + imsi + "'>", "<'00101'>"));
+    FakeModem modem;
+    modem.modem["OwnNumbers"] = "<'+15551230001'>";
+    modem.modem["EquipmentIdentifier"] = "<'" + imsi + "99'>";
+    tell(modem);
+    for (const auto& question : telephonyQuestions())
+        if (const auto error = question.ask(telephony, HOME)) {
+            EXPECT_THAT(error->reason, Not(HasSubstr("0123456789"))) << question.name;
+            EXPECT_THAT(error->reason, Not(HasSubstr("5551230001"))) << question.name;
+        }
+}
+
+TEST_F(ScriptedModemsTest, RepliesOfAnotherTypeAreErrors)
+{
+    for (const char* const body : {"()", "('text',)", "(@a{sv} {},)", "(@a{oa{sv}} {},)"}) {
+        service->answerTo(TREE, body);
+        for (const auto& question : telephonyQuestions()) {
+            const auto error = question.ask(telephony, HOME);
+            ASSERT_TRUE(error) << question.name << body;
+            EXPECT_EQ(Error::Kind::NotAvailable, error->kind);
+            EXPECT_EQ("org.freedesktop.ModemManager1: the reply to GetManagedObjects is of another "
+                      "type",
+                      error->reason);
+        }
+    }
+    tell({});
+    for (const char* const body : {"()", "('text',)", "(@a{ss} {},)"}) {
+        service->answer(body);
+        EXPECT_EQ("error: org.freedesktop.ModemManager1: the reply to GetAll is of another type",
+                  show(telephony.imsi(HOME)));
+    }
+}
+
+TEST_F(ScriptedModemsTest, RefusedQuestionIsDenied)
+{
+    const char* const refusal = "org.freedesktop.DBus.Error.AccessDenied";
+    service->fail(refusal, "not for you");
+    const auto imsi = telephony.imsi(HOME);
+    ASSERT_FALSE(imsi);
+    EXPECT_EQ(Error::Kind::Denied, imsi.error().kind);
+    service->fail(refusal, "not for you", TREE);
+    for (const auto& question : telephonyQuestions()) {
+        const auto error = question.ask(telephony, HOME);
+        ASSERT_TRUE(error) << question.name;
+        EXPECT_EQ(Error::Kind::Denied, error->kind) << question.name;
+        EXPECT_EQ("org.freedesktop.ModemManager1: not for you", error->reason) << question.name;
+    }
+}
+
+TEST_F(ScriptedModemsTest, SimThatWentMeanwhileIsNotAvailable)
+{
+    service->fail("org.freedesktop.DBus.Error.UnknownObject", "no such object");
+    for (int i = 0; i < 2; ++i) {
+        const auto imsi = telephony.imsi(HOME);
+        ASSERT_FALSE(imsi);
+        EXPECT_EQ(Error::Kind::NotAvailable, imsi.error().kind);
+    }
+}
+
+TEST_F(ScriptedModemsTest, MoreObjectsThanCanBeAreNotBelieved)
+{
+    std::vector<FakeModem> modems(MOST_OBJECTS + 1);
+    for (std::size_t i = 0; i < modems.size(); ++i)
+        modems[i].path = "/Modem/" + std::to_string(i);
+    tellAll(modems);
+    EXPECT_EQ("org.freedesktop.ModemManager1 told of 1001 objects", reasonOf(telephony.slots()));
+    modems.pop_back();
+    tellAll(modems);
+    EXPECT_EQ(MOST_OBJECTS, valueOf(telephony.slots()).size());
+}
+
+TEST_F(ScriptedModemsTest, HugeValuesAreBorne)
+{
+    std::string slots = "<[objectpath '/SIM'";
+    for (int i = 0; i < 10000; ++i)
+        slots += ", '/SIM'";
+    tellSlots(slots + "]>", "<uint32 1>");
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
+    const std::string endless = "<'" + std::string(1000000, '1') + "'>";
+    tellChanged("EquipmentIdentifier", endless);
+    EXPECT_EQ("EquipmentIdentifier is no IMEI", reasonOf(telephony.imei(HOME)));
+    tellChanged("OwnNumbers", "<['" + std::string(1000000, '1') + "']>");
+    EXPECT_EQ(std::nullopt, valueOf(telephony.number(HOME)));
+    service->answer(simOf(endless, "<'11111'>"));
+    EXPECT_EQ("error: Imsi does not fit OperatorIdentifier", show(telephony.imsi(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, SilentServiceIsBounded)
+{
+    service->keepSilent(TREE);
+    const int time = millisecondsOf([this] {
+        together(static_cast<int>(telephonyQuestions().size()), [this](int i) {
+            const auto error =
+                telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
+            ASSERT_TRUE(error);
+            EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
+        });
+    });
+    EXPECT_LT(time, Bus::CALL_TIMEOUT_MS + SLACK_MS);
+}
+
+TEST_F(ScriptedModemsTest, SilentSimIsBounded)
+{
+    service->keepSilent();
+    for (int i = 0; i < 2; ++i) {
+        const int time = millisecondsOf([this] {
+            EXPECT_EQ("error: org.freedesktop.ModemManager1 did not answer in time",
+                      show(telephony.imsi(HOME)));
+        });
+        EXPECT_LT(time, Bus::CALL_TIMEOUT_MS + SLACK_MS);
+    }
+}
+
+TEST_F(ScriptedModemsTest, ServiceThatDiesWhenAskedIsNotAvailable)
+{
+    for (const char* const method : {TREE, "GetAll"}) {
+        service = std::make_unique<ScriptedService>(daemon.address(), MODEM_MANAGER.name);
+        tell({});
+        service->leaveWhenAsked(method);
+        int time = millisecondsOf([this] {
+            EXPECT_THAT(reasonOf(telephony.imsi(HOME)),
+                        StartsWith("org.freedesktop.ModemManager1"));
+        });
+        EXPECT_LT(time, Bus::CALL_TIMEOUT_MS);
+        EXPECT_EQ("org.freedesktop.ModemManager1 is not on the system bus",
+                  reasonOf(telephony.imsi(HOME)));
+    }
+}
+
+TEST_F(ScriptedModemsTest, AbsentServiceIsToldWithinFiftyMilliseconds)
+{
+    service.reset();
+    for (const auto& question : telephonyQuestions()) {
+        int best = 1000;
+        for (int i = 0; i < 3; ++i) // the best of a few: the machine may be busy
+            best = std::min(best, millisecondsOf([&] {
+                                EXPECT_EQ("org.freedesktop.ModemManager1 is not on the system bus",
+                                          question.ask(telephony, HOME)->reason);
+                            }));
+        EXPECT_LT(best, 50) << question.name;
+    }
+}
+
+TEST_F(ScriptedModemsTest, CardOfAServiceThatTookOverIsNotMistaken)
+{
+    service->answerOnlyTogether(2);
+    std::thread asker([this] {
+        EXPECT_EQ("error: org.freedesktop.ModemManager1 was started again meanwhile",
+                  show(telephony.imsi(HOME)));
+    });
+    while (service->timesAsked() == 0)
+        std::this_thread::yield();
+    ScriptedService other(daemon.address(), MODEM_MANAGER.name);
+    other.answer(simOf("<'999990123456789'>", "<'99999'>"));
+    service->answerOnlyTogether(1);
+    asker.join();
+}
+
+TEST_F(ScriptedModemsTest, CardThatMovedToAnotherObjectIsFollowed)
+{
+    EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME)));
+    tellChanged("Sim", "<objectpath '" + std::string(SIM_1) + "'>");
+    service->answerTo("GetAll", simOf("<'26201987654321'>", "<'26201'>"), SIM_1);
+    EXPECT_EQ("262 01 987654321", show(telephony.imsi(HOME)));
+}
+
+TEST_F(ScriptedModemsTest, EveryQuestionIsOneRoundTrip)
+{
+    telephony.slots();
+    for (const auto& question : telephonyQuestions()) {
+        const bool hasTwoParts = std::string(question.name) == "imsi";
+        const int before = service->timesAsked();
+        // Both parts of a question are on their way before either is answered.
+        service->answerOnlyTogether(hasTwoParts ? 2 : 1);
+        EXPECT_EQ(std::nullopt, question.ask(telephony, HOME)) << question.name;
+        EXPECT_EQ(hasTwoParts ? 2 : 1, service->timesAsked() - before) << question.name;
+    }
+}
+
+// The objects of a NetworkManager whose traffic goes over one connection of one device.
+std::string networkTree(const std::string& type, const std::string& modem)
+{
+    const std::string name = NETWORK_MANAGER.name;
+    return treeOf({"objectpath '/org/freedesktop/NetworkManager': {'" + name + "': " +
+                       propertiesText({{"PrimaryConnection", "<objectpath '/Active/1'>"},
+                                       {"PrimaryConnectionType", "<'" + type + "'>"}}) +
+                       "}",
+                   "objectpath '/Active/1': {'" + name + ".Connection.Active': " +
+                       propertiesText({{"Devices", "<[objectpath '/Devices/1']>"}}) + "}",
+                   "objectpath '/Devices/1': {'" + name +
+                       ".Device': " + propertiesText({{"Udi", "<'" + modem + "'>"}}) + "}"});
+}
+
+class SubscriptionsTest : public ScriptedModemsTest {
+protected:
+    SubscriptionsTest()
+    {
+        FakeModem first;
+        first.path = "/Modem/7";
+        first.modem["Device"] = "<'/sys/a'>";
+        FakeModem second;
+        second.path = "/Modem/3";
+        second.modem["Device"] = "<'/sys/b'>";
+        second.modem["SimSlots"] = THREE_SLOTS;
+        second.modem["PrimarySimSlot"] = "<uint32 3>";
+        tellAll({first, second});
+        network.answerTo(TREE, networkTree("gsm", "/Modem/3"));
+    }
+
+    std::optional<int> data()
+    {
+        return valueOf(telephony.subscriptions()).data;
+    }
+
+    ScriptedService network{daemon.address(), NETWORK_MANAGER.name};
+};
+
+TEST_F(SubscriptionsTest, DataGoesOverTheSlotOfThePrimaryConnection)
+{
+    EXPECT_EQ(3, data()); // the third slot of the second modem
+    EXPECT_EQ("org.freedesktop.ModemManager1, org.freedesktop.NetworkManager",
+              telephony.subscriptions().value().source);
+    network.answerTo(TREE, networkTree("gsm", "/Modem/7"));
+    EXPECT_EQ(0, data());
+    EXPECT_EQ(std::nullopt, valueOf(telephony.subscriptions()).network);
+    EXPECT_EQ(port::Subscriptions::Voice::Unknown, valueOf(telephony.subscriptions()).voice);
+}
+
+TEST_F(SubscriptionsTest, OtherTrafficNamesNoSlot)
+{
+    for (const auto& tree :
+         {networkTree("802-3-ethernet", "/Modem/3"), networkTree("", "/Modem/3"),
+          networkTree("gsm", "/Modem/1"), networkTree("gsm", ""), treeOf({}), std::string("()")}) {
+        network.answerTo(TREE, tree);
+        EXPECT_EQ(std::nullopt, data()) << tree;
+        EXPECT_EQ("org.freedesktop.ModemManager1", telephony.subscriptions().value().source);
+    }
+}
+
+TEST_F(SubscriptionsTest, NetworkManagerThatFailsTakesNothingElseAway)
+{
+    network.fail("org.freedesktop.DBus.Error.AccessDenied", "no", TREE);
+    EXPECT_EQ(std::nullopt, data());
+    network.keepSilent(TREE);
+    EXPECT_LT(millisecondsOf([this] { EXPECT_EQ(std::nullopt, data()); }),
+              Bus::CALL_TIMEOUT_MS + SLACK_MS);
+}
+
+} // namespace
