@@ -3,11 +3,14 @@
 #include "linux/Telephony.h"
 
 #include <atomic>
+#include <chrono>
+#include <cstdlib>
 #include <thread>
 
 #include <gmock/gmock.h>
 
 #include "support/ModemsOnBus.h"
+#include "support/TelephonyQuestions.h"
 #include "support/Together.h"
 
 using port::CardStatus;
@@ -19,8 +22,8 @@ using port::Sourced;
 using port::linux_backend::Bus;
 using port::linux_backend::LinuxTelephony;
 using testing::ElementsAre;
-using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::StartsWith;
 
 namespace {
 
@@ -200,6 +203,146 @@ TEST_F(TelephonyTest, TwoModemsAreTwoSlotsInTheOrderOfTheirDevices)
     EXPECT_EQ("001", valueOf(telephony.imsi("/virtual/a")).mcc);
     EXPECT_EQ("310", valueOf(telephony.imsi("/virtual/b")).mcc);
     EXPECT_EQ("001", valueOf(telephony.imsi("/virtual/a")).mcc);
+}
+
+// Questions for as long as this lives, from one thread; none may be answered with anything but an
+// answer or a reason.
+class Asker {
+public:
+    explicit Asker(port::Telephony& telephony) : telephony_(telephony), thread_([this] { run(); })
+    {
+    }
+    ~Asker()
+    {
+        done_ = true;
+        thread_.join();
+        EXPECT_GT(answers_, 0);
+    }
+    Asker(const Asker&) = delete;
+    Asker& operator=(const Asker&) = delete;
+
+private:
+    void run()
+    {
+        while (!done_)
+            for (const auto& question : telephonyQuestions()) {
+                const auto error = question.ask(telephony_, HOME);
+                EXPECT_TRUE(!error || !error->reason.empty()) << question.name;
+                ++answers_;
+            }
+    }
+
+    port::Telephony& telephony_;
+    std::atomic<bool> done_{false};
+    std::atomic<int> answers_{0};
+    std::thread thread_;
+};
+
+TEST_F(TelephonyTest, ModemMayBeRemovedWhileAsked)
+{
+    modems->add("home");
+    {
+        const Asker asker(telephony);
+        modems->unplug("home");
+        EXPECT_TRUE(modems->waitUntil([&] { return valueOf(telephony.slots()).empty(); }));
+    }
+    for (const auto& question : telephonyQuestions())
+        if (question.aboutASlot) {
+            EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
+                      question.ask(telephony, HOME)->reason)
+                << question.name;
+        }
+}
+
+TEST_F(TelephonyTest, DaemonMayBeKilledWhileAsked)
+{
+    modems->add("home");
+    {
+        const Asker asker(telephony);
+        modems->kill();
+        EXPECT_TRUE(modems->waitUntil([&] { return !telephony.slots(); }));
+    }
+    for (const auto& question : telephonyQuestions()) {
+        const auto error = question.ask(telephony, HOME);
+        ASSERT_TRUE(error) << question.name;
+        EXPECT_EQ(Error::Kind::NotAvailable, error->kind) << question.name;
+        EXPECT_EQ("org.freedesktop.ModemManager1 is not on the system bus", error->reason);
+    }
+}
+
+TEST_F(TelephonyTest, RestartedDaemonGivesItsOldObjectsToOtherCards)
+{
+    modems->add("home");
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
+    modems->kill();
+    modems->start();
+    AtModem::State other;
+    other.imsi = "262011234567890";
+    modems->add("other", other);
+    EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
+              telephony.imsi(HOME).error().reason);
+    EXPECT_EQ("262", valueOf(telephony.imsi("/virtual/other")).mcc);
+    modems->add("home");
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
+}
+
+TEST_F(TelephonyTest, CardPutInLaterIsSeen)
+{
+    AtModem::State empty;
+    empty.hasSim = false;
+    modems->add("home", empty);
+    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME)).status);
+    modems->plugIn("home"); // as a modem that starts anew does
+    EXPECT_TRUE(modems->waitUntil([&] {
+        const auto card = telephony.card(HOME);
+        return card && card.value().value.status == CardStatus::Ready;
+    }));
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
+}
+
+TEST_F(TelephonyTest, FrozenDaemonIsBoundedAndAnswersLater)
+{
+    modems->add("home");
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
+    modems->freeze();
+    const auto begin = std::chrono::steady_clock::now();
+    together(static_cast<int>(telephonyQuestions().size()), [&](int i) {
+        const auto error = telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
+        ASSERT_TRUE(error);
+        EXPECT_EQ(Error::Kind::NotAvailable, error->kind);
+        EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
+    });
+    const auto time = std::chrono::steady_clock::now() - begin;
+    modems->thaw();
+    EXPECT_GE(time, std::chrono::milliseconds(Bus::CALL_TIMEOUT_MS - 1));
+    EXPECT_LT(time, std::chrono::seconds(2));
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
+}
+
+TEST_F(TelephonyTest, DaemonIsFoundOnceItRuns)
+{
+    modems->kill();
+    EXPECT_FALSE(telephony.slots());
+    modems->start();
+    modems->add("home");
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
+}
+
+TEST(TelephonyWithoutABusTest, EveryQuestionIsNotAvailableAtOnce)
+{
+    const TemporaryTree tree;
+    setenv("DBUS_SYSTEM_BUS_ADDRESS", ("unix:path=" + tree.path("/none")).c_str(), 1);
+    Bus bus;
+    LinuxTelephony telephony(bus);
+    const auto begin = std::chrono::steady_clock::now();
+    for (const auto& question : telephonyQuestions()) {
+        const auto error = question.ask(telephony, HOME);
+        ASSERT_TRUE(error) << question.name;
+        EXPECT_EQ(Error::Kind::NotAvailable, error->kind) << question.name;
+        EXPECT_THAT(error->reason, StartsWith("no system bus: ")) << question.name;
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(1));
+    unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
 }
 
 } // namespace
