@@ -27,6 +27,14 @@ struct GLibRelease {
         g_source_destroy(source);
         g_source_unref(source);
     }
+    void operator()(GSettingsSchema* schema) const
+    {
+        g_settings_schema_unref(schema);
+    }
+    void operator()(GSettingsSchemaKey* key) const
+    {
+        g_settings_schema_key_unref(key);
+    }
     void operator()(GKeyFile* keyFile) const
     {
         g_key_file_unref(keyFile);

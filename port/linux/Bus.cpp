@@ -55,11 +55,8 @@ public:
     {
         g_source_set_callback(timer_.get(), &TimedConnect::onTimeout, this, nullptr);
         context_.attach(timer_.get());
-        g_dbus_connection_new_for_address(
-            address,
-            static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                              G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-            nullptr, cancellable_.get(), &TimedConnect::onReady, this);
+        g_dbus_connection_new_for_address(address, BUS_CLIENT, nullptr, cancellable_.get(),
+                                          &TimedConnect::onReady, this);
         context_.runUntil([this] { return done_; });
     }
     TimedConnect(const TimedConnect&) = delete;

@@ -23,6 +23,9 @@ namespace port::linux_backend {
 
 using Connection = std::shared_ptr<GDBusConnection>;
 
+constexpr auto BUS_CLIENT = static_cast<GDBusConnectionFlags>(
+    G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
+
 // Whether asking a service may start it. hostname1 and locale1 live only while they are asked, so
 // the bus starts them on purpose; nothing else ever is.
 enum class Start { WhenAsked, Never };

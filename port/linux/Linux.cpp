@@ -8,7 +8,9 @@
 #include "Files.h"
 #include "Hostname1.h"
 #include "Locale1.h"
+#include "BlueZ.h"
 #include "ModemManager.h"
+#include "Network.h"
 #include "NetworkManager.h"
 #include "Packages.h"
 #include "Settings.h"
@@ -129,7 +131,7 @@ private:
     LinuxDeviceInfo deviceInfo_{bus_, ""};
     LinuxSettings settings_{bus_};
     LinuxTelephony telephony_{bus_};
-    Network network_;
+    LinuxNetwork network_{bus_, ""};
     LinuxStorage storage_{g_get_user_data_dir()};
     LinuxPackages packages_{""};
     LinuxConfiguration configuration_{configurationFiles()};

@@ -31,7 +31,30 @@ auto orderOf(const Modem& modem)
     return std::make_tuple(modem.device(), modem.path().size(), modem.path());
 }
 
+constexpr Registration REGISTRATIONS[] = {
+    {MM_MODEM_3GPP_REGISTRATION_STATE_IDLE, Service::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME, Service::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_SEARCHING, Service::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_DENIED, Service::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING, Service::InService, true},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_SMS_ONLY, Service::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_SMS_ONLY, Service::InService, true},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_EMERGENCY_ONLY, Service::EmergencyOnly, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_CSFB_NOT_PREFERRED, Service::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_CSFB_NOT_PREFERRED, Service::InService, true},
+    // Some services of this place only, for whoever has no subscription here.
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ATTACHED_RLOS, Service::EmergencyOnly, false},
+};
+
 } // namespace
+
+std::optional<Registration> registrationOf(std::uint32_t state)
+{
+    for (const Registration& row : REGISTRATIONS)
+        if (row.state == state)
+            return row;
+    return std::nullopt;
+}
 
 Modem::Modem(Object object, Properties modem)
     : object_(std::move(object)), modem_(std::move(modem)), device_(deviceOf(object_, modem_))
@@ -80,12 +103,33 @@ bool Modem::isPoweredOff() const
     return power && power.value() == MM_MODEM_POWER_STATE_OFF;
 }
 
+Result<std::uint32_t> Modem::numberOfNetwork(const char* interface, const char* name) const
+{
+    const Result<Properties> network = object_.properties(interface);
+    return network ? network.value().number(name) : Result<std::uint32_t>(network.error());
+}
+
 Result<std::uint32_t> Modem::registration() const
 {
-    const Result<Properties> network = object_.properties(MM_DBUS_INTERFACE_MODEM_MODEM3GPP);
-    if (!network)
-        return network.error();
-    return network.value().number(MM_MODEM_MODEM3GPP_PROPERTY_REGISTRATIONSTATE);
+    return numberOfNetwork(MM_DBUS_INTERFACE_MODEM_MODEM3GPP,
+                           MM_MODEM_MODEM3GPP_PROPERTY_REGISTRATIONSTATE);
+}
+
+Result<std::uint32_t> Modem::packetService() const
+{
+    return numberOfNetwork(MM_DBUS_INTERFACE_MODEM_MODEM3GPP,
+                           MM_MODEM_MODEM3GPP_PROPERTY_PACKETSERVICESTATE);
+}
+
+bool Modem::isCdmaRoaming() const
+{
+    for (const char* const name : {MM_MODEM_MODEMCDMA_PROPERTY_CDMA1XREGISTRATIONSTATE,
+                                   MM_MODEM_MODEMCDMA_PROPERTY_EVDOREGISTRATIONSTATE}) {
+        const auto state = numberOfNetwork(MM_DBUS_INTERFACE_MODEM_MODEMCDMA, name);
+        if (state && state.value() == MM_MODEM_CDMA_REGISTRATION_STATE_ROAMING)
+            return true;
+    }
+    return false;
 }
 
 Result<std::string> Modem::equipmentIdentifier() const

@@ -3,11 +3,13 @@
 #ifndef PORT_LINUX_MODEM_MANAGER_H
 #define PORT_LINUX_MODEM_MANAGER_H
 
+#include <optional>
 #include <string>
 #include <vector>
 
 #include <ModemManager/ModemManager.h>
 
+#include "../backend/Telephony.h"
 #include "Bus.h"
 #include "Properties.h"
 
@@ -15,6 +17,16 @@ namespace port::linux_backend {
 
 constexpr BusObject MODEM_MANAGER = {MM_DBUS_SERVICE, MM_DBUS_PATH, MM_DBUS_INTERFACE,
                                      Start::Never};
+
+// What a state of registration means.
+struct Registration {
+    std::uint32_t state; // MMModem3gppRegistrationState
+    Service service;
+    bool roaming;
+};
+
+/// Nothing for "unknown", and for a state that this port does not know.
+std::optional<Registration> registrationOf(std::uint32_t state);
 
 // A modem as it was when ModemManager told of it.
 class Modem {
@@ -49,13 +61,17 @@ public:
     Result<std::uint32_t> lock() const;         // MMModemLock
     Result<std::uint32_t> retriesLeft(MMModemLock lock) const;
     bool isPoweredOff() const;
-    Result<std::uint32_t> registration() const; // MMModem3gppRegistrationState
+    Result<std::uint32_t> registration() const;  // MMModem3gppRegistrationState
+    Result<std::uint32_t> packetService() const; // MMModem3gppPacketServiceState
+    /// Whether either of its two networks is one abroad, by the rules of CDMA.
+    bool isCdmaRoaming() const;
     Result<std::string> equipmentIdentifier() const;
     Result<std::vector<std::string>> ownNumbers() const;
     bool hasMessaging() const;
 
 private:
     void readSims();
+    Result<std::uint32_t> numberOfNetwork(const char* interface, const char* name) const;
 
     Object object_;
     Properties modem_;

@@ -1,53 +1,76 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "NetworkManager.h"
 
-#include <vector>
+#include <algorithm>
 
 namespace port::linux_backend {
 namespace {
-
-using Objects = std::vector<Object>;
 
 // The object manager stands above the service's main object.
 constexpr BusObject MANAGER_OF_OBJECTS = {NETWORK_MANAGER.name, "/org/freedesktop",
                                           "org.freedesktop.DBus.ObjectManager",
                                           NETWORK_MANAGER.start};
-constexpr char ACTIVE_CONNECTION[] = "org.freedesktop.NetworkManager.Connection.Active";
-constexpr char DEVICE[] = "org.freedesktop.NetworkManager.Device";
-constexpr char CELLULAR[] = "gsm"; // a connection's type
+// A connection's type, and the name of that type's settings.
+constexpr char GSM[] = "gsm";
+constexpr char CDMA[] = "cdma";
 
-Result<Properties> propertiesAt(const Objects& objects, const std::string& path,
-                                const char* interface)
+struct RadioRow {
+    Radio radio;
+    const char* software; // the switch that the user sets
+    const char* hardware; // the one on the case
+    std::uint32_t flag;   // NMRadioFlags
+    NMDeviceType device;
+};
+constexpr RadioRow RADIOS[] = {
+    {Radio::Wifi, "WirelessEnabled", "WirelessHardwareEnabled", NM_RADIO_FLAG_WLAN_AVAILABLE,
+     NM_DEVICE_TYPE_WIFI},
+    {Radio::Cellular, "WwanEnabled", "WwanHardwareEnabled", NM_RADIO_FLAG_WWAN_AVAILABLE,
+     NM_DEVICE_TYPE_MODEM},
+};
+
+const RadioRow& rowOf(Radio radio)
 {
-    for (const Object& object : objects)
-        if (object.path() == path)
-            return object.properties(interface);
-    return notAvailable(path + " is not there");
+    return *std::find_if(std::begin(RADIOS), std::end(RADIOS),
+                         [radio](const RadioRow& row) { return row.radio == radio; });
 }
 
-// What a connection's devices call themselves below NetworkManager: a modem's device is named by
-// its ModemManager object.
-std::optional<std::string> deviceBelow(const Objects& objects, const Properties& connection)
+bool isCellular(const std::string& type)
 {
-    const auto devices = connection.paths("Devices");
-    if (!devices || devices.value().empty())
-        return std::nullopt;
-    const auto device = propertiesAt(objects, devices.value().front(), DEVICE);
-    const auto name = device ? device.value().text("Udi") : Result<std::string>(device.error());
-    return name ? std::optional<std::string>(name.value()) : std::nullopt;
+    return type == GSM || type == CDMA;
 }
 
-std::optional<std::string> primaryModem(const Objects& objects)
+Error fromNetworkManager(const Error& error)
 {
-    const auto network = propertiesAt(objects, NETWORK_MANAGER.path, NETWORK_MANAGER.interface);
-    if (!network)
-        return std::nullopt;
-    const auto primary = network.value().path("PrimaryConnection");
-    const auto type = network.value().text("PrimaryConnectionType");
-    if (!primary || !type || type.value() != CELLULAR)
-        return std::nullopt;
-    const auto connection = propertiesAt(objects, primary.value(), ACTIVE_CONNECTION);
-    return connection ? deviceBelow(objects, connection.value()) : std::nullopt;
+    return {error.kind, shortName(NETWORK_MANAGER) + ": " + error.reason};
+}
+
+// NetworkManager leaves out what has its default value.
+template <typename T>
+Result<T> orDefault(const Properties& settings, Result<T> (Properties::*read)(const char*) const,
+                    const char* name, T valueIfMissing)
+{
+    return settings.has(name) ? (settings.*read)(name) : Result<T>(valueIfMissing);
+}
+
+// Nothing for a connection of another type.
+Result<std::optional<CellularConnection>> cellularConnection(const Object& settings, bool isActive)
+{
+    using Found = std::optional<CellularConnection>;
+    const Result<Properties> common = settings.properties("connection");
+    const auto type = common ? common.value().text("type") : Result<std::string>(common.error());
+    if (!type || !isCellular(type.value()))
+        return type ? Result<Found>(Found()) : type.error();
+    const Result<bool> connectsItself =
+        orDefault(common.value(), &Properties::flag, "autoconnect", true);
+    const Result<std::int32_t> priority =
+        orDefault(common.value(), &Properties::signedNumber, "autoconnect-priority", 0);
+    // Only these have the setting; it forbids roaming.
+    const Result<Properties> gsm = settings.properties(GSM);
+    const Result<bool> isHomeOnly =
+        gsm ? orDefault(gsm.value(), &Properties::flag, "home-only", false) : Result<bool>(false);
+    if (!connectsItself || !priority || !isHomeOnly)
+        return notAvailable("a cellular connection has malformed settings");
+    return Found({isActive, connectsItself.value(), priority.value(), isHomeOnly.value()});
 }
 
 } // namespace
@@ -57,10 +80,189 @@ Question networkObjects()
     return objectsBelow(MANAGER_OF_OBJECTS);
 }
 
+Result<NetworkView> NetworkView::from(const Result<Reply>& reply)
+{
+    if (!reply)
+        return reply.error();
+    const Result<std::vector<Object>> objects = objectsIn(reply.value().body);
+    if (!objects)
+        return fromNetworkManager(objects.error());
+    return NetworkView(objects.value());
+}
+
+Result<Properties> NetworkView::at(const std::string& path, const char* interface) const
+{
+    for (const Object& object : objects_)
+        if (object.path() == path)
+            return object.properties(interface);
+    return notAvailable(path + " is not there");
+}
+
+Result<Properties> NetworkView::manager() const
+{
+    const auto found = at(NETWORK_MANAGER.path, NETWORK_MANAGER.interface);
+    return found ? found : fromNetworkManager(found.error());
+}
+
+Result<bool> NetworkView::managerFlag(const char* name) const
+{
+    const Result<Properties> all = manager();
+    if (!all)
+        return all.error();
+    const Result<bool> flag = all.value().flag(name);
+    return flag ? flag : fromNetworkManager(flag.error());
+}
+
+Result<bool> NetworkView::isOn() const
+{
+    return managerFlag("NetworkingEnabled");
+}
+
+Result<bool> NetworkView::isSwitchedOn(Radio radio) const
+{
+    return managerFlag(rowOf(radio).software);
+}
+
+Result<bool> NetworkView::isOn(Radio radio) const
+{
+    const Result<bool> on = isSwitchedOn(radio);
+    return on && on.value() ? managerFlag(rowOf(radio).hardware) : on;
+}
+
+Result<bool> NetworkView::isThere(Radio radio) const
+{
+    const Result<Properties> all = manager();
+    const auto states = statesOf(rowOf(radio).device);
+    if (!all || !states)
+        return all ? states.error() : all.error();
+    // The flags are there from version 1.38 on; they know a radio whose device has gone.
+    const Result<std::uint32_t> flags = all.value().number("RadioFlags");
+    return !states.value().empty() || (flags && (flags.value() & rowOf(radio).flag) != 0);
+}
+
+Result<std::vector<std::uint32_t>> NetworkView::statesOf(NMDeviceType type) const
+{
+    std::vector<std::uint32_t> states;
+    for (const Object& object : objects_) {
+        const Result<Properties> device = object.properties(NM_DBUS_INTERFACE_DEVICE);
+        if (!device)
+            continue;
+        const Result<std::uint32_t> kind = device.value().number("DeviceType");
+        if (kind && kind.value() != static_cast<std::uint32_t>(type))
+            continue;
+        const Result<std::uint32_t> state = device.value().number("State");
+        if (!kind || !state)
+            return fromNetworkManager(kind ? state.error() : kind.error());
+        states.push_back(state.value());
+    }
+    return states;
+}
+
+// Whether a predicate holds for one of the connections that are up or coming up.
+template <typename Predicate>
+bool anyActive(const std::vector<Object>& objects, Predicate holds)
+{
+    return std::any_of(objects.begin(), objects.end(), [holds](const Object& object) {
+        const auto active = object.properties(NM_DBUS_INTERFACE_ACTIVE_CONNECTION);
+        const auto state =
+            active ? active.value().number("State") : Result<std::uint32_t>(active.error());
+        return state &&
+               (state.value() == NM_ACTIVE_CONNECTION_STATE_ACTIVATING ||
+                state.value() == NM_ACTIVE_CONNECTION_STATE_ACTIVATED) &&
+               holds(active.value());
+    });
+}
+
+bool NetworkView::hasActiveCellularConnection() const
+{
+    return anyActive(objects_, [](const Properties& connection) {
+        const auto type = connection.text("Type");
+        return type && isCellular(type.value());
+    });
+}
+
+bool NetworkView::isActive(const std::string& connection) const
+{
+    return anyActive(objects_, [&connection](const Properties& active) {
+        const auto path = active.path("Connection");
+        return path && path.value() == connection;
+    });
+}
+
+std::vector<std::string> NetworkView::connectionPaths() const
+{
+    std::vector<std::string> paths;
+    for (const Object& object : objects_)
+        if (object.has(NM_DBUS_INTERFACE_SETTINGS_CONNECTION))
+            paths.push_back(object.path());
+    return paths;
+}
+
+std::vector<Question> NetworkView::connectionSettings() const
+{
+    std::vector<Question> questions;
+    for (const Object& object : objects_)
+        if (object.has(NM_DBUS_INTERFACE_SETTINGS_CONNECTION))
+            questions.push_back({{NETWORK_MANAGER.name, object.path().c_str(),
+                                  NM_DBUS_INTERFACE_SETTINGS_CONNECTION, NETWORK_MANAGER.start},
+                                 "GetSettings",
+                                 nullptr,
+                                 "(a{sa{sv}})"});
+    return questions;
+}
+
+Result<std::vector<CellularConnection>>
+NetworkView::cellularConnections(const std::vector<Result<Reply>>& replies) const
+{
+    const std::vector<std::string> paths = connectionPaths();
+    std::vector<CellularConnection> found;
+    for (std::size_t i = 0; i < replies.size(); ++i) {
+        if (!replies[i])
+            continue;
+        const Object settings(paths[i],
+                              share(g_variant_get_child_value(replies[i].value().body.get(), 0)));
+        const auto connection = cellularConnection(settings, isActive(paths[i]));
+        if (!connection)
+            return fromNetworkManager(connection.error());
+        if (connection.value())
+            found.push_back(*connection.value());
+    }
+    const bool nobodyAnswered = std::none_of(replies.begin(), replies.end(),
+                                             [](const auto& reply) { return bool(reply); });
+    if (!replies.empty() && nobodyAnswered)
+        return replies.front().error();
+    return found;
+}
+
+// What a connection's devices call themselves below NetworkManager: a modem's device is named by
+// its ModemManager object.
+std::optional<std::string> NetworkView::deviceBelow(const Properties& connection) const
+{
+    const auto devices = connection.paths("Devices");
+    if (!devices || devices.value().empty())
+        return std::nullopt;
+    const auto device = at(devices.value().front(), NM_DBUS_INTERFACE_DEVICE);
+    const auto name = device ? device.value().text("Udi") : Result<std::string>(device.error());
+    return name ? std::optional<std::string>(name.value()) : std::nullopt;
+}
+
+std::optional<std::string> NetworkView::primaryModem() const
+{
+    const auto network = manager();
+    if (!network)
+        return std::nullopt;
+    const auto primary = network.value().path("PrimaryConnection");
+    const auto type = network.value().text("PrimaryConnectionType");
+    if (!primary || !type || type.value() != GSM)
+        return std::nullopt;
+    const auto connection = at(primary.value(), NM_DBUS_INTERFACE_ACTIVE_CONNECTION);
+    return connection ? deviceBelow(connection.value()) : std::nullopt;
+}
+
 std::optional<std::string> primaryModemIn(const Reply& reply)
 {
-    const Result<Objects> objects = objectsIn(reply.body);
-    return objects ? primaryModem(objects.value()) : std::nullopt;
+    const Result<NetworkView> view = NetworkView::from(reply);
+    return view ? view.value().primaryModem() : std::nullopt;
 }
 
 } // namespace port::linux_backend

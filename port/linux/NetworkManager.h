@@ -1,24 +1,78 @@
 // SPDX-License-Identifier: Apache-2.0
-// The connections that NetworkManager knows.
+// What NetworkManager knows: switches of radios, devices, connections.
 #ifndef PORT_LINUX_NETWORK_MANAGER_H
 #define PORT_LINUX_NETWORK_MANAGER_H
 
 #include <optional>
 #include <string>
+#include <vector>
+
+#include <nm-dbus-interface.h>
 
 #include "Bus.h"
+#include "Properties.h"
 
 namespace port::linux_backend {
 
-constexpr BusObject NETWORK_MANAGER = {"org.freedesktop.NetworkManager",
-                                       "/org/freedesktop/NetworkManager",
-                                       "org.freedesktop.NetworkManager", Start::Never};
+constexpr BusObject NETWORK_MANAGER = {NM_DBUS_SERVICE, NM_DBUS_PATH, NM_DBUS_INTERFACE,
+                                       Start::Never};
 
 /// Asks for all objects of NetworkManager.
 Question networkObjects();
 
-/// The ModemManager object of the modem over which this machine's traffic goes, from the reply to
-/// networkObjects(); nothing when it goes elsewhere.
+enum class Radio { Wifi, Cellular };
+
+// A connection of type gsm or cdma as the user set it up.
+struct CellularConnection {
+    bool isActive = false;
+    bool connectsItself = true;
+    std::int32_t priority = 0;
+    bool isHomeOnly = false;
+};
+
+// NetworkManager as it was when it told of itself.
+class NetworkView {
+public:
+    /// From the reply to networkObjects().
+    static Result<NetworkView> from(const Result<Reply>& reply);
+
+    /// Whether networking as a whole is switched on.
+    Result<bool> isOn() const;
+    /// Whether the user's switch of a radio is on; it is there also when the radio is not.
+    Result<bool> isSwitchedOn(Radio radio) const;
+    /// The same and the switch on the case, where there is one.
+    Result<bool> isOn(Radio radio) const;
+    Result<bool> isThere(Radio radio) const;
+    /// Of all devices of that type; numbers, since a service may say what its enumeration lacks.
+    Result<std::vector<std::uint32_t>> statesOf(NMDeviceType type) const; // NMDeviceState
+    /// Whether a cellular connection is up, or coming up.
+    bool hasActiveCellularConnection() const;
+
+    /// Asks for the settings of every connection, which are not among the objects.
+    std::vector<Question> connectionSettings() const;
+    /// The cellular ones, from the replies to those questions. Connections that went away in
+    /// between are left out.
+    Result<std::vector<CellularConnection>>
+    cellularConnections(const std::vector<Result<Reply>>& replies) const;
+
+    /// The ModemManager object of the modem over which this machine's traffic goes; nothing when it
+    /// goes elsewhere.
+    std::optional<std::string> primaryModem() const;
+
+private:
+    explicit NetworkView(std::vector<Object> objects) : objects_(std::move(objects)) {}
+
+    Result<Properties> manager() const;
+    Result<bool> managerFlag(const char* name) const;
+    Result<Properties> at(const std::string& path, const char* interface) const;
+    std::vector<std::string> connectionPaths() const;
+    bool isActive(const std::string& connection) const;
+    std::optional<std::string> deviceBelow(const Properties& connection) const;
+
+    std::vector<Object> objects_;
+};
+
+/// The same from the reply to networkObjects().
 std::optional<std::string> primaryModemIn(const Reply& reply);
 
 } // namespace port::linux_backend

@@ -41,6 +41,19 @@ Result<Variant> Properties::value(const char* name, const char* type, const char
     return found;
 }
 
+bool Properties::has(const char* name) const
+{
+    return lookUp(values_, name) != nullptr;
+}
+
+Result<bool> Properties::flag(const char* name) const
+{
+    const Result<Variant> found = value(name, "b", "truth value");
+    if (!found)
+        return found.error();
+    return g_variant_get_boolean(found.value().get()) != FALSE;
+}
+
 Result<std::string> Properties::text(const char* name) const
 {
     const Result<Variant> found = value(name, "s", "text");

@@ -20,6 +20,8 @@ public:
     /// `values` is an a{sv}.
     explicit Properties(Variant values) : values_(std::move(values)) {}
 
+    bool has(const char* name) const;
+    Result<bool> flag(const char* name) const;
     /// A text that is not empty.
     Result<std::string> text(const char* name) const;
     Result<std::vector<std::string>> texts(const char* name) const;

@@ -4,11 +4,13 @@
 #include <cstdlib>
 #include <cstring>
 #include <optional>
+#include <utility>
 
 #include <sys/utsname.h>
 
 #include "Hostname1.h"
 #include "Locale1.h"
+#include "TextScaling.h"
 
 namespace port::linux_backend {
 namespace {
@@ -76,6 +78,29 @@ Result<Fact> LinuxSettings::language()
 {
     const Result<Fact> language = languageOfMachine(bus_);
     return language ? language : orElse(language.error(), languageOfProcess());
+}
+
+// Halfway between the steps that desktops offer: 1, 1.25, 1.5 and 2 times the usual size.
+FontSize fontSizeOf(double textScaling)
+{
+    constexpr std::pair<double, FontSize> LIMITS[] = {
+        {0.95, FontSize::Small},
+        {1.125, FontSize::Normal},
+        {1.375, FontSize::Large},
+        {1.75, FontSize::Huge},
+    };
+    for (const auto& [limit, size] : LIMITS)
+        if (textScaling < limit)
+            return size;
+    return FontSize::Giant;
+}
+
+Result<Sourced<FontSize>> LinuxSettings::fontSize()
+{
+    const Result<Sourced<double>> scaling = textScaling();
+    if (!scaling)
+        return scaling.error();
+    return Sourced<FontSize>{fontSizeOf(scaling.value().value), scaling.value().source};
 }
 
 } // namespace port::linux_backend

@@ -204,29 +204,6 @@ Result<std::string> imeiOf(const Slot& slot)
     return identifier;
 }
 
-struct Registration {
-    std::uint32_t state;
-    Service service;
-    bool roaming;
-};
-
-constexpr Registration NOT_REGISTERED = {MM_MODEM_3GPP_REGISTRATION_STATE_IDLE,
-                                         Service::OutOfService, false};
-constexpr Registration REGISTRATIONS[] = {
-    NOT_REGISTERED,
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_SEARCHING, Service::OutOfService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_DENIED, Service::OutOfService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING, Service::InService, true},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_SMS_ONLY, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_SMS_ONLY, Service::InService, true},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_EMERGENCY_ONLY, Service::EmergencyOnly, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_CSFB_NOT_PREFERRED, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_CSFB_NOT_PREFERRED, Service::InService, true},
-    // Some services of this place only, for whoever has no subscription here.
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ATTACHED_RLOS, Service::EmergencyOnly, false},
-};
-
 // A modem in such a state says nothing of its registration, or that it does not know it.
 bool isOffTheNetwork(const Modem& modem)
 {
@@ -241,11 +218,11 @@ Result<Registration> registrationOf(const Slot& slot)
     if (!slot.isActive())
         return noSim(findingOutOfUse(slot).reason);
     const Result<std::uint32_t> state = slot.modem().registration();
-    for (const Registration& row : REGISTRATIONS)
-        if (state && state.value() == row.state)
-            return row;
+    const auto known = state ? registrationOf(state.value()) : std::nullopt;
+    if (known)
+        return *known;
     if (isOffTheNetwork(slot.modem()))
-        return NOT_REGISTERED;
+        return *registrationOf(MM_MODEM_3GPP_REGISTRATION_STATE_IDLE);
     return state ? notAvailable("the modem's registration is not known") : state.error();
 }
 

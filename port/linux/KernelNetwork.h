@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the kernel itself tells of radios and network interfaces, in /sys/class.
+#ifndef PORT_LINUX_KERNEL_NETWORK_H
+#define PORT_LINUX_KERNEL_NETWORK_H
+
+#include <string>
+#include <utility>
+
+#include "../backend/Network.h"
+
+namespace port::linux_backend {
+
+class KernelNetwork {
+public:
+    /// `root` stands before every path that is read; "" for this machine.
+    explicit KernelNetwork(std::string root) : root_(std::move(root)) {}
+
+    /// NotSupported: there is no interface of that kind.
+    Result<Sourced<LinkState>> wifi() const;
+    Result<Sourced<WifiConnection>> wifiConnection() const;
+    /// Whether a connection over Bluetooth is up.
+    bool isConnectedOverBluetooth() const;
+    bool hasBluetoothAdapter() const;
+    /// Whether every switch of a Wi-Fi or cellular radio is off.
+    Result<Sourced<bool>> areRadiosSwitchedOff() const;
+
+private:
+    const std::string root_;
+};
+
+} // namespace port::linux_backend
+
+#endif

@@ -1,0 +1,45 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections from NetworkManager, ModemManager, BlueZ and the kernel.
+#ifndef PORT_LINUX_NETWORK_H
+#define PORT_LINUX_NETWORK_H
+
+#include "../backend/Network.h"
+#include "Bus.h"
+#include "KernelNetwork.h"
+#include "ModemManager.h"
+#include "NetworkManager.h"
+
+namespace port::linux_backend {
+
+class LinuxNetwork : public Network {
+public:
+    /// `root` stands before every path that is read; "" for this machine.
+    LinuxNetwork(Bus& bus, const std::string& root) : bus_(bus), kernel_(root) {}
+
+    Result<Sourced<CellularState>> cellular() override;
+    Result<Sourced<LinkState>> wifi() override;
+    Result<Sourced<WifiConnection>> wifiConnection() override;
+    Result<Sourced<LinkState>> bluetooth() override;
+    Result<Sourced<bool>> flightMode() override;
+    Result<Sourced<bool>> packetData() override;
+    Result<Sourced<bool>> mobileData() override;
+    Result<Sourced<bool>> dataRoaming() override;
+    std::unique_ptr<Watch> watch(std::function<void()> changed) override;
+
+private:
+    Result<NetworkView> view();
+    Result<std::vector<CellularConnection>> cellularConnections(const NetworkView& view);
+    Result<bool> isRoamingAllowed(const NetworkView& view);
+    Result<bool> isPacketDataOn(const NetworkView& view);
+    Result<Sourced<bool>> cellularSetting(Result<bool> (LinuxNetwork::*read)(const NetworkView&));
+    Result<Sourced<bool>> flightModeIn(const Result<NetworkView>& view) const;
+    Result<CellularState> cellularIn(const std::vector<Modem>& modems,
+                                     const Result<NetworkView>& view);
+
+    Bus& bus_;
+    const KernelNetwork kernel_;
+};
+
+} // namespace port::linux_backend
+
+#endif
