@@ -6,8 +6,6 @@
 #include <string>
 #include <utility>
 
-#include <unistd.h>
-
 #include "Bus.h"
 
 namespace port::linux_backend {
@@ -21,39 +19,30 @@ constexpr char BUS_NAME[] = "org.freedesktop.DBus";
 } // namespace
 
 BusWatch::BusWatch(std::vector<BusSignal> signals, std::function<void()> changed)
-    : signals_(std::move(signals)), changed_(std::move(changed)), process_(getpid()),
-      context_(g_main_context_new()), cancellable_(g_cancellable_new()), thread_([this] { run(); })
+    : signals_(std::move(signals)), changed_(std::move(changed))
 {
+    thread_.run([this] { connect(); });
 }
 
 BusWatch::~BusWatch()
 {
-    if (getpid() != process_) { // the thread stayed behind in the parent
-        thread_.detach();
-        return;
-    }
-    after(0, &BusWatch::onStop);
-    thread_.join();
+    thread_.run([this] { stop(); });
 }
 
-void BusWatch::run()
+void BusWatch::stop()
 {
-    g_main_context_push_thread_default(context_.get());
-    connect();
-    while (!isStopping_)
-        g_main_context_iteration(context_.get(), TRUE);
+    isStopping_ = true;
     g_cancellable_cancel(cancellable_.get());
     leaveBus();
     while (answersAwaited_ > 0)
-        g_main_context_iteration(context_.get(), TRUE);
-    g_main_context_pop_thread_default(context_.get());
+        g_main_context_iteration(g_main_context_get_thread_default(), TRUE);
 }
 
 void BusWatch::after(int milliseconds, GSourceFunc act)
 {
     GSource* const timer = g_timeout_source_new(static_cast<guint>(milliseconds));
     g_source_set_callback(timer, act, this, nullptr);
-    g_source_attach(timer, context_.get());
+    g_source_attach(timer, g_main_context_get_thread_default());
     g_source_unref(timer);
 }
 
@@ -75,8 +64,8 @@ void BusWatch::onConnected(GObject*, GAsyncResult* result, gpointer self)
     --watch.answersAwaited_;
     watch.connection_.reset(g_dbus_connection_new_for_address_finish(result, nullptr));
     if (watch.isStopping_)
-        watch.leaveBus();
-    else if (watch.connection_)
+        return;
+    if (watch.connection_)
         watch.subscribe();
     else
         watch.after(RETRY_MS, &BusWatch::onRetry);
@@ -154,20 +143,17 @@ gboolean BusWatch::onDue(gpointer self)
 {
     auto& watch = *static_cast<BusWatch*>(self);
     watch.isDue_ = false;
-    watch.changed_();
+    if (!watch.isStopping_)
+        watch.changed_();
     watch.lastTold_ = g_get_monotonic_time();
     return G_SOURCE_REMOVE;
 }
 
 gboolean BusWatch::onRetry(gpointer self)
 {
-    static_cast<BusWatch*>(self)->connect();
-    return G_SOURCE_REMOVE;
-}
-
-gboolean BusWatch::onStop(gpointer self)
-{
-    static_cast<BusWatch*>(self)->isStopping_ = true;
+    auto& watch = *static_cast<BusWatch*>(self);
+    if (!watch.isStopping_)
+        watch.connect();
     return G_SOURCE_REMOVE;
 }
 

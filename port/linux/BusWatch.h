@@ -4,12 +4,10 @@
 #define PORT_LINUX_BUS_WATCH_H
 
 #include <functional>
-#include <thread>
 #include <vector>
 
-#include <sys/types.h>
-
 #include "../backend/Network.h"
+#include "../events/ContextThread.h"
 #include "GLibTypes.h"
 
 namespace port::linux_backend {
@@ -34,11 +32,11 @@ public:
     BusWatch& operator=(const BusWatch&) = delete;
 
 private:
-    void run();
     void connect();
     void subscribe();
     void subscribeTo(const BusSignal& signal);
     void leaveBus();
+    void stop();
     void noteChange();
     void after(int milliseconds, GSourceFunc act);
 
@@ -49,21 +47,18 @@ private:
                          GVariant*, gpointer self);
     static gboolean onRetry(gpointer self);
     static gboolean onDue(gpointer self);
-    static gboolean onStop(gpointer self);
 
     const std::vector<BusSignal> signals_;
     const std::function<void()> changed_;
-    const pid_t process_;
-    Owned<GMainContext> context_;
-    Owned<GCancellable> cancellable_;
-    // Of the thread only:
+    const Owned<GCancellable> cancellable_{g_cancellable_new()};
+    // Of the thread:
     Owned<GDBusConnection> connection_;
     std::vector<guint> subscriptions_;
     int answersAwaited_ = 0;
     bool isStopping_ = false;
     bool isDue_ = false;
     gint64 lastTold_ = 0;
-    std::thread thread_; // last, so that it finds the rest made
+    ContextThread thread_; // last, so that it ends first
 };
 
 } // namespace port::linux_backend

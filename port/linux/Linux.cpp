@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // This machine's real services.
 #include "../backend/Backend.h"
+#include "BlueZ.h"
 #include "Bus.h"
 #include "Clock.h"
 #include "Configuration.h"
@@ -8,7 +9,6 @@
 #include "Files.h"
 #include "Hostname1.h"
 #include "Locale1.h"
-#include "BlueZ.h"
 #include "ModemManager.h"
 #include "Network.h"
 #include "NetworkManager.h"
@@ -73,9 +73,11 @@ public:
             {HOSTNAME1, "device name, hardware model",
              "the device name is the kernel's host name, the model DMI's or the device tree's"},
             {LOCALE1, "display language", "the language is that of LC_ALL, LC_MESSAGES or LANG"},
-            {MODEM_MANAGER, "SIM cards, IMEI, roaming", "no telephony"},
-            {NETWORK_MANAGER, "the SIM card for data",
-             "nobody tells which SIM card carries the data"},
+            {MODEM_MANAGER, "SIM cards, IMEI, roaming, the cellular network", "no telephony"},
+            {NETWORK_MANAGER, "Wi-Fi, flight mode, cellular data, the SIM card for data",
+             "Wi-Fi and flight mode are the kernel's, nothing is known of cellular data, nobody "
+             "tells which SIM card carries it"},
+            {BLUEZ, "Bluetooth", "no Bluetooth"},
         });
         const std::vector<Service> onDisk = {
             file(OS_RELEASE, "platform name and version", "no platform name and version"),
@@ -86,6 +88,7 @@ public:
             probe(DPKG_STATUS, packages_.version(""), "installed packages", "no package is known"),
         };
         found.insert(found.end(), onDisk.begin(), onDisk.end());
+        found.push_back(probe("GSettings", settings_.fontSize(), "font size", "no font size"));
         return found;
     }
 

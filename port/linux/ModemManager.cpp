@@ -48,7 +48,7 @@ constexpr Registration REGISTRATIONS[] = {
 
 } // namespace
 
-std::optional<Registration> registrationOf(std::uint32_t state)
+std::optional<Registration> findRegistration(std::uint32_t state)
 {
     for (const Registration& row : REGISTRATIONS)
         if (row.state == state)

@@ -26,7 +26,7 @@ struct Registration {
 };
 
 /// Nothing for "unknown", and for a state that this port does not know.
-std::optional<Registration> registrationOf(std::uint32_t state);
+std::optional<Registration> findRegistration(std::uint32_t state);
 
 // A modem as it was when ModemManager told of it.
 class Modem {

@@ -115,7 +115,7 @@ bool hasActivated(const Result<std::vector<std::uint32_t>>& deviceStates)
 bool isAbroad(const Modem& modem)
 {
     const auto state = modem.registration();
-    const auto registration = state ? registrationOf(state.value()) : std::nullopt;
+    const auto registration = state ? findRegistration(state.value()) : std::nullopt;
     return registration ? registration->roaming : modem.isCdmaRoaming();
 }
 
@@ -161,8 +161,8 @@ Result<CellularState> furthestOf(const std::vector<Modem>& modems)
 // show in lists that the manager and its settings keep.
 std::vector<BusSignal> networkSignals()
 {
-    constexpr char PROPERTIES[] = "org.freedesktop.DBus.Properties";
-    constexpr char OBJECTS[] = "org.freedesktop.DBus.ObjectManager";
+    constexpr const char* PROPERTIES = "org.freedesktop.DBus.Properties";
+    constexpr const char* OBJECTS = "org.freedesktop.DBus.ObjectManager";
     std::vector<BusSignal> signals = {
         {NM_DBUS_SERVICE, NM_DBUS_INTERFACE_SETTINGS_CONNECTION, "Updated", nullptr},
         {MM_DBUS_SERVICE, OBJECTS, nullptr, nullptr},
@@ -196,8 +196,7 @@ Result<NetworkView> LinuxNetwork::view()
     return NetworkView::from(bus_.ask({networkObjects()}, ROUND_TRIP_TIMEOUT_MS).front());
 }
 
-Result<std::vector<CellularConnection>>
-LinuxNetwork::cellularConnections(const NetworkView& view)
+Result<std::vector<CellularConnection>> LinuxNetwork::cellularConnections(const NetworkView& view)
 {
     return view.cellularConnections(bus_.ask(view.connectionSettings(), ROUND_TRIP_TIMEOUT_MS));
 }
@@ -216,13 +215,12 @@ Result<Sourced<WifiConnection>> LinuxNetwork::wifiConnection()
 
 Result<Sourced<LinkState>> LinuxNetwork::bluetooth()
 {
-    const auto replies =
-        bus_.ask({objectsBelow(BLUEZ), networkObjects()}, ROUND_TRIP_TIMEOUT_MS);
+    const auto replies = bus_.ask({objectsBelow(BLUEZ), networkObjects()}, ROUND_TRIP_TIMEOUT_MS);
+    if (!replies[0] && !kernel_.hasBluetoothAdapter())
+        return notSupported(replies[0].error().reason + "; no Bluetooth adapter in /sys/class");
     const auto adapters = adaptersIn(replies[0]);
     if (!adapters)
-        return kernel_.hasBluetoothAdapter()
-                   ? adapters.error()
-                   : notSupported(adapters.error().reason + "; no Bluetooth adapter in /sys/class");
+        return adapters.error();
     if (adapters.value().empty())
         return notSupported("BlueZ knows no Bluetooth adapter");
     if (std::count(adapters.value().begin(), adapters.value().end(), true) == 0)
@@ -250,9 +248,9 @@ Result<bool> LinuxNetwork::isRoamingAllowed(const NetworkView& view)
     const auto connections = cellularConnections(view);
     if (!connections)
         return connections.error();
-    const auto used = std::max_element(
-        connections.value().begin(), connections.value().end(),
-        [](const auto& a, const auto& b) { return rankOf(a) < rankOf(b); });
+    const auto used =
+        std::max_element(connections.value().begin(), connections.value().end(),
+                         [](const auto& a, const auto& b) { return rankOf(a) < rankOf(b); });
     if (used == connections.value().end())
         return notAvailable("NetworkManager has no cellular connection");
     return !used->isHomeOnly;
@@ -323,8 +321,8 @@ Result<Sourced<CellularState>> LinuxNetwork::cellular()
 {
     const auto replies =
         bus_.ask({objectsBelow(MODEM_MANAGER), networkObjects()}, ROUND_TRIP_TIMEOUT_MS);
-    const auto modems = replies[0] ? modemsIn(replies[0].value())
-                                   : Result<std::vector<Modem>>(replies[0].error());
+    const auto modems =
+        replies[0] ? modemsIn(replies[0].value()) : Result<std::vector<Modem>>(replies[0].error());
     if (!modems)
         return modems.error();
     return from(MODEM_MANAGER, cellularIn(modems.value(), NetworkView::from(replies[1])));

@@ -41,7 +41,7 @@ bool isCellular(const std::string& type)
 
 Error fromNetworkManager(const Error& error)
 {
-    return {error.kind, shortName(NETWORK_MANAGER) + ": " + error.reason};
+    return {error.kind, "NetworkManager: " + error.reason};
 }
 
 // NetworkManager leaves out what has its default value.
@@ -227,8 +227,8 @@ NetworkView::cellularConnections(const std::vector<Result<Reply>>& replies) cons
         if (connection.value())
             found.push_back(*connection.value());
     }
-    const bool nobodyAnswered = std::none_of(replies.begin(), replies.end(),
-                                             [](const auto& reply) { return bool(reply); });
+    const bool nobodyAnswered =
+        std::none_of(replies.begin(), replies.end(), [](const auto& reply) { return bool(reply); });
     if (!replies.empty() && nobodyAnswered)
         return replies.front().error();
     return found;

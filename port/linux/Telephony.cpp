@@ -218,11 +218,11 @@ Result<Registration> registrationOf(const Slot& slot)
     if (!slot.isActive())
         return noSim(findingOutOfUse(slot).reason);
     const Result<std::uint32_t> state = slot.modem().registration();
-    const auto known = state ? registrationOf(state.value()) : std::nullopt;
+    const auto known = state ? findRegistration(state.value()) : std::nullopt;
     if (known)
         return *known;
     if (isOffTheNetwork(slot.modem()))
-        return *registrationOf(MM_MODEM_3GPP_REGISTRATION_STATE_IDLE);
+        return *findRegistration(MM_MODEM_3GPP_REGISTRATION_STATE_IDLE);
     return state ? notAvailable("the modem's registration is not known") : state.error();
 }
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TextScaling.h"
 
+#include <cmath>
 #include <mutex>
 
 // A GSettings object would subscribe to changes on the session bus, and may start one for that. The
@@ -28,10 +29,17 @@ Owned<GVariant> storedValue(const std::string& path)
     static std::mutex mutex;
     const std::lock_guard<std::mutex> lock(mutex);
     GSettingsBackend* const store = g_settings_backend_get_default();
-    GVariant* const value = G_SETTINGS_BACKEND_GET_CLASS(store)->read(
-        store, path.c_str(), G_VARIANT_TYPE_DOUBLE, FALSE);
+    GVariant* const value = G_SETTINGS_BACKEND_GET_CLASS(store)->read(store, path.c_str(),
+                                                                      G_VARIANT_TYPE_DOUBLE, FALSE);
     g_object_unref(store);
     return Owned<GVariant>(value);
+}
+
+bool isFactor(GVariant* value, GSettingsSchemaKey* key)
+{
+    return g_variant_is_of_type(value, G_VARIANT_TYPE_DOUBLE) &&
+           g_settings_schema_key_range_check(key, value) != FALSE &&
+           !std::isnan(g_variant_get_double(value)); // which is in every range
 }
 
 } // namespace
@@ -51,9 +59,8 @@ Result<Sourced<double>> textScaling()
                               G_VARIANT_TYPE_DOUBLE))
         return missing("the schema has a key of another type");
     Owned<GVariant> value = storedValue(std::string(path) + KEY);
-    // What the user never set, or set to what is out of range, has the schema's value.
-    if (!value || !g_variant_is_of_type(value.get(), G_VARIANT_TYPE_DOUBLE) ||
-        !g_settings_schema_key_range_check(key.get(), value.get()))
+    // What the user never set, or set to no factor, has the schema's value.
+    if (!value || !isFactor(value.get(), key.get()))
         value.reset(g_settings_schema_key_get_default_value(key.get()));
     return Sourced<double>{g_variant_get_double(value.get()), SOURCE};
 }

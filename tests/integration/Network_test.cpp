@@ -1,0 +1,707 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections, from scripted services under their real names.
+#include "linux/Network.h"
+
+#include <chrono>
+#include <condition_variable>
+#include <mutex>
+#include <optional>
+
+#include <gmock/gmock.h>
+
+#include "support/PrivateBus.h"
+#include "support/ScriptedService.h"
+#include "support/TemporaryTree.h"
+
+using port::CellularState;
+using port::Error;
+using port::LinkState;
+using port::Result;
+using port::Sourced;
+using port::WifiConnection;
+using port::linux_backend::Bus;
+using port::linux_backend::LinuxNetwork;
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+const char NM[] = "org.freedesktop.NetworkManager";
+const char NM_PATH[] = "/org/freedesktop/NetworkManager";
+const char MM[] = "org.freedesktop.ModemManager1";
+const char BLUEZ[] = "org.bluez";
+
+// The text of an object for a reply of GetManagedObjects.
+std::string object(const std::string& path, const std::string& interface,
+                   const std::string& properties)
+{
+    return "@o '" + path + "': {'" + interface + "': {" + properties + "}}";
+}
+
+std::string reply(const std::vector<std::string>& objects)
+{
+    if (objects.empty())
+        return "(@a{oa{sa{sv}}} {},)";
+    std::string text;
+    for (const std::string& one : objects)
+        text += (text.empty() ? "" : ", ") + one;
+    return "({" + text + "},)";
+}
+
+// What NetworkManager is made to tell.
+struct Networks {
+    bool networking = true;
+    bool wifiOn = true;
+    bool wifiHardwareOn = true;
+    bool cellularOn = true;
+    unsigned radioFlags = 3;
+    std::vector<std::pair<unsigned, unsigned>> devices; // type and state
+    std::vector<std::string> connections;               // "connection" and further settings
+    int active = -1;                                    // one of the connections
+};
+
+constexpr unsigned WIFI = 2;
+constexpr unsigned BLUETOOTH = 5;
+constexpr unsigned MODEM = 8;
+
+std::string flag(const char* name, bool value)
+{
+    return std::string("'") + name + "': <" + (value ? "true" : "false") + ">, ";
+}
+
+std::string number(const char* name, unsigned value)
+{
+    return std::string("'") + name + "': <uint32 " + std::to_string(value) + ">";
+}
+
+std::string connectionPath(std::size_t index)
+{
+    return std::string(NM_PATH) + "/Settings/" + std::to_string(index);
+}
+
+std::string managerObject(const Networks& networks)
+{
+    return object(NM_PATH, NM,
+                  flag("NetworkingEnabled", networks.networking) +
+                      flag("WirelessEnabled", networks.wifiOn) +
+                      flag("WirelessHardwareEnabled", networks.wifiHardwareOn) +
+                      flag("WwanEnabled", networks.cellularOn) + flag("WwanHardwareEnabled", true) +
+                      number("RadioFlags", networks.radioFlags));
+}
+
+std::string objectsOf(const Networks& networks)
+{
+    std::vector<std::string> objects = {managerObject(networks)};
+    for (std::size_t i = 0; i < networks.devices.size(); ++i)
+        objects.push_back(object(std::string(NM_PATH) + "/Devices/" + std::to_string(i),
+                                 std::string(NM) + ".Device",
+                                 number("DeviceType", networks.devices[i].first) + ", " +
+                                     number("State", networks.devices[i].second)));
+    for (std::size_t i = 0; i < networks.connections.size(); ++i)
+        objects.push_back(object(connectionPath(i), std::string(NM) + ".Settings.Connection",
+                                 "'Unsaved': <false>"));
+    if (networks.active >= 0)
+        objects.push_back(object(std::string(NM_PATH) + "/ActiveConnection/1",
+                                 std::string(NM) + ".Connection.Active",
+                                 "'Type': <'gsm'>, 'Connection': <@o '" +
+                                     connectionPath(static_cast<std::size_t>(networks.active)) +
+                                     "'>, " + number("State", 2)));
+    return reply(objects);
+}
+
+template <typename T>
+std::string show(const Result<Sourced<T>>& answer)
+{
+    if (answer)
+        return std::to_string(static_cast<int>(answer.value().value)) + " <" +
+               answer.value().source + ">";
+    return (answer.error().kind == Error::Kind::NotSupported ? "not supported: " : "error: ") +
+           answer.error().reason;
+}
+
+template <typename T>
+std::string shown(T value, const char* source)
+{
+    return show(Result<Sourced<T>>(Sourced<T>{value, source}));
+}
+
+const std::string ON = "1 <org.freedesktop.NetworkManager>";
+const std::string OFF = "0 <org.freedesktop.NetworkManager>";
+
+class NetworkTest : public testing::Test {
+protected:
+    NetworkTest()
+    {
+        daemon.start();
+    }
+
+    ScriptedService& serve(std::unique_ptr<ScriptedService>& service, const char* name,
+                           const std::string& objects)
+    {
+        if (!service)
+            service = std::make_unique<ScriptedService>(daemon.address(), name);
+        service->answerTo("GetManagedObjects", objects);
+        return *service;
+    }
+    void serve(const Networks& networks)
+    {
+        serve(networkManager, NM, objectsOf(networks));
+        for (std::size_t i = 0; i < networks.connections.size(); ++i)
+            networkManager->answerTo("GetSettings", "({" + networks.connections[i] + "},)",
+                                     connectionPath(i));
+    }
+    // One modem for each text of properties; "|" begins those of Modem3gpp.
+    void serveModems(const std::vector<std::string>& modems)
+    {
+        std::vector<std::string> objects;
+        for (const std::string& text : modems) {
+            const std::size_t bar = text.find('|');
+            std::string one =
+                object("/org/freedesktop/ModemManager1/Modem/" + std::to_string(objects.size()),
+                       std::string(MM) + ".Modem", text.substr(0, bar));
+            if (bar != std::string::npos)
+                one.insert(one.size() - 1, ", '" + std::string(MM) + ".Modem.Modem3gpp': {" +
+                                               text.substr(bar + 1) + "}");
+            objects.push_back(one);
+        }
+        serve(modemManager, MM, reply(objects));
+    }
+    void serveAdapters(const std::vector<std::string>& adapters)
+    {
+        std::vector<std::string> objects = {
+            object("/org/bluez", "org.bluez.AgentManager1", "'x': <1>")};
+        for (std::size_t i = 0; i < adapters.size(); ++i)
+            objects.push_back(
+                object("/org/bluez/hci" + std::to_string(i), "org.bluez.Adapter1", adapters[i]));
+        serve(bluez, BLUEZ, reply(objects));
+    }
+
+    PrivateBus daemon;
+    std::unique_ptr<ScriptedService> networkManager;
+    std::unique_ptr<ScriptedService> modemManager;
+    std::unique_ptr<ScriptedService> bluez;
+    const TemporaryTree root;
+    Bus bus;
+    LinuxNetwork network{bus, root.root()};
+};
+
+TEST_F(NetworkTest, WifiFollowsItsDevice)
+{
+    const struct {
+        unsigned device;
+        LinkState link;
+        WifiConnection connection;
+    } rows[] = {
+        {20, LinkState::Deactivated, WifiConnection::Disconnected},
+        {30, LinkState::Disconnected, WifiConnection::Disconnected},
+        {40, LinkState::Disconnected, WifiConnection::Association},
+        {50, LinkState::Disconnected, WifiConnection::Association},
+        {60, LinkState::Disconnected, WifiConnection::Association},
+        {70, LinkState::Disconnected, WifiConnection::Configuration},
+        {80, LinkState::Disconnected, WifiConnection::Configuration},
+        {90, LinkState::Disconnected, WifiConnection::Configuration},
+        {100, LinkState::Connected, WifiConnection::Connected},
+        {110, LinkState::Disconnected, WifiConnection::Disconnected},
+        {120, LinkState::Disconnected, WifiConnection::Failure},
+    };
+    for (const auto& row : rows) {
+        Networks networks;
+        networks.devices = {{1, 100}, {WIFI, row.device}};
+        serve(networks);
+        EXPECT_EQ(shown(row.link, NM), show(network.wifi())) << row.device;
+        EXPECT_EQ(shown(row.connection, NM), show(network.wifiConnection())) << row.device;
+    }
+}
+
+TEST_F(NetworkTest, WifiDeviceThatIsFurthestCounts)
+{
+    Networks networks;
+    networks.devices = {{WIFI, 30}, {WIFI, 100}, {WIFI, 10}};
+    serve(networks);
+    EXPECT_EQ(shown(LinkState::Connected, NM), show(network.wifi()));
+    EXPECT_EQ(shown(WifiConnection::Connected, NM), show(network.wifiConnection()));
+}
+
+TEST_F(NetworkTest, WifiThatIsSwitchedOffIsDeactivated)
+{
+    for (const int which : {0, 1, 2}) {
+        Networks networks;
+        networks.devices = {{WIFI, 100}};
+        networks.wifiOn = which != 0;
+        networks.wifiHardwareOn = which != 1;
+        networks.networking = which != 2;
+        serve(networks);
+        EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi())) << which;
+        EXPECT_EQ(shown(WifiConnection::Disconnected, NM), show(network.wifiConnection()));
+    }
+}
+
+TEST_F(NetworkTest, MachineWithoutWifiHasNone)
+{
+    Networks networks;
+    networks.radioFlags = 2;
+    networks.devices = {{1, 100}, {MODEM, 100}};
+    serve(networks);
+    EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device", show(network.wifi()));
+    EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device",
+              show(network.wifiConnection()));
+    networks.radioFlags = 1; // there is a radio, and its device has gone
+    serve(networks);
+    EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi()));
+}
+
+TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
+{
+    Networks networks;
+    networks.devices = {{WIFI, 10}};
+    serve(networks);
+    EXPECT_EQ("not supported: NetworkManager leaves the Wi-Fi device to others; "
+              "no Wi-Fi interface in /sys/class/net",
+              show(network.wifi()));
+    root.write("/sys/class/net/wlan0/phy80211/name", "phy0\n");
+    root.write("/sys/class/net/wlan0/flags", "0x1003\n");
+    root.write("/sys/class/net/wlan0/carrier", "1\n");
+    root.write("/sys/class/net/wlan0/operstate", "up\n");
+    EXPECT_EQ(shown(LinkState::Connected, "/sys/class/net"), show(network.wifi()));
+    EXPECT_EQ(shown(WifiConnection::Connected, "/sys/class/net"), show(network.wifiConnection()));
+}
+
+TEST_F(NetworkTest, KernelAnswersWithoutNetworkManager)
+{
+    EXPECT_EQ("not supported: org.freedesktop.NetworkManager is not on the system bus; "
+              "no Wi-Fi interface in /sys/class/net",
+              show(network.wifi()));
+    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus; "
+              "no switch of a radio in /sys/class/rfkill",
+              show(network.flightMode()));
+    root.write("/sys/class/rfkill/rfkill0/type", "wlan\n");
+    root.write("/sys/class/rfkill/rfkill0/soft", "1\n");
+    EXPECT_EQ("1 </sys/class/rfkill>", show(network.flightMode()));
+}
+
+TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
+{
+    serve(Networks());
+    serveAdapters({"'Powered': <false>"});
+    EXPECT_EQ(shown(LinkState::Deactivated, BLUEZ), show(network.bluetooth()));
+    serveAdapters({"'Powered': <false>", "'Powered': <true>"});
+    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    Networks networks;
+    networks.devices = {{BLUETOOTH, 30}};
+    serve(networks);
+    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    networks.devices = {{BLUETOOTH, 30}, {BLUETOOTH, 100}};
+    serve(networks);
+    EXPECT_EQ(shown(LinkState::Connected, BLUEZ), show(network.bluetooth()));
+    serveAdapters({"'Powered': <false>"});
+    EXPECT_EQ(shown(LinkState::Deactivated, BLUEZ), show(network.bluetooth()));
+}
+
+TEST_F(NetworkTest, MachineWithoutBluetoothHasNone)
+{
+    EXPECT_EQ("not supported: org.bluez is not on the system bus; "
+              "no Bluetooth adapter in /sys/class",
+              show(network.bluetooth()));
+    root.write("/sys/class/bluetooth/hci0/type", "");
+    EXPECT_EQ("error: org.bluez is not on the system bus", show(network.bluetooth()));
+    serveAdapters({});
+    EXPECT_EQ("not supported: BlueZ knows no Bluetooth adapter", show(network.bluetooth()));
+}
+
+TEST_F(NetworkTest, KernelTellsOfABluetoothConnectionWithoutNetworkManager)
+{
+    serveAdapters({"'Powered': <true>"});
+    root.write("/sys/class/net/bnep0/uevent", "DEVTYPE=bluetooth\nINTERFACE=bnep0\n");
+    root.write("/sys/class/net/bnep0/flags", "0x1003\n");
+    root.write("/sys/class/net/bnep0/carrier", "1\n");
+    root.write("/sys/class/net/bnep0/operstate", "down\n");
+    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    root.write("/sys/class/net/bnep0/operstate", "up\n");
+    EXPECT_EQ(shown(LinkState::Connected, BLUEZ), show(network.bluetooth()));
+}
+
+TEST_F(NetworkTest, FlightModeIsEveryRadioSwitchedOff)
+{
+    const struct {
+        unsigned radios; // 1 Wi-Fi, 2 cellular
+        bool wifiOn;
+        bool cellularOn;
+        bool flightMode;
+    } rows[] = {
+        {3, true, true, false},  {3, false, true, false}, {3, true, false, false},
+        {3, false, false, true}, {1, false, true, true},  {1, true, false, false},
+        {2, true, false, true},  {2, false, true, false}, {0, false, true, false},
+        {0, false, false, true},
+    };
+    for (const auto& row : rows) {
+        Networks networks;
+        networks.radioFlags = row.radios;
+        networks.wifiOn = row.wifiOn;
+        networks.cellularOn = row.cellularOn;
+        serve(networks);
+        EXPECT_EQ(row.flightMode ? ON : OFF, show(network.flightMode()))
+            << row.radios << row.wifiOn << row.cellularOn;
+    }
+}
+
+TEST_F(NetworkTest, SwitchOnTheCaseIsNoFlightMode)
+{
+    Networks networks;
+    networks.radioFlags = 1;
+    networks.wifiHardwareOn = false;
+    serve(networks);
+    EXPECT_EQ(OFF, show(network.flightMode()));
+}
+
+TEST_F(NetworkTest, DataIsOnWhenAConnectionWouldComeUp)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    serve(networks);
+    EXPECT_EQ(OFF, show(network.packetData()));
+    networks.connections = {"'connection': {'type': <'802-11-wireless'>}",
+                            "'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
+    serve(networks);
+    EXPECT_EQ(OFF, show(network.packetData()));
+    EXPECT_EQ(OFF, show(network.mobileData()));
+    networks.active = 1;
+    serve(networks);
+    EXPECT_EQ(ON, show(network.packetData()));
+    EXPECT_EQ(ON, show(network.mobileData()));
+    networks.active = -1;
+    networks.connections[1] = "'connection': {'type': <'cdma'>}";
+    serve(networks);
+    EXPECT_EQ(ON, show(network.packetData()));
+    networks.cellularOn = false;
+    serve(networks);
+    EXPECT_EQ(OFF, show(network.packetData()));
+}
+
+TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    serve(networks);
+    EXPECT_EQ("error: NetworkManager has no cellular connection", show(network.dataRoaming()));
+    networks.connections = {
+        "'connection': {'type': <'gsm'>, 'autoconnect': <false>}, 'gsm': {'apn': <'a'>}",
+        "'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
+    serve(networks);
+    EXPECT_EQ(OFF, show(network.dataRoaming())); // the one that connects itself
+    networks.active = 0;
+    serve(networks);
+    EXPECT_EQ(ON, show(network.dataRoaming())); // the one that is up
+    networks.active = -1;
+    networks.connections.push_back("'connection': {'type': <'gsm'>, 'autoconnect-priority': <5>}");
+    serve(networks);
+    EXPECT_EQ(ON, show(network.dataRoaming())); // the one that connects itself first
+}
+
+TEST_F(NetworkTest, MachineWithoutAModemHasNoCellularSettings)
+{
+    Networks networks;
+    networks.radioFlags = 1;
+    networks.connections = {"'connection': {'type': <'gsm'>}"};
+    serve(networks);
+    for (const auto& answer : {network.packetData(), network.mobileData(), network.dataRoaming()})
+        EXPECT_EQ("not supported: NetworkManager knows no modem", show(answer));
+    networkManager.reset();
+    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus",
+              show(network.packetData()));
+}
+
+TEST_F(NetworkTest, CellularFollowsTheModem)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    serve(networks);
+    const struct {
+        const char* modem;
+        CellularState state;
+    } rows[] = {
+        {"'State': <-1>", CellularState::OutOfService},
+        {"'State': <2>", CellularState::OutOfService},
+        {"'State': <3>|'RegistrationState': <uint32 4>", CellularState::OutOfService},
+        {"'State': <7>|'RegistrationState': <uint32 2>", CellularState::OutOfService},
+        {"'State': <8>|'RegistrationState': <uint32 1>, 'PacketServiceState': <uint32 2>",
+         CellularState::Available},
+        {"'State': <8>|'RegistrationState': <uint32 1>, 'PacketServiceState': <uint32 1>",
+         CellularState::CallOnlyAvailable},
+        {"'State': <8>|'RegistrationState': <uint32 6>, 'PacketServiceState': <uint32 2>",
+         CellularState::CallOnlyAvailable},
+        {"'State': <8>|'RegistrationState': <uint32 1>", CellularState::Available},
+        {"'State': <8>", CellularState::Available},
+        {"'State': <10>|'RegistrationState': <uint32 1>", CellularState::Available},
+        {"'State': <11>|'RegistrationState': <uint32 5>", CellularState::Connected},
+        {"'State': <8>|'RegistrationState': <uint32 5>", CellularState::Available},
+    };
+    for (const auto& row : rows) {
+        serveModems({row.modem});
+        EXPECT_EQ(shown(row.state, MM), show(network.cellular())) << row.modem;
+    }
+}
+
+TEST_F(NetworkTest, RoamingIsOffWhereTheConnectionForbidsIt)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
+    serve(networks);
+    serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
+    EXPECT_EQ(shown(CellularState::RoamingOff, MM), show(network.cellular()));
+    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
+    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+    networkManager.reset();
+    serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
+    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+}
+
+TEST_F(NetworkTest, FlightModeHidesTheModemThatIsNotConnected)
+{
+    Networks networks;
+    networks.wifiOn = false;
+    networks.cellularOn = false;
+    serve(networks);
+    serveModems({"'State': <3>"});
+    EXPECT_EQ(shown(CellularState::FlightMode, MM), show(network.cellular()));
+    serveModems({"'State': <11>"});
+    EXPECT_EQ(shown(CellularState::Connected, MM), show(network.cellular()));
+}
+
+TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 100}};
+    serve(networks);
+    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
+    EXPECT_EQ(shown(CellularState::Connected, MM), show(network.cellular()));
+}
+
+TEST_F(NetworkTest, ModemThatIsFurthestCounts)
+{
+    serveModems({"'State': <'broken'>", "'State': <3>",
+                 "'State': <8>|'RegistrationState': <uint32 1>", "'State': <7>"});
+    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+}
+
+TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
+{
+    EXPECT_EQ("error: org.freedesktop.ModemManager1 is not on the system bus",
+              show(network.cellular()));
+    serveModems({});
+    EXPECT_EQ("not supported: ModemManager knows no modem", show(network.cellular()));
+}
+
+TEST_F(NetworkTest, MalformedPropertiesAreTold)
+{
+    serve(networkManager, NM, reply({}));
+    EXPECT_THAT(show(network.flightMode()),
+                StartsWith("error: NetworkManager: /org/freedesktop/NetworkManager is not there"));
+    serve(networkManager, NM, reply({object(NM_PATH, "com.example.Other", "'x': <1>")}));
+    EXPECT_THAT(show(network.wifi()), HasSubstr("/org/freedesktop/NetworkManager has no "));
+    serve(networkManager, NM,
+          reply({object(NM_PATH, NM, "'WirelessEnabled': <'yes'>, 'WwanEnabled': <true>")}));
+    EXPECT_THAT(show(network.flightMode()),
+                StartsWith("error: NetworkManager: WirelessEnabled is no truth value"));
+    serve(networkManager, NM,
+          reply({managerObject(Networks()),
+                 object(std::string(NM_PATH) + "/Devices/1", std::string(NM) + ".Device",
+                        "'DeviceType': <uint32 2>, 'State': <'up'>")}));
+    EXPECT_THAT(show(network.wifi()), HasSubstr("NetworkManager: State is no number"));
+
+    Networks networks;
+    networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <'no'>}"};
+    serve(networks);
+    EXPECT_EQ("error: NetworkManager: a cellular connection has malformed settings",
+              show(network.dataRoaming()));
+    serveAdapters({"'Powered': <'on'>"});
+    EXPECT_EQ("error: bluez: Powered is no truth value", show(network.bluetooth()));
+    serveAdapters({"'Name': <'x'>"});
+    EXPECT_EQ("error: bluez: Powered is missing", show(network.bluetooth()));
+    serveModems({"'State': <uint32 8>"});
+    EXPECT_EQ("error: org.freedesktop.ModemManager1: State is no number", show(network.cellular()));
+    for (const char* const body : {"()", "('text',)", "({'/m/0': 5},)", "(@a{sv} {},)"}) {
+        serve(networkManager, NM, body);
+        EXPECT_THAT(show(network.flightMode()),
+                    StartsWith("error: org.freedesktop.NetworkManager: "))
+            << body;
+    }
+}
+
+template <typename Work>
+int millisecondsOf(Work work)
+{
+    const auto begin = std::chrono::steady_clock::now();
+    work();
+    const auto time = std::chrono::steady_clock::now() - begin;
+    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
+}
+
+TEST_F(NetworkTest, ServiceThatKeepsSilentIsNotWaitedForLong)
+{
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
+    serve(networkManager, NM, objectsOf(networks)).whenAsked([] {}, "GetSettings");
+    EXPECT_LT(millisecondsOf([this] {
+                  EXPECT_EQ("error: org.freedesktop.NetworkManager did not answer in time",
+                            show(network.dataRoaming()));
+              }),
+              2000);
+}
+
+// Counts calls, and lets a test wait for one.
+class Calls {
+public:
+    void note()
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        ++count_;
+        changed_.notify_all();
+    }
+    bool waitFor(int count)
+    {
+        std::unique_lock<std::mutex> lock(mutex_);
+        return changed_.wait_for(lock, std::chrono::seconds(10), [&] { return count_ >= count; });
+    }
+    // Of calls so far.
+    int count()
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        return count_;
+    }
+
+private:
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    int count_ = 0;
+};
+
+class WatchTest : public NetworkTest {
+protected:
+    void begin()
+    {
+        watch = network.watch([this] { calls.note(); });
+        ASSERT_TRUE(calls.waitFor(1)); // at first it always tells
+    }
+    // Whether something that happens now is told.
+    template <typename Work>
+    bool isTold(Work work)
+    {
+        const int before = calls.count();
+        work();
+        return calls.waitFor(before + 1);
+    }
+
+    Calls calls;
+    std::unique_ptr<port::Watch> watch;
+};
+
+TEST_F(WatchTest, EveryKindOfChangeIsTold)
+{
+    serve(Networks());
+    serveModems({});
+    serveAdapters({});
+    begin();
+    const struct {
+        std::unique_ptr<ScriptedService>& service;
+        const char* interface;
+    } rows[] = {
+        {networkManager, "org.freedesktop.NetworkManager"},
+        {networkManager, "org.freedesktop.NetworkManager.Device"},
+        {networkManager, "org.freedesktop.NetworkManager.Connection.Active"},
+        {networkManager, "org.freedesktop.NetworkManager.Settings"},
+        {modemManager, "org.freedesktop.ModemManager1.Modem"},
+        {modemManager, "org.freedesktop.ModemManager1.Modem.Modem3gpp"},
+        {bluez, "org.bluez.Adapter1"},
+    };
+    for (const auto& row : rows)
+        EXPECT_TRUE(isTold([&row] {
+            row.service->emit("/any", "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                              std::string("('") + row.interface + "', {'X': <1>}, @as [])");
+        })) << row.interface;
+    EXPECT_TRUE(isTold([this] {
+        networkManager->emit(connectionPath(1), std::string(NM) + ".Settings.Connection", "Updated",
+                             "()");
+    }));
+    for (const auto* const service : {&modemManager, &bluez})
+        EXPECT_TRUE(isTold([service] {
+            (*service)->emit("/", "org.freedesktop.DBus.ObjectManager", "InterfacesRemoved",
+                             "(@o '/x', ['y'])");
+        }));
+}
+
+TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)
+{
+    serve(Networks());
+    begin();
+    EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
+    EXPECT_TRUE(isTold([this] { serve(Networks()); }));
+    EXPECT_TRUE(isTold([this] {
+        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+    }));
+}
+
+TEST_F(WatchTest, BusThatGoesAndComesIsTold)
+{
+    serve(Networks());
+    begin();
+    networkManager.reset();
+    EXPECT_TRUE(isTold([this] { daemon.kill(); }));
+    EXPECT_TRUE(isTold([this] { daemon.start(); }));
+    EXPECT_TRUE(isTold([this] { serve(Networks()); }));
+}
+
+TEST_F(WatchTest, BusThatIsNotThereYetIsFound)
+{
+    daemon.kill();
+    watch = network.watch([this] { calls.note(); });
+    EXPECT_EQ(0, calls.count());
+    daemon.start();
+    EXPECT_TRUE(calls.waitFor(1));
+}
+
+TEST_F(WatchTest, BurstIsToldInFewCalls)
+{
+    serve(Networks());
+    begin();
+    const int before = calls.count();
+    constexpr int SIGNALS = 1000;
+    for (int i = 0; i < SIGNALS; ++i)
+        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+    EXPECT_TRUE(calls.waitFor(before + 1));
+    EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
+    EXPECT_LT(calls.count() - before, SIGNALS / 2);
+}
+
+TEST_F(WatchTest, NothingIsToldAfterItsEnd)
+{
+    serve(Networks());
+    begin();
+    for (int i = 0; i < 50; ++i)
+        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+    watch.reset();
+    const int atTheEnd = calls.count();
+    // A second watch has seen what came after.
+    Calls other;
+    const auto second = network.watch([&other] { other.note(); });
+    ASSERT_TRUE(other.waitFor(1));
+    networkManager.reset();
+    EXPECT_TRUE(other.waitFor(2));
+    EXPECT_EQ(atTheEnd, calls.count());
+}
+
+TEST_F(WatchTest, EndOfAWatchThatNeverReachedTheBusIsQuick)
+{
+    daemon.freeze();
+    watch = network.watch([this] { calls.note(); });
+    EXPECT_LT(millisecondsOf([this] { watch.reset(); }), 1000);
+    daemon.thaw();
+    EXPECT_EQ(0, calls.count());
+}
+
+} // namespace
