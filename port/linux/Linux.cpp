@@ -75,8 +75,7 @@ public:
             {LOCALE1, "display language", "the language is that of LC_ALL, LC_MESSAGES or LANG"},
             {MODEM_MANAGER, "SIM cards, IMEI, roaming, the cellular network", "no telephony"},
             {NETWORK_MANAGER, "Wi-Fi, flight mode, cellular data, the SIM card for data",
-             "Wi-Fi and flight mode are the kernel's, nothing is known of cellular data, nobody "
-             "tells which SIM card carries it"},
+             "Wi-Fi and flight mode are the kernel's, nothing is known of cellular data"},
             {BLUEZ, "Bluetooth", "no Bluetooth"},
         });
         const std::vector<Service> onDisk = {
