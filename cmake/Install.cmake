@@ -20,6 +20,16 @@ endforeach()
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/port/coreutil/include/
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/coreutil FILES_MATCHING PATTERN "*.h")
 
+# The service that tells the serial number, its rights on the system bus, and who starts it.
+install(TARGETS deviced DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
+set(deviced_dir ${PROJECT_SOURCE_DIR}/port/deviced)
+set(deviced_build_dir ${PROJECT_BINARY_DIR}/port/deviced)
+install(FILES ${deviced_dir}/org.tizen.system.deviced.conf
+        DESTINATION ${CMAKE_INSTALL_DATADIR}/dbus-1/system.d)
+install(FILES ${deviced_build_dir}/org.tizen.system.deviced.service
+        DESTINATION ${CMAKE_INSTALL_DATADIR}/dbus-1/system-services)
+install(FILES ${deviced_build_dir}/coresystem-deviced.service DESTINATION lib/systemd/system)
+
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/coresystem)
 install(EXPORT coresystem NAMESPACE coresystem:: FILE coresystemConfig.cmake
         DESTINATION ${package_dir})

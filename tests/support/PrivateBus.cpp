@@ -34,21 +34,45 @@ const char CONFIGURATION[] =
   <listen>unix:path=@ROOT@/socket</listen>
   <auth>EXTERNAL</auth>
   <servicedir>@ROOT@/services</servicedir>
-  <policy context="default">
+  @POLICY@
+</busconfig>
+)";
+
+const char ALLOW_ALL[] = R"(<policy context="default">
     <allow user="*"/>
     <allow own="*"/>
     <allow send_destination="*" eavesdrop="true"/>
     <allow eavesdrop="true"/>
-  </policy>
-</busconfig>
-)";
+  </policy>)";
 
-std::string configurationFor(const std::string& root)
+// The beginning of a machine's own: whatever is not allowed is forbidden.
+const char ALLOW_LITTLE[] = R"(<policy context="default">
+    <allow user="*"/>
+    <deny own="*"/>
+    <deny send_type="method_call"/>
+    <allow send_type="signal"/>
+    <allow send_requested_reply="true" send_type="method_return"/>
+    <allow send_requested_reply="true" send_type="error"/>
+    <allow receive_type="method_call"/>
+    <allow receive_type="method_return"/>
+    <allow receive_type="error"/>
+    <allow receive_type="signal"/>
+    <allow send_destination="org.freedesktop.DBus"/>
+  </policy>
+  )";
+
+void replaceAll(std::string& text, const std::string& mark, const std::string& replacement)
+{
+    for (std::size_t at = text.find(mark); at != std::string::npos;
+         at = text.find(mark, at + replacement.size()))
+        text.replace(at, mark.size(), replacement);
+}
+
+std::string configurationFor(const std::string& root, const std::string& policy)
 {
     std::string text = CONFIGURATION;
-    const std::string mark = "@ROOT@";
-    for (std::size_t at = text.find(mark); at != std::string::npos; at = text.find(mark, at))
-        text.replace(at, mark.size(), root);
+    replaceAll(text, "@ROOT@", root);
+    replaceAll(text, "@POLICY@", policy);
     return text;
 }
 
@@ -86,7 +110,7 @@ void endDaemon(int processDescriptor)
 
 PrivateBus::PrivateBus()
 {
-    tree_.write("/bus.conf", configurationFor(tree_.root()));
+    tree_.write("/bus.conf", configurationFor(tree_.root(), ALLOW_ALL));
     tree_.write("/services/none", "");
 }
 
@@ -105,6 +129,12 @@ void PrivateBus::addActivatable(const std::string& name, const std::string& prog
 {
     tree_.write("/services/" + name + ".service",
                 "[D-BUS Service]\nName=" + name + "\nExec=" + program + "\nUser=root\n");
+}
+
+void PrivateBus::usePolicy(const std::string& file) const
+{
+    tree_.write("/bus.conf",
+                configurationFor(tree_.root(), ALLOW_LITTLE + ("<include>" + file) + "</include>"));
 }
 
 void PrivateBus::useEtc(const std::string& folder)

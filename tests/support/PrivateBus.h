@@ -22,6 +22,9 @@ public:
 
     /// Before start(): lets the bus start a program when somebody asks for a name.
     void addActivatable(const std::string& name, const std::string& program) const;
+    /// Before start(): by itself nobody may own a name or call anybody, as on a machine's own bus;
+    /// this file of a bus configuration says who may.
+    void usePolicy(const std::string& file) const;
     /// Before start(): the bus and what it starts see this folder as /etc, in namespaces of their
     /// own, so that nothing they change reaches the machine.
     void useEtc(const std::string& folder);

@@ -1,0 +1,271 @@
+// SPDX-License-Identifier: Apache-2.0
+// The service that stands in for the device daemon, started by a private system bus.
+#include <csignal>
+#include <cstdlib>
+
+#include <gmock/gmock.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "backend/Backend.h"
+#include "common/GLibTypes.h"
+#include "linux/Bus.h"
+#include "support/PrivateBus.h"
+#include "support/Program.h"
+#include "support/ScriptedService.h"
+#include "support/TemporaryTree.h"
+#include "support/Together.h"
+#include "support/Wait.h"
+
+using port::Out;
+using port::Owned;
+using testing::AnyOf;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+const char NAME[] = "org.tizen.system.deviced";
+const char PATH[] = "/Org/Tizen/System/DeviceD/Board";
+const char INTERFACE[] = "org.tizen.system.deviced.Board";
+constexpr int PATIENCE_MS = 10000;
+
+// A connection that is closed with the object.
+class Client {
+public:
+    explicit Client(const std::string& address)
+        : connection_(g_dbus_connection_new_for_address_sync(
+              address.c_str(), port::linux_backend::BUS_CLIENT, nullptr, nullptr, nullptr))
+    {
+    }
+
+    // The text of the reply, or "error: " and its name and message.
+    std::string call(const char* name, const char* path, const char* interface, const char* method,
+                     GVariant* arguments = nullptr) const
+    {
+        Owned<GError> error;
+        const Owned<GVariant> reply(g_dbus_connection_call_sync(
+            connection_.get(), name, path, interface, method, arguments, nullptr,
+            G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, Out(error)));
+        if (!reply)
+            return std::string("error: ") + error->message;
+        return Owned<char>(g_variant_print(reply.get(), FALSE)).get();
+    }
+    std::string serial() const
+    {
+        return call(NAME, PATH, INTERFACE, "GetSerial");
+    }
+    std::string askBus(const char* method, GVariant* arguments) const
+    {
+        return call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
+                    arguments);
+    }
+
+    GDBusConnection* connection() const
+    {
+        return connection_.get();
+    }
+
+private:
+    const Owned<GDBusConnection> connection_;
+};
+
+class DevicedTest : public testing::Test {
+protected:
+    DevicedTest()
+    {
+        useSerial("serial = \"SN-4711\"");
+        setenv("CORESYSTEM_DEVICE", tree.path("/device.toml").c_str(), 1);
+        bus.addActivatable(NAME, PROGRAM);
+    }
+    ~DevicedTest() override
+    {
+        unsetenv("CORESYSTEM_DEVICE");
+    }
+
+    void useSerial(const std::string& line) const
+    {
+        tree.write("/device.toml", "schema = 1\n[device]\n" + line + "\n");
+    }
+    std::string serial() const
+    {
+        return Client(bus.address()).serial();
+    }
+    pid_t processOfService() const
+    {
+        const std::string reply =
+            Client(bus.address()).askBus("GetConnectionUnixProcessID", g_variant_new("(s)", NAME));
+        return static_cast<pid_t>(std::strtol(reply.c_str() + 1, nullptr, 10));
+    }
+
+    const TemporaryTree tree;
+    PrivateBus bus;
+};
+
+TEST_F(DevicedTest, SerialOfTheBackendIsAnswered)
+{
+    bus.start();
+    EXPECT_EQ("('SN-4711',)", serial());
+    useSerial("serial = \"\xc3\x9c-1\"");
+    EXPECT_EQ("('\xc3\x9c-1',)", serial());
+}
+
+TEST_F(DevicedTest, MissingSerialIsAnErrorAndNeverInvented)
+{
+    useSerial("model_name = \"x\"");
+    bus.start();
+    EXPECT_THAT(serial(), StartsWith("error: GDBus.Error:org.tizen.system.deviced.Error."
+                                     "NotAvailable: "));
+}
+
+TEST_F(DevicedTest, MachinesOwnSerialIsTheAnswerWithoutADeviceFile)
+{
+    unsetenv("CORESYSTEM_DEVICE");
+    bus.start();
+    port::linux_backend::Bus own;
+    const auto backend = port::makeLinuxBackend();
+    const auto expected = backend->deviceInfo().serial();
+    if (expected)
+        EXPECT_EQ("('" + expected.value().value + "',)", serial());
+    else
+        EXPECT_THAT(serial(), HasSubstr(expected.error().reason));
+}
+
+TEST_F(DevicedTest, OtherCallsAreErrors)
+{
+    bus.start();
+    const Client client(bus.address());
+    const struct {
+        const char* path;
+        const char* interface;
+        const char* method;
+    } rows[] = {
+        {"/", INTERFACE, "GetSerial"},
+        {"/Org/Tizen/System/DeviceD", INTERFACE, "GetSerial"},
+        {PATH, "org.tizen.system.deviced.board", "GetSerial"},
+        {PATH, INTERFACE, "SetSerial"},
+    };
+    for (const auto& row : rows)
+        EXPECT_THAT(client.call(NAME, row.path, row.interface, row.method), StartsWith("error: "))
+            << row.path << row.method;
+    EXPECT_THAT(client.call(NAME, PATH, INTERFACE, "GetSerial", g_variant_new("(s)", "x")),
+                StartsWith("error: "));
+    EXPECT_EQ("('SN-4711',)", client.serial());
+}
+
+TEST_F(DevicedTest, ManyAskAtOnce)
+{
+    bus.start();
+    together(8, [this](int) {
+        const Client client(bus.address());
+        for (int i = 0; i < 50; ++i)
+            EXPECT_EQ("('SN-4711',)", client.serial());
+    });
+}
+
+TEST_F(DevicedTest, ServiceThatWasKilledIsStartedAgain)
+{
+    bus.start();
+    EXPECT_EQ("('SN-4711',)", serial());
+    const pid_t first = processOfService();
+    ASSERT_GT(first, 1);
+    ASSERT_EQ(0, kill(first, SIGKILL));
+    // While the bus has not noticed yet, the call may reach the one that was killed.
+    EXPECT_THAT(serial(), AnyOf("('SN-4711',)", HasSubstr("disconnected")));
+    EXPECT_EQ("('SN-4711',)", serial());
+    EXPECT_NE(first, processOfService());
+}
+
+TEST_F(DevicedTest, EveryUserMayAskAndOnlyRootMayOwnTheName)
+{
+    if (geteuid() != 0)
+        GTEST_SKIP() << "needs root, to be another user";
+    bus.usePolicy(POLICY);
+    bus.start();
+    EXPECT_EQ("('SN-4711',)", serial());
+    const std::string asNobody = "setpriv --reuid=65534 --regid=65534 --clear-groups gdbus call "
+                                 "--system --timeout 10 ";
+    EXPECT_EQ("('SN-4711',)\n", outputOf(asNobody + "-d " + NAME + " -o " + PATH + " -m " +
+                                         INTERFACE + ".GetSerial"));
+    EXPECT_THAT(outputOf(asNobody + "-d org.freedesktop.DBus -o /org/freedesktop/DBus " +
+                         "-m org.freedesktop.DBus.RequestName " + NAME + " 0 || true"),
+                HasSubstr("is not allowed to own the service"));
+}
+
+// Runs the service by hand.
+class Program {
+public:
+    Program() : process_(fork())
+    {
+        if (process_ == 0) {
+            execl(PROGRAM, PROGRAM, static_cast<char*>(nullptr));
+            _exit(127);
+        }
+    }
+    void tell(int signal) const
+    {
+        kill(process_, signal);
+    }
+    // Its exit code, or minus the signal that ended it.
+    int end() const
+    {
+        int status = 0;
+        waitpid(process_, &status, 0);
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
+    }
+
+private:
+    const pid_t process_;
+};
+
+// Waits until the service is on the bus, without starting it.
+bool comesToBus(const PrivateBus& bus)
+{
+    const Client client(bus.address());
+    bool isThere = false;
+    const guint watch = g_bus_watch_name_on_connection(
+        client.connection(), NAME, G_BUS_NAME_WATCHER_FLAGS_NONE,
+        [](GDBusConnection*, const char*, const char*, gpointer flag) {
+            *static_cast<bool*>(flag) = true;
+        },
+        nullptr, &isThere, nullptr);
+    const bool came = runUntil([&isThere] { return isThere; });
+    g_bus_unwatch_name(watch);
+    return came;
+}
+
+TEST_F(DevicedTest, EndsCleanlyWhenItIsToldTo)
+{
+    bus.start();
+    for (const int signal : {SIGTERM, SIGINT}) {
+        const Program program;
+        ASSERT_TRUE(comesToBus(bus));
+        program.tell(signal);
+        EXPECT_EQ(0, program.end()) << signal;
+    }
+}
+
+TEST_F(DevicedTest, EndsCleanlyWithTheBus)
+{
+    bus.start();
+    const Program program;
+    ASSERT_TRUE(comesToBus(bus));
+    bus.kill();
+    EXPECT_EQ(0, program.end());
+}
+
+TEST_F(DevicedTest, FailsWithoutABus)
+{
+    bus.start();
+    bus.kill();
+    EXPECT_EQ(1, Program().end());
+}
+
+TEST_F(DevicedTest, FailsWhenTheNameIsTaken)
+{
+    bus.start();
+    const ScriptedService other(bus.address(), NAME);
+    EXPECT_EQ(1, Program().end());
+}
+
+} // namespace
