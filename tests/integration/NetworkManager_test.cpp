@@ -1,0 +1,151 @@
+// SPDX-License-Identifier: Apache-2.0
+// Radios and connections from the real NetworkManager and the real ModemManager, with simulated
+// modems.
+#include <condition_variable>
+#include <memory>
+#include <mutex>
+
+#include <gmock/gmock.h>
+
+#include "linux/Network.h"
+#include "support/ModemsOnBus.h"
+#include "support/NetworkManagerOnBus.h"
+
+using port::CellularState;
+using port::Error;
+using port::Result;
+using port::Sourced;
+using port::linux_backend::Bus;
+using port::linux_backend::LinuxNetwork;
+
+namespace {
+
+template <typename T>
+T valueOf(const Result<Sourced<T>>& answer)
+{
+    return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
+}
+
+class NetworkManagerTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        for (const std::string& obstacle :
+             {ModemsOnBus::obstacle(), NetworkManagerOnBus::obstacle()})
+            if (!obstacle.empty())
+                GTEST_SKIP() << obstacle;
+        modems = std::make_unique<ModemsOnBus>();
+        networks = std::make_unique<NetworkManagerOnBus>(modems->bus().address());
+    }
+
+    // A modem that is on the air, and known to NetworkManager.
+    AtModem& addModem(const AtModem::State& state)
+    {
+        AtModem& modem = modems->add("home", state);
+        EXPECT_TRUE(modems->waitUntil([this] { return bool(network.packetData()); }));
+        modems->enable("home");
+        return modem;
+    }
+    bool becomes(CellularState state)
+    {
+        return modems->waitUntil([&] {
+            const auto now = network.cellular();
+            return now && now.value().value == state;
+        });
+    }
+
+    std::unique_ptr<ModemsOnBus> modems;
+    std::unique_ptr<NetworkManagerOnBus> networks;
+    const TemporaryTree root;
+    Bus bus;
+    LinuxNetwork network{bus, root.root()};
+};
+
+TEST_F(NetworkManagerTest, MachineWithoutRadiosHasNone)
+{
+    EXPECT_EQ(Error::Kind::NotSupported, network.wifi().error().kind);
+    EXPECT_EQ(Error::Kind::NotSupported, network.cellular().error().kind);
+    EXPECT_EQ(Error::Kind::NotSupported, network.packetData().error().kind);
+    EXPECT_EQ("NetworkManager knows no Wi-Fi device", network.wifi().error().reason);
+    EXPECT_EQ("org.freedesktop.NetworkManager", network.flightMode().value().source);
+}
+
+TEST_F(NetworkManagerTest, FlightModeFollowsTheSwitches)
+{
+    EXPECT_FALSE(valueOf(network.flightMode()));
+    networks->setSwitch("WirelessEnabled", false);
+    EXPECT_FALSE(valueOf(network.flightMode()));
+    networks->setSwitch("WwanEnabled", false);
+    EXPECT_TRUE(valueOf(network.flightMode()));
+    networks->setSwitch("WirelessEnabled", true);
+    EXPECT_FALSE(valueOf(network.flightMode()));
+}
+
+TEST_F(NetworkManagerTest, SwitchIsToldToAWatch)
+{
+    std::mutex mutex;
+    std::condition_variable changed;
+    bool flightMode = false;
+    const auto watch = network.watch([&] {
+        const bool now = valueOf(network.flightMode());
+        const std::lock_guard<std::mutex> lock(mutex);
+        flightMode = now;
+        changed.notify_all();
+    });
+    networks->setSwitch("WirelessEnabled", false);
+    networks->setSwitch("WwanEnabled", false);
+    std::unique_lock<std::mutex> lock(mutex);
+    EXPECT_TRUE(changed.wait_for(lock, std::chrono::seconds(10), [&] { return flightMode; }));
+}
+
+TEST_F(NetworkManagerTest, ModemAtHomeIsAvailable)
+{
+    addModem({});
+    EXPECT_TRUE(becomes(CellularState::Available));
+}
+
+TEST_F(NetworkManagerTest, ModemAbroadObeysItsConnection)
+{
+    AtModem::State abroad;
+    abroad.registration = 5;
+    AtModem& modem = addModem(abroad);
+    EXPECT_EQ("NetworkManager has no cellular connection", network.dataRoaming().error().reason);
+    EXPECT_TRUE(becomes(CellularState::Available));
+    networks->addCellularConnection(true);
+    EXPECT_FALSE(valueOf(network.dataRoaming()));
+    EXPECT_FALSE(valueOf(network.packetData())); // it does not connect by itself
+    EXPECT_TRUE(becomes(CellularState::RoamingOff));
+    modem.change([](AtModem::State& state) { state.registration = 1; });
+    EXPECT_TRUE(becomes(CellularState::Available));
+}
+
+TEST_F(NetworkManagerTest, ConnectionThatMayRoamAllowsData)
+{
+    addModem({});
+    networks->addCellularConnection(false);
+    EXPECT_TRUE(valueOf(network.dataRoaming()));
+}
+
+TEST_F(NetworkManagerTest, CellularSwitchTakesTheModemOffTheNetwork)
+{
+    addModem({});
+    EXPECT_TRUE(becomes(CellularState::Available));
+    networks->setSwitch("WwanEnabled", false);
+    EXPECT_TRUE(becomes(CellularState::FlightMode)); // its only radio
+    EXPECT_FALSE(valueOf(network.packetData()));
+    networks->setSwitch("WwanEnabled", true);
+    EXPECT_TRUE(becomes(CellularState::Available));
+}
+
+TEST_F(NetworkManagerTest, NetworkManagerThatEndedIsNotWaitedFor)
+{
+    networks.reset();
+    EXPECT_EQ("org.freedesktop.NetworkManager is not on the system bus",
+              network.packetData().error().reason);
+    root.write("/sys/class/rfkill/rfkill0/type", "wlan\n");
+    root.write("/sys/class/rfkill/rfkill0/soft", "1\n");
+    EXPECT_TRUE(valueOf(network.flightMode()));
+    EXPECT_EQ("/sys/class/rfkill", network.flightMode().value().source);
+}
+
+} // namespace
