@@ -6,6 +6,8 @@
 namespace {
 
 constexpr int PATIENCE_MS = 5000;
+const char BUS_NAME[] = "org.freedesktop.DBus"; // of its interface too
+const char BUS_PATH[] = "/org/freedesktop/DBus";
 constexpr guint32 PRIMARY_OWNER = 1;
 constexpr guint32 MAY_BE_REPLACED = 1;
 constexpr guint32 REPLACE = 2;
@@ -24,10 +26,10 @@ GDBusConnection* connectTo(const std::string& address)
 
 void ownName(GDBusConnection* connection, const std::string& name)
 {
-    GVariant* const reply = g_dbus_connection_call_sync(
-        connection, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-        "RequestName", g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE), nullptr,
-        G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
+    GVariant* const reply =
+        g_dbus_connection_call_sync(connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
+                                    g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE),
+                                    nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
     guint32 result = 0;
     if (reply != nullptr)
         g_variant_get(reply, "(u)", &result);
@@ -44,15 +46,25 @@ std::string keyOf(const std::string& method, const std::string& path)
     return path.empty() ? method : method + " " + path;
 }
 
-GVariant* parsed(const std::string& body)
+std::shared_ptr<GVariant> parsed(const std::string& body)
 {
-    return g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr);
+    GVariant* const value = g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr);
+    if (value == nullptr)
+        throw std::runtime_error("no GVariant text: " + body);
+    return std::shared_ptr<GVariant>(g_variant_ref_sink(value), g_variant_unref);
+}
+
+GDBusMessage* replyWith(GDBusMessage* question, GVariant* body)
+{
+    GDBusMessage* const message = g_dbus_message_new_method_reply(question);
+    g_dbus_message_set_body(message, body);
+    return message;
 }
 
 } // namespace
 
 ScriptedService::ScriptedService(const std::string& address, const std::string& name)
-    : connection_(connectTo(address)),
+    : name_(name), connection_(connectTo(address)),
       filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage,
                                            new std::shared_ptr<State>(state_),
                                            &ScriptedService::releaseState))
@@ -76,7 +88,7 @@ ScriptedService::~ScriptedService()
     g_object_unref(connection_);
 }
 
-bool ScriptedService::State::answer(GDBusMessage* question)
+bool ScriptedService::State::answer(GDBusMessage* question, std::vector<GDBusMessage*>& due)
 {
     const std::string method = g_dbus_message_get_member(question);
     const std::lock_guard<std::mutex> lock(mutex);
@@ -88,25 +100,9 @@ bool ScriptedService::State::answer(GDBusMessage* question)
     ++timesAsked;
     if (GDBusMessage* const answer = script->second(question))
         heldBack.push_back(answer);
-    return true;
-}
-
-std::vector<GDBusMessage*> ScriptedService::State::answersThatAreDue()
-{
-    const std::lock_guard<std::mutex> lock(mutex);
-    std::vector<GDBusMessage*> due;
     if (heldBack.size() >= together)
         due.swap(heldBack);
-    return due;
-}
-
-void ScriptedService::sendAnswersOf(State& state, GDBusConnection* connection)
-{
-    for (GDBusMessage* const answer : state.answersThatAreDue()) {
-        g_dbus_connection_send_message(connection, answer, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                       nullptr);
-        g_object_unref(answer);
-    }
+    return true;
 }
 
 // Runs on the connection's own thread, so a test may block in a call meanwhile.
@@ -115,10 +111,14 @@ GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessa
 {
     if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
-    State& script = **static_cast<std::shared_ptr<State>*>(state);
-    if (!script.answer(message))
+    std::vector<GDBusMessage*> due;
+    if (!(*static_cast<std::shared_ptr<State>*>(state))->answer(message, due))
         return message;
-    sendAnswersOf(script, connection);
+    for (GDBusMessage* const answer : due) {
+        g_dbus_connection_send_message(connection, answer, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                       nullptr);
+        g_object_unref(answer);
+    }
     g_object_unref(message);
     return nullptr;
 }
@@ -136,18 +136,20 @@ void ScriptedService::follow(const std::string& method, Script script, const std
 
 GDBusMessage* ScriptedService::reply(GDBusMessage* question, const std::string& body)
 {
-    GDBusMessage* const message = g_dbus_message_new_method_reply(question);
-    g_dbus_message_set_body(message, parsed(body));
-    return message;
+    return replyWith(question, parsed(body).get());
 }
 
 void ScriptedService::answerOnlyTogether(std::size_t count)
 {
-    {
-        const std::lock_guard<std::mutex> lock(state_->mutex);
-        state_->together = count;
-    }
-    sendAnswersOf(*state_, connection_);
+    const std::lock_guard<std::mutex> lock(state_->mutex);
+    state_->together = count;
+}
+
+void ScriptedService::releaseName()
+{
+    g_dbus_connection_call(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
+                           g_variant_new("(s)", name_.c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE,
+                           PATIENCE_MS, nullptr, nullptr, nullptr);
 }
 
 int ScriptedService::timesAsked() const
@@ -172,7 +174,7 @@ void ScriptedService::emit(const std::string& path, const std::string& interface
                            const std::string& signal, const std::string& body)
 {
     g_dbus_connection_emit_signal(connection_, nullptr, path.c_str(), interface.c_str(),
-                                  signal.c_str(), parsed(body), nullptr);
+                                  signal.c_str(), parsed(body).get(), nullptr);
     g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
 }
 

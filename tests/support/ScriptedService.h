@@ -45,7 +45,10 @@ public:
     void follow(const std::string& method, Script script, const std::string& path = "");
     static GDBusMessage* reply(GDBusMessage* question, const std::string& body);
 
-    /// Holds the answers back until there are so many, then gives them all; 1 gives them at once.
+    /// Gives the name back before the next answer is sent; whoever had it before has it again.
+    void releaseName();
+
+    /// Holds the answers back until there are so many, then gives them all.
     void answerOnlyTogether(std::size_t count);
     /// How many questions it had a script for.
     int timesAsked() const;
@@ -59,17 +62,16 @@ private:
         std::size_t together = 1;
         std::vector<GDBusMessage*> heldBack;
 
-        /// Whether there is a script for it.
-        bool answer(GDBusMessage* question);
-        std::vector<GDBusMessage*> answersThatAreDue();
+        /// Whether there is a script for it; fills the answers that are due.
+        bool answer(GDBusMessage* question, std::vector<GDBusMessage*>& due);
     };
 
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
                                    gpointer state);
     static void releaseState(gpointer state);
-    static void sendAnswersOf(State& state, GDBusConnection* connection);
 
     const std::shared_ptr<State> state_ = std::make_shared<State>();
+    const std::string name_;
     GDBusConnection* const connection_;
     const guint filter_;
 };
