@@ -32,19 +32,6 @@ constexpr Column COLUMNS[] = {
     {"SMS", "sms", &SimSlot::sms, false, "ready", "not ready"},
 };
 
-// A default slot.
-struct Subscription {
-    const char* title;
-    const char* key;
-    Answer Sims::*answer;
-};
-
-constexpr Subscription SUBSCRIPTIONS[] = {
-    {"network", "network", &Sims::network},
-    {"data", "data", &Sims::data},
-    {"calls", "voice", &Sims::voice},
-};
-
 Json shown(const Column& column, const SimSlot& slot, bool reveal)
 {
     const Json& value = (slot.*column.answer).value;
@@ -93,14 +80,12 @@ std::string reasonsText(const std::vector<SimSlot>& slots)
     return rows.empty() ? "" : "\n" + heading("Not available") + "\n" + aligned(rows);
 }
 
-std::string subscriptionsText(const Sims& sims)
+std::string defaultsText(const std::vector<DefaultSlot>& defaults)
 {
     Rows rows;
-    for (const Subscription& row : SUBSCRIPTIONS) {
-        const Answer& answer = sims.*row.answer;
-        rows.push_back({row.title, answer.value.is_null() ? "not available (" + answer.reason + ")"
-                                                          : answer.value.get<std::string>()});
-    }
+    for (const auto& [use, slot] : defaults)
+        rows.push_back({use, slot.value.is_null() ? "not available (" + slot.reason + ")"
+                                                  : slot.value.get<std::string>()});
     return "\n" + heading("Default slots") + "\n" + aligned(rows);
 }
 
@@ -116,7 +101,7 @@ bool hidesAnything(const std::vector<SimSlot>& slots)
 std::string simText(const Sims& sims, bool reveal)
 {
     std::string text = backendLine() + "\n\n" + slotsText(sims.slots, reveal) +
-                       reasonsText(sims.slots) + subscriptionsText(sims);
+                       reasonsText(sims.slots) + defaultsText(sims.defaults);
     if (!reveal && hidesAnything(sims.slots))
         text += "\nWhat identifies the subscriber is masked; --reveal shows it.\n";
     return text;
@@ -145,9 +130,8 @@ std::string simJson(const Sims& sims, bool reveal)
         json["slots"].push_back(slotJson(slot, reveal));
     if (sims.slots.empty())
         json["reason"] = sims.reason;
-    else
-        for (const Subscription& row : SUBSCRIPTIONS)
-            json["default_slots"][row.key] = (sims.*row.answer).value;
+    for (const auto& [use, slot] : sims.defaults)
+        json["default_slots"][use] = slot.value;
     return jsonText(json);
 }
 

@@ -82,19 +82,22 @@ Answer askStatus(int slot)
                               : Answer{wordOf(STATUSES, status), ""};
 }
 
-void askIdentity(SimSlot& slot)
+struct Identity {
+    Answer mcc;
+    Answer mnc;
+    Answer msin;
+    Answer country;
+};
+
+Identity askIdentity(const char* modem)
 {
     std::string mcc;
     std::string mnc;
     std::string msin;
-    if (library().GetSimInfo(slot.modem.c_str(), &mcc, &mnc, &msin)) {
-        slot.mcc = {mcc, ""};
-        slot.mnc = {mnc, ""};
-        slot.msin = {msin, ""};
-        slot.country = askCountryOf(mcc);
-        return;
-    }
-    slot.mcc = slot.mnc = slot.msin = slot.country = unanswered(Question::SimIdentity);
+    if (library().GetSimInfo(modem, &mcc, &mnc, &msin))
+        return {{mcc, ""}, {mnc, ""}, {msin, ""}, askCountryOf(mcc)};
+    const Answer none = unanswered(Question::SimIdentity);
+    return {none, none, none, none};
 }
 
 // The platform fails, or succeeds with nothing, when the card holds no number.
@@ -120,15 +123,18 @@ Answer askSms(char* modem)
 
 SimSlot askSlot(int number, char* modem, telephony_h& handle)
 {
-    SimSlot slot{};
-    slot.number = number;
-    slot.modem = modem;
-    slot.status = askStatus(number);
-    askIdentity(slot);
-    slot.phoneNumber = askPhoneNumber(handle);
-    slot.roaming = askRoaming(number);
-    slot.sms = askSms(modem);
-    return slot;
+    const Answer status = askStatus(number);
+    const Identity identity = askIdentity(modem);
+    return {number,
+            modem,
+            status,
+            identity.mcc,
+            identity.mnc,
+            identity.msin,
+            identity.country,
+            askPhoneNumber(handle),
+            askRoaming(number),
+            askSms(modem)};
 }
 
 template <typename Number, std::size_t count>
@@ -140,11 +146,13 @@ Answer askSubscription(char* modem, bool (CoreSystem::*ask)(char*, Number*),
                                           : unanswered(Question::Subscriptions);
 }
 
-void askSubscriptions(Sims& sims, char* modem)
+std::vector<DefaultSlot> askDefaults(char* modem)
 {
-    sims.network = askSubscription(modem, &CoreSystem::GetMainSimSubscription, NETWORK_SLOTS);
-    sims.data = askSubscription(modem, &CoreSystem::GetDefaultDataSubscription, DATA_SLOTS);
-    sims.voice = askSubscription(modem, &CoreSystem::GetCallPreferredSubscription, VOICE_SLOTS);
+    return {
+        {"network", askSubscription(modem, &CoreSystem::GetMainSimSubscription, NETWORK_SLOTS)},
+        {"data", askSubscription(modem, &CoreSystem::GetDefaultDataSubscription, DATA_SLOTS)},
+        {"calls", askSubscription(modem, &CoreSystem::GetCallPreferredSubscription, VOICE_SLOTS)},
+    };
 }
 
 // Why there are no slots.
@@ -168,7 +176,7 @@ cli::Sims cli::askSims()
     if (sims.slots.empty())
         sims.reason = whyNoSlots();
     else
-        askSubscriptions(sims, modems[0]);
+        sims.defaults = askDefaults(sims.slots.front().modem.data());
     library().DeinitHandleList(&list);
     return sims;
 }

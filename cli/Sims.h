@@ -31,12 +31,16 @@ struct SimSlot {
     Answer sms; // whether text messages can be sent and received
 };
 
+// The slot that serves something by default, or "unknown".
+struct DefaultSlot {
+    const char* use; // "network", ...
+    Answer slot;
+};
+
 struct Sims {
     std::vector<SimSlot> slots;
     std::string reason; // why there are none
-    Answer network;     // the default slots, or "unknown"
-    Answer data;
-    Answer voice;
+    std::vector<DefaultSlot> defaults;
 };
 
 Sims askSims();

@@ -11,6 +11,7 @@
 #include <map>
 #include <mutex>
 #include <optional>
+#include <type_traits>
 #include <utility>
 
 namespace port {
@@ -25,13 +26,14 @@ inline std::uintptr_t newHandleNumber()
 /// thread.
 template <typename Handle, typename Content>
 class Handles {
+    static_assert(std::is_pointer_v<Handle>, "a number takes its place");
+
 public:
     static Handle open(Content content)
     {
         const std::uintptr_t number = newHandleNumber();
         Handle handle{};
-        static_assert(sizeof handle == sizeof number, "a handle is a pointer");
-        std::memcpy(&handle, &number, sizeof handle);
+        std::memcpy(&handle, &number, sizeof number);
         Registry& all = registry();
         const std::lock_guard<std::mutex> lock(all.mutex);
         all.contents.emplace(number, std::move(content));
