@@ -3,13 +3,13 @@
 #include "linux/Telephony.h"
 
 #include <chrono>
-#include <map>
 
 #include <gmock/gmock.h>
 
 #include "linux/ModemManager.h"
 #include "linux/NetworkManager.h"
 #include "support/PrivateBus.h"
+#include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
 #include "support/TelephonyQuestions.h"
 #include "support/Together.h"
@@ -39,65 +39,6 @@ const SlotName HOME = "/virtual/home";
 const char TREE[] = "GetManagedObjects";
 const char SIM_0[] = "/org/freedesktop/ModemManager1/SIM/0";
 const char SIM_1[] = "/org/freedesktop/ModemManager1/SIM/1";
-
-// GVariant texts by name; an empty one is left out.
-using Entries = std::map<std::string, std::string>;
-
-std::string dictionary(const Entries& entries, const std::string& type)
-{
-    std::string text;
-    for (const auto& [name, value] : entries)
-        if (!value.empty())
-            text += (text.empty() ? "" : ", ") + ("'" + name + "': ") + value;
-    return "@" + type + " {" + text + "}";
-}
-
-std::string propertiesText(const Entries& entries)
-{
-    return dictionary(entries, "a{sv}");
-}
-
-struct FakeModem {
-    std::string path = "/org/freedesktop/ModemManager1/Modem/0";
-    Entries modem = {
-        {"Device", "<'/virtual/home'>"},
-        {"State", "<int32 8>"}, // registered
-        {"StateFailedReason", "<uint32 0>"},
-        {"UnlockRequired", "<uint32 1>"}, // nothing
-        {"UnlockRetries", "<{uint32 2: uint32 3, 4: 10}>"},
-        {"PowerState", "<uint32 3>"}, // on
-        {"Sim", "<objectpath '" + std::string(SIM_0) + "'>"},
-        {"SimSlots", "<@ao []>"},
-        {"PrimarySimSlot", "<uint32 0>"},
-        {"EquipmentIdentifier", "<'490154203237518'>"},
-        {"OwnNumbers", "<['+15551230001']>"},
-    };
-    Entries network = {{"RegistrationState", "<uint32 1>"}}; // home
-    Entries interfaces = {};                                 // others
-
-    std::string text() const
-    {
-        Entries all = {{"org.freedesktop.ModemManager1.Modem", propertiesText(modem)},
-                       {"org.freedesktop.ModemManager1.Modem.Modem3gpp", propertiesText(network)},
-                       {"org.freedesktop.ModemManager1.Modem.Messaging", propertiesText({})}};
-        for (const auto& [name, properties] : interfaces)
-            all[name] = properties;
-        return "objectpath '" + path + "': " + dictionary(all, "a{sa{sv}}");
-    }
-};
-
-std::string treeOf(const std::vector<std::string>& objects)
-{
-    std::string text;
-    for (const std::string& object : objects)
-        text += (text.empty() ? "" : ", ") + object;
-    return "(@a{oa{sa{sv}}} {" + text + "},)";
-}
-
-std::string simOf(const std::string& imsi, const std::string& network)
-{
-    return "(" + propertiesText({{"Imsi", imsi}, {"OperatorIdentifier", network}}) + ",)";
-}
 
 template <typename Work>
 int millisecondsOf(Work work)
@@ -705,20 +646,6 @@ TEST_F(ScriptedModemsTest, EveryQuestionIsOneRoundTrip)
         EXPECT_EQ(std::nullopt, question.ask(telephony, HOME)) << question.name;
         EXPECT_EQ(hasTwoParts ? 2 : 1, service->timesAsked() - before) << question.name;
     }
-}
-
-// The objects of a NetworkManager whose traffic goes over one connection of one device.
-std::string networkTree(const std::string& type, const std::string& modem)
-{
-    const std::string name = NETWORK_MANAGER.name;
-    return treeOf({"objectpath '/org/freedesktop/NetworkManager': {'" + name + "': " +
-                       propertiesText({{"PrimaryConnection", "<objectpath '/Active/1'>"},
-                                       {"PrimaryConnectionType", "<'" + type + "'>"}}) +
-                       "}",
-                   "objectpath '/Active/1': {'" + name + ".Connection.Active': " +
-                       propertiesText({{"Devices", "<[objectpath '/Devices/1']>"}}) + "}",
-                   "objectpath '/Devices/1': {'" + name +
-                       ".Device': " + propertiesText({{"Udi", "<'" + modem + "'>"}}) + "}"});
 }
 
 class SubscriptionsTest : public ScriptedModemsTest {
