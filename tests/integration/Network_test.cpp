@@ -2,10 +2,12 @@
 // Radios and connections, from scripted services under their real names.
 #include "linux/Network.h"
 
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
 #include <optional>
+#include <thread>
 
 #include <gmock/gmock.h>
 
@@ -551,6 +553,37 @@ TEST_F(NetworkTest, ServiceThatKeepsSilentIsNotWaitedForLong)
               2000);
 }
 
+// Every question, and how long it took.
+std::vector<int> timesOfAllQuestions(LinuxNetwork& network)
+{
+    return {
+        millisecondsOf([&] { EXPECT_FALSE(network.cellular()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.wifi()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.wifiConnection()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.bluetooth()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.flightMode()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.packetData()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.mobileData()); }),
+        millisecondsOf([&] { EXPECT_FALSE(network.dataRoaming()); }),
+    };
+}
+
+TEST_F(NetworkTest, AbsentServicesAreToldAtOnce)
+{
+    EXPECT_THAT(timesOfAllQuestions(network), testing::Each(testing::Lt(500)));
+}
+
+TEST_F(NetworkTest, SilentServicesAreNotWaitedForLong)
+{
+    serve(Networks());
+    serveModems({});
+    serveAdapters({});
+    for (const auto* const service : {&networkManager, &modemManager, &bluez})
+        (*service)->whenAsked([] {}, "GetManagedObjects");
+    EXPECT_THAT(timesOfAllQuestions(network),
+                testing::Each(AllOf(testing::Ge(500), testing::Lt(2000))));
+}
+
 // Counts calls, and lets a test wait for one.
 class Calls {
 public:
@@ -693,6 +726,33 @@ TEST_F(WatchTest, NothingIsToldAfterItsEnd)
     networkManager.reset();
     EXPECT_TRUE(other.waitFor(2));
     EXPECT_EQ(atTheEnd, calls.count());
+}
+
+TEST_F(WatchTest, WatchesBeginAndEndWhileSignalsArrive)
+{
+    serve(Networks());
+    std::atomic<bool> isOver{false};
+    std::thread sender([&] {
+        while (!isOver)
+            networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                                 "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+    });
+    constexpr int WATCHES = 200;
+    for (int i = 0; i < WATCHES; ++i) {
+        auto living = std::make_unique<bool>(true);
+        const int before = calls.count();
+        watch = network.watch([&] {
+            EXPECT_TRUE(*living);
+            calls.note();
+        });
+        if (i % 2 == 0) {
+            EXPECT_TRUE(calls.waitFor(before + 1));
+        }
+        watch.reset();
+        living.reset();
+    }
+    isOver = true;
+    sender.join();
 }
 
 TEST_F(WatchTest, EndOfAWatchThatNeverReachedTheBusIsQuick)
