@@ -14,6 +14,7 @@ import sys
 # Applications reach the class through GetInstance() only.
 NEVER_EXPORTED = ("CoreSystem::CoreSystem", "CoreSystem::~CoreSystem", "vtable for ",
                   "typeinfo for ", "typeinfo name for ")
+SINGLETONS = ("CoreSystem", "SimManager", "ConnectionManager", "DBusManager")
 # Offset to top, type information, and the two entries of the destructor.
 VTABLE_WORDS = 4
 
@@ -64,14 +65,16 @@ def check_imports(library, listed, runtime):
 
 
 def check_vtable(library, word):
-    tables = [line.split() for line in run("nm", "-C", "-S", library).splitlines()
-              if line.endswith("vtable for CoreSystem")]
-    if len(tables) != 1:
-        yield "the virtual table of CoreSystem was not found; is the library stripped?"
-    for table in tables:
-        if int(table[1], 16) != VTABLE_WORDS * word:
-            yield f"the virtual table of CoreSystem holds {int(table[1], 16) // word} words, " \
-                  f"not the {VTABLE_WORDS} of a lone destructor"
+    symbols = run("nm", "-C", "-S", library).splitlines()
+    for name in SINGLETONS:
+        sizes = [int(line.split()[1], 16) for line in symbols
+                 if line.endswith(f" vtable for {name}")]
+        if len(sizes) != 1:
+            yield f"the virtual table of {name} was not found; is the library stripped?"
+        for size in sizes:
+            if size != VTABLE_WORDS * word:
+                yield f"the virtual table of {name} holds {size // word} words, " \
+                      f"not the {VTABLE_WORDS} of a lone destructor"
 
 
 def relocations(library):
@@ -87,7 +90,7 @@ def main():
     parser.add_argument("--exports", type=pathlib.Path, help="list of all exported names")
     parser.add_argument("--imports", type=pathlib.Path, help="list of all imported names ...")
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
-    parser.add_argument("--vtable", type=int, metavar="WORD", help="check it; bytes of a pointer")
+    parser.add_argument("--vtable", type=int, metavar="WORD", help="check them; bytes of a pointer")
     arguments = parser.parse_args()
 
     problems = []

@@ -3,10 +3,13 @@
 #ifndef CORESYSTEM_TESTS_SUPPORT_CORE_SYSTEM_INTERNALS_H
 #define CORESYSTEM_TESTS_SUPPORT_CORE_SYSTEM_INTERNALS_H
 
+#include <ctime>
 #include <string>
 #include <vector>
 
+#include <ConnectionManager.h>
 #include <CoreSystem.h>
+#include <DBusManager.h>
 #include <SimManager.h>
 
 struct CoreSystemInternals {
@@ -53,6 +56,27 @@ struct CoreSystemInternals {
         CoreSystem::instance_->GetISO639LangCodeFromDeviceLang(upperCode, &preset);
         return preset;
     }
+
+    static int fontSize(int* slot)
+    {
+        return CoreSystem::instance_->GetFontSize(slot);
+    }
+
+    static int currentTime(std::tm* slot)
+    {
+        return CoreSystem::instance_->GetCurrentTime(slot);
+    }
+
+    static bool isPackageInstalled(const char* name)
+    {
+        return CoreSystem::instance_->IsPackageInstalled(name);
+    }
+
+    typedef int (CoreSystem::*StateRead)();
+
+    static constexpr StateRead GET_CELLULAR_STATE = &CoreSystem::GetCellularNetworkState;
+    static constexpr StateRead GET_WIFI_STATE = &CoreSystem::GetWifiNetworkState;
+    static constexpr StateRead GET_BT_STATE = &CoreSystem::GetBTNetworkState;
 };
 
 #endif

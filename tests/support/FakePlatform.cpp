@@ -146,10 +146,11 @@ package_info_h handleOfPackage(const std::string& name)
 
 char connectionHandle = 'c';
 
-// "connection" for the one there is.
 const char* nameOf(connection_h connection)
 {
-    return connection == &connectionHandle ? "connection" : "no connection";
+    if (connection == nullptr)
+        return "no connection";
+    return connection == &connectionHandle ? "connection" : "another connection";
 }
 
 std::string nameOf(const telephony_handle_list_s& list)

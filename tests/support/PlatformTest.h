@@ -19,6 +19,7 @@ namespace fake {
 // The texts of the events of one source file, as FakePlatform::trace() has them.
 struct SourceFile {
     std::string className;
+    std::string defaultTag = "CoreSystem";
 
     std::string debug(const std::string& function, const std::string& text) const
     {
@@ -27,6 +28,10 @@ struct SourceFile {
     std::string error(const std::string& function, const std::string& text) const
     {
         return "error " + className + ".cpp " + function + ": " + text;
+    }
+    std::string notice(const std::string& function, const std::string& text) const
+    {
+        return "notice " + className + ".cpp " + function + ": " + text;
     }
     std::string lock() const
     {
@@ -41,6 +46,8 @@ struct SourceFile {
 
 const SourceFile CORE_SYSTEM{"CoreSystem"};
 const SourceFile SIM_MANAGER{"SimManager"};
+const SourceFile CONNECTION_MANAGER{"ConnectionManager"};
+const SourceFile D_BUS_MANAGER{"DBusManager", "Logger"};
 
 inline Texts operator+(Texts texts, const Texts& more)
 {
@@ -51,7 +58,9 @@ inline Texts operator+(Texts texts, const Texts& more)
 // All instances exist and nothing is recorded when a test begins.
 class PlatformTest : public testing::Test {
 protected:
-    PlatformTest() : system(*CoreSystem::GetInstance()), sim(*SimManager::GetInstance())
+    PlatformTest()
+        : system(*CoreSystem::GetInstance()), sim(*SimManager::GetInstance()),
+          connections(*ConnectionManager::GetInstance()), dbus(*DBusManager::GetInstance())
     {
         platform().reset();
     }
@@ -62,6 +71,8 @@ protected:
 
     CoreSystem& system;
     SimManager& sim;
+    ConnectionManager& connections;
+    DBusManager& dbus;
 };
 
 // One call of the library and everything it does in debug mode, in order. The tests of all such

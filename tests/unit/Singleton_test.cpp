@@ -8,6 +8,7 @@
 
 using namespace fake;
 using testing::Each;
+using testing::Field;
 
 namespace {
 
@@ -23,6 +24,37 @@ const SourceFile& sourceOf<SimManager>()
 {
     return SIM_MANAGER;
 }
+template <>
+const SourceFile& sourceOf<ConnectionManager>()
+{
+    return CONNECTION_MANAGER;
+}
+template <>
+const SourceFile& sourceOf<DBusManager>()
+{
+    return D_BUS_MANAGER;
+}
+
+typedef testing::Types<CoreSystem, SimManager, ConnectionManager, DBusManager> Singletons;
+
+template <class... Classes>
+void destroyInstances(testing::Types<Classes...>)
+{
+    (CoreSystemInternals::destroyInstance<Classes>(), ...);
+}
+
+// The classes that have an instance now.
+template <class... Classes>
+Texts instances(testing::Types<Classes...>)
+{
+    Texts names;
+    const auto add = [&names](const void* instance, const std::string& name) {
+        if (instance != nullptr)
+            names.push_back(name);
+    };
+    (add(CoreSystemInternals::instance<Classes>(), sourceOf<Classes>().className), ...);
+    return names;
+}
 
 // Looks before the first test does anything.
 class LoadTime : public testing::Environment {
@@ -31,9 +63,7 @@ public:
 
     void SetUp() override
     {
-        nothingHappened = platform().events().empty() &&
-                          CoreSystemInternals::instance<CoreSystem>() == nullptr &&
-                          CoreSystemInternals::instance<SimManager>() == nullptr;
+        nothingHappened = platform().events().empty() && instances(Singletons()).empty();
     }
 };
 bool LoadTime::nothingHappened = false;
@@ -73,7 +103,6 @@ protected:
     }
 };
 
-typedef testing::Types<CoreSystem, SimManager> Singletons;
 class SingletonName {
 public:
     template <class Singleton>
@@ -110,13 +139,16 @@ TYPED_TEST(SingletonTest, FirstCallConstructsUnderItsLock)
 
 TYPED_TEST(SingletonTest, ConstructorCreatesNoOtherInstance)
 {
-    CoreSystemInternals::destroyInstance<CoreSystem>();
-    CoreSystemInternals::destroyInstance<SimManager>();
+    destroyInstances(Singletons());
     TypeParam::GetInstance();
-    const bool coreSystem = CoreSystemInternals::instance<CoreSystem>() != nullptr;
-    const bool simManager = CoreSystemInternals::instance<SimManager>() != nullptr;
-    EXPECT_EQ(coreSystem, (std::is_same<TypeParam, CoreSystem>::value));
-    EXPECT_EQ(simManager, (std::is_same<TypeParam, SimManager>::value));
+    EXPECT_EQ(instances(Singletons()), Texts{this->source.className});
+}
+
+TYPED_TEST(SingletonTest, EveryLineCarriesTheDefaultTag)
+{
+    TypeParam::GetInstance();
+    EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, this->source.defaultTag)));
+    EXPECT_EQ(platform().lines().size(), 2u);
 }
 
 TYPED_TEST(SingletonTest, LaterCallsTakeTheLockAndConstructNothing)
@@ -143,7 +175,7 @@ TYPED_TEST(SingletonTest, FailedAllocationGivesNullAndAnErrorLine)
     EXPECT_TRUE(failure.happened());
     EXPECT_EQ(platform().trace(), this->accessAround(this->source.error(
                                       "GetInstance", this->source.className + "() failed.")));
-    EXPECT_EQ(platform().lines().back().tag, "CoreSystem");
+    EXPECT_EQ(platform().lines().back().tag, this->source.defaultTag);
 }
 
 TYPED_TEST(SingletonTest, CallAfterFailedAllocationTriesAgain)
