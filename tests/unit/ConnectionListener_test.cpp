@@ -487,6 +487,7 @@ TEST_F(ConnectionListenerTest, RuntimeEventsThatCannotBeReadNeedNoListener)
 // Unlike the Wi-Fi events: they rely on the registration being gone before the listener is.
 TEST_F(ConnectionListenerTest, RuntimeEventsDoNotTestForAListener)
 {
+    GTEST_FLAG_SET(death_test_style, "threadsafe"); // the bus library may have threads
     set(&recorder, &firstData);
     const FakePlatform::Callbacks late = platform().callbacks;
     set(nullptr, nullptr);
