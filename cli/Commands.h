@@ -39,6 +39,9 @@ void setFooter(CLI::App& command, const std::string& remarks);
 void addInfoCommands(CLI::App& app, Invocation& invocation);
 void addCountryCommand(CLI::App& app, Invocation& invocation);
 void addSimCommand(CLI::App& app, Invocation& invocation);
+void addPackageCommand(CLI::App& app, Invocation& invocation);
+void addStorageCommand(CLI::App& app, Invocation& invocation);
+void addWatchCommand(CLI::App& app, Invocation& invocation);
 void addLogCommands(CLI::App& app, Invocation& invocation);
 void addDoctorCommand(CLI::App& app, Invocation& invocation);
 

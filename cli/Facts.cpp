@@ -31,6 +31,16 @@ Fact answer(Question question, Json value)
     return {"", std::move(value), lastOrigin(question).source, ""};
 }
 
+// Each text once.
+std::string joined(const std::vector<std::string>& texts)
+{
+    std::string all;
+    for (auto text = texts.begin(); text != texts.end(); ++text)
+        if (std::find(texts.begin(), text, *text) == text)
+            all += (all.empty() ? "" : "; ") + *text;
+    return all;
+}
+
 Fact noAnswer(const std::string& reason)
 {
     return {"", nullptr, "", reason};
@@ -142,6 +152,63 @@ Fact askRoamingOfFirstSlot()
                                    : answer(Question::Roaming, roaming.value);
 }
 
+// A switch that cannot be read is told to applications as off.
+std::function<Fact()> yesOrNo(std::vector<Question> questions, std::function<bool()> read)
+{
+    return [=] {
+        const bool isOn = read();
+        std::vector<std::string> sources;
+        std::vector<std::string> reasons;
+        for (const Question question : questions) {
+            const auto origin = lastOrigin(question);
+            (origin.available ? sources : reasons)
+                .push_back(origin.available ? origin.source : origin.reason);
+        }
+        if (!isOn && !reasons.empty())
+            return noAnswer(butTold(joined(reasons), "no"));
+        return Fact{"", isOn, joined(sources), ""};
+    };
+}
+
+std::function<Fact()> connected(bool overWifi, bool overBluetooth)
+{
+    std::vector<Question> counted = {Question::Cellular};
+    if (overWifi)
+        counted.push_back(Question::Wifi);
+    if (overBluetooth)
+        counted.push_back(Question::Bluetooth);
+    return yesOrNo(counted, [=] { return library().IsNetworkConnected(overWifi, overBluetooth); });
+}
+
+Fact askSalesCode()
+{
+    const auto code = taken(library().GetCSC());
+    return code ? answer(Question::SalesCode, *code)
+                : noAnswer(lastOrigin(Question::SalesCode).reason);
+}
+
+std::string reasonOfNoSerial(int code)
+{
+    switch (code) {
+    case 1:
+        return "no connection to the system bus";
+    case 3:
+        return "the system bus does not answer in time";
+    default:
+        return "the device daemon does not answer with a serial number";
+    }
+}
+
+// The daemon has a backend of its own.
+Fact askSerial()
+{
+    const char* slot = nullptr;
+    const int code = library().GetDeviceUniqueID(&slot);
+    const auto serial = taken(const_cast<char*>(slot)); // the caller's, though it is read-only
+    return serial ? Fact{"", *serial, "device daemon (org.tizen.system.deviced)", ""}
+                  : noAnswer(reasonOfNoSerial(code));
+}
+
 struct FactRow {
     const char* name;
     std::function<Fact()> ask;
@@ -165,6 +232,18 @@ const std::vector<FactRow>& facts()
         {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim), true},
         {"imei", askImei, true},
         {"roaming", askRoamingOfFirstSlot},
+        {"flight_mode", yesOrNo({Question::FlightMode}, [] { return library().IsFlightMode(); })},
+        {"data_roaming",
+         yesOrNo({Question::DataRoaming}, [] { return library().IsDataRoamingEnabled(); })},
+        {"mobile_data", yesOrNo({Question::MobileData}, [] { return library().IsMobileData(); })},
+        {"connected_cellular", connected(false, false)},
+        {"connected_wifi", connected(true, false)},
+        {"connected_bluetooth", connected(false, true)},
+        {"connected_any", connected(true, true)},
+        {"sales_code", askSalesCode},
+        {"storage_available",
+         yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
+        {"device_serial", askSerial, true},
     };
     return all;
 }

@@ -2,6 +2,8 @@
 // `coresystem info` and `coresystem get`.
 #include <algorithm>
 
+#include <coresystem_port.h>
+
 #include "Commands.h"
 #include "Facts.h"
 #include "Session.h"
@@ -12,21 +14,27 @@
 namespace cli {
 namespace {
 
-// The whole reason was already told once, about the device file.
-std::vector<std::string> rowOf(const Fact& fact, bool deviceFileBad)
+// What is wrong with the device file is told once, not with each fact.
+std::string shortReason(const std::string& reason)
+{
+    const std::string problem = coresystem_port::deviceFileProblem();
+    const bool isOfTheFile = !problem.empty() && reason.find(problem) != std::string::npos;
+    return isOfTheFile ? "the device file is unusable" : reason;
+}
+
+std::vector<std::string> rowOf(const Fact& fact)
 {
     if (fact.value.is_null())
-        return {fact.name, "not available",
-                "(" + (deviceFileBad ? "the device file is unusable" : fact.reason) + ")"};
+        return {fact.name, "not available", "(" + shortReason(fact.reason) + ")"};
     const std::string text = textOf(fact.value);
     return {fact.name, text.empty() ? "\"\"" : text, fact.source};
 }
 
-std::string infoText(const std::vector<Fact>& facts, bool deviceFileBad)
+std::string infoText(const std::vector<Fact>& facts)
 {
     Rows rows;
     for (const Fact& fact : facts)
-        rows.push_back(rowOf(fact, deviceFileBad));
+        rows.push_back(rowOf(fact));
     return backendLine() + "\n\n" + aligned(rows, "");
 }
 
@@ -44,10 +52,16 @@ std::string infoJson(const std::vector<Fact>& facts)
     return jsonText(json);
 }
 
-std::vector<Fact> askAll(bool reveal)
+// What an application may learn of its connections.
+const std::vector<std::string> NETWORK_FACTS = {
+    "connected_cellular", "connected_wifi", "connected_bluetooth", "connected_any",
+    "flight_mode",        "mobile_data",    "data_roaming",
+};
+
+std::vector<Fact> askAll(const std::vector<std::string>& names, bool reveal)
 {
     std::vector<Fact> facts;
-    for (const std::string& name : factNames()) {
+    for (const std::string& name : names) {
         facts.push_back(askFact(name));
         if (facts.back().isIdentity && !reveal)
             facts.back().value = masked(facts.back().value);
@@ -55,11 +69,11 @@ std::vector<Fact> askAll(bool reveal)
     return facts;
 }
 
-ExitCode runInfo(const Invocation& invocation, bool reveal)
+ExitCode runInfo(const Invocation& invocation, const std::vector<std::string>& names, bool reveal)
 {
-    const std::vector<Fact> facts = askAll(reveal);
+    const std::vector<Fact> facts = askAll(names, reveal);
     const bool deviceFileBad = reportDeviceFileProblem();
-    writeOut(invocation.json ? infoJson(facts) : infoText(facts, deviceFileBad));
+    writeOut(invocation.json ? infoJson(facts) : infoText(facts));
     return deviceFileBad ? BAD_DEVICE_FILE : SUCCESS;
 }
 
@@ -116,6 +130,31 @@ void addGet(CLI::App& app, Invocation& invocation)
     });
 }
 
+void addNetwork(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const network =
+        app.add_subcommand("network", "Print what applications may learn of the connections");
+    network->add_flag("--json", invocation.json, "Print one JSON object");
+    setFooter(*network, "A connection over Wi-Fi or Bluetooth counts beside the cellular one: "
+                        "\"connected_wifi\" is yes when either is there.");
+    network->callback([&invocation] {
+        invocation.command = [&invocation] { return runInfo(invocation, NETWORK_FACTS, false); };
+    });
+}
+
+void addSerial(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const serial =
+        app.add_subcommand("serial", "Print the serial number that the device daemon tells");
+    serial->add_flag("--json", invocation.json, "Print a JSON object with value and source");
+    setFooter(*serial, "The daemon answers by the device file that it was started with, not by "
+                       "--device.\n"
+                       "Exit code 3: there is no serial number; the reason is on standard error.");
+    serial->callback([&invocation] {
+        invocation.command = [&invocation] { return runGet(invocation, "device_serial"); };
+    });
+}
+
 } // namespace
 } // namespace cli
 
@@ -124,12 +163,16 @@ void cli::addInfoCommands(CLI::App& app, Invocation& invocation)
     CLI::App* const info =
         app.add_subcommand("info", "Print every fact about the device, with its source");
     const auto reveal = std::make_shared<bool>(false);
-    info->add_flag("--reveal", *reveal, "Show the phone number and the IMEI, unmasked");
+    info->add_flag("--reveal", *reveal, "Show phone number, IMEI and serial number, unmasked");
     info->add_flag("--json", invocation.json, "Print one JSON object");
     setFooter(*info, "Examples: coresystem info\n"
                      "          coresystem info --json --device phone.toml");
     info->callback([&invocation, reveal] {
-        invocation.command = [&invocation, reveal] { return runInfo(invocation, *reveal); };
+        invocation.command = [&invocation, reveal] {
+            return runInfo(invocation, factNames(), *reveal);
+        };
     });
     addGet(app, invocation);
+    addNetwork(app, invocation);
+    addSerial(app, invocation);
 }

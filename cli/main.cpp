@@ -19,12 +19,16 @@ const char* const FOOTER = R"(Examples:
   coresystem info --device phone.toml    every fact about a simulated device
   coresystem get device_name             one fact, for scripts
   coresystem sim                         what applications may learn of the SIM cards
+  coresystem network                     connections, flight mode, mobile data
+  coresystem watch                       connection changes, until interrupted
+  coresystem package org.example.clock   the version of an installed package
+  coresystem storage --at-least 500      whether more than 500 MB are free
   coresystem country 340                 what the library makes of a country key
   coresystem log decipher --key key <log read a debug trace
   coresystem doctor                      what the answers rest on
 
 Exit codes:
-  0 success   1 failure   2 usage error   3 fact not available
+  0 success   1 failure, or less storage   2 usage error   3 fact not available
   4 device file unusable   5 no such country key)";
 
 struct Program {
@@ -45,6 +49,9 @@ struct Program {
         addInfoCommands(app, invocation);
         addCountryCommand(app, invocation);
         addSimCommand(app, invocation);
+        addPackageCommand(app, invocation);
+        addStorageCommand(app, invocation);
+        addWatchCommand(app, invocation);
         addLogCommands(app, invocation);
         addDoctorCommand(app, invocation);
         app.footer(FOOTER);

@@ -5,9 +5,10 @@ _coresystem_words()
 {
     local global='--device --verbose --help'
     case $1 in
-    '') echo "info get country sim log doctor --version $global" ;;
+    '') echo "info get network serial sim package storage watch country log doctor --version $global" ;;
     info | sim) echo "--reveal --json $global" ;;
-    country | doctor) echo "--json $global" ;;
+    country | doctor | network | serial | package | watch) echo "--json $global" ;;
+    storage) echo "--at-least --json $global" ;;
     get) echo "$("$2" get --list 2>/dev/null) --list --json $global" ;;
     log) echo "decipher $global" ;;
     decipher) echo "--key $global" ;;
@@ -27,9 +28,11 @@ _coresystem()
     esac
     for ((i = 1; i < COMP_CWORD; i++)); do
         case ${COMP_WORDS[i]} in
-        --device | --key) ((i++)) ;;
+        --device | --key | --at-least) ((i++)) ;;
         -*) ;;
-        info | get | country | sim | log | doctor) [[ -z $command ]] && command=${COMP_WORDS[i]} ;;
+        info | get | network | serial | sim | package | storage | watch | country | log | doctor)
+            [[ -z $command ]] && command=${COMP_WORDS[i]}
+            ;;
         decipher) [[ $command == log ]] && command=decipher ;;
         esac
     done

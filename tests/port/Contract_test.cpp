@@ -143,15 +143,19 @@ private:
     port::linux_backend::LinuxSettings settings_{client_};
 };
 
+// The facts that both can show. The identifier is none of them: the linux backend's is a hash.
 Facts factsOf(const std::string& deviceFile)
 {
+    constexpr std::pair<const char*, const char*> SHOWN[] = {{"device", "platform_name"},
+                                                             {"device", "platform_version"},
+                                                             {"device", "model_name"},
+                                                             {"settings", "device_name"},
+                                                             {"settings", "language"}};
     Facts facts = {{"machine", "4f2d9c0b6a714e8d95c3b17e20fd86aa"}};
     const toml::table file = toml::parse_file(std::string(DEVICE_FILES "/") + deviceFile);
-    for (const char* const section : {"device", "settings"})
-        if (const toml::table* const table = file[section].as_table())
-            for (const auto& [key, value] : *table)
-                if (key != "platform_id") // the linux backend's is a hash
-                    facts[std::string(key.str())] = value.value<std::string>().value();
+    for (const auto& [section, key] : SHOWN)
+        if (const auto value = file[section][key].value<std::string>())
+            facts[key] = *value;
     return facts;
 }
 

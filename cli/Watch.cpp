@@ -1,0 +1,170 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem watch`: connection changes as a listener is told of them.
+#include <csignal>
+#include <exception>
+#include <memory>
+
+#include <IConnectionStateListener.h>
+#include <glib-unix.h>
+
+#include "Commands.h"
+#include "Session.h"
+#include "Terminal.h"
+
+namespace cli {
+namespace {
+
+const char* nameOfConnection(int state)
+{
+    switch (state) {
+    case WIFI_CONNECTION_STATE_FAILURE:
+        return "failure";
+    case WIFI_CONNECTION_STATE_DISCONNECTED:
+        return "disconnected";
+    case WIFI_CONNECTION_STATE_ASSOCIATION:
+        return "association";
+    case WIFI_CONNECTION_STATE_CONFIGURATION:
+        return "configuration";
+    case WIFI_CONNECTION_STATE_CONNECTED:
+        return "connected";
+    default:
+        return "unknown";
+    }
+}
+
+// The thread's main loop, which ends at an interruption.
+class Loop {
+public:
+    Loop()
+    {
+        for (const int signal : {SIGINT, SIGTERM})
+            g_unix_signal_add(signal, onSignal, this);
+    }
+
+    void run()
+    {
+        g_main_loop_run(loop_.get());
+    }
+    void quit()
+    {
+        g_main_loop_quit(loop_.get());
+    }
+
+private:
+    static gboolean onSignal(gpointer self)
+    {
+        static_cast<Loop*>(self)->quit();
+        return G_SOURCE_CONTINUE;
+    }
+
+    std::unique_ptr<GMainLoop, void (*)(GMainLoop*)> loop_{g_main_loop_new(nullptr, FALSE),
+                                                           g_main_loop_unref};
+};
+
+// Prints one line for each event.
+class Printer : public IConnectionStateListener {
+public:
+    Printer(Loop& loop, bool asJson) : loop_(loop), asJson_(asJson) {}
+
+    void OnWifiDeviceStateChanged(int state, void*) override
+    {
+        print("wifi_device", state == WIFI_DEVICE_STATE_ACTIVATED ? "activated" : "deactivated");
+    }
+    void OnWifiConnectionStateChanged(int state, wifi_ap_h, void*) override
+    {
+        print("wifi_connection", nameOfConnection(state));
+    }
+    void OnFlightModeChanged(bool enabled, void*) override
+    {
+        print("flight_mode", enabled ? "on" : "off");
+    }
+    void OnPacketDataChanged(bool enabled, void*) override
+    {
+        print("packet_data", enabled ? "on" : "off");
+    }
+    void OnWifiStatusChanged(bool connected, void*) override
+    {
+        print("wifi_status", connected ? "connected" : "not connected");
+    }
+
+    // The line that tells that the listener is set.
+    void begin()
+    {
+        Json first = {{"event", "watching"}};
+        first.update(jsonAnswer());
+        writeOut(asJson_ ? lineOf(first) : backendLine() + "\n\n");
+    }
+
+    // A failure of a line that was to be printed.
+    void rethrow() const
+    {
+        if (failure_)
+            std::rethrow_exception(failure_);
+    }
+
+private:
+    static std::string lineOf(const Json& json)
+    {
+        return json.dump(-1, ' ', false, Json::error_handler_t::replace) + "\n";
+    }
+
+    // The platform calls from C: no exception may pass.
+    void print(const char* event, const char* state)
+    try {
+        writeOut(asJson_ ? lineOf({{"event", event}, {"state", state}})
+                         : std::string(event) + " " + state + "\n");
+    } catch (...) {
+        failure_ = std::current_exception();
+        loop_.quit();
+    }
+
+    Loop& loop_;
+    const bool asJson_;
+    std::exception_ptr failure_;
+};
+
+// Is told of changes while it lives.
+class Listening {
+public:
+    explicit Listening(Printer& printer)
+    {
+        library().SetConnectionEventListener(&printer, nullptr);
+    }
+    ~Listening()
+    {
+        library().SetConnectionEventListener(nullptr, nullptr);
+    }
+    Listening(const Listening&) = delete;
+    Listening& operator=(const Listening&) = delete;
+};
+
+ExitCode runWatch(const Invocation& invocation)
+{
+    if (reportDeviceFileProblem())
+        return BAD_DEVICE_FILE;
+    Loop loop;
+    Printer printer(loop, invocation.json);
+    {
+        const Listening listening(printer);
+        printer.begin();
+        loop.run();
+    }
+    printer.rethrow();
+    return SUCCESS;
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addWatchCommand(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const watch =
+        app.add_subcommand("watch", "Print connection changes, one line each, until interrupted");
+    watch->add_flag("--json", invocation.json, "Print one JSON object a line");
+    setFooter(*watch, "Examples: coresystem watch\n"
+                      "          coresystem watch -v --device phone.toml   also what is wrong "
+                      "with an edit\n"
+                      "Ends with exit code 0 at SIGINT (Ctrl-C) or SIGTERM.");
+    watch->callback(
+        [&invocation] { invocation.command = [&invocation] { return runWatch(invocation); }; });
+}
