@@ -76,7 +76,7 @@ protected:
     {
         useSerial("serial = \"SN-4711\"");
         setenv("CORESYSTEM_DEVICE", tree.path("/device.toml").c_str(), 1);
-        bus.addActivatable(NAME, PROGRAM);
+        bus.addActivatable(NAME, "'" PROGRAM "'"); // a command line
     }
     ~DevicedTest() override
     {
