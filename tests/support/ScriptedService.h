@@ -68,6 +68,8 @@ private:
 
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
                                    gpointer state);
+    static gpointer handedOn(const std::shared_ptr<State>& state);
+    static std::shared_ptr<State> takenFrom(gpointer state);
     static void releaseState(gpointer state);
 
     const std::shared_ptr<State> state_ = std::make_shared<State>();
