@@ -31,13 +31,21 @@ Fact answer(Question question, Json value)
     return {"", std::move(value), lastOrigin(question).source, ""};
 }
 
-// Each text once.
+// What stands between the semicolons of several texts, each once.
 std::string joined(const std::vector<std::string>& texts)
 {
+    const std::string separator = "; ";
+    std::vector<std::string> parts;
+    for (const std::string& text : texts)
+        for (std::size_t begin = 0, end = 0; end < text.size(); begin = end + separator.size()) {
+            end = std::min(text.find(separator, begin), text.size());
+            const std::string part = text.substr(begin, end - begin);
+            if (std::find(parts.begin(), parts.end(), part) == parts.end())
+                parts.push_back(part);
+        }
     std::string all;
-    for (auto text = texts.begin(); text != texts.end(); ++text)
-        if (std::find(texts.begin(), text, *text) == text)
-            all += (all.empty() ? "" : "; ") + *text;
+    for (const std::string& part : parts)
+        all += (all.empty() ? "" : separator) + part;
     return all;
 }
 
