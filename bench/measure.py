@@ -129,7 +129,7 @@ def package_version(package):
 
 def machine():
     packages = ["libbenchmark-dev", "libphonenumber-dev", "libicu-dev", "libglib2.0-dev",
-                "libmm-glib-dev", "modemmanager", "libc6", "valgrind"]
+                "libmm-glib-dev", "modemmanager", "network-manager", "libc6", "valgrind"]
     yield f"- Processor: {cpu_model()}, {os.cpu_count()} cores; load {os.getloadavg()[1]:.1f} " \
           "(5 minutes) at the end of the run"
     yield f"- Kernel: {platform.release()}; compiler: {output_of('c++', '--version').splitlines()[0]}"

@@ -10,10 +10,12 @@
 #include <chrono>
 #include <cstdlib>
 #include <functional>
+#include <initializer_list>
 #include <iostream>
 #include <string>
 #include <vector>
 
+#include <NetworkManager.h>
 #include <dlfcn.h>
 #include <libmm-glib.h>
 
@@ -21,6 +23,7 @@
 #include <coresystem_port.h>
 
 #include "support/ModemsOnBus.h"
+#include "support/NetworkManagerOnBus.h"
 
 namespace {
 
@@ -136,15 +139,15 @@ bool runs(const char* command)
     return std::system(command) == 0; // NOLINT(cert-env33-c): a fixed text
 }
 
-void measureSimQuestions()
+void measureAll(std::initializer_list<Case> cases)
 {
-    ModemsOnBus modems;
-    modems.add("home");
-    modems.enable("home");
-    GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
-    g_dbus_connection_set_exit_on_close(connection, FALSE);
+    for (const Case& each : cases)
+        measure(each);
+}
 
-    const Case cases[] = {
+void measureSimQuestions(GDBusConnection* connection)
+{
+    measureAll({
         {"IsSimAvailable", [] { return library().IsSimAvailable(); }, 1000},
         {"GetMCCFromSim", [] { return answers(&CoreSystem::GetMCCFromSim, "001"); }, 1000},
         {"GetMNCFromSim", [] { return answers(&CoreSystem::GetMNCFromSim, "01"); }, 1000},
@@ -153,11 +156,99 @@ void measureSimQuestions()
         {"GetIMEI", [] { return answers(&CoreSystem::GetIMEI, "490154203237518"); }, 1000},
         {"GetRoamingStatus", asksRoaming, 1000},
         {"GetCpNameList and GetSimInfo", asksSimInfo, 1000},
-        {"libmm-glib, a new client", [&] { return asksNewClient(connection); }, 300},
+        {"libmm-glib, a new client", [=] { return asksNewClient(connection); }, 300},
         {"mmcli", [] { return runs("mmcli -m any -K >/dev/null"); }, 50},
-    };
-    for (const Case& each : cases)
-        measure(each);
+    });
+}
+
+bool asksNewNetworkClient()
+{
+    NMClient* const client = nm_client_new(nullptr, nullptr);
+    const bool good = client != nullptr && nm_client_wwan_get_enabled(client);
+    g_object_unref(client);
+    return good;
+}
+
+bool knowsPackage()
+{
+    char* version = nullptr;
+    const bool known = library().GetPackageVersion("libc6", &version) == 0;
+    std::free(version);
+    return known;
+}
+
+void measureOtherQuestions()
+{
+    measureAll({
+        {"IsNetworkConnected", [] { return !library().IsNetworkConnected(false, false); }, 1000},
+        {"IsNetworkConnected with Wi-Fi and Bluetooth",
+         [] { return !library().IsNetworkConnected(true, true); }, 1000},
+        {"IsFlightMode", [] { return !library().IsFlightMode(); }, 1000},
+        {"IsMobileData", [] { return !library().IsMobileData(); }, 1000},
+        {"libnm, a new client", asksNewNetworkClient, 300},
+        {"nmcli", [] { return runs("nmcli -g WWAN radio >/dev/null"); }, 50},
+        {"busctl",
+         [] {
+             return runs("busctl --system get-property org.freedesktop.NetworkManager "
+                         "/org/freedesktop/NetworkManager org.freedesktop.NetworkManager "
+                         "WwanEnabled >/dev/null");
+         },
+         50},
+        {"GetPackageVersion", knowsPackage, 300},
+        {"dpkg-query", [] { return runs("dpkg-query -W -f '${Version}' libc6 >/dev/null"); }, 50},
+    });
+}
+
+// Notes the last flight mode that it was told.
+class FlightModeListener : public IConnectionStateListener {
+public:
+    void OnWifiDeviceStateChanged(int, void*) override {}
+    void OnWifiConnectionStateChanged(int, wifi_ap_h, void*) override {}
+    void OnFlightModeChanged(bool enabled, void*) override
+    {
+        isOn = enabled;
+    }
+    void OnPacketDataChanged(bool, void*) override {}
+    void OnWifiStatusChanged(bool, void*) override {}
+
+    bool isOn = false;
+};
+
+// From the call of the switch to the listener.
+void measureEvents(const NetworkManagerOnBus& networks)
+{
+    networks.setSwitch("WirelessEnabled", false);
+    FlightModeListener listener;
+    library().SetConnectionEventListener(&listener, nullptr);
+    measure({"switch to OnFlightModeChanged",
+             [&] {
+                 const bool wanted = !listener.isOn;
+                 networks.setSwitch("WwanEnabled", !wanted);
+                 while (listener.isOn != wanted)
+                     g_main_context_iteration(nullptr, TRUE);
+                 return true;
+             },
+             50});
+    library().SetConnectionEventListener(nullptr, nullptr);
+}
+
+GDBusConnection* systemBus()
+{
+    GDBusConnection* const connection = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    g_dbus_connection_set_exit_on_close(connection, FALSE);
+    return connection;
+}
+
+void measureEverything()
+{
+    ModemsOnBus modems;
+    modems.add("home");
+    modems.enable("home");
+    GDBusConnection* const connection = systemBus();
+    measureSimQuestions(connection);
+    const NetworkManagerOnBus networks(modems.bus().address());
+    measureOtherQuestions();
+    measureEvents(networks);
     g_object_unref(connection);
 }
 
@@ -165,12 +256,12 @@ void measureSimQuestions()
 
 int main()
 {
-    const std::string obstacle = ModemsOnBus::obstacle();
-    if (!obstacle.empty()) {
-        std::cerr << obstacle << '\n';
-        return EXIT_FAILURE;
-    }
+    for (const std::string& obstacle : {ModemsOnBus::obstacle(), NetworkManagerOnBus::obstacle()})
+        if (!obstacle.empty()) {
+            std::cerr << obstacle << '\n';
+            return EXIT_FAILURE;
+        }
     coresystem_port::setLogSink(coresystem_port::LogSink::None);
-    measureSimQuestions();
+    measureEverything();
     return EXIT_SUCCESS;
 }
