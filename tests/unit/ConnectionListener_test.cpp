@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // The application's listener: registration, and what of the platform's events reaches it.
+#include <atomic>
 #include <cstring>
 #include <new>
 #include <utility>
 
 #include "support/PlatformTest.h"
+#include "support/Together.h"
 
 using namespace fake;
 using testing::ElementsAre;
@@ -520,6 +522,59 @@ TEST_F(ConnectionListenerTest, ListenerIsNeverDeleted)
     set(nullptr, nullptr);
     EXPECT_FALSE(destroyed);
     recorder.destroyed = nullptr;
+}
+
+// Counts on any thread what it is told.
+class Counter : public IConnectionStateListener {
+public:
+    void OnWifiDeviceStateChanged(int, void*) override
+    {
+        ++told;
+    }
+    void OnWifiConnectionStateChanged(int, wifi_ap_h, void*) override
+    {
+        ++told;
+    }
+    void OnFlightModeChanged(bool, void*) override
+    {
+        ++told;
+    }
+    void OnPacketDataChanged(bool, void*) override
+    {
+        ++told;
+    }
+    void OnWifiStatusChanged(bool, void*) override
+    {
+        ++told;
+    }
+
+    std::atomic<int> told{0};
+};
+
+TEST_F(ConnectionListenerTest, EventsOfOtherThreadsReachOneListenerWhileItIsReplaced)
+{
+    const int THREADS = 4;
+    const int ROUNDS = 50;
+    Counter first;
+    Counter second;
+    platform().answer(PACKET_DATA_READ, 0, true);
+    platform().answer(WIFI_STATUS_READ, 0, 2);
+    set(&first, &firstData);
+    const FakePlatform::Callbacks registered = platform().callbacks;
+    together(THREADS, [&](int thread) {
+        for (int round = 0; round < ROUNDS; ++round) {
+            if (thread == 0) {
+                set(round % 2 == 0 ? &second : &first, &firstData);
+                continue;
+            }
+            registered.wifiDevice(WIFI_DEVICE_STATE_ACTIVATED, &firstData);
+            registered.wifiConnection(WIFI_CONNECTION_STATE_CONNECTED, nullptr, &firstData);
+            for (const int key : {1, 9})
+                registered.runtime.at(key).first(static_cast<runtime_info_key_e>(key), &firstData);
+        }
+    });
+    EXPECT_EQ(first.told + second.told, (THREADS - 1) * ROUNDS * 4);
+    set(nullptr, nullptr);
 }
 
 TEST_F(ConnectionListenerTest, QueriesLeaveTheListenerAlone)

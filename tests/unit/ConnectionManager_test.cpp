@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The states of the networks, and whether one of them is connected.
 #include "support/PlatformTest.h"
+#include "support/Together.h"
 
 using namespace fake;
 using testing::IsEmpty;
@@ -282,4 +283,16 @@ TEST_F(NetworkConnectedTest, NothingIsConnectedWhereNoHandleIsToBeHad)
         platform().answer(network.readCall("no connection"), -22);
     platform().answer("connection_destroy(no connection)", -22);
     EXPECT_FALSE(connections.IsNetworkConnected(true, true));
+}
+
+TEST_F(NetworkConnectedTest, ManyThreadsMayAskAtOnce)
+{
+    answerAll(0, 1, 2);
+    together(8, [&](int) {
+        for (int i = 0; i < 20; ++i) {
+            EXPECT_TRUE(connections.IsNetworkConnected(true, true));
+            EXPECT_FALSE(connections.IsNetworkConnected(true, false));
+        }
+    });
+    EXPECT_THAT(platform().liveHandles(), IsEmpty());
 }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Whether the internal storage has more than so many megabytes free.
+#include <cmath>
 #include <limits>
 
 #include <sys/statvfs.h>
@@ -32,10 +33,15 @@ struct statvfs volume(unsigned long blockSize, fsblkcnt_t blocks, fsblkcnt_t fre
 // 3 MiB free of 5 MiB.
 const struct statvfs SMALL = volume(4096, 1280, 768);
 
+bool ask(double requiredMegabytes)
+{
+    return CoreSystemInternals::instance<CoreSystem>()->IsSystemMemoryAvailable(requiredMegabytes);
+}
+
 bool isAvailable(const struct statvfs& fs, double requiredMegabytes)
 {
     platform().answer(CALL, 0, fs);
-    return CoreSystemInternals::instance<CoreSystem>()->IsSystemMemoryAvailable(requiredMegabytes);
+    return ask(requiredMegabytes);
 }
 
 const std::string ENTRY = CORE_SYSTEM.debug(METHOD, "CoreSystem IsSystemMemoryAvailable");
@@ -78,10 +84,9 @@ const std::vector<LoggedCall> CALLS = {
     {"StorageUnreadable",
      [] {
          platform().answer(CALL, -1);
-         EXPECT_FALSE(CoreSystem::GetInstance()->IsSystemMemoryAvailable(0));
+         EXPECT_FALSE(ask(0));
      },
-     CORE_SYSTEM.access() +
-         Texts{ENTRY, CALL, CORE_SYSTEM.error(METHOD, "Fail to get internal memory size")}},
+     {ENTRY, CALL, CORE_SYSTEM.error(METHOD, "Fail to get internal memory size")}},
 };
 
 } // namespace
@@ -179,7 +184,7 @@ TEST_F(StorageTest, EveryNegativeResultIsFailure)
     for (const int code : {-1, -19, -22, INT32_MIN}) {
         platform().forgetEvents();
         platform().answer(CALL, code, SMALL);
-        EXPECT_FALSE(system.IsSystemMemoryAvailable(-INFINITE));
+        EXPECT_FALSE(ask(-INFINITE));
         EXPECT_EQ(platform().trace(),
                   (Texts{CALL, CORE_SYSTEM.error(METHOD, "Fail to get internal memory size")}));
     }
@@ -190,7 +195,7 @@ TEST_F(StorageTest, OtherResultsAreSuccess)
     for (const int code : {1, INT32_MAX}) {
         platform().forgetEvents();
         platform().answer(CALL, code, SMALL);
-        EXPECT_TRUE(system.IsSystemMemoryAvailable(2.5));
+        EXPECT_TRUE(ask(2.5));
         EXPECT_EQ(platform().trace(), Texts{CALL});
     }
 }
