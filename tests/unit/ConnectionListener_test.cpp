@@ -340,6 +340,14 @@ TEST_F(ConnectionListenerTest, UserDataComesBackUnchanged)
     EXPECT_EQ(recorder.takeCalls(), allTold("null"));
 }
 
+TEST_F(ConnectionListenerTest, FacadeHandsListenerAndUserDataOn)
+{
+    answerRegistration();
+    system.SetConnectionEventListener(&recorder, &secondData);
+    allEvents();
+    EXPECT_EQ(recorder.calls, allTold("second"));
+}
+
 TEST_F(ConnectionListenerTest, AccessPointMayBeNull)
 {
     set(&recorder, &firstData);
