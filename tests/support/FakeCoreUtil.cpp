@@ -50,9 +50,24 @@ struct FormatBuffer {
     std::array<char, 1024> bytes;
 };
 
-// More buffers than threads that log at once.
-std::array<FormatBuffer, 64> buffers;
+// More buffers than a test of many threads writes lines.
+std::array<FormatBuffer, 4096> buffers;
 std::atomic<int> nextIndex{3};
+int firstUsed = 3; // since the last clearing
+
+FormatBuffer& bufferAt(int index)
+{
+    return buffers[static_cast<std::size_t>(index) % buffers.size()];
+}
+
+template <class Visit>
+void visitUsedBuffers(Visit visit)
+{
+    const int end = nextIndex;
+    for (int index = std::max(firstUsed, end - static_cast<int>(buffers.size())); index < end;
+         ++index)
+        visit(bufferAt(index));
+}
 
 // A named mutex; never destroyed. Nobody takes it twice on one thread: the device's own need not be
 // recursive. The fake's is, so that a test fails and does not hang.
@@ -95,16 +110,21 @@ void release(void* mutex, const std::string& before, const std::string& after)
 
 bool fake::isInFormatBuffer(const std::string& text)
 {
-    return std::any_of(buffers.begin(), buffers.end(), [&](const FormatBuffer& buffer) {
-        return std::search(buffer.bytes.begin(), buffer.bytes.end(), text.begin(), text.end()) !=
-               buffer.bytes.end();
+    bool found = false;
+    visitUsedBuffers([&](const FormatBuffer& buffer) {
+        found = found || std::search(buffer.bytes.begin(), buffer.bytes.end(), text.begin(),
+                                     text.end()) != buffer.bytes.end();
     });
+    return found;
 }
 
 void fake::clearFormatBuffers()
 {
-    for (FormatBuffer& buffer : buffers)
+    visitUsedBuffers([](FormatBuffer& buffer) {
+        EXPECT_FALSE(buffer.overrun()) << "a message was longer than its buffer";
         buffer.clear();
+    });
+    firstUsed = nextIndex;
 }
 
 CoreLogger::CoreLogger() = default;
@@ -145,9 +165,7 @@ char* CoreLogger::GetBuffer(const int& index)
 {
     recordLogger("GetBuffer");
     EXPECT_TRUE(index >= 3 && index < nextIndex) << "nobody handed out buffer " << index;
-    FormatBuffer& buffer = buffers[static_cast<std::size_t>(index) % buffers.size()];
-    EXPECT_FALSE(buffer.overrun()) << "a message was longer than its buffer";
-    return buffer.bytes.data();
+    return bufferAt(index).bytes.data();
 }
 
 AESCrypto::AESCrypto() = default;

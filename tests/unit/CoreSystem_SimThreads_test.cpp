@@ -46,7 +46,8 @@ void askIdentity(CoreSystem& system)
 {
     for (const IdentityRead& read : identityReads()) {
         char* value = nullptr;
-        EXPECT_EQ((system.*read.readFirst)(&value), 0);
+        const int result = (system.*read.readFirst)(&value);
+        EXPECT_EQ(result, 0);
         EXPECT_EQ(value, read.valueOf(KOREAN_CARD));
         std::free(value);
         std::vector<char*> values;

@@ -139,7 +139,8 @@ std::vector<LoggedCall> simCalls()
 char* readFirst(const IdentityRead& read, int expectedResult, char* preset = nullptr)
 {
     char* value = preset;
-    EXPECT_EQ((coreSystem().*read.readFirst)(&value), expectedResult);
+    const int result = (coreSystem().*read.readFirst)(&value);
+    EXPECT_EQ(result, expectedResult);
     EXPECT_THAT(platform().liveHandles(), IsEmpty());
     return value;
 }
@@ -373,7 +374,8 @@ TEST_P(FirstReadTest, SlotsWithoutListAreUntouched)
     setSlotCount(0);
     char preset = 'p';
     char* answer = &preset;
-    EXPECT_EQ((system.*read.readFirst)(&answer), read.failureWithoutList);
+    const int result = (system.*read.readFirst)(&answer);
+    EXPECT_EQ(result, read.failureWithoutList);
     EXPECT_EQ(answer, &preset);
     EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 0"));
 }

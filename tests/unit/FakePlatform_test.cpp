@@ -117,6 +117,13 @@ TEST_F(FakePlatformTest, FormatBuffersAreSearchedWhole)
     EXPECT_FALSE(isInFormatBuffer("at the end"));
 }
 
+TEST_F(FakePlatformTest, MessageBeyondItsBufferFailsTheTest)
+{
+    CoreLogger& logger = *CoreLogger::GetInstance();
+    logger.GetBuffer(logger.GetBufferIndex())[599] = '\0';
+    EXPECT_NONFATAL_FAILURE(platform().reset(), "longer than its buffer");
+}
+
 TEST_F(FakePlatformTest, ClockTellsTheTimeThatWasSet)
 {
     EXPECT_GT(std::time(nullptr), 1000000);

@@ -14,9 +14,9 @@ char* readSlot(const IdentityRead& read, unsigned int count, int slot, int expec
                char* preset = nullptr)
 {
     char* value = preset;
-    EXPECT_EQ(
-        (CoreSystemInternals::instance<SimManager>()->*read.read)(openList(count), slot, &value),
-        expectedResult);
+    SimManager& sim = *CoreSystemInternals::instance<SimManager>();
+    const int result = (sim.*read.read)(openList(count), slot, &value);
+    EXPECT_EQ(result, expectedResult);
     // Only the caller's list is open: the modem is released on every way out.
     EXPECT_THAT(platform().liveHandles(), ElementsAre(listName(count)));
     return value;
@@ -245,7 +245,8 @@ TEST_P(ImsiReadTest, SlotAtTheEndOfTheNamesIsPassedOn)
     platform().setModems(Texts{"cp0", "cp1"});
     platform().answer("tel_init(null)", -1);
     char* value = &preset;
-    EXPECT_EQ((sim.*read.read)(openList(3), 2, &value), 4);
+    const int result = (sim.*read.read)(openList(3), 2, &value);
+    EXPECT_EQ(result, 4);
     EXPECT_EQ(value, nullptr);
     EXPECT_EQ(platform().texts(Event::Kind::CALL),
               (Texts{stateCall(2), "tel_get_cp_name_list()", "tel_init(null)"}));
