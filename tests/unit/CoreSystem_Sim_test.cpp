@@ -135,12 +135,16 @@ std::vector<LoggedCall> simCalls()
     };
 }
 
+int askFirst(const IdentityRead& read, char** value)
+{
+    return (coreSystem().*read.readFirst)(value);
+}
+
 // Reads with a slot that holds `preset`; what the slot holds then.
 char* readFirst(const IdentityRead& read, int expectedResult, char* preset = nullptr)
 {
     char* value = preset;
-    const int result = (coreSystem().*read.readFirst)(&value);
-    EXPECT_EQ(result, expectedResult);
+    EXPECT_EQ(askFirst(read, &value), expectedResult);
     EXPECT_THAT(platform().liveHandles(), IsEmpty());
     return value;
 }
@@ -374,8 +378,7 @@ TEST_P(FirstReadTest, SlotsWithoutListAreUntouched)
     setSlotCount(0);
     char preset = 'p';
     char* answer = &preset;
-    const int result = (system.*read.readFirst)(&answer);
-    EXPECT_EQ(result, read.failureWithoutList);
+    EXPECT_EQ(askFirst(read, &answer), read.failureWithoutList);
     EXPECT_EQ(answer, &preset);
     EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 0"));
 }

@@ -9,14 +9,18 @@ using testing::IsEmpty;
 
 namespace {
 
+int askSlot(const IdentityRead& read, unsigned int count, int slot, char** value)
+{
+    SimManager& sim = *CoreSystemInternals::instance<SimManager>();
+    return (sim.*read.read)(openList(count), slot, value);
+}
+
 // Reads with a slot that holds `preset`; what the slot holds then.
 char* readSlot(const IdentityRead& read, unsigned int count, int slot, int expectedResult,
                char* preset = nullptr)
 {
     char* value = preset;
-    SimManager& sim = *CoreSystemInternals::instance<SimManager>();
-    const int result = (sim.*read.read)(openList(count), slot, &value);
-    EXPECT_EQ(result, expectedResult);
+    EXPECT_EQ(askSlot(read, count, slot, &value), expectedResult);
     // Only the caller's list is open: the modem is released on every way out.
     EXPECT_THAT(platform().liveHandles(), ElementsAre(listName(count)));
     return value;
@@ -245,8 +249,7 @@ TEST_P(ImsiReadTest, SlotAtTheEndOfTheNamesIsPassedOn)
     platform().setModems(Texts{"cp0", "cp1"});
     platform().answer("tel_init(null)", -1);
     char* value = &preset;
-    const int result = (sim.*read.read)(openList(3), 2, &value);
-    EXPECT_EQ(result, 4);
+    EXPECT_EQ(askSlot(read, 3, 2, &value), 4);
     EXPECT_EQ(value, nullptr);
     EXPECT_EQ(platform().texts(Event::Kind::CALL),
               (Texts{stateCall(2), "tel_get_cp_name_list()", "tel_init(null)"}));
