@@ -16,7 +16,7 @@
 #include <sys/types.h>
 
 #include "../backend/Result.h"
-#include "GLibTypes.h"
+#include "../common/GLibTypes.h"
 #include "Properties.h"
 
 namespace port::linux_backend {

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Configuration.h"
 
+#include "../common/GLibTypes.h"
 #include "../common/RegularFile.h"
-#include "GLibTypes.h"
 
 namespace port::linux_backend {
 namespace {

@@ -6,8 +6,8 @@
 #include <iterator>
 #include <string_view>
 
+#include "../common/GLibTypes.h"
 #include "Files.h"
-#include "GLibTypes.h"
 #include "Hostname1.h"
 
 namespace port::linux_backend {

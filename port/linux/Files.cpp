@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <sstream>
 
+#include "../common/GLibTypes.h"
 #include "../common/RegularFile.h"
-#include "GLibTypes.h"
 
 namespace port::linux_backend {
 namespace {

@@ -11,7 +11,7 @@
 #include <dlog.h>
 #include <unistd.h>
 
-#include "GLibTypes.h"
+#include "../common/GLibTypes.h"
 
 namespace port::linux_backend {
 namespace {

@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "../backend/Result.h"
-#include "GLibTypes.h"
+#include "../common/GLibTypes.h"
 
 namespace port::linux_backend {
 

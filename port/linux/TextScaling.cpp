@@ -9,7 +9,7 @@
 #define G_SETTINGS_ENABLE_BACKEND
 #include <gio/gsettingsbackend.h>
 
-#include "GLibTypes.h"
+#include "../common/GLibTypes.h"
 
 namespace port::linux_backend {
 namespace {

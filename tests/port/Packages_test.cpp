@@ -14,7 +14,6 @@
 using coresystem_port::lastOrigin;
 using coresystem_port::Question;
 using port::InstalledPackages;
-using testing::ElementsAreArray;
 
 namespace {
 
@@ -87,7 +86,7 @@ TEST_F(PackagesTest, NamesGoThroughUnchanged)
     for (const std::string& name : names)
         EXPECT_EQ(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE,
                   package_manager_get_package_size_info(name.c_str(), nullptr, nullptr));
-    EXPECT_THAT(asked, ElementsAreArray(names));
+    EXPECT_TRUE(asked == names); // printing them would take long
 }
 
 TEST_F(PackagesTest, FailuresHaveTheirCodes)
