@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The application's listener: registration, and what of the platform's events reaches it.
 #include <atomic>
-#include <cstring>
 #include <new>
 #include <utility>
 
@@ -98,28 +97,32 @@ void set(IConnectionStateListener* listener, void* userData)
                                                                                    userData);
 }
 
+// A platform may have numbers that the enumerations of these headers lack, so it calls with
+// numbers.
+template <class Callback, class... Arguments>
+void callWithNumbers(Callback* callback, Arguments... arguments)
+{
+    const auto untyped = reinterpret_cast<void (*)()>(callback);
+    reinterpret_cast<void (*)(Arguments...)>(untyped)(arguments...);
+}
+
 // What the platform calls, as registered.
 void wifiDeviceEvent(int state)
 {
-    wifi_device_state_e value = WIFI_DEVICE_STATE_DEACTIVATED;
-    std::memcpy(&value, &state, sizeof state);
-    platform().callbacks.wifiDevice(value, platform().callbacks.wifiDeviceData);
+    callWithNumbers(platform().callbacks.wifiDevice, state, platform().callbacks.wifiDeviceData);
 }
 
 void wifiConnectionEvent(int state, wifi_ap_h ap = &accessPoint)
 {
-    wifi_connection_state_e value = WIFI_CONNECTION_STATE_DISCONNECTED;
-    std::memcpy(&value, &state, sizeof state);
-    platform().callbacks.wifiConnection(value, ap, platform().callbacks.wifiConnectionData);
+    callWithNumbers(platform().callbacks.wifiConnection, state, ap,
+                    platform().callbacks.wifiConnectionData);
 }
 
 // By any of the three registrations: one function serves all keys.
 void runtimeEvent(int key, int registeredKey)
 {
-    runtime_info_key_e value = RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED;
-    std::memcpy(&value, &key, sizeof key);
     const auto [callback, data] = platform().callbacks.runtime.at(registeredKey);
-    callback(value, data);
+    callWithNumbers(callback, key, data);
 }
 
 void runtimeEvent(int key)
