@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <functional>
 #include <optional>
+#include <utility>
 
 #include <coresystem_port.h>
 
@@ -163,7 +164,7 @@ Fact askRoamingOfFirstSlot()
 // A switch that cannot be read is told to applications as off.
 std::function<Fact()> yesOrNo(std::vector<Question> questions, std::function<bool()> read)
 {
-    return [=] {
+    return [questions = std::move(questions), read = std::move(read)] {
         const bool isOn = read();
         std::vector<std::string> sources;
         std::vector<std::string> reasons;
@@ -254,7 +255,7 @@ const std::vector<FactRow>& facts()
         {"device_serial", askSerial, true},
     };
     return all;
-}
+} // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
 
 } // namespace
 

@@ -3,8 +3,9 @@
 #ifndef CORESYSTEM_D_BUS_MANAGER_H
 #define CORESYSTEM_D_BUS_MANAGER_H
 
-typedef struct _GDBusConnection GDBusConnection;
-typedef struct _GDBusMessage GDBusMessage;
+// As the bus library names them.
+typedef struct _GDBusConnection GDBusConnection; // NOLINT(bugprone-reserved-identifier)
+typedef struct _GDBusMessage GDBusMessage;       // NOLINT(bugprone-reserved-identifier)
 
 /// What GetDeviceUniqueID() answers.
 enum CoreDbusError {

@@ -77,6 +77,7 @@ public:
     /// Calls `changed` whenever one of the answers may have changed, on a thread of the watch's
     /// own, one call at a time, until the watch is destroyed; destroying it waits for a call that
     /// runs. Null when changes cannot be watched.
+    // NOLINTNEXTLINE(performance-unnecessary-value-param): whoever watches keeps it
     virtual std::unique_ptr<Watch> watch(std::function<void()>)
     {
         return nullptr;

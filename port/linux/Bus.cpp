@@ -326,6 +326,7 @@ std::vector<Result<std::string>> Bus::statesOf(const std::vector<BusObject>& ser
     const std::vector<Result<Reply>> lists =
         ask({namesOfBus("ListNames"), namesOfBus("ListActivatableNames")});
     std::vector<Result<std::string>> states;
+    states.reserve(services.size());
     for (const BusObject& service : services)
         states.push_back(stateIn(lists, service));
     return states;

@@ -101,6 +101,7 @@ private:
     std::vector<Service> findOnBus(const std::vector<BusService>& services)
     {
         std::vector<BusObject> objects;
+        objects.reserve(services.size());
         for (const BusService& service : services)
             objects.push_back(service.object);
         const std::vector<Result<std::string>> states = bus_.statesOf(objects);
