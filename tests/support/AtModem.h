@@ -86,7 +86,6 @@ private:
     std::mutex mutex_;
     State state_;
     std::map<std::string, std::string> reports_; // "+CREG" and its kind, and how much they report
-    bool namesAsNumbers_ = false;
     std::vector<Caller> callers_;
     std::thread thread_;
 };
