@@ -47,7 +47,7 @@ int readPlatformString(const char* key, char** slot, const LogSite& site, const 
     return result;
 }
 
-// Reads a switch; one that cannot be read is off, whatever the platform says of it.
+// Reads a switch. No result code is looked at: meant, a read that fails leaves it off.
 template <class Key>
 bool readSwitch(int (*read)(Key, bool*), Key key, const LogSite& site, const char* on,
                 const char* off)

@@ -4,6 +4,7 @@
 
 #include <atomic>
 #include <cstdlib>
+#include <functional>
 #include <future>
 #include <string>
 #include <thread>
@@ -305,7 +306,9 @@ TEST_F(ChangeEventsTest, EachCallbackRunsOnTheContextOfItsRegistration)
     events.unset(Change::PacketData); // its promise ends here
 }
 
-TEST_F(ChangeEventsTest, UnsetWaitsForACallOnAnotherThread)
+// Ends a callback while it runs on another thread: `endIt` must not return before the call does.
+template <typename End>
+void expectToWaitForTheCall(ChangeEvents& events, const std::function<void()>& change, End endIt)
 {
     port::ContextThread other;
     std::promise<void> begun;
@@ -318,33 +321,24 @@ TEST_F(ChangeEventsTest, UnsetWaitsForACallOnAnotherThread)
             ended = true;
         }));
     });
-    setFlightMode(true);
+    change();
     begun.get_future().wait();
     std::thread releaser([&] { mayEnd.set_value(); });
-    events.unset(Change::FlightMode);
+    endIt();
     EXPECT_TRUE(ended);
     releaser.join();
 }
 
+TEST_F(ChangeEventsTest, UnsetWaitsForACallOnAnotherThread)
+{
+    expectToWaitForTheCall(
+        events, [&] { setFlightMode(true); }, [&] { events.unset(Change::FlightMode); });
+}
+
 TEST_F(ChangeEventsTest, ReplacingWaitsForACallOnAnotherThread)
 {
-    port::ContextThread other;
-    std::promise<void> begun;
-    std::promise<void> mayEnd;
-    std::atomic<bool> ended{false};
-    other.run([&] {
-        EXPECT_TRUE(events.set(Change::FlightMode, [&](int) {
-            begun.set_value();
-            mayEnd.get_future().wait();
-            ended = true;
-        }));
-    });
-    setFlightMode(true);
-    begun.get_future().wait();
-    std::thread releaser([&] { mayEnd.set_value(); });
-    listen(Change::FlightMode, "");
-    EXPECT_TRUE(ended);
-    releaser.join();
+    expectToWaitForTheCall(
+        events, [&] { setFlightMode(true); }, [&] { listen(Change::FlightMode, ""); });
 }
 
 // How often; the environment may ask for more.
