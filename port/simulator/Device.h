@@ -16,8 +16,16 @@
 
 namespace port::simulator {
 
+// What a call is told to do in place of what it does.
+struct Fault {
+    std::string error;      // its name in the file; empty: none, the call is late only
+    std::int64_t value = 0; // the error's number; of an error name of the bus none
+    std::int64_t delayMs = 0;
+    std::int64_t call = 0; // counted from 1; 0: every one
+};
+
 struct Value {
-    std::variant<std::string, bool, std::int64_t> content;
+    std::variant<std::string, bool, std::int64_t, Fault> content;
     std::string source; // FILE:LINE
 };
 
@@ -46,15 +54,16 @@ public:
         return found != values_.end() ? &found->second : nullptr;
     }
 
-    /// A value of the type that the schema gives the key: std::string, bool, std::int64_t, or the
-    /// enumeration behind its names.
+    /// A value of the type that the schema gives the key: std::string, bool, Fault, std::int64_t,
+    /// or the enumeration behind its names.
     template <typename T>
     Result<Sourced<T>> get(const std::string& key) const
     {
         const Value* const value = find(key);
         if (value == nullptr)
             return notAvailable(source_ + ": " + title_ + " has no " + key);
-        if constexpr (std::is_same_v<T, std::string> || std::is_same_v<T, bool>) {
+        if constexpr (std::is_same_v<T, std::string> || std::is_same_v<T, bool> ||
+                      std::is_same_v<T, Fault>) {
             return Sourced<T>{std::get<T>(value->content), value->source};
         } else {
             const auto number = std::get<std::int64_t>(value->content);

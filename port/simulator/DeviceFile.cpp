@@ -8,6 +8,7 @@
 #include <sstream>
 
 #include <dlog.h>
+#include <gio/gio.h>
 #include <toml++/toml.h>
 
 #include "../backend/Log.h"
@@ -65,6 +66,17 @@ bool isNumber(std::string_view text)
            text.find_first_not_of("0123456789*#") == std::string_view::npos;
 }
 
+// A name of two parts or more, as the bus wants it (D-Bus specification, "Error names").
+bool isBusErrorName(const std::string& text)
+{
+    return g_dbus_is_interface_name(text.c_str()) != FALSE;
+}
+
+bool isFault(const Type& type)
+{
+    return type.kind == Type::Kind::Fault || type.kind == Type::Kind::BusFault;
+}
+
 bool isWithin(const Type& type, std::int64_t number)
 {
     return type.least <= number && number <= type.most;
@@ -111,11 +123,31 @@ std::string expected(const Type& type)
         return "true or false";
     case Type::Kind::Whole:
         return "a whole number " + rangeOf(type);
+    case Type::Kind::BusFault:
+        return listOf(type.names) + ", or an error name of D-Bus in quotes";
+    case Type::Kind::Fault:
     case Type::Kind::Name:
         break;
     }
     return "one of " + listOf(type.names) +
            (type.most < type.least ? "" : ", or a whole number " + rangeOf(type));
+}
+
+std::optional<std::int64_t> valueOf(const Names& names, std::string_view text)
+{
+    for (const Name& row : names)
+        if (row.name == text)
+            return row.value;
+    return std::nullopt;
+}
+
+// A fault that is written as its error alone.
+std::optional<Content> readFault(const Type& type, const std::string& text)
+{
+    const auto value = valueOf(type.names, text);
+    if (!value && !(type.kind == Type::Kind::BusFault && isBusErrorName(text)))
+        return std::nullopt;
+    return Fault{text, value.value_or(0)};
 }
 
 std::optional<Content> readText(const Type& type, const std::string& text)
@@ -130,10 +162,10 @@ std::optional<Content> readText(const Type& type, const std::string& text)
             return std::string();
         return isNumber(text) ? std::optional<Content>(text) : std::nullopt;
     case Type::Kind::Name:
-        for (const Name& row : type.names)
-            if (row.name == text)
-                return row.value;
-        return std::nullopt;
+        return valueOf(type.names, text);
+    case Type::Kind::Fault:
+    case Type::Kind::BusFault:
+        return readFault(type, text);
     case Type::Kind::Text:
         return isLongEnough(type, text) ? std::optional<Content>(text) : std::nullopt;
     default:
@@ -247,13 +279,46 @@ private:
         const Type* const type = findKey(row, key.str());
         if (type == nullptr)
             throw Problem{key.source(), "unknown key " + quoted(key) + " in " + titleOf(row)};
-        std::optional<Content> content = readNode(*type, node);
+        if (isFault(*type) && node.is_table())
+            return {readFaultTable(*type, key, *node.as_table()), sourceOf(node)};
+        return {readContent(*type, key, node), sourceOf(node)};
+    }
+
+    static Content readContent(const Type& type, const toml::key& key, const toml::node& node)
+    {
+        std::optional<Content> content = readNode(type, node);
         if (!content)
-            throw Problem{node.source(), quoted(key) + " must be " + expected(*type)};
+            throw Problem{node.source(), quoted(key) + " must be " + expected(type)};
         const auto* const text = std::get_if<std::string>(&*content);
         if (text != nullptr && text->find('\0') != std::string::npos)
             throw Problem{node.source(), quoted(key) + " must not hold a NUL"};
-        return {std::move(*content), sourceOf(node)};
+        return std::move(*content);
+    }
+
+    static Fault readFaultTable(const Type& type, const toml::key& name, const toml::table& table)
+    {
+        Fault fault;
+        for (const auto& [key, node] : table)
+            readFaultKey(type, key, node, fault);
+        if (fault.error.empty() && fault.delayMs == 0)
+            throw Problem{table.source(), quoted(name) + " must have an error or a delay_ms"};
+        return fault;
+    }
+
+    static void readFaultKey(const Type& type, const toml::key& key, const toml::node& node,
+                             Fault& fault)
+    {
+        const Type* const own = key == "error" ? &type : findFaultKey(key.str());
+        if (own == nullptr)
+            throw Problem{key.source(), "unknown key " + quoted(key) +
+                                            " in a fault, which has error, delay_ms and call"};
+        const Content content = readContent(*own, key, node);
+        if (const auto* const read = std::get_if<Fault>(&content)) {
+            fault.error = read->error;
+            fault.value = read->value;
+        } else {
+            (key == "call" ? fault.call : fault.delayMs) = std::get<std::int64_t>(content);
+        }
     }
 
     const std::string& path_;

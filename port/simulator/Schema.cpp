@@ -7,6 +7,7 @@
 #include "../backend/Network.h"
 #include "../backend/Settings.h"
 #include "../backend/Telephony.h"
+#include "ErrorNames.h"
 
 namespace port::simulator {
 namespace {
@@ -101,6 +102,21 @@ constexpr Name WIFI_CONNECTIONS[] = {
     {"not_supported", NOT_SUPPORTED},
 };
 
+// A call that hands out a pointer or a list may also succeed without.
+constexpr Name OR_NULL[] = {{"null", NOTHING}};
+constexpr Name OR_EMPTY[] = {{"empty", NOTHING}};
+
+constexpr auto PACKAGE_MANAGER_ERRORS_OR_NULL = joined(PACKAGE_MANAGER_ERRORS, OR_NULL);
+constexpr auto SYSTEM_INFO_ERRORS_OR_NULL = joined(SYSTEM_INFO_ERRORS, OR_NULL);
+constexpr auto SYSTEM_SETTINGS_ERRORS_OR_NULL = joined(SYSTEM_SETTINGS_ERRORS, OR_NULL);
+constexpr auto TAPI_SIM_ERRORS = joined(TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS);
+constexpr auto TELEPHONY_ERRORS_OR_EMPTY = joined(TELEPHONY_ERRORS, OR_EMPTY);
+constexpr auto TELEPHONY_ERRORS_OR_NULL = joined(TELEPHONY_ERRORS, OR_NULL);
+
+// The bus's own errors have names for numbers.
+constexpr Name SERIAL_FAULTS[] = {name("not_a_string", BusFault::NotAString)};
+constexpr Name BUS_FAULTS[] = {name("no_bus", BusFault::NoBus)};
+
 constexpr std::int64_t ANY = std::numeric_limits<std::int64_t>::max();
 
 constexpr Type TEXT{Type::Kind::Text};
@@ -124,10 +140,16 @@ constexpr Type oneOf(const Name (&names)[Count], std::int64_t least = 0, std::in
     return {Type::Kind::Name, least, most, {names, Count}};
 }
 
+template <typename Rows>
+constexpr Type fault(const Rows& names, Type::Kind kind = Type::Kind::Fault)
+{
+    return {kind, 0, -1, {std::data(names), std::size(names)}};
+}
+
 constexpr SectionRow SECTIONS[] = {
     {"device", Form::Section},        {"settings", Form::Section}, {"slot", Form::List},
     {"subscriptions", Form::Section}, {"network", Form::Section},  {"storage", Form::Section},
-    {"packages", Form::Free},
+    {"packages", Form::Free},         {"fault", Form::Section},
 };
 
 struct KeyRow {
@@ -183,6 +205,61 @@ constexpr KeyRow KEYS[] = {
     {"storage", "available_blocks", whole(0, ANY)},
 
     {"packages", "", TEXT},
+
+    // The calls of the platform by their own names, and what is asked over the bus.
+    {"fault", "__dlog_print", fault(DLOG_ERRORS)},
+    {"fault", "alarm_get_current_time", fault(ALARM_ERRORS)},
+    {"fault", "connection_create", fault(CONNECTION_ERRORS)},
+    {"fault", "connection_destroy", fault(CONNECTION_ERRORS)},
+    {"fault", "connection_get_bt_state", fault(CONNECTION_ERRORS)},
+    {"fault", "connection_get_cellular_state", fault(CONNECTION_ERRORS)},
+    {"fault", "connection_get_wifi_state", fault(CONNECTION_ERRORS)},
+    {"fault", "package_info_create", fault(PACKAGE_MANAGER_ERRORS)},
+    {"fault", "package_info_destroy", fault(PACKAGE_MANAGER_ERRORS)},
+    {"fault", "package_info_get_version", fault(PACKAGE_MANAGER_ERRORS_OR_NULL)},
+    {"fault", "package_manager_get_package_size_info", fault(PACKAGE_MANAGER_ERRORS)},
+    {"fault", "runtime_info_get_value_bool", fault(RUNTIME_INFO_ERRORS)},
+    {"fault", "runtime_info_get_value_int", fault(RUNTIME_INFO_ERRORS)},
+    {"fault", "runtime_info_set_changed_cb", fault(RUNTIME_INFO_ERRORS)},
+    {"fault", "runtime_info_unset_changed_cb", fault(RUNTIME_INFO_ERRORS)},
+    {"fault", "storage_get_internal_memory_size", fault(STORAGE_ERRORS)},
+    {"fault", "system_info_get_platform_string", fault(SYSTEM_INFO_ERRORS_OR_NULL)},
+    {"fault", "system_settings_get_value_bool", fault(SYSTEM_SETTINGS_ERRORS)},
+    {"fault", "system_settings_get_value_int", fault(SYSTEM_SETTINGS_ERRORS)},
+    {"fault", "system_settings_get_value_string", fault(SYSTEM_SETTINGS_ERRORS_OR_NULL)},
+    {"fault", "tel_check_sms_device_status", fault(TAPI_ERRORS)},
+    {"fault", "tel_deinit", fault(TAPI_ERRORS)},
+    {"fault", "tel_get_call_preferred_voice_subscription", fault(TAPI_ERRORS)},
+    {"fault", "tel_get_cp_name_list", fault(OR_NULL)},
+    {"fault", "tel_get_network_default_data_subscription", fault(TAPI_ERRORS)},
+    {"fault", "tel_get_network_default_subscription", fault(TAPI_ERRORS)},
+    {"fault", "tel_get_sim_imsi", fault(TAPI_SIM_ERRORS)},
+    {"fault", "tel_get_sim_init_info", fault(TAPI_SIM_ERRORS)},
+    {"fault", "tel_init", fault(OR_NULL)},
+    {"fault", "telephony_deinit", fault(TELEPHONY_ERRORS)},
+    {"fault", "telephony_init", fault(TELEPHONY_ERRORS_OR_EMPTY)},
+    {"fault", "telephony_modem_get_imei", fault(TELEPHONY_ERRORS_OR_NULL)},
+    {"fault", "telephony_network_get_roaming_status", fault(TELEPHONY_ERRORS)},
+    {"fault", "telephony_network_get_service_state", fault(TELEPHONY_ERRORS)},
+    {"fault", "telephony_sim_get_state", fault(TELEPHONY_ERRORS)},
+    {"fault", "telephony_sim_get_subscriber_number", fault(TELEPHONY_ERRORS_OR_NULL)},
+    {"fault", "vconf_get_str", fault(OR_NULL)},
+    {"fault", "wifi_initialize", fault(WIFI_ERRORS)},
+    {"fault", "wifi_set_connection_state_changed_cb", fault(WIFI_ERRORS)},
+    {"fault", "wifi_set_device_state_changed_cb", fault(WIFI_ERRORS)},
+    {"fault", "wifi_unset_connection_state_changed_cb", fault(WIFI_ERRORS)},
+    {"fault", "wifi_unset_device_state_changed_cb", fault(WIFI_ERRORS)},
+    {"fault", "GetSerial", fault(SERIAL_FAULTS, Type::Kind::BusFault)},
+    {"fault", "g_bus_get_sync", oneOf(BUS_FAULTS)}, // of who starts the application
+};
+
+// Beside "error", in a fault's table.
+constexpr struct {
+    std::string_view key;
+    Type type;
+} FAULT_KEYS[] = {
+    {"delay_ms", whole(1, 60000)},
+    {"call", whole(1, ANY)},
 };
 
 } // namespace
@@ -209,6 +286,14 @@ const Type* findKey(const SectionRow& section, std::string_view key)
 {
     for (const KeyRow& row : KEYS)
         if (row.section == section.name && (row.key == key || section.form == Form::Free))
+            return &row.type;
+    return nullptr;
+}
+
+const Type* findFaultKey(std::string_view key)
+{
+    for (const auto& row : FAULT_KEYS)
+        if (row.key == key)
             return &row.type;
     return nullptr;
 }

@@ -12,6 +12,12 @@ namespace port::simulator {
 // The value of the name "not_supported": this device has no such thing.
 constexpr std::int64_t NOT_SUPPORTED = std::numeric_limits<std::int64_t>::min();
 
+// The value of the words with which a fault has a call succeed and hand out null or an empty list.
+constexpr std::int64_t NOTHING = std::numeric_limits<std::int64_t>::max();
+
+// What can be wrong with an answer over the bus, or with the bus, in place of an error's number.
+enum class BusFault { NotAString, NoBus };
+
 // A name in quotes and the number that it is kept as, which is an enumerator's.
 struct Name {
     std::string_view name;
@@ -34,12 +40,14 @@ struct Names {
 
 struct Type {
     enum class Kind {
-        Text,   // in quotes, without a NUL, `least` bytes or longer
-        Digits, // in quotes, from `least` to `most` of them
-        Number, // a phone number in quotes, or "null"
-        Switch, // true or false
-        Whole,  // a whole number from `least` to `most`
-        Name,   // one of `names` in quotes, or a whole number from `least` to `most`
+        Text,     // in quotes, without a NUL, `least` bytes or longer
+        Digits,   // in quotes, from `least` to `most` of them
+        Number,   // a phone number in quotes, or "null"
+        Switch,   // true or false
+        Whole,    // a whole number from `least` to `most`
+        Name,     // one of `names` in quotes, or a whole number from `least` to `most`
+        Fault,    // one of `names` in quotes, or a table with it as "error" and the keys of a fault
+        BusFault, // the same, and the error may be any error name of the bus
     };
     Kind kind;
     std::int64_t least = 0;
@@ -62,6 +70,9 @@ const SectionRow* findSection(std::string_view name);
 
 /// The type of a key; null when the section has no such key.
 const Type* findKey(const SectionRow& section, std::string_view key);
+
+/// The type of a key beside "error" in a fault's table; null when there is no such key.
+const Type* findFaultKey(std::string_view key);
 
 /// All sections in order, for `for`.
 const SectionRow* beginSections();

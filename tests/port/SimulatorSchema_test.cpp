@@ -8,6 +8,7 @@ using port::CellularState;
 using port::FontSize;
 using port::LinkState;
 using port::simulator::DeviceFile;
+using port::simulator::Fault;
 using testing::EndsWith;
 using testing::HasSubstr;
 
@@ -211,6 +212,85 @@ TEST_F(SimulatorSchemaTest, PackagesHaveNamesOfTheirOwn)
     EXPECT_EQ(":3:7: \"app\" must be a text in quotes", problemOf("[packages]\napp = 1\n"));
     EXPECT_THAT(problemOf("[packages]\norg.app = '1'\n"),
                 EndsWith("\"org\" must be a text in quotes"));
+}
+
+TEST_F(SimulatorSchemaTest, FaultIsAnErrorByItsName)
+{
+    describe("[fault]\ntelephony_init = 'TELEPHONY_ERROR_PERMISSION_DENIED'\n"
+             "tel_get_sim_imsi = 'TAPI_SIM_ACCESS_CARD_ERROR'\nvconf_get_str = 'null'\n");
+    const auto refused = file.get<Fault>("fault", "telephony_init");
+    ASSERT_TRUE(refused) << backend->deviceFileProblem();
+    EXPECT_EQ(line(3), refused.value().source);
+    EXPECT_EQ("TELEPHONY_ERROR_PERMISSION_DENIED", refused.value().value.error);
+    EXPECT_EQ(-13, refused.value().value.value);
+    EXPECT_EQ(0, refused.value().value.delayMs);
+    EXPECT_EQ(0, refused.value().value.call);
+    EXPECT_EQ(1, file.get<Fault>("fault", "tel_get_sim_imsi").value().value.value);
+    EXPECT_EQ(port::simulator::NOTHING,
+              file.get<Fault>("fault", "vconf_get_str").value().value.value);
+    EXPECT_FALSE(file.get<Fault>("fault", "wifi_initialize"));
+}
+
+TEST_F(SimulatorSchemaTest, FaultMayBeLateAndOfOneCall)
+{
+    describe("[fault]\ntelephony_sim_get_state = { error = 'TELEPHONY_ERROR_OPERATION_FAILED', "
+             "delay_ms = 200, call = 2 }\nwifi_initialize.delay_ms = 60000\n"
+             "[fault.GetSerial]\nerror = 'org.freedesktop.DBus.Error.AccessDenied'\ncall = 1\n");
+    const auto state = file.get<Fault>("fault", "telephony_sim_get_state");
+    ASSERT_TRUE(state) << backend->deviceFileProblem();
+    EXPECT_EQ("TELEPHONY_ERROR_OPERATION_FAILED", state.value().value.error);
+    EXPECT_EQ(-39845887, state.value().value.value);
+    EXPECT_EQ(200, state.value().value.delayMs);
+    EXPECT_EQ(2, state.value().value.call);
+    EXPECT_EQ("", file.get<Fault>("fault", "wifi_initialize").value().value.error);
+    EXPECT_EQ(60000, file.get<Fault>("fault", "wifi_initialize").value().value.delayMs);
+    EXPECT_EQ("org.freedesktop.DBus.Error.AccessDenied",
+              file.get<Fault>("fault", "GetSerial").value().value.error);
+}
+
+TEST_F(SimulatorSchemaTest, BusOfAProgramMayBeMissing)
+{
+    describe("[fault]\ng_bus_get_sync = 'no_bus'\n");
+    expectAnswer(port::simulator::BusFault::NoBus, line(3),
+                 file.get<port::simulator::BusFault>("fault", "g_bus_get_sync"));
+    EXPECT_EQ(":3:18: \"g_bus_get_sync\" must be one of \"no_bus\"",
+              refusal("[fault]", "g_bus_get_sync = 'off'"));
+}
+
+TEST_F(SimulatorSchemaTest, FaultHasANameOfItsOwnInterface)
+{
+    EXPECT_EQ(":3:1: unknown key \"telephony_inti\" in [fault]",
+              refusal("[fault]", "telephony_inti = 'TELEPHONY_ERROR_PERMISSION_DENIED'"));
+    EXPECT_EQ(":3:19: \"wifi_initialize\" must be one of \"WIFI_ERROR_INVALID_PARAMETER\", "
+              "\"WIFI_ERROR_OUT_OF_MEMORY\", \"WIFI_ERROR_INVALID_OPERATION\", "
+              "\"WIFI_ERROR_OPERATION_FAILED\", \"WIFI_ERROR_PERMISSION_DENIED\", "
+              "\"WIFI_ERROR_NOT_SUPPORTED\"",
+              refusal("[fault]", "wifi_initialize = 'TELEPHONY_ERROR_PERMISSION_DENIED'"));
+    EXPECT_EQ(":3:26: \"error\" must be one of \"DLOG_ERROR_NOT_PERMITTED\", "
+              "\"DLOG_ERROR_INVALID_PARAMETER\"",
+              refusal("[fault]", "__dlog_print = { error = -1 }"));
+    EXPECT_EQ(":3:12: \"tel_init\" must be one of \"null\"",
+              refusal("[fault]", "tel_init = 'TAPI_API_ACCESS_DENIED'"));
+    for (const char* const name : {"'x'", "'a..b'", "''", "1", "'a.1b'"})
+        EXPECT_EQ(
+            ":3:13: \"GetSerial\" must be \"not_a_string\", or an error name of D-Bus in quotes",
+            refusal("[fault]", "GetSerial = " + std::string(name)))
+            << name;
+    EXPECT_EQ("", refusal("[fault]", "GetSerial = 'not_a_string'"));
+}
+
+TEST_F(SimulatorSchemaTest, FaultsTableSaysWhatHappens)
+{
+    EXPECT_EQ(":3:12: \"tel_init\" must have an error or a delay_ms",
+              refusal("[fault]", "tel_init = { call = 2 }"));
+    EXPECT_EQ(":3:14: unknown key \"delay\" in a fault, which has error, delay_ms and call",
+              refusal("[fault]", "tel_init = { delay = 2 }"));
+    for (const char* const delay : {"0", "60001", "-1", "'1'", "1.5"})
+        EXPECT_EQ(":3:25: \"delay_ms\" must be a whole number from 1 to 60000",
+                  refusal("[fault]", "tel_init = { delay_ms = " + std::string(delay) + " }"))
+            << delay;
+    EXPECT_EQ(":3:37: \"call\" must be a whole number from 1",
+              refusal("[fault]", "tel_init = { error = 'null', call = 0 }"));
 }
 
 TEST_F(SimulatorSchemaTest, NulIsRefusedInAnyText)
