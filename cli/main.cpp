@@ -5,6 +5,7 @@
 #include <exception>
 
 #include "Commands.h"
+#include "Completion.h"
 #include "Session.h"
 #include "Terminal.h"
 #include "Text.h"
@@ -97,6 +98,10 @@ ExitCode execute(const Program& program)
 ExitCode run(int argc, char** argv)
 {
     Program program;
+    if (argc > 1 && argv[1] == std::string(COMPLETE)) {
+        writeOut(completions(program.app, {argv + 2, argv + argc}));
+        return SUCCESS;
+    }
     try {
         program.app.parse(argc, argv);
         return execute(program);

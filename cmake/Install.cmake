@@ -5,8 +5,6 @@ include(CMakePackageConfigHelpers)
 set_target_properties(platform PROPERTIES EXPORT_NAME port)
 
 install(TARGETS coresystem platform coreutil EXPORT coresystem)
-# Loaded by the utility library from beside itself; nobody links with it.
-install(TARGETS coreutil_cipher LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 
 install(FILES ${PROJECT_SOURCE_DIR}/include/CoreSystem.h
               ${PROJECT_SOURCE_DIR}/include/IConnectionStateListener.h

@@ -20,7 +20,7 @@ struct LoadedModule {
     std::string problem;
 };
 
-// The module stands beside this library, wherever that is.
+// The module stands in a folder beside this library, wherever that is.
 std::string modulePath()
 {
     static const char here = 0;

@@ -44,7 +44,7 @@ std::string deviceName()
     return take(name);
 }
 
-// Through the cipher module, which the utility library finds beside itself.
+// Through the cipher module, which the utility library finds by its own place.
 std::string throughTheCipher(const std::string& text)
 {
     std::string back;

@@ -39,7 +39,10 @@ TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
         GTEST_SKIP() << "needs root and a temporary folder that allows set-user-ID programs";
     const std::string probe = tree.path("/probe");
     fs::copy_file(ENVIRONMENT_PROBE, probe);
-    fs::copy_file(CIPHER_MODULE, tree.path("/" + fs::path(CIPHER_MODULE).filename().string()));
+    const fs::path module = CIPHER_MODULE;
+    const fs::path modules = tree.path("/" + module.parent_path().filename().string());
+    fs::create_directory(modules);
+    fs::copy_file(module, modules / module.filename());
     fs::permissions(probe, fs::perms::set_uid | fs::perms(0755));
 
     const std::string asNobody =
