@@ -18,6 +18,12 @@ endforeach()
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/port/coreutil/include/
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/coreutil FILES_MATCHING PATTERN "*.h")
 
+foreach(page coresystem.1 CoreSystem.3 coresystem-device.5 coresystem.7)
+  string(REGEX MATCH "[0-9]$" section ${page})
+  install(FILES ${PROJECT_SOURCE_DIR}/docs/man/${page}
+          DESTINATION ${CMAKE_INSTALL_MANDIR}/man${section})
+endforeach()
+
 # The service that tells the serial number, its rights on the system bus, and who starts it.
 install(TARGETS deviced DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
 set(deviced_dir ${PROJECT_SOURCE_DIR}/port/deviced)

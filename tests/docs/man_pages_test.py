@@ -1,0 +1,100 @@
+#!/usr/bin/env python3
+"""The man pages name what is there, and nothing else.
+
+    man_pages_test.py COMMAND [unittest arguments]
+"""
+import re
+import shutil
+import subprocess
+import sys
+import unittest
+from pathlib import Path
+
+TREE = Path(__file__).resolve().parent.parent.parent
+PAGES = sorted((TREE / "docs/man").iterdir())
+sys.path.insert(0, str(TREE / "tests/cli"))
+import command_help  # noqa: E402
+
+PROGRAM = Path(sys.argv[1]).resolve()
+
+
+def page(name):
+    return (TREE / "docs/man" / name).read_text("utf-8")
+
+
+def words_of(macro, text):
+    """The words that a macro marks, wherever it stands in a line."""
+    marked = []
+    for line in re.findall(r"^\.(.*)", text, re.MULTILINE):
+        for run in re.findall(rf"(?:^|\s){macro} (.*?)(?=\s[A-Z][a-z]\b|$)", line):
+            marked += [word for word in run.split() if re.search(r"\w", word)]
+    return marked
+
+
+def output_of(*command):
+    done = subprocess.run(command, capture_output=True, text=True, timeout=60, check=False,
+                          env={"PATH": "/usr/local/bin:/usr/bin:/bin", "LC_ALL": "C.UTF-8"})
+    return done.stdout + done.stderr
+
+
+class EveryPage(unittest.TestCase):
+    def test_is_clean_for_mandoc(self):
+        for path in PAGES:
+            self.assertEqual(output_of("mandoc", "-T", "lint", "-W", "warning", str(path)), "")
+
+    @unittest.skipUnless(shutil.which("man"), "man is not installed")
+    def test_is_clean_for_man(self):
+        for path in PAGES:
+            self.assertEqual(output_of("sh", "-c", 'man --warnings -E UTF-8 -l -Tutf8 -Z "$1" '
+                                       ">/dev/null", "sh", str(path)), "")
+
+    def test_refers_to_pages_that_are_there(self):
+        ours = {(path.stem, path.suffix[1:]) for path in PAGES} | {("statvfs", "3")}
+        for path in PAGES:
+            for name, number in re.findall(r"\.Xr (\S+) (\d)", path.read_text("utf-8")):
+                self.assertIn((name, number), ours, path)
+
+
+class TheCommandsPage(unittest.TestCase):
+    def setUp(self):
+        self.help = {command: options
+                     for command, subcommands, options in command_help.walk(PROGRAM)
+                     if not (command and subcommands)}  # a group is no command by itself
+
+    def test_names_every_command(self):
+        items = re.findall(r"^\.It Cm (.*)", page("coresystem.1"), re.MULTILINE)
+        named = {tuple(re.match(r"[a-z ]+", item).group().split()) for item in items}
+        self.assertEqual(named, set(self.help) - {()})
+
+    def test_names_every_option(self):
+        there = {option for options in self.help.values() for option in options}
+        named = {"-" + word for word in words_of("Fl", page("coresystem.1")) if word[0] == "-"}
+        self.assertEqual(named, there)
+
+
+class TheLibrarysPage(unittest.TestCase):
+    def test_says_what_the_headers_say(self):
+        self.assertEqual(output_of(sys.executable, str(TREE / "tools/man-page-of-header"),
+                                   "--check"), "")
+
+    def test_names_every_exported_method(self):
+        exported = re.findall(r"^CoreSystem::(\w+)\(",
+                              (TREE / "tests/abi/exports.txt").read_text("utf-8"), re.MULTILINE)
+        methods, listeners = page("CoreSystem.3").split(".Ss The listener")
+        self.assertEqual(sorted(re.findall(r'^\.It Li "[^"(]*?(\w+)\(', methods, re.MULTILINE)),
+                         sorted(exported))
+        self.assertEqual(len(re.findall(r'^\.It Li "', listeners, re.MULTILINE)), 5)
+
+
+class TheOverview(unittest.TestCase):
+    def test_names_every_environment_variable_of_the_readme(self):
+        table = (TREE / "README.md").read_text("utf-8").split("## Environment variables")[1]
+        rows = re.findall(r"^\| (`.*?) \|", table.split("\n## ")[0], re.MULTILINE)
+        there = {name for row in rows for name in re.findall(r"`(\w+)`", row)}
+        named = set(words_of("It Ev", page("coresystem.7")))
+        self.assertEqual({name.strip(",") for name in named}, there)
+
+
+if __name__ == "__main__":
+    del sys.argv[1]
+    unittest.main()
