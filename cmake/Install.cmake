@@ -24,6 +24,10 @@ foreach(page coresystem.1 CoreSystem.3 coresystem-device.5 coresystem.7)
           DESTINATION ${CMAKE_INSTALL_MANDIR}/man${section})
 endforeach()
 
+# What editors check device files by.
+install(FILES ${PROJECT_SOURCE_DIR}/docs/device-file.schema.json
+        DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem)
+
 # The service that tells the serial number, its rights on the system bus, and who starts it.
 install(TARGETS deviced DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
 set(deviced_dir ${PROJECT_SOURCE_DIR}/port/deviced)

@@ -113,8 +113,7 @@ constexpr auto TAPI_SIM_ERRORS = joined(TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS);
 constexpr auto TELEPHONY_ERRORS_OR_EMPTY = joined(TELEPHONY_ERRORS, OR_EMPTY);
 constexpr auto TELEPHONY_ERRORS_OR_NULL = joined(TELEPHONY_ERRORS, OR_NULL);
 
-// The bus's own errors have names for numbers.
-constexpr Name SERIAL_FAULTS[] = {name("not_a_string", BusFault::NotAString)};
+constexpr Name SERIAL_FAULTS[] = {{"not_a_string", NOT_A_STRING}};
 constexpr Name BUS_FAULTS[] = {name("no_bus", BusFault::NoBus)};
 
 constexpr std::int64_t ANY = std::numeric_limits<std::int64_t>::max();
@@ -296,6 +295,23 @@ const Type* findFaultKey(std::string_view key)
         if (row.key == key)
             return &row.type;
     return nullptr;
+}
+
+std::vector<std::string> keyNames(const SectionRow& section)
+{
+    std::vector<std::string> names;
+    for (const KeyRow& row : KEYS)
+        if (row.section == section.name && section.form != Form::Free)
+            names.emplace_back(row.key);
+    return names;
+}
+
+std::vector<std::string> faultKeyNames()
+{
+    std::vector<std::string> names;
+    for (const auto& row : FAULT_KEYS)
+        names.emplace_back(row.key);
+    return names;
 }
 
 } // namespace port::simulator

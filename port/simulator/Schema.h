@@ -5,18 +5,22 @@
 
 #include <cstdint>
 #include <limits>
+#include <string>
 #include <string_view>
+#include <vector>
 
 namespace port::simulator {
 
 // The value of the name "not_supported": this device has no such thing.
 constexpr std::int64_t NOT_SUPPORTED = std::numeric_limits<std::int64_t>::min();
 
-// The value of the words with which a fault has a call succeed and hand out null or an empty list.
-constexpr std::int64_t NOTHING = std::numeric_limits<std::int64_t>::max();
+// The values of a fault's error that is no number of an interface.
+constexpr std::int64_t NOTHING = std::numeric_limits<std::int64_t>::max(); // "null", "empty"
+constexpr std::int64_t NOT_A_STRING = NOTHING - 1;
+constexpr std::int64_t BUS_ERROR = NOTHING - 2; // has a name only
 
-// What can be wrong with an answer over the bus, or with the bus, in place of an error's number.
-enum class BusFault { NotAString, NoBus };
+// What is wrong with the bus of a program that is run on a device.
+enum class BusFault { NoBus };
 
 // A name in quotes and the number that it is kept as, which is an enumerator's.
 struct Name {
@@ -73,6 +77,12 @@ const Type* findKey(const SectionRow& section, std::string_view key);
 
 /// The type of a key beside "error" in a fault's table; null when there is no such key.
 const Type* findFaultKey(std::string_view key);
+
+/// The keys of a section in order; none when it has keys of any name.
+std::vector<std::string> keyNames(const SectionRow& section);
+
+/// The keys beside "error" in a fault's table.
+std::vector<std::string> faultKeyNames();
 
 /// All sections in order, for `for`.
 const SectionRow* beginSections();

@@ -1,0 +1,134 @@
+#!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
+"""Holds docs/device-file.schema.json to the rows that the reader of device files goes by, and to the
+reader's own judgement: of every device file of the tree, and of one mistake of each kind.
+
+With --write it puts the schema of the rows in its place.
+"""
+import argparse
+import json
+import subprocess
+import sys
+import tempfile
+import tomllib
+import unittest
+from pathlib import Path
+
+import jsonschema
+
+TREE = Path(__file__).resolve().parent.parent.parent
+SCHEMA = TREE / "docs" / "device-file.schema.json"
+
+# Each after "schema = 1".
+GOOD = [
+    "",
+    "[device]\ntelephony = false",
+    "[settings]\nfont_size = 7\nutc_offset = -3600",
+    "[settings]\nfont_size = 'huge'",
+    "[[slot]]\nmcc = '001'\nmnc = '01'\nnumber = 'null'",
+    "[subscriptions]\ndata = 1\nvoice = 'ask_always'",
+    "[packages]\n'org.example.app' = ''",
+    "[fault]\ntelephony_init = 'empty'",
+    "[fault]\ntelephony_init = { delay_ms = 60000 }",
+    "[fault.vconf_get_str]\nerror = 'null'\ncall = 3",
+    "[fault]\nGetSerial = 'org.example.Error'",
+    "[fault]\nGetSerial = { error = 'not_a_string', delay_ms = 1 }",
+    "[fault]\ng_bus_get_sync = 'no_bus'",
+]
+BAD = [
+    "colour = 1",
+    "device = 1",
+    "[device]\ncolour = 1",
+    "[device]\nserial = 1",
+    "[device]\nserial = \"\\u0000\"",
+    "[device]\ntelephony = 'false'",
+    "[settings]\nfont_size = 4",
+    "[settings]\nfont_size = 'tiny'",
+    "[settings]\nutc_offset = 86400",
+    "[slot]",
+    "slot = [1]",
+    "[[slot]]\nmcc = '01'",
+    "[[slot]]\nmnc = '0001'",
+    "[[slot]]\nnumber = '+'",
+    "[[slot]]\ncp_name = ''",
+    "[subscriptions]\ndata = 2",
+    "[storage]\nblocks = -1",
+    "[packages]\napp = 1",
+    "[fault]\ntelephony_inti = 'null'",
+    "[fault]\ntelephony_init = 'WIFI_ERROR_OPERATION_FAILED'",
+    "[fault]\ntelephony_init = -13",
+    "[fault]\ntelephony_init = { call = 1 }",
+    "[fault]\ntelephony_init = { delay_ms = 60001 }",
+    "[fault]\ntelephony_init = { delay_ms = 1, colour = 1 }",
+    "[fault]\nGetSerial = 'word'",
+    "[fault]\ng_bus_get_sync = { error = 'no_bus' }",
+]
+
+
+def printed(*arguments):
+    return subprocess.run([PROGRAM, *map(str, arguments)], stdout=subprocess.PIPE, check=True,
+                          text=True).stdout
+
+
+def schema():
+    return json.loads(SCHEMA.read_text())
+
+
+def device_files():
+    for folder in "tests/devices", "devices", "examples":
+        for path in sorted((TREE / folder).rglob("*.toml")):
+            yield path
+
+
+class DeviceSchema(unittest.TestCase):
+    def setUp(self):
+        self.validator = jsonschema.Draft7Validator(schema())
+
+    def judge(self, path):
+        """What the schema and the reader say of a file: whether it is good."""
+        by_schema = self.validator.is_valid(tomllib.loads(path.read_text()))
+        return by_schema, printed(path) == "\n"
+
+    def test_schema_is_that_of_the_rows(self):
+        self.assertEqual(SCHEMA.read_text(), printed(),
+                         "docs/device-file.schema.json is out of date: run check_device_schema.py "
+                         "PROGRAM --write")
+
+    def test_schema_is_one(self):
+        jsonschema.Draft7Validator.check_schema(schema())
+
+    def test_device_files_of_the_tree(self):
+        paths = list(device_files())
+        self.assertGreater(len(paths), 5)
+        for path in paths:
+            with self.subTest(path=str(path)):
+                by_schema, by_reader = self.judge(path)
+                self.assertEqual(by_reader, by_schema)
+
+    def judge_text(self, text):
+        with tempfile.TemporaryDirectory() as folder:
+            path = Path(folder) / "device.toml"
+            path.write_text("schema = 1\n" + text + "\n")
+            return self.judge(path)
+
+    def test_good_and_bad(self):
+        for verdict, texts in (True, GOOD), (False, BAD):
+            for text in texts:
+                with self.subTest(text=text):
+                    self.assertEqual((verdict, verdict), self.judge_text(text))
+
+    def test_schema_is_asked_for(self):
+        self.assertFalse(self.validator.is_valid({}))
+        self.assertFalse(self.validator.is_valid({"schema": 2}))
+
+
+if __name__ == "__main__":
+    parser = argparse.ArgumentParser(description=__doc__)
+    parser.add_argument("program", help="prints the schema of the rows")
+    parser.add_argument("--write", action="store_true")
+    arguments = parser.parse_args()
+    PROGRAM = arguments.program
+    if arguments.write:
+        SCHEMA.write_text(printed())
+    else:
+        unittest.main(argv=sys.argv[:1])
