@@ -67,6 +67,13 @@ std::string reasonOf(Question question, int code)
     return reason.empty() ? "the platform answered with error " + std::to_string(code) : reason;
 }
 
+// Of a question that succeeds and hands out null.
+std::string reasonOfNull(Question question)
+{
+    const std::string reason = lastOrigin(question).reason;
+    return reason.empty() ? "out of memory" : reason;
+}
+
 // A question that fails with a code of the platform.
 std::function<Fact()> text(Question question, int (CoreSystem::*read)(char**))
 {
@@ -77,7 +84,7 @@ std::function<Fact()> text(Question question, int (CoreSystem::*read)(char**))
         // After a failed read the slot holds nothing that the device said.
         if (code != 0)
             return noAnswer(reasonOf(question, code));
-        return value ? answer(question, *value) : noAnswer("out of memory");
+        return value ? answer(question, *value) : noAnswer(reasonOfNull(question));
     };
 }
 
@@ -101,7 +108,7 @@ std::function<Fact()> language(bool asIso639)
     return [=] {
         int code = 0;
         const auto value = readLanguage(asIso639, code);
-        if (code != 0)
+        if (code != 0 || !lastOrigin(Question::Language).available)
             return noAnswer(butTold(reasonOf(Question::Language, code), value.value_or("nothing")));
         if (value)
             return answer(Question::Language, *value);

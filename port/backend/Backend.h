@@ -12,6 +12,7 @@
 #include "Clock.h"
 #include "Configuration.h"
 #include "DeviceInfo.h"
+#include "Faults.h"
 #include "Network.h"
 #include "Packages.h"
 #include "Settings.h"
@@ -33,6 +34,13 @@ public:
     virtual Packages& packages() = 0;
     virtual Configuration& configuration() = 0;
     virtual Clock& clock() = 0;
+
+    /// None, unless the backend says otherwise.
+    virtual Faults& faults()
+    {
+        static Faults& none = *new Faults; // a thread may still ask while the process ends
+        return none;
+    }
 
     virtual std::string deviceFile() const
     {

@@ -4,6 +4,7 @@
 #define PORT_DEVICED_BOARD_H
 
 #include "../backend/DeviceInfo.h"
+#include "../backend/Faults.h"
 #include "../common/GLibTypes.h"
 
 namespace port::deviced {
@@ -12,7 +13,7 @@ constexpr char BUS_NAME[] = "org.tizen.system.deviced";
 
 class Board {
 public:
-    explicit Board(DeviceInfo& deviceInfo) : deviceInfo_(deviceInfo) {}
+    Board(DeviceInfo& deviceInfo, Faults& faults) : deviceInfo_(deviceInfo), faults_(faults) {}
 
     /// Shows the object to a connection, which must not outlive this. False when it has one
     /// already.
@@ -21,9 +22,13 @@ public:
 private:
     static void onCall(GDBusConnection*, const char*, const char*, const char*, const char*,
                        GVariant*, GDBusMethodInvocation* call, gpointer self);
-    void answerSerial(GDBusMethodInvocation* call);
+    static gboolean onDelayEnd(gpointer late);
+    void meetSerial(GDBusMethodInvocation* call);
+    void answerSerial(GDBusMethodInvocation* call, const CallFault& fault);
+    void tellSerial(GDBusMethodInvocation* call);
 
     DeviceInfo& deviceInfo_;
+    Faults& faults_;
 };
 
 } // namespace port::deviced

@@ -6,7 +6,7 @@
 #include <cstddef>
 #include <cstring>
 
-#include "HandOut.h"
+#include "Refusal.h"
 
 namespace port {
 
@@ -35,6 +35,13 @@ const Row* findKey(const Row (&rows)[Size], int key)
         if (row.key == key)
             return &row;
     return nullptr;
+}
+
+// Of a call that asks for the key of a row; null when there is no such key.
+template <typename Row>
+Refusal refusalOf(const char* call, const Row* row)
+{
+    return row != nullptr && row->read != nullptr ? Refusal{call, {row->question}} : Refusal{call};
 }
 
 // Reads a key of the type that the rows have; one of another type is as wrong as an unknown one.

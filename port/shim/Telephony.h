@@ -8,6 +8,7 @@
 #include "../backend/Backend.h"
 #include "HandOut.h"
 #include "Handles.h"
+#include "Refusal.h"
 
 namespace port {
 

@@ -2,7 +2,7 @@
 #include <app_alarm.h>
 
 #include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Refusal.h"
 
 namespace {
 
@@ -14,6 +14,8 @@ constexpr port::Codes CODES{ALARM_ERROR_CONNECTION_FAIL, ALARM_ERROR_CONNECTION_
 
 int alarm_get_current_time(struct tm* date)
 {
+    if (const port::Refusal refusal{__func__, {coresystem_port::Question::CurrentTime}})
+        return refusal.code();
     if (date == nullptr)
         return ALARM_ERROR_INVALID_PARAMETER;
     return port::guarded(

@@ -6,7 +6,7 @@
 #include <string>
 
 #include "../backend/Log.h"
-#include "HandOut.h"
+#include "Refusal.h"
 
 namespace {
 
@@ -29,6 +29,8 @@ bool format(std::string& text, const char* fmt, va_list arguments)
 
 int __dlog_print(log_id_t, int prio, const char* tag, const char* fmt, ...)
 {
+    if (const port::Refusal refusal{__func__})
+        return refusal.code();
     if (fmt == nullptr)
         return DLOG_ERROR_INVALID_PARAMETER;
     va_list arguments;

@@ -4,6 +4,7 @@
 #include "../backend/Backend.h"
 #include "HandOut.h"
 #include "HandleKinds.h"
+#include "Refusal.h"
 
 namespace {
 
@@ -41,6 +42,9 @@ int readState(connection_h connection, State* state, Question question,
 
 int connection_create(connection_h* connection)
 {
+    if (const port::Refusal refusal{__func__,
+                                    {Question::Cellular, Question::Wifi, Question::Bluetooth}})
+        return refusal.code();
     if (connection == nullptr)
         return CONNECTION_ERROR_INVALID_PARAMETER;
     return port::guarded(
@@ -53,21 +57,28 @@ int connection_create(connection_h* connection)
 
 int connection_destroy(connection_h connection)
 {
-    return Connections::close(connection) ? CONNECTION_ERROR_NONE
-                                          : CONNECTION_ERROR_INVALID_PARAMETER;
+    const port::Refusal refusal{__func__};
+    return refusal.after(Connections::close(connection) ? CONNECTION_ERROR_NONE
+                                                        : CONNECTION_ERROR_INVALID_PARAMETER);
 }
 
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state)
 {
+    if (const port::Refusal refusal{__func__, {Question::Cellular}})
+        return refusal.code();
     return readState(connection, state, Question::Cellular, &Network::cellular);
 }
 
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state)
 {
+    if (const port::Refusal refusal{__func__, {Question::Wifi}})
+        return refusal.code();
     return readState(connection, state, Question::Wifi, &Network::wifi);
 }
 
 int connection_get_bt_state(connection_h connection, connection_bt_state_e* state)
 {
+    if (const port::Refusal refusal{__func__, {Question::Bluetooth}})
+        return refusal.code();
     return readState(connection, state, Question::Bluetooth, &Network::bluetooth);
 }

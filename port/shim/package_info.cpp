@@ -3,11 +3,15 @@
 
 #include "HandleKinds.h"
 #include "Packages.h"
+#include "Refusal.h"
 
+using coresystem_port::Question;
 using port::InstalledPackages;
 
 int package_info_create(const char* package_id, package_info_h* info)
 {
+    if (const port::Refusal refusal{__func__, {Question::PackageVersion}})
+        return refusal.code();
     if (package_id == nullptr || info == nullptr)
         return PACKAGE_MANAGER_ERROR_INVALID_PARAMETER;
     return port::withInstalledPackage(package_id, [info](const std::string& version) {
@@ -18,12 +22,15 @@ int package_info_create(const char* package_id, package_info_h* info)
 
 int package_info_destroy(package_info_h info)
 {
-    return InstalledPackages::close(info) ? PACKAGE_MANAGER_ERROR_NONE
-                                          : PACKAGE_MANAGER_ERROR_INVALID_PARAMETER;
+    const port::Refusal refusal{__func__};
+    return refusal.after(InstalledPackages::close(info) ? PACKAGE_MANAGER_ERROR_NONE
+                                                        : PACKAGE_MANAGER_ERROR_INVALID_PARAMETER);
 }
 
 int package_info_get_version(package_info_h info, char** version)
 {
+    if (const port::Refusal refusal{__func__, {Question::PackageVersion}})
+        return refusal.code(version);
     if (version == nullptr)
         return PACKAGE_MANAGER_ERROR_INVALID_PARAMETER;
     return port::guarded([=]() -> int {

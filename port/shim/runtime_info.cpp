@@ -76,17 +76,25 @@ bool isKey(int key)
 
 int runtime_info_get_value_bool(runtime_info_key_e key, bool* value)
 {
+    if (const auto refusal =
+            port::refusalOf(__func__, port::findKey(BOOL_KEYS, port::numberOf(key))))
+        return refusal.code();
     return port::readKey(BOOL_KEYS, key, value, CODES);
 }
 
 int runtime_info_get_value_int(runtime_info_key_e key, int* value)
 {
+    if (const auto refusal =
+            port::refusalOf(__func__, port::findKey(INT_KEYS, port::numberOf(key))))
+        return refusal.code();
     return port::readKey(INT_KEYS, key, value, CODES);
 }
 
 int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback,
                                 void* user_data)
 {
+    if (const port::Refusal refusal{__func__})
+        return refusal.code();
     const auto* const row = port::findKey(CHANGES, port::numberOf(key));
     if (!isKey(port::numberOf(key)) || callback == nullptr)
         return RUNTIME_INFO_ERROR_INVALID_PARAMETER;
@@ -101,11 +109,12 @@ int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb 
 
 int runtime_info_unset_changed_cb(runtime_info_key_e key)
 {
+    const port::Refusal refusal{__func__};
     if (!isKey(port::numberOf(key)))
-        return RUNTIME_INFO_ERROR_INVALID_PARAMETER;
-    return port::guarded([&] {
+        return refusal.after(RUNTIME_INFO_ERROR_INVALID_PARAMETER);
+    return refusal.after(port::guarded([&] {
         if (const auto* const row = port::findKey(CHANGES, port::numberOf(key)))
             port::changeEvents().unset(row->change);
         return RUNTIME_INFO_ERROR_NONE;
-    });
+    }));
 }

@@ -3,7 +3,7 @@
 #include <storage.h>
 
 #include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Refusal.h"
 
 #ifdef __USE_FILE_OFFSET64
 #error "the two structures are the same one here, and so are the names of the functions"
@@ -34,6 +34,9 @@ bool fits(const port::VolumeSize& size, Structure& structure)
 template <typename Structure>
 int internalSize(Structure* buf)
 {
+    if (const port::Refusal refusal{"storage_get_internal_memory_size",
+                                    {coresystem_port::Question::Storage}})
+        return refusal.code();
     if (buf == nullptr)
         return STORAGE_ERROR_INVALID_PARAMETER;
     const auto store = [buf](const port::VolumeSize& size) -> int {

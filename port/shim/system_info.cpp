@@ -4,7 +4,7 @@
 #include <string_view>
 
 #include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Keys.h"
 
 namespace {
 
@@ -28,17 +28,25 @@ constexpr KeyRow KEYS[] = {
     {"tizen.org/system/model_name", Question::ModelName, &DeviceInfo::modelName},
 };
 
+const KeyRow* findRow(const char* key)
+{
+    for (const KeyRow& row : KEYS)
+        if (key != nullptr && row.key == key)
+            return &row;
+    return nullptr;
+}
+
 } // namespace
 
 int system_info_get_platform_string(const char* key, char** value)
 {
-    if (key == nullptr || value == nullptr)
+    const KeyRow* const row = findRow(key);
+    if (const auto refusal = port::refusalOf(__func__, row))
+        return refusal.code(value);
+    if (row == nullptr || value == nullptr)
         return SYSTEM_INFO_ERROR_INVALID_PARAMETER;
     return port::guarded([&]() -> int {
-        for (const KeyRow& row : KEYS)
-            if (row.key == key)
-                return port::handOut(row.question, (port::backend().deviceInfo().*row.read)(),
-                                     value, CODES);
-        return SYSTEM_INFO_ERROR_INVALID_PARAMETER;
+        return port::handOut(row->question, (port::backend().deviceInfo().*row->read)(), value,
+                             CODES);
     });
 }

@@ -65,15 +65,24 @@ constexpr KeyRow<FontSize> INT_KEYS[] = {
 
 int system_settings_get_value_string(system_settings_key_e key, char** value)
 {
+    if (const auto refusal =
+            port::refusalOf(__func__, port::findKey(STRING_KEYS, port::numberOf(key))))
+        return refusal.code(value);
     return port::readKey(STRING_KEYS, key, value, CODES);
 }
 
 int system_settings_get_value_bool(system_settings_key_e key, bool* value)
 {
+    if (const auto refusal =
+            port::refusalOf(__func__, port::findKey(BOOL_KEYS, port::numberOf(key))))
+        return refusal.code();
     return port::readKey(BOOL_KEYS, key, value, CODES);
 }
 
 int system_settings_get_value_int(system_settings_key_e key, int* value)
 {
+    if (const auto refusal =
+            port::refusalOf(__func__, port::findKey(INT_KEYS, port::numberOf(key))))
+        return refusal.code();
     return port::readKey(INT_KEYS, key, value, CODES);
 }

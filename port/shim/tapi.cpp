@@ -204,6 +204,13 @@ int askSubscription(TapiHandle* handle, Subs (*choose)(const Subscriptions&), Su
         CODES.failed, CODES.noMemory);
 }
 
+// What is asked of a modem by its name.
+constexpr std::initializer_list<Question> MODEM_QUESTIONS = {
+    Question::SimCard, Question::SimIdentity, Question::SmsReadiness, Question::Subscriptions};
+constexpr std::initializer_list<Question> LIST_QUESTIONS = {
+    Question::SimSlots, Question::SimCard, Question::SimIdentity, Question::SmsReadiness,
+    Question::Subscriptions};
+
 // The reason why a handle's card cannot be read, by asking for its status.
 int askWhyUnreadable(TapiHandle* handle)
 {
@@ -220,6 +227,8 @@ int askWhyUnreadable(TapiHandle* handle)
 
 char** tel_get_cp_name_list(void)
 {
+    if (port::Refusal{__func__, LIST_QUESTIONS})
+        return nullptr;
     char** list = nullptr;
     port::guarded([&]() -> int {
         if (const auto slots = askSlots())
@@ -231,6 +240,8 @@ char** tel_get_cp_name_list(void)
 
 TapiHandle* tel_init(const char* cp_name)
 {
+    if (port::Refusal{__func__, MODEM_QUESTIONS})
+        return nullptr;
     TapiHandle* handle = nullptr;
     port::guarded([&]() -> int {
         const auto slots = askSlots();
@@ -245,15 +256,18 @@ TapiHandle* tel_init(const char* cp_name)
 
 int tel_deinit(TapiHandle* handle)
 {
-    return port::guarded(
+    const port::Refusal refusal{__func__};
+    return refusal.after(port::guarded(
         [&]() -> int {
             return ModemHandles::close(handle) ? TAPI_API_SUCCESS : TAPI_API_INVALID_PTR;
         },
-        CODES.failed, CODES.noMemory);
+        CODES.failed, CODES.noMemory));
 }
 
 int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
 {
+    if (const port::Refusal refusal{__func__, {Question::SimIdentity}})
+        return refusal.code();
     const int result =
         port::askSlot(CODES, handle, Question::SimIdentity, &Telephony::imsi, imsi, handOutImsi);
     return result == CODES.noSim ? askWhyUnreadable(handle) : result;
@@ -261,6 +275,8 @@ int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
 
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed)
 {
+    if (const port::Refusal refusal{__func__, {Question::SimCard}})
+        return refusal.code();
     if (card_changed == nullptr)
         return TAPI_API_INVALID_PTR;
     return port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, status,
@@ -273,21 +289,29 @@ int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* c
 
 int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subs)
 {
+    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
+        return refusal.code();
     return askSubscription(handle, networkSubscription, subs);
 }
 
 int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subs)
 {
+    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
+        return refusal.code();
     return askSubscription(handle, dataSubscription, subs);
 }
 
 int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subs)
 {
+    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
+        return refusal.code();
     return askSubscription(handle, voiceSubscription, subs);
 }
 
 int tel_check_sms_device_status(TapiHandle* handle, int* ready)
 {
+    if (const port::Refusal refusal{__func__, {Question::SmsReadiness}})
+        return refusal.code();
     return port::askSlot(CODES, handle, Question::SmsReadiness, &Telephony::smsReady, ready,
                          [](bool isReady, int& slot) {
                              slot = isReady ? 1 : 0;

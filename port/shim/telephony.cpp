@@ -100,6 +100,13 @@ telephony_network_service_state_e serviceState(port::Service service)
     return TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE;
 }
 
+// What is asked of a slot by its handle, and what is asked only of a card that is available.
+constexpr std::initializer_list<Question> LIST_QUESTIONS = {
+    Question::SimSlots, Question::SimCard,        Question::SimIdentity, Question::PhoneNumber,
+    Question::Imei,     Question::NetworkService, Question::Roaming};
+constexpr std::initializer_list<Question> STATE_QUESTIONS = {
+    Question::SimCard, Question::SimIdentity, Question::PhoneNumber};
+
 template <typename Value>
 int store(const Value& value, Value& slot)
 {
@@ -117,6 +124,8 @@ std::size_t port::liveTelephonyLists()
 
 int telephony_init(telephony_handle_list_s* list)
 {
+    if (const port::Refusal refusal{__func__, LIST_QUESTIONS})
+        return refusal.code(list);
     if (list == nullptr)
         return TELEPHONY_ERROR_INVALID_PARAMETER;
     return port::guarded(
@@ -130,13 +139,16 @@ int telephony_init(telephony_handle_list_s* list)
 
 int telephony_deinit(telephony_handle_list_s* list)
 {
+    const port::Refusal refusal{__func__};
     if (list == nullptr)
-        return TELEPHONY_ERROR_INVALID_PARAMETER;
-    return port::guarded([&]() -> int { return release(*list); }, CODES.failed);
+        return refusal.after(TELEPHONY_ERROR_INVALID_PARAMETER);
+    return refusal.after(port::guarded([&]() -> int { return release(*list); }, CODES.failed));
 }
 
 int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
 {
+    if (const port::Refusal refusal{__func__, STATE_QUESTIONS})
+        return refusal.code();
     return port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, state,
                          [](const port::Card& card, telephony_sim_state_e& slot) {
                              return store(port::simState(card.status), slot);
@@ -145,12 +157,16 @@ int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
 
 int telephony_sim_get_subscriber_number(telephony_h handle, char** number)
 {
+    if (const port::Refusal refusal{__func__, {Question::PhoneNumber}})
+        return refusal.code(number);
     return port::askSlot(CODES, handle, Question::PhoneNumber, &Telephony::number, number,
                          handOutNumber);
 }
 
 int telephony_modem_get_imei(telephony_h handle, char** imei)
 {
+    if (const port::Refusal refusal{__func__, {Question::Imei}})
+        return refusal.code(imei);
     return port::askSlot(
         CODES, handle, Question::Imei, &Telephony::imei, imei,
         [](const std::string& text, char*& slot) { return port::handOutCopy(text, &slot); });
@@ -159,6 +175,8 @@ int telephony_modem_get_imei(telephony_h handle, char** imei)
 int telephony_network_get_service_state(telephony_h handle,
                                         telephony_network_service_state_e* state)
 {
+    if (const port::Refusal refusal{__func__, {Question::NetworkService}})
+        return refusal.code();
     return port::askSlot(CODES, handle, Question::NetworkService, &Telephony::service, state,
                          [](port::Service service, telephony_network_service_state_e& slot) {
                              return store(serviceState(service), slot);
@@ -167,6 +185,8 @@ int telephony_network_get_service_state(telephony_h handle,
 
 int telephony_network_get_roaming_status(telephony_h handle, bool* roaming)
 {
+    if (const port::Refusal refusal{__func__, {Question::Roaming}})
+        return refusal.code();
     return port::askSlot(CODES, handle, Question::Roaming, &Telephony::roaming, roaming,
                          store<bool>);
 }

@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Refusal.h"
 
 namespace {
 
@@ -33,6 +33,8 @@ int read(const std::string& key, char** slot)
 
 char* vconf_get_str(const char* key)
 {
+    if (port::Refusal{__func__, {Question::SalesCode}})
+        return nullptr;
     char* text = nullptr;
     if (key != nullptr && isInAStore(key))
         port::guarded([&] { return read(key, &text); });

@@ -6,7 +6,7 @@
 
 #include "../backend/Backend.h"
 #include "../events/ChangeEvents.h"
-#include "HandOut.h"
+#include "Refusal.h"
 
 namespace {
 
@@ -58,6 +58,8 @@ int unset(Change change)
 
 int wifi_initialize(void)
 {
+    if (const port::Refusal refusal{__func__})
+        return refusal.code();
     return port::guarded(
         []() -> int {
             const int next = hasWifi() ? WIFI_ERROR_NONE : WIFI_ERROR_NOT_SUPPORTED;
@@ -72,6 +74,8 @@ int wifi_initialize(void)
 
 int wifi_set_device_state_changed_cb(wifi_device_state_changed_cb callback, void* user_data)
 {
+    if (const port::Refusal refusal{__func__})
+        return refusal.code();
     return port::guarded(
         [=] {
             return set(Change::WifiDevice, callback != nullptr, [=](int state) {
@@ -83,6 +87,8 @@ int wifi_set_device_state_changed_cb(wifi_device_state_changed_cb callback, void
 
 int wifi_set_connection_state_changed_cb(wifi_connection_state_changed_cb callback, void* user_data)
 {
+    if (const port::Refusal refusal{__func__})
+        return refusal.code();
     return port::guarded(
         [=] {
             return set(Change::WifiConnection, callback != nullptr,
@@ -93,10 +99,12 @@ int wifi_set_connection_state_changed_cb(wifi_connection_state_changed_cb callba
 
 int wifi_unset_device_state_changed_cb(void)
 {
-    return unset(Change::WifiDevice);
+    const port::Refusal refusal{__func__};
+    return refusal.after(unset(Change::WifiDevice));
 }
 
 int wifi_unset_connection_state_changed_cb(void)
 {
-    return unset(Change::WifiConnection);
+    const port::Refusal refusal{__func__};
+    return refusal.after(unset(Change::WifiConnection));
 }

@@ -19,7 +19,7 @@ namespace port::simulator {
 // What a call is told to do in place of what it does.
 struct Fault {
     std::string error;      // its name in the file; empty: none, the call is late only
-    std::int64_t value = 0; // the error's number; of an error name of the bus none
+    std::int64_t value = 0; // the error's number, or one that stands for a word of the schema
     std::int64_t delayMs = 0;
     std::int64_t call = 0; // counted from 1; 0: every one
 };
@@ -54,8 +54,8 @@ public:
         return found != values_.end() ? &found->second : nullptr;
     }
 
-    /// A value of the type that the schema gives the key: std::string, bool, Fault, std::int64_t,
-    /// or the enumeration behind its names.
+    /// A value of the type that the schema gives the key: std::string, bool, Fault,
+    /// std::int64_t, or the enumeration behind its names.
     template <typename T>
     Result<Sourced<T>> get(const std::string& key) const
     {

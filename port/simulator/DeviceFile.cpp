@@ -147,7 +147,7 @@ std::optional<Content> readFault(const Type& type, const std::string& text)
     const auto value = valueOf(type.names, text);
     if (!value && !(type.kind == Type::Kind::BusFault && isBusErrorName(text)))
         return std::nullopt;
-    return Fault{text, value.value_or(0)};
+    return Fault{text, value.value_or(BUS_ERROR)};
 }
 
 std::optional<Content> readText(const Type& type, const std::string& text)

@@ -5,6 +5,7 @@
 #include "Configuration.h"
 #include "DeviceFile.h"
 #include "DeviceInfo.h"
+#include "Faults.h"
 #include "Network.h"
 #include "Packages.h"
 #include "Settings.h"
@@ -56,6 +57,10 @@ public:
     {
         return clock_;
     }
+    Faults& faults() override
+    {
+        return faults_;
+    }
     std::string deviceFile() const override
     {
         return file_.path();
@@ -84,6 +89,7 @@ private:
     SimulatedPackages packages_{file_};
     SimulatedConfiguration configuration_{file_};
     SimulatedClock clock_{file_};
+    SimulatedFaults faults_{file_};
 };
 
 } // namespace

@@ -118,6 +118,36 @@ TEST_F(DevicedTest, MissingSerialIsAnErrorAndNeverInvented)
                                      "NotAvailable: "));
 }
 
+TEST_F(DevicedTest, FaultOfTheDeviceFileIsTheAnswer)
+{
+    bus.start();
+    useSerial("serial = \"SN-4711\"\n[fault]\n"
+              "GetSerial = \"org.freedesktop.DBus.Error.AccessDenied\"");
+    EXPECT_EQ(
+        "error: GDBus.Error:org.freedesktop.DBus.Error.AccessDenied: " + tree.path("/device.toml") +
+            ":5: GetSerial fails with org.freedesktop.DBus.Error.AccessDenied",
+        serial());
+    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = \"not_a_string\"");
+    EXPECT_EQ("(uint32 0,)", serial());
+    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { error = \"not_a_string\", call = 2 }");
+    EXPECT_EQ("('SN-4711',)", serial());
+    EXPECT_EQ("(uint32 0,)", serial());
+    EXPECT_EQ("('SN-4711',)", serial());
+}
+
+// The one that is late waits by itself.
+TEST_F(DevicedTest, LateAnswerKeepsNobodyElseWaiting)
+{
+    bus.start();
+    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { delay_ms = 60000, call = 2 }");
+    EXPECT_EQ("('SN-4711',)", serial());
+    const Client late(bus.address());
+    g_dbus_connection_call(late.connection(), NAME, PATH, INTERFACE, "GetSerial", nullptr, nullptr,
+                           G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr, nullptr);
+    g_dbus_connection_flush_sync(late.connection(), nullptr, nullptr);
+    EXPECT_EQ("('SN-4711',)", late.serial());
+}
+
 TEST_F(DevicedTest, MachinesOwnSerialIsTheAnswerWithoutADeviceFile)
 {
     unsetenv("CORESYSTEM_DEVICE");

@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: Apache-2.0
+// Calls that fail, from the section [fault] of a device file.
+#ifndef PORT_SIMULATOR_FAULTS_H
+#define PORT_SIMULATOR_FAULTS_H
+
+#include <map>
+#include <mutex>
+#include <string>
+
+#include "../backend/Faults.h"
+#include "DeviceFile.h"
+
+namespace port::simulator {
+
+class SimulatedFaults : public Faults {
+public:
+    explicit SimulatedFaults(DeviceFile& file) : file_(file) {}
+
+    std::optional<CallFault> meet(const char* call) override;
+
+private:
+    // The calls of a function since its fault was first met as it is now.
+    struct Count {
+        Fault rule;
+        std::int64_t calls = 0;
+    };
+
+    bool isTheCall(const std::string& call, const Fault& rule);
+    void forget(const std::string& call);
+
+    DeviceFile& file_;
+    std::mutex mutex_;
+    std::map<std::string, Count> counts_;
+};
+
+} // namespace port::simulator
+
+#endif

@@ -1,0 +1,771 @@
+// SPDX-License-Identifier: Apache-2.0
+// Every call of the platform that the library makes is failed by a device file, and what an
+// application then gets is looked at: the library, the port and the simulator as they are.
+#include <CoreSystem.h>
+
+#include <chrono>
+#include <cstdlib>
+#include <fstream>
+#include <functional>
+#include <set>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include <app_alarm.h>
+#include <coresystem_port.h>
+#include <dlog.h>
+#include <net_connection.h>
+#include <package_info.h>
+#include <package_manager.h>
+#include <runtime_info.h>
+#include <storage.h>
+#include <system_info.h>
+#include <system_settings.h>
+#include <tapi_common.h>
+#include <vconf.h>
+#include <wifi.h>
+
+#include "events/ChangeEvents.h"
+#include "shim/HandleKinds.h"
+#include "shim/Telephony.h"
+#include "support/CapturedStandardError.h"
+#include "support/Child.h"
+#include "support/CoreSystemInternals.h"
+#include "support/PrivateBus.h"
+#include "support/TemporaryTree.h"
+#include "support/Together.h"
+#include "support/Wait.h"
+
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::StartsWith;
+using Internals = CoreSystemInternals;
+
+namespace {
+
+const char HEALTHY[] = R"(schema = 1
+[device]
+platform_id = "5d3f"
+platform_name = "Tizen"
+platform_version = "2.3.1"
+model_name = "Phone"
+serial = "SN-4711"
+[settings]
+device_name = "My phone"
+language = "ko_KR.UTF-8"
+sales_code = "DBT"
+font_size = "huge"
+flight_mode = true
+data_roaming = true
+mobile_data = true
+packet_data = true
+utc_offset = 3600
+[[slot]]
+sim = "available"
+mcc = "001"
+mnc = "01"
+msin = "0123456789"
+number = "+15550100"
+imei = "490154203237518"
+service = "in_service"
+roaming = true
+sms = true
+[subscriptions]
+network = 1
+data = 1
+voice = "slot1"
+[network]
+cellular = "connected"
+wifi = "connected"
+bluetooth = "connected"
+[storage]
+block_size = 4096
+fragment_size = 4096
+blocks = 1000000
+available_blocks = 500000
+[packages]
+app = "1.2"
+)";
+
+// Every switch and radio the other way round.
+const char CHANGED[] = R"(schema = 1
+[settings]
+flight_mode = false
+packet_data = false
+data_roaming = false
+[network]
+wifi = "deactivated"
+)";
+
+CoreSystem& library()
+{
+    return *CoreSystem::GetInstance();
+}
+
+std::string text(const char* value)
+{
+    return value != nullptr ? value : "null";
+}
+
+std::string yesOrNo(bool value)
+{
+    return value ? "yes" : "no";
+}
+
+// What a read answers and stores; "untouched" where it stores nothing.
+template <typename Object>
+std::string stored(Object& object, int (Object::*read)(char**))
+{
+    static char untouched[] = "untouched";
+    char* slot = untouched;
+    const int code = (object.*read)(&slot);
+    return std::to_string(code) + " " + text(slot);
+}
+
+template <typename Number>
+std::string subscription(bool (CoreSystem::*read)(char*, Number*))
+{
+    auto number = static_cast<Number>(0);
+    char modem[] = "cp0";
+    const bool wasRead = (library().*read)(modem, &number);
+    return yesOrNo(wasRead) + " " + std::to_string(static_cast<int>(number));
+}
+
+std::string simInfo()
+{
+    std::string mcc = "-", mnc = "-", msin = "-";
+    const bool wasRead = library().GetSimInfo("cp0", &mcc, &mnc, &msin);
+    return yesOrNo(wasRead) + " " + mcc + " " + mnc + " " + msin;
+}
+
+std::string packageVersion()
+{
+    static char untouched[] = "untouched";
+    char* slot = untouched;
+    const int code = library().GetPackageVersion("app", &slot);
+    return std::to_string(code) + " " + text(slot) + ", handles " +
+           std::to_string(port::InstalledPackages::live());
+}
+
+std::string roaming()
+{
+    bool isRoaming = false;
+    const bool wasRead = library().GetRoamingStatus(0, &isRoaming);
+    return yesOrNo(wasRead) + " " + yesOrNo(isRoaming) + ", lists " +
+           std::to_string(port::liveTelephonyLists());
+}
+
+std::string cardStatus()
+{
+    auto status = static_cast<TelSimCardStatus_t>(0x77);
+    const bool isReady = library().IsAvaliableState(0, &status);
+    return yesOrNo(isReady) + " " + std::to_string(static_cast<int>(status));
+}
+
+std::string sms()
+{
+    char modem[] = "cp0";
+    int isReady = 77;
+    const bool wasRead = library().CheckSmsEnabled(modem, &isReady);
+    return yesOrNo(wasRead) + " " + std::to_string(isReady);
+}
+
+std::string handleList()
+{
+    telephony_handle_list_s list = {77, nullptr};
+    const bool isFilled = library().InitHandleList(&list);
+    const unsigned count = list.count;
+    const bool isReleased = isFilled && library().DeinitHandleList(&list);
+    return yesOrNo(isFilled) + " " + std::to_string(count) + ", released " + yesOrNo(isReleased) +
+           ", lists " + std::to_string(port::liveTelephonyLists());
+}
+
+std::string phoneNumberOfHandle()
+{
+    telephony_handle_list_s list = {0, nullptr};
+    library().InitHandleList(&list);
+    static char untouched[] = "untouched";
+    char* number = untouched;
+    const bool wasRead = library().GetPhoneNumber(&list.handle[0], &number);
+    library().DeinitHandleList(&list);
+    return yesOrNo(wasRead) + " " + text(number);
+}
+
+std::string language()
+{
+    char* code = nullptr;
+    const int result = library().GetDeviceLanguageCode(&code, true);
+    return std::to_string(result) + " " + text(code);
+}
+
+// Made of the time zone where no modem tells one.
+std::string imei()
+{
+    char* value = nullptr;
+    const int code = library().GetIMEI(&value);
+    const bool isOfModem = text(value) == "490154203237518";
+    return std::to_string(code) + (isOfModem ? " of the modem" : " of the time zone, ") +
+           (isOfModem ? "" : std::to_string(text(value).size()) + " characters");
+}
+
+std::string currentTime()
+{
+    std::tm now = {};
+    now.tm_year = 77;
+    const int code = Internals::currentTime(&now);
+    return std::to_string(code) + (now.tm_year > 100 ? " now" : " " + std::to_string(now.tm_year));
+}
+
+std::string fontSize()
+{
+    int size = 77;
+    const int code = Internals::fontSize(&size);
+    return std::to_string(code) + " " + std::to_string(size);
+}
+
+std::string states()
+{
+    return std::to_string((library().*Internals::GET_CELLULAR_STATE)()) + " " +
+           std::to_string((library().*Internals::GET_WIFI_STATE)()) + " " +
+           std::to_string((library().*Internals::GET_BT_STATE)()) + ", handles " +
+           std::to_string(port::Connections::live());
+}
+
+// The answer of a call whose result the library does not look at, by itself.
+std::string destroyed()
+{
+    connection_h handle = nullptr;
+    connection_create(&handle);
+    const int code = connection_destroy(handle);
+    return std::to_string(code) + ", " + states();
+}
+
+std::string packageDestroyed()
+{
+    package_info_h handle = nullptr;
+    package_info_create("app", &handle);
+    const int code = package_info_destroy(handle);
+    return std::to_string(code) + ", " + packageVersion();
+}
+
+std::string modemReleased()
+{
+    return std::to_string(tel_deinit(tel_init("cp0"))) + ", " +
+           stored(library(), &CoreSystem::GetMCCFromSim);
+}
+
+class Listener : public IConnectionStateListener {
+public:
+    std::string events;
+
+    void OnWifiDeviceStateChanged(int state, void*) override
+    {
+        events += "radio " + std::to_string(state) + ". ";
+    }
+    void OnWifiConnectionStateChanged(int state, wifi_ap_h, void*) override
+    {
+        events += "connection " + std::to_string(state) + ". ";
+    }
+    void OnFlightModeChanged(bool enabled, void*) override
+    {
+        events += "flight mode " + yesOrNo(enabled) + ". ";
+    }
+    void OnPacketDataChanged(bool enabled, void*) override
+    {
+        events += "packet data " + yesOrNo(enabled) + ". ";
+    }
+    void OnWifiStatusChanged(bool connected, void*) override
+    {
+        events += "status " + yesOrNo(connected) + ". ";
+    }
+};
+
+// The texts of the error lines, which follow "FUNCTION: FILE(LINE) > ".
+std::string errorLines(const std::string& log)
+{
+    std::istringstream lines(log);
+    std::string texts;
+    for (std::string line; std::getline(lines, line);)
+        if (line.rfind("E/", 0) == 0 && line.find(" > ") != std::string::npos)
+            texts += " | " + line.substr(line.find(" > ") + 3);
+    return texts;
+}
+
+class FaultsTest : public testing::Test {
+public:
+    FaultsTest()
+    {
+        setenv("CORESYSTEM_DEVICE", path.c_str(), 1);
+    }
+    ~FaultsTest() override
+    {
+        unsetenv("CORESYSTEM_DEVICE");
+    }
+
+    // A section [fault] after a device's description; its first line is the last one's next.
+    void describe(const std::string& faults, const char* device = HEALTHY) const
+    {
+        // Replaced as a whole: the file never stands half written.
+        tree.write("/next.toml", device + ("[fault]\n" + faults));
+        std::rename(tree.path("/next.toml").c_str(), path.c_str());
+    }
+
+    // What a probe sees on such a device, and the texts of the error lines, in a process that
+    // asked nothing before.
+    std::string observe(const std::string& faults, const std::function<std::string()>& probe) const
+    {
+        describe(faults);
+        return inChild([&] {
+            coresystem_port::setLogSink(coresystem_port::LogSink::StandardError);
+            CapturedStandardError log;
+            const std::string seen = probe();
+            return seen + errorLines(log.take());
+        });
+    }
+
+    // Replaces the file, and waits until the events that follow from it have come.
+    void change(const std::string& faults, const char* device) const
+    {
+        // What is told last of all changes, past the calls that may fail.
+        bool isTold = false;
+        port::changeEvents().set(port::Change::DataRoaming, [&](int) { isTold = true; });
+        describe(faults, device);
+        if (!runUntil([&] { return isTold; }))
+            throw std::runtime_error("no event came"); // ends the child process
+        port::changeEvents().unset(port::Change::DataRoaming);
+    }
+
+    // The file is changed and changed back: the events that come of it.
+    std::string eventsOf(const std::string& faults) const
+    {
+        Listener listener;
+        library().SetConnectionEventListener(&listener, nullptr);
+        change(faults, CHANGED);
+        change(faults, HEALTHY);
+        library().SetConnectionEventListener(nullptr, nullptr);
+        return listener.events;
+    }
+
+    // The answers of the calls that end a listener, and what it is told of later changes.
+    std::string eventsAfterTheEnd(const std::string& faults) const
+    {
+        Listener listener;
+        library().SetConnectionEventListener(&listener, nullptr);
+        library().SetConnectionEventListener(nullptr, nullptr);
+        std::string seen = std::to_string(wifi_unset_device_state_changed_cb());
+        seen += " " + std::to_string(wifi_unset_connection_state_changed_cb());
+        seen += " " +
+                std::to_string(runtime_info_unset_changed_cb(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED));
+        change(faults, CHANGED);
+        return seen + ", " + listener.events;
+    }
+
+    const TemporaryTree tree;
+    const std::string path = tree.path("/device.toml");
+};
+
+using Probe = std::function<std::string(const FaultsTest& test, const std::string& faults)>;
+
+struct Row {
+    const char* call;
+    const char* error;
+    int code; // the error's; "CODE" in what is seen with it
+    Probe probe;
+    std::string healthy;
+    std::string failing;
+};
+
+void PrintTo(const Row& row, std::ostream* out)
+{
+    *out << row.call << " = " << row.error;
+}
+
+// A probe that needs the library only.
+Probe by(std::string (*probe)())
+{
+    return [probe](const FaultsTest&, const std::string&) { return probe(); };
+}
+
+Probe by(int (CoreSystem::*read)(char**))
+{
+    return [read](const FaultsTest&, const std::string&) { return stored(library(), read); };
+}
+
+Probe by(bool (CoreSystem::*read)())
+{
+    return [read](const FaultsTest&, const std::string&) { return yesOrNo((library().*read)()); };
+}
+
+template <typename Number>
+Probe by(bool (CoreSystem::*read)(char*, Number*))
+{
+    return [read](const FaultsTest&, const std::string&) { return subscription(read); };
+}
+
+Probe byEvents(std::string (FaultsTest::*watch)(const std::string&) const)
+{
+    return [watch](const FaultsTest& test, const std::string& faults) {
+        return (test.*watch)(faults);
+    };
+}
+
+std::string salesCode()
+{
+    return text(library().GetCSC());
+}
+
+std::string modems()
+{
+    char** const names = library().GetCpNameList();
+    return names != nullptr ? text(names[0]) : "null";
+}
+
+std::string isInstalled()
+{
+    return yesOrNo(Internals::isPackageInstalled("app"));
+}
+
+std::string hasRoom()
+{
+    return yesOrNo(library().IsSystemMemoryAvailable(1));
+}
+
+std::string isConnected()
+{
+    return yesOrNo(library().IsNetworkConnected(false, false)) + ", " + states();
+}
+
+std::string errorLine()
+{
+    return yesOrNo(library().IsMoSupportMcc(""));
+}
+
+const char EVERY_EVENT[] = "radio 0. connection 0. status no. packet data no. flight mode no. "
+                           "radio 1. connection 3. status yes. packet data yes. flight mode yes. ";
+const char WIFI_EVENTS[] = "radio 0. connection 0. radio 1. connection 3. ";
+const char OTHER_EVENTS[] = "status no. packet data no. flight mode no. "
+                            "status yes. packet data yes. flight mode yes. ";
+const char NO_EVENT[] = "0 0 0, ";
+
+const std::vector<Row>& rows()
+{
+    static const std::vector<Row> all = {
+        {"__dlog_print", "DLOG_ERROR_NOT_PERMITTED", 0, by(errorLine),
+         "no | mcc is empty. IsMoSupportMcc finish.", "no"},
+        {"alarm_get_current_time", "ALARM_ERROR_CONNECTION_FAIL", ALARM_ERROR_CONNECTION_FAIL,
+         by(currentTime), "0 now", "CODE 0"},
+        {"connection_create", "CONNECTION_ERROR_PERMISSION_DENIED", 0, by(isConnected),
+         "yes, 5 2 2, handles 0", "no, 0 0 0, handles 0"},
+        {"connection_destroy", "CONNECTION_ERROR_INVALID_OPERATION",
+         CONNECTION_ERROR_INVALID_OPERATION, by(destroyed), "0, 5 2 2, handles 0",
+         "CODE, 5 2 2, handles 0"},
+        {"connection_get_bt_state", "CONNECTION_ERROR_NOT_SUPPORTED", 0, by(isConnected),
+         "yes, 5 2 2, handles 0", "yes, 5 2 0, handles 0"},
+        {"connection_get_cellular_state", "CONNECTION_ERROR_NO_REPLY", 0, by(isConnected),
+         "yes, 5 2 2, handles 0", "no, 0 2 2, handles 0"},
+        {"connection_get_wifi_state", "CONNECTION_ERROR_OPERATION_FAILED", 0, by(isConnected),
+         "yes, 5 2 2, handles 0", "yes, 5 0 2, handles 0"},
+        {"package_info_create", "PACKAGE_MANAGER_ERROR_PERMISSION_DENIED",
+         PACKAGE_MANAGER_ERROR_PERMISSION_DENIED, by(packageVersion), "0 1.2, handles 0",
+         "CODE untouched, handles 0 | package_info_create failed [CODE]"},
+        {"package_info_destroy", "PACKAGE_MANAGER_ERROR_IO_ERROR", PACKAGE_MANAGER_ERROR_IO_ERROR,
+         by(packageDestroyed), "0, 0 1.2, handles 0", "CODE, 0 1.2, handles 0"},
+        // Nobody releases the handle then.
+        {"package_info_get_version", "PACKAGE_MANAGER_ERROR_SYSTEM_ERROR",
+         PACKAGE_MANAGER_ERROR_SYSTEM_ERROR, by(packageVersion), "0 1.2, handles 0",
+         "CODE untouched, handles 1 | package_info_get_version failed [CODE]"},
+        {"package_info_get_version", "null", 0, by(packageVersion), "0 1.2, handles 0",
+         "0 null, handles 0"},
+        {"package_manager_get_package_size_info", "PACKAGE_MANAGER_ERROR_IO_ERROR",
+         PACKAGE_MANAGER_ERROR_IO_ERROR, by(isInstalled), "yes",
+         "no | Other Error Case.. [package_manager_error_e] code is CODE"},
+        {"package_manager_get_package_size_info", "PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE", 0,
+         by(isInstalled), "yes", "no | No Such Package [app]"},
+        {"runtime_info_get_value_bool", "RUNTIME_INFO_ERROR_PERMISSION_DENIED", 0,
+         by(&CoreSystem::IsFlightMode), "yes", "no"},
+        {"runtime_info_get_value_bool", "RUNTIME_INFO_ERROR_REMOTE_IO", 0,
+         by(&CoreSystem::IsDataRoamingEnabled), "yes", "no"},
+        {"runtime_info_get_value_bool", "RUNTIME_INFO_ERROR_IO_ERROR", 0,
+         byEvents(&FaultsTest::eventsOf), EVERY_EVENT,
+         "radio 0. connection 0. status no. radio 1. connection 3. status yes. "},
+        {"runtime_info_get_value_int", "RUNTIME_INFO_ERROR_IO_ERROR", 0,
+         byEvents(&FaultsTest::eventsOf), EVERY_EVENT,
+         "radio 0. connection 0. packet data no. flight mode no. "
+         "radio 1. connection 3. packet data yes. flight mode yes. "},
+        {"runtime_info_set_changed_cb", "RUNTIME_INFO_ERROR_NOT_SUPPORTED", 0,
+         byEvents(&FaultsTest::eventsOf), EVERY_EVENT, WIFI_EVENTS},
+        {"runtime_info_unset_changed_cb", "RUNTIME_INFO_ERROR_IO_ERROR",
+         RUNTIME_INFO_ERROR_IO_ERROR, byEvents(&FaultsTest::eventsAfterTheEnd), NO_EVENT,
+         "0 0 CODE, "},
+        {"storage_get_internal_memory_size", "STORAGE_ERROR_OPERATION_FAILED", 0, by(hasRoom),
+         "yes", "no | Fail to get internal memory size"},
+        {"system_info_get_platform_string", "SYSTEM_INFO_ERROR_PERMISSION_DENIED",
+         SYSTEM_INFO_ERROR_PERMISSION_DENIED, by(&CoreSystem::GetPlatformName), "0 Tizen",
+         "CODE null"},
+        {"system_info_get_platform_string", "null", 0, by(&CoreSystem::GetModelName), "0 Phone",
+         "0 null"},
+        {"system_info_get_platform_string", "SYSTEM_INFO_ERROR_IO_ERROR",
+         SYSTEM_INFO_ERROR_IO_ERROR, by(&CoreSystem::GetTizenIdN), "0 5d3f",
+         "CODE untouched | system_info_get_platform_string failed [CODE]"},
+        {"system_info_get_platform_string", "null", 0, by(&CoreSystem::GetTizenIdN), "0 5d3f",
+         "0 null"},
+        {"system_settings_get_value_bool", "SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED", 0,
+         by(&CoreSystem::IsMobileData), "yes", "no"},
+        {"system_settings_get_value_int", "SYSTEM_SETTINGS_ERROR_IO_ERROR",
+         SYSTEM_SETTINGS_ERROR_IO_ERROR, by(fontSize), "0 3", "CODE 0"},
+        {"system_settings_get_value_string", "SYSTEM_SETTINGS_ERROR_LOCKSCREEN_APP_PASSWORD_MODE",
+         SYSTEM_SETTINGS_ERROR_LOCKSCREEN_APP_PASSWORD_MODE, by(&CoreSystem::GetDeviceName),
+         "0 My phone", "CODE null"},
+        {"system_settings_get_value_string", "null", 0, by(&CoreSystem::GetDeviceName),
+         "0 My phone", "0 null"},
+        {"system_settings_get_value_string", "SYSTEM_SETTINGS_ERROR_IO_ERROR",
+         SYSTEM_SETTINGS_ERROR_IO_ERROR, by(language), "0 kor", "CODE eng"},
+        {"system_settings_get_value_string", "null", 0, by(language), "0 kor", "0 eng"},
+        {"tel_check_sms_device_status", "TAPI_API_SERVICE_NOT_READY", 0, by(sms), "yes 1", "no 77"},
+        {"tel_deinit", "TAPI_API_INVALID_PTR", TAPI_API_INVALID_PTR, by(modemReleased), "0, 0 001",
+         "CODE, 0 001"},
+        {"tel_get_call_preferred_voice_subscription", "TAPI_API_ACCESS_DENIED", 0,
+         by(&CoreSystem::GetCallPreferredSubscription), "yes 3", "no 0"},
+        {"tel_get_cp_name_list", "null", 0, by(modems), "cp0", "null"},
+        {"tel_get_cp_name_list", "null", 0, by(&CoreSystem::GetMCCFromSim), "0 001",
+         "4 untouched | fail to get MCC"},
+        {"tel_get_cp_name_list", "null", 0, by(cardStatus), "yes 3", "no 119"},
+        {"tel_get_network_default_data_subscription", "TAPI_API_NOT_SUPPORTED", 0,
+         by(&CoreSystem::GetDefaultDataSubscription), "yes 1", "no 0"},
+        {"tel_get_network_default_subscription", "TAPI_API_SYSTEM_RPC_LINK_DOWN", 0,
+         by(&CoreSystem::GetMainSimSubscription), "yes 1", "no 0"},
+        {"tel_get_sim_imsi", "TAPI_SIM_ACCESS_FILE_NOT_FOUND", 0, by(&CoreSystem::GetMNCFromSim),
+         "0 01", "4 untouched | fail to get MNC"},
+        {"tel_get_sim_imsi", "TAPI_API_ACCESS_DENIED", 0, by(simInfo), "yes 001 01 0123456789",
+         "no - - - | Failed to get IMSI"},
+        {"tel_get_sim_init_info", "TAPI_API_OPERATION_FAILED", 0, by(cardStatus), "yes 3",
+         "no 119"},
+        {"tel_init", "null", 0, by(simInfo), "yes 001 01 0123456789",
+         "no - - - | Failed to get TapiHandle"},
+        {"tel_init", "null", 0, by(sms), "yes 1", "no 77"},
+        {"telephony_deinit", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(handleList),
+         "yes 1, released yes, lists 0", "yes 1, released no, lists 0"},
+        {"telephony_deinit", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(roaming),
+         "yes yes, lists 0 | SimManager::GetRoamingStatus()",
+         "yes yes, lists 0 | SimManager::GetRoamingStatus()"},
+        {"telephony_init", "TELEPHONY_ERROR_PERMISSION_DENIED", 0, by(handleList),
+         "yes 1, released yes, lists 0", "no 77, released no, lists 0"},
+        {"telephony_init", "empty", 0, by(handleList), "yes 1, released yes, lists 0",
+         "yes 0, released yes, lists 0"},
+        {"telephony_init", "TELEPHONY_ERROR_NOT_SUPPORTED", 0, by(&CoreSystem::IsSimAvailable),
+         "yes", "no | telephony_init Failed."},
+        {"telephony_init", "empty", 0, by(&CoreSystem::IsSimAvailable), "yes",
+         "no | telephony_init Failed."},
+        {"telephony_init", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(&CoreSystem::IsSimExist),
+         "yes", "no"},
+        {"telephony_init", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(imei), "0 of the modem",
+         "0 of the time zone, 15 characters | telephony_init Failed. | telephony_init Failed. "
+         "Start to get IMEI from current time"},
+        {"telephony_init", "TELEPHONY_ERROR_OPERATION_FAILED", 0,
+         by(&CoreSystem::GetPhoneNumberFromSim), "0 +15550100",
+         "0 untouched | telephony_init Failed."},
+        {"telephony_modem_get_imei", "TELEPHONY_ERROR_PERMISSION_DENIED", 0, by(imei),
+         "0 of the modem", "0 of the time zone, 15 characters"},
+        {"telephony_modem_get_imei", "null", 0, by(imei), "0 of the modem",
+         "0 of the time zone, 15 characters"},
+        {"telephony_network_get_roaming_status", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(roaming),
+         "yes yes, lists 0 | SimManager::GetRoamingStatus()",
+         "no no, lists 0 | SimManager::GetRoamingStatus()"},
+        {"telephony_network_get_service_state", "TELEPHONY_ERROR_OPERATION_FAILED", 0, by(roaming),
+         "yes yes, lists 0 | SimManager::GetRoamingStatus()",
+         "no no, lists 0 | SimManager::GetRoamingStatus()"},
+        {"telephony_sim_get_state", "TELEPHONY_ERROR_OPERATION_FAILED", 0,
+         by(&CoreSystem::IsSimAvailable), "yes", "no | Sim is not available"},
+        {"telephony_sim_get_state", "TELEPHONY_ERROR_OPERATION_FAILED", 0,
+         by(&CoreSystem::IsSimExist), "yes", "no"},
+        {"telephony_sim_get_subscriber_number", "TELEPHONY_ERROR_SIM_NOT_AVAILABLE",
+         TELEPHONY_ERROR_SIM_NOT_AVAILABLE, by(&CoreSystem::GetPhoneNumberFromSim), "0 +15550100",
+         "CODE untouched | fail to get phoneNumber"},
+        {"telephony_sim_get_subscriber_number", "null", TELEPHONY_ERROR_SIM_NOT_AVAILABLE,
+         by(&CoreSystem::GetPhoneNumberFromSim), "0 +15550100",
+         "CODE untouched | fail to get phoneNumber"},
+        {"telephony_sim_get_subscriber_number", "TELEPHONY_ERROR_PERMISSION_DENIED", 0,
+         by(phoneNumberOfHandle), "yes +15550100", "no untouched | Failed to get phone number"},
+        {"telephony_sim_get_subscriber_number", "null", 0, by(phoneNumberOfHandle), "yes +15550100",
+         "yes null"},
+        {"vconf_get_str", "null", 0, by(salesCode), "DBT", "null"},
+        {"wifi_initialize", "WIFI_ERROR_OPERATION_FAILED", 0, byEvents(&FaultsTest::eventsOf),
+         EVERY_EVENT, OTHER_EVENTS},
+        {"wifi_set_connection_state_changed_cb", "WIFI_ERROR_OPERATION_FAILED", 0,
+         byEvents(&FaultsTest::eventsOf), EVERY_EVENT,
+         "radio 0. status no. packet data no. flight mode no. "
+         "radio 1. status yes. packet data yes. flight mode yes. "},
+        {"wifi_set_device_state_changed_cb", "WIFI_ERROR_PERMISSION_DENIED", 0,
+         byEvents(&FaultsTest::eventsOf), EVERY_EVENT,
+         "connection 0. status no. packet data no. flight mode no. "
+         "connection 3. status yes. packet data yes. flight mode yes. "},
+        {"wifi_unset_connection_state_changed_cb", "WIFI_ERROR_OPERATION_FAILED",
+         WIFI_ERROR_OPERATION_FAILED, byEvents(&FaultsTest::eventsAfterTheEnd), NO_EVENT,
+         "0 CODE 0, "},
+        {"wifi_unset_device_state_changed_cb", "WIFI_ERROR_OPERATION_FAILED",
+         WIFI_ERROR_OPERATION_FAILED, byEvents(&FaultsTest::eventsAfterTheEnd), NO_EVENT,
+         "CODE 0 0, "},
+    };
+    return all;
+}
+
+std::string with(int code, std::string seen)
+{
+    const std::string place = "CODE";
+    for (std::size_t at = 0; (at = seen.find(place)) != std::string::npos;)
+        seen.replace(at, place.size(), std::to_string(code));
+    return seen;
+}
+
+// The library's own imports of the platform: the first block of their list.
+std::set<std::string> importsOfPlatform()
+{
+    std::ifstream list(IMPORTS);
+    std::set<std::string> names;
+    std::string line;
+    while (std::getline(list, line) && !line.empty())
+        if (line[0] != '#')
+            names.insert(line);
+    return names;
+}
+
+TEST_F(FaultsTest, EveryCallOfThePlatformIsFailed)
+{
+    std::set<std::string> failed;
+    for (const Row& row : rows())
+        failed.insert(row.call);
+    EXPECT_EQ(importsOfPlatform(), failed);
+}
+
+class EachFaultTest : public FaultsTest, public testing::WithParamInterface<Row> {};
+
+TEST_P(EachFaultTest, IsSeenByTheApplication)
+{
+    const Row& row = GetParam();
+    const std::string fault = std::string(row.call) + " = \"" + row.error + "\"\n";
+    EXPECT_EQ(row.healthy, observe("", [&] { return row.probe(*this, ""); }));
+    EXPECT_EQ(with(row.code, row.failing), observe(fault, [&] { return row.probe(*this, fault); }));
+}
+
+INSTANTIATE_TEST_SUITE_P(Rows, EachFaultTest, testing::ValuesIn(rows()), [](const auto& each) {
+    return "Row" + std::to_string(each.index) + "_" + each.param.call;
+});
+
+// What the library asks three times.
+std::string flightModeThrice()
+{
+    std::string seen;
+    for (int i = 0; i < 3; ++i)
+        seen += yesOrNo(library().IsFlightMode()) + " ";
+    return seen;
+}
+
+TEST_F(FaultsTest, OneCallFailsAndTheOthersDoNot)
+{
+    const std::string error = "{ error = \"RUNTIME_INFO_ERROR_IO_ERROR\", call = ";
+    EXPECT_EQ("yes no yes ",
+              observe("runtime_info_get_value_bool = " + error + "2 }\n", flightModeThrice));
+    EXPECT_EQ("yes yes yes ",
+              observe("runtime_info_get_value_bool = " + error + "4 }\n", flightModeThrice));
+}
+
+TEST_F(FaultsTest, CallsAreCountedAnewWhenTheFaultIsAnother)
+{
+    const std::string once = "runtime_info_get_value_bool = { error = "
+                             "\"RUNTIME_INFO_ERROR_IO_ERROR\", call = 1 }\n";
+    const std::string other = "runtime_info_get_value_bool = { error = "
+                              "\"RUNTIME_INFO_ERROR_REMOTE_IO\", call = 1 }\n";
+    EXPECT_EQ("no yes yes yes yes yes no yes yes yes yes yes no yes yes ", observe(once, [&] {
+                  std::string seen = flightModeThrice();
+                  describe("tel_init = \"null\"\n" + once); // this one is the same
+                  seen += flightModeThrice();
+                  describe(other);
+                  seen += flightModeThrice();
+                  describe("");
+                  seen += flightModeThrice();
+                  describe(other);
+                  return seen + flightModeThrice();
+              }));
+}
+
+TEST_F(FaultsTest, SeveralFaultsHoldAtOnce)
+{
+    EXPECT_EQ("no no 4 untouched | Sim is not available | fail to get MCC",
+              observe("runtime_info_get_value_bool = \"RUNTIME_INFO_ERROR_IO_ERROR\"\n"
+                      "telephony_sim_get_state = { error = \"TELEPHONY_ERROR_OPERATION_FAILED\" }\n"
+                      "system_settings_get_value_bool.error = \"SYSTEM_SETTINGS_ERROR_IO_ERROR\"\n",
+                      [] {
+                          return yesOrNo(library().IsFlightMode()) + " " +
+                                 yesOrNo(library().IsMobileData()) + " " +
+                                 stored(library(), &CoreSystem::GetMCCFromSim);
+                      }));
+}
+
+using Clock = std::chrono::steady_clock;
+
+TEST_F(FaultsTest, DelayedCallAnswersLate)
+{
+    EXPECT_EQ("yes late", observe("runtime_info_get_value_bool = { delay_ms = 300 }\n", [] {
+                  const auto start = Clock::now();
+                  const std::string answer = yesOrNo(library().IsFlightMode());
+                  const bool isLate = Clock::now() - start >= std::chrono::milliseconds(300);
+                  return answer + (isLate ? " late" : " at once");
+              }));
+}
+
+TEST_F(FaultsTest, ThreadsWaitBesideOneAnother)
+{
+    EXPECT_EQ("together", observe("system_settings_get_value_bool = { delay_ms = 1000 }\n", [] {
+                  const auto start = Clock::now();
+                  together(20, [](int) { library().IsMobileData(); });
+                  const auto seconds =
+                      std::chrono::duration_cast<std::chrono::seconds>(Clock::now() - start);
+                  return std::string(seconds.count() < 15 ? "together" : "one by one");
+              }));
+}
+
+TEST_F(FaultsTest, FaultComesAndGoesWhileAListenerRuns)
+{
+    const std::string fault = "runtime_info_get_value_bool = \"RUNTIME_INFO_ERROR_IO_ERROR\"\n";
+    EXPECT_EQ("radio 0. connection 0. status no. "
+              "radio 1. connection 3. status yes. packet data yes. flight mode yes. ",
+              observe("", [&] {
+                  Listener listener;
+                  library().SetConnectionEventListener(&listener, nullptr);
+                  change(fault, CHANGED);
+                  change("", HEALTHY);
+                  library().SetConnectionEventListener(nullptr, nullptr);
+                  return listener.events;
+              }));
+}
+
+// The serial number as the library reads it over a bus with the service that answers from the file.
+std::string serial()
+{
+    PrivateBus bus;
+    bus.addActivatable("org.tizen.system.deviced", "'" DEVICED "'");
+    bus.start();
+    const char* slot = "untouched";
+    const auto start = Clock::now();
+    const int code = library().GetDeviceUniqueID(&slot);
+    const bool isLate = Clock::now() - start >= std::chrono::milliseconds(700);
+    return std::to_string(code) + " " + text(slot) + (isLate ? ", maybe late" : "");
+}
+
+TEST_F(FaultsTest, SerialNumberFailsOverTheBus)
+{
+    EXPECT_THAT(observe("", serial), StartsWith("0 SN-4711"));
+    EXPECT_THAT(observe("GetSerial = \"org.freedesktop.DBus.Error.AccessDenied\"\n", serial),
+                AllOf(StartsWith("2 null"),
+                      HasSubstr(" | g_dbus_message_to_gerror() failed:[9:GDBus.Error:org."
+                                "freedesktop.DBus.Error.AccessDenied: " +
+                                path + ":44: GetSerial fails with ")));
+    EXPECT_THAT(observe("GetSerial = \"not_a_string\"\n", serial), StartsWith("2 null"));
+    EXPECT_EQ("0 SN-4711, maybe late", observe("GetSerial = { delay_ms = 700 }\n", serial));
+}
+
+} // namespace
