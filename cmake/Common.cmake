@@ -2,6 +2,8 @@
 option(CORESYSTEM_WARNINGS_AS_ERRORS "Stop at the first warning" OFF)
 option(CORESYSTEM_COVERAGE "Count executed lines" OFF)
 set(CORESYSTEM_SANITIZE "" CACHE STRING "Sanitizers to build with, as -fsanitize takes them")
+set(CORESYSTEM_STRINGS "new" CACHE STRING "Layout of std::string in the interface: new or old")
+set_property(CACHE CORESYSTEM_STRINGS PROPERTY STRINGS new old)
 
 set(CMAKE_CXX_EXTENSIONS OFF)
 set(CMAKE_CXX_STANDARD_REQUIRED ON)
@@ -10,6 +12,9 @@ set(CMAKE_CXX_VISIBILITY_PRESET hidden)
 set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
 set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
+if(CORESYSTEM_PLATFORM STREQUAL "device") # has all libraries in one place
+  set(CMAKE_SKIP_RPATH ON)
+endif()
 # All binaries of a build stand together, so that each finds the others by its own place.
 set(CMAKE_LIBRARY_OUTPUT_DIRECTORY ${PROJECT_BINARY_DIR}/lib)
 set(CMAKE_RUNTIME_OUTPUT_DIRECTORY ${PROJECT_BINARY_DIR}/bin)
@@ -18,6 +23,11 @@ add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wconversion
                     "-fmacro-prefix-map=${PROJECT_SOURCE_DIR}/=")
 if(CORESYSTEM_WARNINGS_AS_ERRORS)
   add_compile_options(-Werror)
+endif()
+if(CORESYSTEM_STRINGS STREQUAL "old") # that of g++ before 5
+  add_compile_definitions(_GLIBCXX_USE_CXX11_ABI=0)
+elseif(NOT CORESYSTEM_STRINGS STREQUAL "new")
+  message(FATAL_ERROR "CORESYSTEM_STRINGS=${CORESYSTEM_STRINGS}: it is new or old")
 endif()
 if(CORESYSTEM_SANITIZE)
   add_compile_options(-fsanitize=${CORESYSTEM_SANITIZE} -fno-sanitize-recover=all

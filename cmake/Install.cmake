@@ -1,6 +1,7 @@
 # What is installed: the libraries, the public headers, and what lets others find them, by
 # find_package(coresystem) and by pkg-config.
 include(CMakePackageConfigHelpers)
+include(${CMAKE_CURRENT_LIST_DIR}/InstallPkgConfig.cmake)
 
 set_target_properties(platform PROPERTIES EXPORT_NAME port)
 
@@ -45,17 +46,8 @@ write_basic_package_version_file(${PROJECT_BINARY_DIR}/coresystemConfigVersion.c
                                  COMPATIBILITY SameMajorVersion)
 install(FILES ${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake DESTINATION ${package_dir})
 
-# Writes NAME.pc; it holds no absolute path, so an installed tree can be moved.
-function(coresystem_install_pkg_config name library description)
-  set(more_cflags ${ARGN})
-  set(pkg_config_dir ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
-  file(RELATIVE_PATH up /${pkg_config_dir} /)
-  string(REGEX REPLACE "/$" "" up "${up}")
-  configure_file(${PROJECT_SOURCE_DIR}/cmake/package.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
-  install(FILES ${PROJECT_BINARY_DIR}/${name}.pc DESTINATION ${pkg_config_dir})
-endfunction()
 coresystem_install_pkg_config(coresystem coresystem "${PROJECT_DESCRIPTION}"
-  "-I\${includedir}/coresystem-platform")
+  CFLAGS "-I\${includedir}/coresystem-platform")
 coresystem_install_pkg_config(coresystem-port coresystem-port
   "Which backend answers on this machine, and where answers come from")
 coresystem_install_pkg_config(coreutil coreutil "Logger state, log cipher and named mutexes")

@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Compares what the library exports and imports with the lists beside this file.
+"""Compares what the library exports and imports, and which libraries it asks for, with lists.
 
 Prints what is new or missing by name; the exit code is 1 then.
 """
@@ -11,10 +11,17 @@ import pathlib
 import subprocess
 import sys
 
+sys.path.insert(0, str(pathlib.Path(__file__).resolve().parents[2] / "device"))
+from imports import read_libraries
+
 # Applications reach the class through GetInstance() only.
 NEVER_EXPORTED = ("CoreSystem::CoreSystem", "CoreSystem::~CoreSystem", "vtable for ",
                   "typeinfo for ", "typeinfo name for ")
 SINGLETONS = ("CoreSystem", "SimManager", "ConnectionManager", "DBusManager")
+RUNTIME_LIBRARIES = {"libstdc++.so.6", "libgcc_s.so.1", "libc.so.6"}
+# The newest that the library needs of each: images with the old layout of std::string are old.
+RUNTIME_VERSIONS = {"GLIBC": (2, 4), "GLIBCXX": (3, 4, 5), "CXXABI": (1, 3), "GCC": (3, 5)}
+NEW_STRING = "std::__cxx11::basic_string<char, std::char_traits<char>, std::allocator<char> >"
 # Offset to top, type information, and the two entries of the destructor.
 VTABLE_WORDS = 4
 
@@ -34,18 +41,26 @@ def exported(library):
 
 
 def imported(library):
-    lines = run("nm", "-D", "-C", "--undefined-only", library).splitlines()
-    return {line.strip().split(maxsplit=1)[1] for line in lines}
+    """As the linker sees them, with their versions."""
+    lines = run("nm", "-D", "--undefined-only", library).splitlines()
+    return {line.split()[-1] for line in lines}
 
 
-def compare(what, found, listed):
+def readable(symbol):
+    name = run("c++filt", symbol.split("@")[0]).strip()
+    return symbol if name == symbol else f"{symbol} {name}"
+
+
+def compare(what, found, listed, shown=str):
     for name in sorted(found - listed):
-        yield f"{what} but not in the list: {name}"
+        yield f"{what} but not in the list: {shown(name)}"
     for name in sorted(listed - found):
-        yield f"in the list but not {what}: {name}"
+        yield f"in the list but not {what}: {shown(name)}"
 
 
-def check_exports(library, listed):
+def check_exports(library, listed, strings):
+    if strings == "new":
+        listed = [name.replace("std::string", NEW_STRING) for name in listed]
     found = exported(library)
     yield from compare("exported", found, set(listed))
     for name in sorted(found.union(listed)):
@@ -59,9 +74,53 @@ def is_of_runtime(symbol, patterns):
                for pattern in patterns)
 
 
-def check_imports(library, listed, runtime):
+def check_imports(library, libraries, strings, runtime):
+    listed = {symbol for one in libraries for symbol in one.symbols_of(strings)}
     found = {symbol for symbol in imported(library) if not is_of_runtime(symbol, runtime)}
-    yield from compare("imported", found, set(listed))
+    yield from compare("imported", found, listed, readable)
+
+
+def dynamic_section(library, tag):
+    lines = run("readelf", "-W", "-d", library).splitlines()
+    return {line.rsplit("[")[1].rstrip("]") for line in lines if f"({tag})" in line}
+
+
+def check_needed(library, needed):
+    yield from compare("asked of the loader", dynamic_section(library, "NEEDED"), needed)
+
+
+def check_place(library):
+    for tag in ("RPATH", "RUNPATH"):
+        for path in dynamic_section(library, tag):
+            yield f"looks for libraries in a place of its own: {path}"
+
+
+def check_start(library):
+    section = run("readelf", "-W", "-d", library)
+    if "TEXTREL" in section:
+        yield "its code is changed at start"
+    if "BIND_NOW" not in section:
+        yield "not everything is bound at start"
+    if "GNU_RELRO" not in run("readelf", "-W", "-l", library):
+        yield "its table of addresses stays writable"
+
+
+def check_versions(library):
+    for symbol in sorted(imported(library)):
+        name, _, version = symbol.partition("@")
+        kind, _, number = version.partition("_")
+        if version and tuple(map(int, number.split("."))) > RUNTIME_VERSIONS[kind]:
+            yield f"too new for a device: {symbol}"
+
+
+def check_device(library, libraries, strings):
+    """What holds for a library that a device loads."""
+    sonames = {one.soname for one in libraries if one.symbols_of(strings)}
+    yield from check_needed(library, sonames | RUNTIME_LIBRARIES)
+    yield from check_place(library)
+    yield from check_start(library)
+    if strings == "old":
+        yield from check_versions(library)
 
 
 def check_vtable(library, word):
@@ -88,19 +147,30 @@ def main():
     parser = argparse.ArgumentParser(description=__doc__)
     parser.add_argument("library")
     parser.add_argument("--exports", type=pathlib.Path, help="list of all exported names")
-    parser.add_argument("--imports", type=pathlib.Path, help="list of all imported names ...")
+    parser.add_argument("--imports", type=pathlib.Path, help="libraries and all imported names ...")
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
+    parser.add_argument("--strings", choices=("new", "old"), default="new",
+                        help="the layout of std::string")
+    parser.add_argument("--needed", nargs="+", metavar="SONAME", help="all libraries it asks for")
+    parser.add_argument("--device", action="store_true",
+                        help="it asks for those of the imports, and suits a device")
     parser.add_argument("--vtable", type=int, metavar="WORD", help="check them; bytes of a pointer")
     arguments = parser.parse_args()
 
+    library = arguments.library
+    libraries = read_libraries(arguments.imports) if arguments.imports else []
     problems = []
     if arguments.exports:
-        problems += check_exports(arguments.library, read_list(arguments.exports))
-    if arguments.imports:
-        problems += check_imports(arguments.library, read_list(arguments.imports),
+        problems += check_exports(library, read_list(arguments.exports), arguments.strings)
+    if arguments.runtime:
+        problems += check_imports(library, libraries, arguments.strings,
                                   read_list(arguments.runtime))
+    if arguments.needed:
+        problems += check_needed(library, set(arguments.needed))
+    if arguments.device:
+        problems += check_device(library, libraries, arguments.strings)
     if arguments.vtable:
-        problems += check_vtable(arguments.library, arguments.vtable)
+        problems += check_vtable(library, arguments.vtable)
     for problem in problems:
         print(problem)
     print(f"relocations: {relocations(arguments.library)}")

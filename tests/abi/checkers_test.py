@@ -33,6 +33,13 @@ class CheckerTest(unittest.TestCase):
         path.write_text(text)
         return str(path)
 
+    def build(self, source, *options):
+        library = str(self.root / "library.so")
+        compiler = os.environ.get("CXX", "c++")
+        subprocess.run([compiler, "-shared", "-fPIC", "-fvisibility=hidden", *options, "-o", library,
+                        self.write("library.cpp", source)], check=True)
+        return library
+
     def run_checker(self, checker, *arguments):
         done = subprocess.run([sys.executable, str(HERE / checker), *arguments],
                               capture_output=True, text=True)
@@ -124,15 +131,11 @@ class Symbols(CheckerTest):
     def setUp(self):
         super().setUp()
         self.exports = self.write("exports.txt", "# all\nExported::Ask(char const*)\n")
-        self.imports = self.write("imports.txt", "platform_call\n")
+        self.list_imports("platform_call")
         self.runtime = str(HERE / "runtime.txt")
 
-    def build(self, source):
-        library = str(self.root / "library.so")
-        compiler = os.environ.get("CXX", "c++")
-        subprocess.run([compiler, "-shared", "-fPIC", "-fvisibility=hidden", "-o", library,
-                        self.write("library.cpp", source)], check=True)
-        return library
+    def list_imports(self, symbols):
+        self.imports = self.write("imports.txt", f"[all]\nsoname = liball.so.1\nsymbols = {symbols}\n")
 
     def check_lists(self, source):
         return self.run_checker("check_symbols.py", self.build(source), "--exports", self.exports,
@@ -162,7 +165,7 @@ class Symbols(CheckerTest):
         self.assert_fails(self.check_lists(source), "imported but not in the list: more")
 
     def test_MissingPlatformCallFails(self):
-        self.write("imports.txt", "platform_call\nother_call\n")
+        self.list_imports("platform_call other_call")
         self.assert_fails(self.check_lists(LIBRARY_SOURCE),
                           "in the list but not imported: other_call")
 
@@ -180,7 +183,7 @@ class Symbols(CheckerTest):
         names = ("CoreSystem::CoreSystem()", "CoreSystem::~CoreSystem()", "vtable for CoreSystem",
                  "typeinfo for CoreSystem", "typeinfo name for CoreSystem")
         self.write("exports.txt", "\n".join(names))
-        self.write("imports.txt", "")
+        self.list_imports("")
         result = self.check_lists(source)
         for name in names:
             self.assert_fails(result, f"must never be exported: {name}")
@@ -200,6 +203,112 @@ class Symbols(CheckerTest):
 
     def test_NoVirtualTableAtAllFails(self):
         self.assert_fails(self.check_vtable("int nothing;"), "was not found")
+
+    def check_device(self, *options):
+        return self.run_checker("check_symbols.py",
+                                self.build(LIBRARY_SOURCE, "-Wl,-z,now", "-nostdlib", *options),
+                                "--imports", self.imports, "--device", "--strings", "old")
+
+    def platform_library(self, soname):
+        path = str(self.root / soname)
+        source = self.write("platform.c", "int platform_call(const char* key) { return !key; }")
+        subprocess.run(["cc", "-shared", "-fPIC", f"-Wl,-soname,{soname}", "-o", path, source],
+                       check=True)
+        return path
+
+    def test_LibraryOfTheWrongNameFails(self):
+        other = self.platform_library("libother.so.1")
+        self.assert_fails(self.check_device("-Wl,--no-as-needed", other), "asked of the loader but not in the list: libother.so.1")
+
+    def test_LibraryThatNobodyAsksForFails(self):
+        self.assert_fails(self.check_device(), "in the list but not asked of the loader: liball.so.1")
+
+    def test_PlaceOfItsOwnFails(self):
+        for option in ("--enable-new-dtags", "--disable-new-dtags"):
+            self.assert_fails(self.check_device(f"-Wl,{option},-rpath,/here"),
+                              "looks for libraries in a place of its own: /here")
+
+    def test_LateBindingFails(self):
+        self.assert_fails(self.check_device("-Wl,-z,lazy"), "not everything is bound at start")
+
+    def test_NewRuntimeFails(self):
+        source = "#include <string>\nvoid user(std::string& text) { text.append(\"a\"); }\n"
+        self.assert_fails(self.run_checker("check_symbols.py", self.build(source), "--device",
+                                           "--strings", "old", "--imports", self.imports),
+                          "too new for a device: _ZNSt7__cxx11")
+
+
+INTERFACE_SOURCE = """
+#include <string>
+#define API __attribute__((visibility("default")))
+class Listener {
+public:
+    virtual void OnFirst(int state) = 0;
+    virtual void OnSecond(bool enabled) = 0;
+    virtual ~Listener() {}
+};
+class Library {
+public:
+    API static Library* GetInstance();
+    API bool IsEnough(double megabytes);
+    API void SetListener(Listener* listener);
+private:
+    int count_ = 0;
+};
+Library* Library::GetInstance() { static Library instance; return &instance; }
+bool Library::IsEnough(double megabytes) { return megabytes > ++count_; }
+void Library::SetListener(Listener* listener) { listener->OnSecond(true); }
+"""
+
+
+class Baseline(CheckerTest):
+    """An interface that was changed in one place, against the one before."""
+
+    def setUp(self):
+        super().setUp()
+        self.baseline = str(self.root / "library.abi")
+        self.assert_passes(self.check("", "", "--refresh"))
+
+    def check(self, before, after, *options):
+        self.assertIn(before, INTERFACE_SOURCE)
+        library = self.build(INTERFACE_SOURCE.replace(before, after), "-g")
+        return self.run_checker("check_baseline.py", library, self.baseline, *options)
+
+    def assert_told(self, result, *messages):
+        for message in messages + ("--refresh", ):
+            self.assert_fails(result, message)
+
+    def test_SameInterfacePasses(self):
+        self.assert_passes(self.check("", ""))
+
+    def test_ChangeInsidePasses(self):
+        self.assert_passes(self.check("megabytes > ++count_", "megabytes > 1 + count_"))
+
+    def test_RecordedBaselineHoldsNoFolder(self):
+        self.assertNotIn(str(self.root), pathlib.Path(self.baseline).read_text())
+
+    def test_RemovedMethodIsNamed(self):
+        self.assert_told(self.check("API bool IsEnough", "bool IsEnough"),
+                         "Removed function", "Library::IsEnough(double)")
+
+    def test_ChangedParameterIsNamed(self):
+        self.assert_told(self.check("IsEnough(double megabytes)", "IsEnough(float megabytes)"),
+                         "Library::IsEnough(double)", "Library::IsEnough(float)")
+
+
+    def test_NewVirtualFunctionOfTheListenerIsNamed(self):
+        self.assert_told(self.check("virtual void OnSecond", "virtual void OnNew() = 0;\n"
+                                    "    virtual void OnSecond"),
+                         "Listener::OnNew()", "vtable")
+
+    def test_OtherOrderOfTheListenerIsNamed(self):
+        first, second = "virtual void OnFirst(int state) = 0;", "virtual void OnSecond(bool enabled) = 0;"
+        self.assert_told(self.check(f"{first}\n    {second}", f"{second}\n    {first}"),
+                         "Listener::OnFirst(int)", "vtable")
+
+    def test_GrownClassIsNamed(self):
+        self.assert_told(self.check("int count_ = 0;", "int count_ = 0; int more_ = 0;"),
+                         "type size changed")
 
 
 if __name__ == "__main__":

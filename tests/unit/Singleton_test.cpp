@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // The access pattern that all singleton classes share.
-#include <future>
 #include <thread>
 #include <type_traits>
 
 #include "support/PlatformTest.h"
+#include "support/Together.h"
 
 using namespace fake;
 using testing::Each;
@@ -200,21 +200,10 @@ TYPED_TEST(SingletonTest, DestructorIsSilent)
 TYPED_TEST(SingletonTest, ManyThreadsGetOneInstanceConstructedOnce)
 {
     const int THREADS = 8;
-    std::promise<void> start;
-    const std::shared_future<void> started = start.get_future().share();
-    std::vector<std::future<TypeParam*>> answers;
-    for (int i = 0; i < THREADS; ++i)
-        answers.push_back(std::async(std::launch::async, [started] {
-            started.wait();
-            return TypeParam::GetInstance();
-        }));
-    start.set_value();
-
-    std::vector<TypeParam*> instances;
-    for (auto& answer : answers)
-        instances.push_back(answer.get());
-    ASSERT_NE(instances.front(), nullptr);
-    EXPECT_THAT(instances, Each(instances.front()));
+    TypeParam* instances[THREADS] = {};
+    together(THREADS, [&instances](int number) { instances[number] = TypeParam::GetInstance(); });
+    ASSERT_NE(instances[0], nullptr);
+    EXPECT_THAT(instances, Each(instances[0]));
 
     const Texts trace = platform().trace();
     const auto times = [&trace](const std::string& text) {
