@@ -3,6 +3,7 @@
 
     man_pages_test.py COMMAND [unittest arguments]
 """
+import json
 import re
 import shutil
 import subprocess
@@ -70,6 +71,53 @@ class TheCommandsPage(unittest.TestCase):
         there = {option for options in self.help.values() for option in options}
         named = {"-" + word for word in words_of("Fl", page("coresystem.1")) if word[0] == "-"}
         self.assertEqual(named, there)
+
+
+def names_in(schema):
+    """The names that a schema knows, without the types."""
+    if isinstance(schema, dict):
+        for key, value in schema.items():
+            yield from value if key == "enum" else names_in(value)
+    elif isinstance(schema, list):
+        for value in schema:
+            yield from names_in(value)
+
+
+class TheDeviceFilesPage(unittest.TestCase):
+    def setUp(self):
+        schema = json.loads((TREE / "docs/device-file.schema.json").read_text("utf-8"))
+        self.schema = {name: section.get("items", section)
+                       for name, section in schema["properties"].items() if name != "schema"}
+        parts = re.split(r"^\.Ss \[+(\w+)\]+\n", page("coresystem-device.5"), flags=re.MULTILINE)
+        self.page = dict(zip(parts[1::2], (re.split(r"^\.S[sh] ", part, flags=re.MULTILINE)[0]
+                                           for part in parts[2::2])))
+
+    def keys_of(self, section):
+        items = re.findall(r"^\.It Ic (.*)", self.page[section], re.MULTILINE)
+        return {word for item in items for word in re.findall(r"[^ ,]+", item)}
+
+    def test_names_every_section(self):
+        self.assertEqual(set(self.page), set(self.schema))
+
+    def test_names_every_key(self):
+        for section, schema in self.schema.items():
+            if section != "fault":
+                self.assertEqual(self.keys_of(section), set(schema.get("properties", {})), section)
+
+    def test_names_every_name(self):
+        for section, schema in self.schema.items():
+            if section != "fault":
+                named = {word.strip(",") for word in words_of("Cm", self.page[section])}
+                self.assertEqual(named - {"null"}, set(names_in(schema)), section)
+
+    def test_names_every_family_of_calls(self):
+        named = [re.escape(word).replace(r"\.\.\.", r"\w+") for word in
+                 re.findall(r"[^ ,]+", " ".join(words_of("Li", self.page["fault"])))]
+        calls = self.schema["fault"]["properties"]
+        for call in calls:
+            self.assertRegex(call, f"^({'|'.join(named)})$")
+        tables = [way for way in calls["telephony_init"]["anyOf"] if "properties" in way]
+        self.assertEqual(self.keys_of("fault"), set(tables[0]["properties"]))
 
 
 class TheLibrarysPage(unittest.TestCase):
