@@ -6,6 +6,7 @@
 #include <functional>
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 #include <CLI/CLI.hpp>
 
@@ -36,6 +37,9 @@ struct Invocation {
 /// Ends a command's help with its own remarks and those that hold for every command.
 void setFooter(CLI::App& command, const std::string& remarks);
 
+/// The names of the commands below one.
+std::vector<std::string> namesOfCommands(const CLI::App& command);
+
 void addInfoCommands(CLI::App& app, Invocation& invocation);
 void addCountryCommand(CLI::App& app, Invocation& invocation);
 void addSimCommand(CLI::App& app, Invocation& invocation);
@@ -44,6 +48,7 @@ void addStorageCommand(CLI::App& app, Invocation& invocation);
 void addWatchCommand(CLI::App& app, Invocation& invocation);
 void addLogCommands(CLI::App& app, Invocation& invocation);
 void addDoctorCommand(CLI::App& app, Invocation& invocation);
+void addDeviceCommands(CLI::App& app, Invocation& invocation);
 
 } // namespace cli
 

@@ -10,6 +10,7 @@
 #include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
+#include "common/Closest.h"
 
 namespace cli {
 namespace {
@@ -82,7 +83,7 @@ void checkFactName(const std::string& name)
     const std::vector<std::string> names = factNames();
     if (std::find(names.begin(), names.end(), name) == names.end())
         throw UsageError("no fact is called " + quoted(name) + "; did you mean \"" +
-                         closest(name, names) + "\"? The facts are " + listed(names));
+                         port::closest(name, names) + "\"? The facts are " + listed(names));
 }
 
 ExitCode reportMissing(const Fact& fact)

@@ -6,7 +6,6 @@
 #include <cstdio>
 #include <cwchar>
 #include <cwctype>
-#include <numeric>
 
 namespace {
 
@@ -83,22 +82,6 @@ std::string joined(const std::vector<std::string>& row, const std::vector<std::s
     return line;
 }
 
-// Levenshtein distance.
-std::size_t editsBetween(const std::string& from, const std::string& to)
-{
-    std::vector<std::size_t> row(to.size() + 1);
-    std::iota(row.begin(), row.end(), std::size_t{0});
-    for (std::size_t i = 0; i < from.size(); ++i) {
-        std::size_t diagonal = row[0]++;
-        for (std::size_t j = 0; j < to.size(); ++j) {
-            const std::size_t replaced = diagonal + (from[i] == to[j] ? 0 : 1);
-            diagonal = row[j + 1];
-            row[j + 1] = std::min({replaced, diagonal + 1, row[j] + 1});
-        }
-    }
-    return row.back();
-}
-
 } // namespace
 
 void cli::useUtf8()
@@ -144,12 +127,4 @@ std::string cli::aligned(const Rows& rows, const std::string& indent)
     for (const auto& row : shown)
         text += indent + joined(row, widths) + "\n";
     return text;
-}
-
-std::string cli::closest(const std::string& word, const std::vector<std::string>& candidates)
-{
-    return *std::min_element(candidates.begin(), candidates.end(),
-                             [&](const std::string& left, const std::string& right) {
-                                 return editsBetween(word, left) < editsBetween(word, right);
-                             });
 }

@@ -24,9 +24,6 @@ std::string listed(const std::vector<std::string>& words);
 using Rows = std::vector<std::vector<std::string>>;
 std::string aligned(const Rows& rows, const std::string& indent = "  ");
 
-/// The candidate that takes the fewest edits to make from the word.
-std::string closest(const std::string& word, const std::vector<std::string>& candidates);
-
 } // namespace cli
 
 #endif

@@ -9,6 +9,7 @@
 #include "Session.h"
 #include "Terminal.h"
 #include "Text.h"
+#include "common/Closest.h"
 
 namespace cli {
 namespace {
@@ -27,6 +28,7 @@ const char* const FOOTER = R"(Examples:
   coresystem country 340                 what the library makes of a country key
   coresystem log decipher --key key <log read a debug trace
   coresystem doctor                      what the answers rest on
+  coresystem device list                 the simulated devices there are
 
 Exit codes:
   0 success   1 failure, or less storage   2 usage error   3 fact not available
@@ -55,6 +57,7 @@ struct Program {
         addWatchCommand(app, invocation);
         addLogCommands(app, invocation);
         addDoctorCommand(app, invocation);
+        addDeviceCommands(app, invocation);
         app.footer(FOOTER);
     }
 };
@@ -65,17 +68,24 @@ ExitCode reportUsage(const std::string& text)
     return USAGE;
 }
 
+// The innermost command that was given.
+const CLI::App& chosenCommand(const CLI::App& app)
+{
+    const std::vector<CLI::App*> chosen = app.get_subcommands();
+    return chosen.empty() ? app : chosenCommand(*chosen.front());
+}
+
 ExitCode reportExtras(const CLI::App& app)
 {
     const std::vector<std::string> extras = app.remaining(true);
     const std::string word = extras.empty() ? "" : extras.front();
-    if (!app.get_subcommands().empty() || word.rfind('-', 0) == 0)
+    const CLI::App& chosen = chosenCommand(app);
+    const std::vector<std::string> names = namesOfCommands(chosen);
+    if (names.empty() || word.rfind('-', 0) == 0)
         return reportUsage("unexpected argument " + quoted(word));
-    std::vector<std::string> names;
-    for (const CLI::App* const command : app.get_subcommands({}))
-        names.push_back(command->get_name());
-    return reportUsage("no command is called " + quoted(word) + "; did you mean \"" +
-                       closest(word, names) + "\"? The commands are " + listed(names));
+    const std::string kind = &chosen == &app ? "" : chosen.get_name() + " ";
+    return reportUsage("no " + kind + "command is called " + quoted(word) + "; did you mean \"" +
+                       port::closest(word, names) + "\"? The commands are " + listed(names));
 }
 
 ExitCode execute(const Program& program)
@@ -129,6 +139,14 @@ ExitCode reportOutputFailure(int error)
 }
 
 } // namespace
+
+std::vector<std::string> namesOfCommands(const CLI::App& command)
+{
+    std::vector<std::string> names;
+    for (const CLI::App* const below : command.get_subcommands({}))
+        names.push_back(below->get_name());
+    return names;
+}
 
 void setFooter(CLI::App& command, const std::string& remarks)
 {

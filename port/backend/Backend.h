@@ -57,7 +57,8 @@ public:
 /// names a device file (not in a set-user-ID process), else this machine's services.
 Backend& backend();
 
-/// The two backends there are; defined in linux/ and simulator/.
+/// The two backends there are; defined in linux/ and simulator/. A device file is named as
+/// CORESYSTEM_DEVICE names it.
 std::unique_ptr<Backend> makeLinuxBackend();
 std::unique_ptr<Backend> makeSimulatorBackend(const std::string& deviceFile);
 

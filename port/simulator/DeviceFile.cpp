@@ -6,12 +6,12 @@
 #include <optional>
 #include <set>
 #include <sstream>
+#include <tuple>
 
-#include <dlog.h>
 #include <gio/gio.h>
 #include <toml++/toml.h>
 
-#include "../backend/Log.h"
+#include "../common/Closest.h"
 #include "../common/RegularFile.h"
 
 namespace port::simulator {
@@ -20,17 +20,6 @@ namespace {
 constexpr long SCHEMA = 1;
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024;
 constexpr std::size_t LINE_LIMIT = 1024;
-
-struct Problem {
-    toml::source_region where;
-    std::string text;
-};
-
-std::string describe(const std::string& path, const Problem& problem)
-{
-    return path + ":" + std::to_string(problem.where.begin.line) + ":" +
-           std::to_string(problem.where.begin.column) + ": " + problem.text;
-}
 
 // In quotes and on one line, whatever it holds.
 std::string quoted(std::string_view name)
@@ -41,13 +30,11 @@ std::string quoted(std::string_view name)
     return stream.str();
 }
 
-void checkSchema(const toml::table& root)
+// What to add to a message about a name that is none of the known ones.
+std::string hint(std::string_view name, const std::vector<std::string>& known)
 {
-    const toml::node* const schema = root.get("schema");
-    if (schema == nullptr)
-        throw Problem{{{1, 1}, {1, 1}, {}}, "schema = 1 is missing"};
-    if (schema->value_exact<std::int64_t>() != SCHEMA)
-        throw Problem{schema->source(), "this version reads schema = 1 only"};
+    const std::string meant = similar(std::string(name), known);
+    return meant.empty() ? "" : "; did you mean " + quoted(meant) + "?";
 }
 
 using Content = decltype(Value::content);
@@ -85,6 +72,22 @@ bool isWithin(const Type& type, std::int64_t number)
 bool isLongEnough(const Type& type, const std::string& text)
 {
     return static_cast<std::int64_t>(text.size()) >= type.least;
+}
+
+std::vector<std::string> sectionNames()
+{
+    std::vector<std::string> names;
+    for (const SectionRow* row = beginSections(); row != endSections(); ++row)
+        names.emplace_back(row->name);
+    return names;
+}
+
+std::vector<std::string> namesOf(const Type& type)
+{
+    std::vector<std::string> names;
+    for (const Name& row : type.names)
+        names.emplace_back(row.name);
+    return names;
 }
 
 // "one of" that a person may write, in the order of the schema.
@@ -187,12 +190,12 @@ std::optional<Content> readNode(const Type& type, const toml::node& node)
     return std::nullopt;
 }
 
-// Reads the tables of a file into a device.
+// Reads the tables of a file into a device, past every mistake.
 class Reader {
 public:
     explicit Reader(const std::string& path) : path_(path) {}
 
-    Device read(const toml::table& root)
+    Reading read(const toml::table& root)
     {
         checkSchema(root);
         for (const SectionRow* row = beginSections(); row != endSections(); ++row)
@@ -201,10 +204,31 @@ public:
         for (const auto& [key, node] : root)
             if (key != "schema")
                 readSection(key, node);
-        return std::move(device_);
+        std::stable_sort(problems_.begin(), problems_.end(), standsBefore);
+        return {std::move(device_), std::move(problems_)};
     }
 
 private:
+    // Tables are sorted by their keys, people read by lines.
+    static bool standsBefore(const Problem& left, const Problem& right)
+    {
+        return std::tie(left.line, left.column) < std::tie(right.line, right.column);
+    }
+
+    void refuse(const toml::source_region& where, std::string text)
+    {
+        problems_.push_back({where.begin.line, where.begin.column, std::move(text)});
+    }
+
+    void checkSchema(const toml::table& root)
+    {
+        const toml::node* const schema = root.get("schema");
+        if (schema == nullptr)
+            problems_.push_back({1, 1, "schema = 1 is missing"});
+        else if (schema->value_exact<std::int64_t>() != SCHEMA)
+            refuse(schema->source(), "this version reads schema = 1 only");
+    }
+
     static std::string titleOf(const SectionRow& row)
     {
         const std::string name(row.name);
@@ -220,13 +244,11 @@ private:
     {
         const SectionRow* const row = findSection(name.str());
         if (row == nullptr)
-            throw Problem{name.source(), "unknown key " + quoted(name)};
-        if (row->form == Form::List) {
-            readList(*row, node);
-            return;
-        }
+            return refuse(name.source(), "unknown key " + quoted(name) + hint(name, sectionNames()));
+        if (row->form == Form::List)
+            return readList(*row, node);
         if (!node.is_table())
-            throw Problem{node.source(), titleOf(*row) + " must be a section"};
+            return refuse(node.source(), titleOf(*row) + " must be a section");
         Section section(titleOf(*row), sourceOf(node));
         readKeys(*row, *node.as_table(), section);
         device_.sections.find(row->name)->second = std::move(section);
@@ -236,10 +258,12 @@ private:
     {
         const toml::array* const list = node.as_array();
         if (list == nullptr)
-            throw Problem{node.source(), titleOf(row) + " must be a list of sections"};
+            return refuse(node.source(), titleOf(row) + " must be a list of sections");
         for (const toml::node& element : *list) {
-            if (!element.is_table())
-                throw Problem{element.source(), titleOf(row) + " must be a list of sections"};
+            if (!element.is_table()) {
+                refuse(element.source(), titleOf(row) + " must be a list of sections");
+                continue;
+            }
             Section section(titleOf(row), sourceOf(element));
             readKeys(row, *element.as_table(), section);
             completeSlot(section, *element.as_table());
@@ -252,14 +276,14 @@ private:
     {
         // An IMSI has 15 digits at most (ITU E.212).
         if (lengthOf(slot, "mnc") == 3 && lengthOf(slot, "msin") > 9)
-            throw Problem{table.get("msin")->source(),
-                          "\"msin\" must be 1 to 9 digits in quotes after an mnc of three"};
+            refuse(table.get("msin")->source(),
+                   "\"msin\" must be 1 to 9 digits in quotes after an mnc of three");
         if (slot.find("cp_name") == nullptr)
             slot.set("cp_name", {"cp" + std::to_string(device_.slots.size()), slot.source()});
         const auto* const written = table.get("cp_name");
         if (!modems_.insert(slot.get<std::string>("cp_name").value().value).second)
-            throw Problem{(written != nullptr ? *written : table).source(),
-                          "every slot must have another cp_name"};
+            refuse((written != nullptr ? *written : table).source(),
+                   "every slot must have another cp_name");
     }
 
     static std::size_t lengthOf(const Section& section, const char* key)
@@ -271,87 +295,127 @@ private:
     void readKeys(const SectionRow& row, const toml::table& table, Section& section)
     {
         for (const auto& [key, node] : table)
-            section.set(std::string(key.str()), readValue(row, key, node));
+            if (std::optional<Value> value = readValue(row, key, node))
+                section.set(std::string(key.str()), std::move(*value));
     }
 
-    Value readValue(const SectionRow& row, const toml::key& key, const toml::node& node)
+    std::optional<Value> readValue(const SectionRow& row, const toml::key& key,
+                                   const toml::node& node)
     {
         const Type* const type = findKey(row, key.str());
+        std::optional<Content> content;
         if (type == nullptr)
-            throw Problem{key.source(), "unknown key " + quoted(key) + " in " + titleOf(row)};
-        if (isFault(*type) && node.is_table())
-            return {readFaultTable(*type, key, *node.as_table()), sourceOf(node)};
-        return {readContent(*type, key, node), sourceOf(node)};
+            refuse(key.source(), "unknown key " + quoted(key) + " in " + titleOf(row) +
+                                     hint(key, keyNames(row)));
+        else if (isFault(*type) && node.is_table())
+            content = readFaultTable(*type, key, *node.as_table());
+        else
+            content = readContent(*type, key, node);
+        if (!content)
+            return std::nullopt;
+        return Value{std::move(*content), sourceOf(node)};
     }
 
-    static Content readContent(const Type& type, const toml::key& key, const toml::node& node)
+    std::optional<Content> readContent(const Type& type, const toml::key& key,
+                                       const toml::node& node)
     {
         std::optional<Content> content = readNode(type, node);
+        const auto* const text = content ? std::get_if<std::string>(&*content) : nullptr;
         if (!content)
-            throw Problem{node.source(), quoted(key) + " must be " + expected(type)};
-        const auto* const text = std::get_if<std::string>(&*content);
-        if (text != nullptr && text->find('\0') != std::string::npos)
-            throw Problem{node.source(), quoted(key) + " must not hold a NUL"};
-        return std::move(*content);
+            refuse(node.source(), quoted(key) + " must be " + expected(type) +
+                                      hint(node.value_or(std::string()), namesOf(type)));
+        else if (text != nullptr && text->find('\0') != std::string::npos)
+            refuse(node.source(), quoted(key) + " must not hold a NUL");
+        else
+            return content;
+        return std::nullopt;
     }
 
-    static Fault readFaultTable(const Type& type, const toml::key& name, const toml::table& table)
+    std::optional<Content> readFaultTable(const Type& type, const toml::key& name,
+                                          const toml::table& table)
     {
         Fault fault;
+        const std::size_t before = problems_.size();
         for (const auto& [key, node] : table)
             readFaultKey(type, key, node, fault);
-        if (fault.error.empty() && fault.delayMs == 0)
-            throw Problem{table.source(), quoted(name) + " must have an error or a delay_ms"};
-        return fault;
+        if (problems_.size() == before && fault.error.empty() && fault.delayMs == 0)
+            refuse(table.source(), quoted(name) + " must have an error or a delay_ms");
+        return problems_.size() == before ? std::optional<Content>(fault) : std::nullopt;
     }
 
-    static void readFaultKey(const Type& type, const toml::key& key, const toml::node& node,
-                             Fault& fault)
+    void readFaultKey(const Type& type, const toml::key& key, const toml::node& node, Fault& fault)
     {
         const Type* const own = key == "error" ? &type : findFaultKey(key.str());
         if (own == nullptr)
-            throw Problem{key.source(), "unknown key " + quoted(key) +
-                                            " in a fault, which has error, delay_ms and call"};
-        const Content content = readContent(*own, key, node);
-        if (const auto* const read = std::get_if<Fault>(&content)) {
+            return refuse(key.source(), "unknown key " + quoted(key) +
+                                            " in a fault, which has error, delay_ms and call");
+        const std::optional<Content> content = readContent(*own, key, node);
+        if (!content)
+            return;
+        if (const auto* const read = std::get_if<Fault>(&*content)) {
             fault.error = read->error;
             fault.value = read->value;
         } else {
-            (key == "call" ? fault.call : fault.delayMs) = std::get<std::int64_t>(content);
+            (key == "call" ? fault.call : fault.delayMs) = std::get<std::int64_t>(*content);
         }
     }
 
     const std::string& path_;
     Device device_;
+    std::vector<Problem> problems_;
     std::set<std::string> modems_;
 };
 
 // Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the
 // line (and on nested values, TOML_MAX_NESTED_VALUES) keeps that from using up the stack.
-void checkLines(const std::string& text)
+std::vector<Problem> findLongLines(const std::string& text)
 {
-    toml::source_index line = 1;
+    std::vector<Problem> problems;
+    std::size_t line = 1;
     for (std::size_t begin = 0, end = 0; begin < text.size(); begin = end + 1, ++line) {
         end = std::min(text.find('\n', begin), text.size());
         if (end - begin > LINE_LIMIT)
-            throw Problem{{{line, 1}, {line, 1}, {}},
-                          "a line longer than " + std::to_string(LINE_LIMIT) + " bytes"};
+            problems.push_back(
+                {line, 1, "a line longer than " + std::to_string(LINE_LIMIT) + " bytes"});
     }
+    return problems;
 }
 
 } // namespace
 
+std::string describe(const std::string& path, const Problem& problem)
+{
+    return path + ":" + std::to_string(problem.line) + ":" + std::to_string(problem.column) + ": " +
+           problem.text;
+}
+
+Reading readDevice(const std::string& text, const std::string& path)
+{
+    if (std::vector<Problem> problems = findLongLines(text); !problems.empty())
+        return {{}, std::move(problems)};
+    try {
+        return Reader(path).read(toml::parse(text, path));
+    } catch (const toml::parse_error& error) {
+        const toml::source_position where = error.source().begin;
+        return {{}, {{where.line, where.column, std::string(error.description())}}};
+    }
+}
+
 Result<Device> parseDevice(const std::string& text, const std::string& path)
 {
-    try {
-        checkLines(text);
-        const toml::table root = toml::parse(text, path);
-        return Reader(path).read(root);
-    } catch (const toml::parse_error& error) {
-        return notAvailable(describe(path, {error.source(), std::string(error.description())}));
-    } catch (const Problem& problem) {
-        return notAvailable(describe(path, problem));
-    }
+    Reading reading = readDevice(text, path);
+    if (!reading.problems.empty())
+        return notAvailable(describe(path, reading.problems.front()));
+    return std::move(reading.device);
+}
+
+Result<std::string> readDeviceText(const std::string& path)
+{
+    std::string text;
+    std::string problem;
+    if (!readRegularFile(path, SIZE_LIMIT, text, problem))
+        return notAvailable(path + ": " + problem);
+    return text;
 }
 
 Result<std::shared_ptr<const Device>> DeviceFile::device()
@@ -363,17 +427,16 @@ Result<std::shared_ptr<const Device>> DeviceFile::device()
 
 Result<std::shared_ptr<const Device>> DeviceFile::read()
 {
-    std::string text;
-    std::string problem;
-    if (!readRegularFile(path_, SIZE_LIMIT, text, problem))
-        return notAvailable(path_ + ": " + problem);
+    const Result<std::string> text = readDeviceText(path_);
+    if (!text)
+        return notAvailable(text.error().reason + elsewhere_);
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (parsed_ == nullptr || parsedText_ != text) {
-        const Result<Device> fresh = parseDevice(text, path_);
+    if (parsed_ == nullptr || parsedText_ != text.value()) {
+        const Result<Device> fresh = parseDevice(text.value(), path_);
         if (!fresh)
             return fresh.error();
         parsed_ = std::make_shared<const Device>(fresh.value());
-        parsedText_ = text;
+        parsedText_ = text.value();
     }
     return parsed_;
 }
@@ -386,8 +449,8 @@ void DeviceFile::report(const std::string& problem)
             return;
         reported_ = problem;
     }
-    if (!problem.empty())
-        processLog().write(DLOG_ERROR, "coresystem-port", problem);
+    if (!problem.empty() && onProblem_)
+        onProblem_(problem);
 }
 
 } // namespace port::simulator

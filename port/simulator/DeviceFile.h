@@ -3,23 +3,52 @@
 #ifndef PORT_SIMULATOR_DEVICE_FILE_H
 #define PORT_SIMULATOR_DEVICE_FILE_H
 
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
+#include <vector>
 
 #include "../backend/Result.h"
 #include "Device.h"
 
 namespace port::simulator {
 
-/// Parses the text of a device file; `path` is for messages only. The error's reason is
+/// A mistake in a device file; lines and columns (of characters) are counted from 1.
+struct Problem {
+    std::size_t line;
+    std::size_t column;
+    std::string text;
+};
+
 /// FILE:LINE:COLUMN: text.
+std::string describe(const std::string& path, const Problem& problem);
+
+/// What the text of a device file says, and every mistake in it, in the order of the text. What is
+/// no TOML has one: the first.
+struct Reading {
+    Device device; // only of use without a problem
+    std::vector<Problem> problems;
+};
+Reading readDevice(const std::string& text, const std::string& path);
+
+/// The same with the first mistake only, as describe() tells it. `path` is for messages only.
 Result<Device> parseDevice(const std::string& text, const std::string& path);
+
+/// The text of a device file; the error's reason is PATH: what the matter is.
+Result<std::string> readDeviceText(const std::string& path);
 
 /// Reads a device file afresh whenever it is asked. Any thread.
 class DeviceFile {
 public:
-    explicit DeviceFile(std::string path) : path_(std::move(path)) {}
+    /// `onProblem` is told of a problem with the file: once, and again only when the problem
+    /// changes or goes away and comes back. `elsewhere` goes on the message of a file that cannot
+    /// be read.
+    explicit DeviceFile(std::string path, std::function<void(const std::string&)> onProblem = {},
+                        std::string elsewhere = {})
+        : path_(std::move(path)), onProblem_(std::move(onProblem)), elsewhere_(std::move(elsewhere))
+    {
+    }
 
     const std::string& path() const
     {
@@ -27,8 +56,7 @@ public:
     }
 
     /// The device as the file describes it now; the file is parsed again only when its text
-    /// changed. A problem with the file is also written to the log, so that an application learns
-    /// of it: one line, and no other until the problem changes or goes away.
+    /// changed.
     Result<std::shared_ptr<const Device>> device();
 
     /// What a function of the device tells.
@@ -53,10 +81,12 @@ private:
     void report(const std::string& problem);
 
     const std::string path_;
+    const std::function<void(const std::string&)> onProblem_;
+    const std::string elsewhere_;
     std::mutex mutex_;
     std::string parsedText_;
     std::shared_ptr<const Device> parsed_;
-    std::string reported_; // the problem that the log was told last; empty when there is none
+    std::string reported_; // the problem that was told last; empty when there is none
 };
 
 } // namespace port::simulator

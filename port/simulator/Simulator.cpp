@@ -1,10 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 // A device described in a TOML file.
+#include <dlog.h>
+
 #include "../backend/Backend.h"
+#include "../backend/Log.h"
 #include "Clock.h"
 #include "Configuration.h"
 #include "DeviceFile.h"
 #include "DeviceInfo.h"
+#include "DeviceSearch.h"
 #include "Faults.h"
 #include "Network.h"
 #include "Packages.h"
@@ -17,9 +21,18 @@ namespace {
 
 using coresystem_port::Service;
 
+// The log is where an application learns of a mistake in the file.
+void logProblem(const std::string& problem)
+{
+    processLog().write(DLOG_ERROR, "coresystem-port", problem);
+}
+
 class SimulatorBackend : public Backend {
 public:
-    explicit SimulatorBackend(const std::string& path) : file_(path) {}
+    explicit SimulatorBackend(const FoundDevice& device)
+        : file_(device.path, logProblem, device.elsewhere)
+    {
+    }
 
     std::string name() const override
     {
@@ -97,5 +110,5 @@ private:
 
 std::unique_ptr<port::Backend> port::makeSimulatorBackend(const std::string& deviceFile)
 {
-    return std::make_unique<simulator::SimulatorBackend>(deviceFile);
+    return std::make_unique<simulator::SimulatorBackend>(simulator::findDevice(deviceFile));
 }

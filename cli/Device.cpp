@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem device`: looks at device files and changes them.
+#include <cstdlib>
+
+#include "DeviceCommands.h"
+#include "Text.h"
+#include "simulator/DeviceSearch.h"
+
+std::string cli::chosenDevice()
+{
+    const char* const name = secure_getenv("CORESYSTEM_DEVICE"); // --device has set it
+    if (name == nullptr || *name == '\0')
+        throw UsageError("no device is chosen; --device FILE or CORESYSTEM_DEVICE names one");
+    return name;
+}
+
+cli::DeviceText cli::readDevice(const std::string& name)
+{
+    const auto [path, elsewhere] = port::simulator::findDevice(name);
+    const auto text = port::simulator::readDeviceText(path);
+    if (!text)
+        return {path, "", text.error().reason + elsewhere};
+    return {path, text.value(), ""};
+}
+
+std::vector<std::string> cli::problemsOf(const DeviceText& device)
+{
+    if (!device.problem.empty())
+        return {device.problem};
+    std::vector<std::string> lines;
+    for (const auto& problem : port::simulator::readDevice(device.text, device.path).problems)
+        lines.push_back(describe(device.path, problem));
+    return lines;
+}
+
+void cli::addDeviceCommands(CLI::App& app, Invocation& invocation)
+{
+    CLI::App* const device = app.add_subcommand("device", "Look at device files and change them");
+    setFooter(*device, "Examples: coresystem device list\n"
+                       "          coresystem device check phone.toml");
+    device->require_subcommand(0, 1);
+    addDeviceListCommand(*device, invocation);
+    addDeviceCheckCommand(*device, invocation);
+    device->callback([device] {
+        if (device->get_subcommands().empty())
+            throw UsageError("device takes a command: " + listed(namesOfCommands(*device)));
+    });
+}
