@@ -4,6 +4,8 @@
 #include <set>
 
 #include "Facts.h"
+#include "simulator/DeviceSearch.h"
+#include "simulator/Schema.h"
 
 namespace cli {
 namespace {
@@ -16,8 +18,38 @@ struct Values {
     std::vector<std::string> (*list)();
 };
 
+std::vector<std::string> deviceNames()
+{
+    std::vector<std::string> names;
+    for (const auto& device : port::simulator::listDevices())
+        names.push_back(device.name);
+    return names;
+}
+
+// "settings.flight_mode"; of slots the first one's, and no section with keys of any name.
+std::vector<std::string> devicePaths()
+{
+    using namespace port::simulator;
+    std::vector<std::string> paths;
+    for (const SectionRow* row = beginSections(); row != endSections(); ++row)
+        for (const std::string& key : keyNames(*row))
+            paths.push_back(std::string(row->name) + (row->form == Form::List ? "[0]." : ".") + key);
+    return paths;
+}
+
+std::vector<std::string> deviceAssignments()
+{
+    std::vector<std::string> paths = devicePaths();
+    for (std::string& path : paths)
+        path += "=";
+    return paths;
+}
+
 const Values VALUES[] = {
     {"FACT", factNames},
+    {"DEVICE", deviceNames},
+    {"PATH", devicePaths},
+    {"PATH=VALUE", deviceAssignments},
 };
 
 // Where the last word stands.
@@ -98,7 +130,7 @@ public:
             if (label == values.label)
                 for (const std::string& word : values.list())
                     add(word);
-        if (label == "FILE")
+        if (label == "FILE" || label == "DEVICE")
             text_ += FILES;
     }
 

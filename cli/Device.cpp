@@ -16,7 +16,8 @@ std::string cli::chosenDevice()
 
 cli::DeviceText cli::readDevice(const std::string& name)
 {
-    const auto [path, elsewhere] = port::simulator::findDevice(name);
+    const auto [path, elsewhere] =
+        port::simulator::findDevice(name.empty() ? chosenDevice() : name);
     const auto text = port::simulator::readDeviceText(path);
     if (!text)
         return {path, "", text.error().reason + elsewhere};
@@ -37,10 +38,14 @@ void cli::addDeviceCommands(CLI::App& app, Invocation& invocation)
 {
     CLI::App* const device = app.add_subcommand("device", "Look at device files and change them");
     setFooter(*device, "Examples: coresystem device list\n"
-                       "          coresystem device check phone.toml");
+                       "          coresystem device check phone.toml\n"
+                       "          coresystem device set settings.flight_mode=true "
+                       "--device phone.toml");
     device->require_subcommand(0, 1);
     addDeviceListCommand(*device, invocation);
     addDeviceCheckCommand(*device, invocation);
+    addDeviceShowCommand(*device, invocation);
+    addDeviceEditCommands(*device, invocation);
     device->callback([device] {
         if (device->get_subcommands().empty())
             throw UsageError("device takes a command: " + listed(namesOfCommands(*device)));

@@ -30,7 +30,7 @@ void cli::addDeviceCheckCommand(CLI::App& device, Invocation& invocation)
 {
     CLI::App* const check = device.add_subcommand("check", "Print every mistake in device files");
     const auto names = std::make_shared<std::vector<std::string>>();
-    check->add_option("FILE", *names, "The device files, as --device takes them")->required();
+    check->add_option("DEVICE", *names, "The devices, as --device takes them")->required();
     setFooter(*check, "Example: coresystem device check phone.toml\n"
                       "Each mistake is one line, FILE:LINE:COLUMN: what is wrong.\n"
                       "Exit code 1: there is a mistake, or a file cannot be read.");

@@ -12,6 +12,8 @@ namespace cli {
 
 void addDeviceListCommand(CLI::App& device, Invocation& invocation);
 void addDeviceCheckCommand(CLI::App& device, Invocation& invocation);
+void addDeviceShowCommand(CLI::App& device, Invocation& invocation);
+void addDeviceEditCommands(CLI::App& device, Invocation& invocation);
 
 /// The name of the device that --device or CORESYSTEM_DEVICE chooses; throws UsageError when there
 /// is none.
@@ -24,7 +26,7 @@ struct DeviceText {
     std::string problem;
 };
 
-/// Looks for a device as --device does and reads its file.
+/// Looks for a device as --device does and reads its file; an empty name is the chosen device's.
 DeviceText readDevice(const std::string& name);
 
 /// Every problem of a device, as lines for people; none when it is good.

@@ -11,6 +11,7 @@
 void cli::prepareStandardStreams()
 {
     std::signal(SIGPIPE, SIG_IGN);
+    std::signal(SIGXFSZ, SIG_IGN);
     for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
         // Opened the wrong way round, so that using the stream still fails.
         const int mode = stream == STDIN_FILENO ? O_WRONLY : O_RDONLY;

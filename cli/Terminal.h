@@ -13,7 +13,7 @@ struct OutputFailed {
 };
 
 /// Makes sure that no file or socket opened later takes the number of a closed standard stream,
-/// and that a reader who went away is an error, not a signal.
+/// and that a reader who went away or a file that grew too large is an error, not a signal.
 void prepareStandardStreams();
 
 /// Writes a text to standard output at once; throws OutputFailed.

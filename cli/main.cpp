@@ -44,7 +44,7 @@ struct Program {
         app.set_version_flag("--version", VERSION_TEXT, "Print the version and exit");
         device = app.add_option("--device", invocation.deviceFile,
                                 "Ask a simulated device (overrides CORESYSTEM_DEVICE)");
-        device->type_name("FILE");
+        device->type_name("DEVICE");
         app.add_flag("-v,--verbose", invocation.verbose,
                      "Show the library's log lines and the backend on standard error");
         app.fallthrough(); // options of every command may also stand behind it; inherited

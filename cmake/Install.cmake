@@ -29,6 +29,10 @@ endforeach()
 install(FILES ${PROJECT_SOURCE_DIR}/docs/device-file.schema.json
         DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem)
 
+# Simulated devices that --device and CORESYSTEM_DEVICE know by name.
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/devices DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem
+        FILES_MATCHING PATTERN "*.toml")
+
 # The service that tells the serial number, its rights on the system bus, and who starts it.
 install(TARGETS deviced DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
 set(deviced_dir ${PROJECT_SOURCE_DIR}/port/deviced)

@@ -8,30 +8,17 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "Descriptor.h"
+
 namespace {
 
-class Descriptor {
-public:
-    explicit Descriptor(const std::string& path)
-        : number(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY))
-    {
-    }
-    ~Descriptor()
-    {
-        if (number >= 0)
-            close(number);
-    }
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-
-    const int number;
-};
+using port::Descriptor;
 
 // Why the file is not one to read; empty when it is.
 std::string refusal(const Descriptor& file)
 {
     struct stat status = {};
-    if (file.number < 0 || fstat(file.number, &status) != 0)
+    if (file.number() < 0 || fstat(file.number(), &status) != 0)
         return std::strerror(errno);
     if (S_ISDIR(status.st_mode))
         return std::strerror(EISDIR);
@@ -45,7 +32,7 @@ bool readUpTo(const Descriptor& file, std::size_t limit, std::string& content)
     char block[4096];
     ssize_t step = 1;
     while (step > 0 && content.size() <= limit) {
-        step = read(file.number, block, sizeof block);
+        step = read(file.number(), block, sizeof block);
         content.append(block, step > 0 ? static_cast<std::size_t>(step) : 0);
     }
     return step >= 0;
@@ -56,7 +43,7 @@ bool readUpTo(const Descriptor& file, std::size_t limit, std::string& content)
 bool port::readRegularFile(const std::string& path, std::size_t limit, std::string& content,
                            std::string& problem)
 {
-    const Descriptor file(path);
+    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     problem = refusal(file);
     if (problem.empty() && !readUpTo(file, limit, content))
         problem = std::strerror(errno);

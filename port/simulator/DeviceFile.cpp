@@ -18,8 +18,6 @@ namespace port::simulator {
 namespace {
 
 constexpr long SCHEMA = 1;
-constexpr std::size_t SIZE_LIMIT = 1024 * 1024;
-constexpr std::size_t LINE_LIMIT = 1024;
 
 // In quotes and on one line, whatever it holds.
 std::string quoted(std::string_view name)
@@ -205,7 +203,7 @@ public:
             if (key != "schema")
                 readSection(key, node);
         std::stable_sort(problems_.begin(), problems_.end(), standsBefore);
-        return {std::move(device_), std::move(problems_)};
+        return {std::move(device_), std::move(problems_), true};
     }
 
 private:
@@ -392,12 +390,12 @@ std::string describe(const std::string& path, const Problem& problem)
 Reading readDevice(const std::string& text, const std::string& path)
 {
     if (std::vector<Problem> problems = findLongLines(text); !problems.empty())
-        return {{}, std::move(problems)};
+        return {{}, std::move(problems), false};
     try {
         return Reader(path).read(toml::parse(text, path));
     } catch (const toml::parse_error& error) {
         const toml::source_position where = error.source().begin;
-        return {{}, {{where.line, where.column, std::string(error.description())}}};
+        return {{}, {{where.line, where.column, std::string(error.description())}}, false};
     }
 }
 

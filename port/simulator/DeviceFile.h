@@ -14,6 +14,9 @@
 
 namespace port::simulator {
 
+constexpr std::size_t SIZE_LIMIT = 1024 * 1024; // of a file, in bytes
+constexpr std::size_t LINE_LIMIT = 1024;        // of one line
+
 /// A mistake in a device file; lines and columns (of characters) are counted from 1.
 struct Problem {
     std::size_t line;
@@ -29,6 +32,7 @@ std::string describe(const std::string& path, const Problem& problem);
 struct Reading {
     Device device; // only of use without a problem
     std::vector<Problem> problems;
+    bool isToml = false;
 };
 Reading readDevice(const std::string& text, const std::string& path);
 

@@ -259,12 +259,13 @@ TEST_F(SimulatorSchemaTest, BusOfAProgramMayBeMissing)
 
 TEST_F(SimulatorSchemaTest, FaultHasANameOfItsOwnInterface)
 {
-    EXPECT_EQ(":3:1: unknown key \"telephony_inti\" in [fault]",
+    EXPECT_EQ(":3:1: unknown key \"telephony_inti\" in [fault]; did you mean \"telephony_init\"?",
               refusal("[fault]", "telephony_inti = 'TELEPHONY_ERROR_PERMISSION_DENIED'"));
     EXPECT_EQ(":3:19: \"wifi_initialize\" must be one of \"WIFI_ERROR_INVALID_PARAMETER\", "
               "\"WIFI_ERROR_OUT_OF_MEMORY\", \"WIFI_ERROR_INVALID_OPERATION\", "
               "\"WIFI_ERROR_OPERATION_FAILED\", \"WIFI_ERROR_PERMISSION_DENIED\", "
-              "\"WIFI_ERROR_NOT_SUPPORTED\"",
+              "\"WIFI_ERROR_NOT_SUPPORTED\"; did you mean "
+              "\"WIFI_ERROR_PERMISSION_DENIED\"?",
               refusal("[fault]", "wifi_initialize = 'TELEPHONY_ERROR_PERMISSION_DENIED'"));
     EXPECT_EQ(":3:26: \"error\" must be one of \"DLOG_ERROR_NOT_PERMITTED\", "
               "\"DLOG_ERROR_INVALID_PARAMETER\"",

@@ -1,0 +1,109 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem device get`, `set` and `unset`: single values of a device file.
+#include <optional>
+
+#include "DeviceCommands.h"
+#include "Terminal.h"
+#include "Text.h"
+#include "common/ChangeFile.h"
+#include "simulator/DevicePath.h"
+#include "simulator/DeviceSearch.h"
+#include "simulator/DeviceText.h"
+
+namespace cli {
+namespace {
+
+using port::simulator::Change;
+
+const char* const PATHS = "A path is settings.flight_mode, slot[0].sim, fault.telephony_init or "
+                          "packages.org.example.app.";
+
+ExitCode reportFailure(const std::string& reason)
+{
+    complain(printable(reason));
+    return FAILURE;
+}
+
+ExitCode runGet(const std::string& path)
+{
+    const DeviceText device = readDevice("");
+    if (!device.problem.empty())
+        return reportFailure(device.problem);
+    const auto value = port::simulator::getValue(device.text, device.path, path);
+    if (!value)
+        return reportFailure(value.error().reason);
+    writeOut(printable(value.value()) + "\n");
+    return SUCCESS;
+}
+
+// PATH=VALUE; a path may hold a "=" in quotes.
+Change assignmentOf(const std::string& argument)
+{
+    for (std::size_t at = 0; (at = argument.find('=', at)) != std::string::npos; ++at)
+        if (const std::string path = argument.substr(0, at); port::simulator::parsePath(path))
+            return {path, argument.substr(at + 1)};
+    throw UsageError(quoted(argument) + " is no PATH=VALUE. " + PATHS);
+}
+
+Change removalOf(const std::string& path)
+{
+    if (!port::simulator::parsePath(path))
+        throw UsageError(quoted(path) + " is no path. " + PATHS);
+    return {path, std::nullopt};
+}
+
+ExitCode runChange(const std::vector<Change>& changes)
+{
+    const auto [path, elsewhere] = port::simulator::findDevice(chosenDevice());
+    const std::string problem = port::changeFile(
+        path, port::simulator::SIZE_LIMIT, [&, file = path](std::string& content) -> std::string {
+            const auto changed = port::simulator::changeText(content, file, changes);
+            if (!changed)
+                return changed.error().reason;
+            content = changed.value();
+            return {};
+        });
+    return problem.empty() ? SUCCESS : reportFailure(problem + elsewhere);
+}
+
+void addGet(CLI::App& device, Invocation& invocation)
+{
+    CLI::App* const get = device.add_subcommand("get", "Print one value of the device file");
+    const auto path = std::make_shared<std::string>();
+    get->add_option("PATH", *path, "The value")->required();
+    setFooter(*get, std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
+                        PATHS + "\nExit code 1: the file does not have it.");
+    get->callback([&invocation, path] { invocation.command = [path] { return runGet(*path); }; });
+}
+
+// A command that changes values, each of which an argument tells.
+void addChange(CLI::App& device, Invocation& invocation, const char* name, const char* argument,
+               Change (*changeOf)(const std::string&), const char* description, const char* remarks)
+{
+    CLI::App* const command = device.add_subcommand(name, description);
+    const auto arguments = std::make_shared<std::vector<std::string>>();
+    command->add_option(argument, *arguments, "The values")->required();
+    setFooter(*command, std::string(remarks) + PATHS +
+                            "\nAll changes are made at once, or none. Exit code 1: none was.");
+    command->callback([&invocation, arguments, changeOf] {
+        std::vector<Change> changes;
+        for (const std::string& text : *arguments)
+            changes.push_back(changeOf(text));
+        invocation.command = [changes] { return runChange(changes); };
+    });
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addDeviceEditCommands(CLI::App& device, Invocation& invocation)
+{
+    addGet(device, invocation);
+    addChange(device, invocation, "set", "PATH=VALUE", assignmentOf,
+              "Change values of the device file",
+              "Example: coresystem device set settings.flight_mode=true network.wifi=deactivated "
+              "--device phone.toml\n");
+    addChange(device, invocation, "unset", "PATH", removalOf,
+              "Remove values from the device file",
+              "Example: coresystem device unset slot[0].number --device phone.toml\n");
+}

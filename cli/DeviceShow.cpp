@@ -1,0 +1,111 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem device show`: the values of a device file, each with its line.
+#include <algorithm>
+#include <iterator>
+
+#include "DeviceCommands.h"
+#include "Session.h"
+#include "Sims.h"
+#include "Terminal.h"
+#include "Text.h"
+#include "simulator/DeviceText.h"
+
+namespace cli {
+namespace {
+
+using port::simulator::Entry;
+
+// What is of a person or of one device only.
+bool isIdentity(const Entry& entry)
+{
+    const char* const names[] = {"msin", "number", "imei", "serial"};
+    const std::string name = entry.key.substr(entry.key.rfind('.') + 1);
+    return std::any_of(std::begin(names), std::end(names), [&](const std::string& identity) {
+        return name == identity || name == identity + '"';
+    });
+}
+
+Json valueOf(const Entry& entry, bool reveal)
+{
+    const Json value = std::visit([](const auto& content) { return Json(content); }, entry.value);
+    return isIdentity(entry) && !reveal ? masked(value) : value;
+}
+
+std::string shown(const Json& value)
+{
+    return value.is_string() ? value.get<std::string>() : value.dump();
+}
+
+std::string sourceOf(const DeviceText& device, const Entry& entry)
+{
+    return device.path + ":" + std::to_string(entry.line);
+}
+
+std::string showText(const DeviceText& device, const std::vector<Entry>& entries, bool reveal)
+{
+    std::string text;
+    for (auto first = entries.begin(); first != entries.end();) {
+        const auto behind = std::find_if(first, entries.end(), [&](const Entry& entry) {
+            return entry.section != first->section;
+        });
+        Rows rows;
+        std::transform(first, behind, std::back_inserter(rows), [&](const Entry& entry) {
+            return std::vector<std::string>{entry.key, shown(valueOf(entry, reveal)),
+                                            sourceOf(device, entry)};
+        });
+        if (!first->section.empty()) // the schema's number is none of the device's values
+            text += (text.empty() ? "" : "\n") + heading("[" + first->section + "]") + "\n" +
+                    aligned(rows);
+        first = behind;
+    }
+    const bool hides = !reveal && std::any_of(entries.begin(), entries.end(), isIdentity);
+    return text + (hides ? "\nWhat identifies the subscriber is masked; --reveal shows it.\n" : "");
+}
+
+std::string showJson(const DeviceText& device, const std::vector<Entry>& entries, bool reveal)
+{
+    Json json = {{"schema", 1}, {"device_file", device.path}, {"masked", !reveal}};
+    for (const char* const part : {"values", "sources"})
+        json[part] = Json::object();
+    for (const Entry& entry : entries) {
+        if (entry.section.empty())
+            continue;
+        json["values"][entry.path()] = valueOf(entry, reveal);
+        json["sources"][entry.path()] = sourceOf(device, entry);
+    }
+    return jsonText(json);
+}
+
+ExitCode runShow(const Invocation& invocation, const std::string& name, bool reveal)
+{
+    const DeviceText device = readDevice(name);
+    const std::vector<std::string> problems = problemsOf(device);
+    for (const std::string& problem : problems)
+        writeErrorLine(printable(problem));
+    if (!problems.empty())
+        return BAD_DEVICE_FILE;
+    const auto entries = port::simulator::listEntries(device.text, device.path);
+    writeOut((invocation.json ? showJson : showText)(device, entries.value(), reveal));
+    return SUCCESS;
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addDeviceShowCommand(CLI::App& device, Invocation& invocation)
+{
+    CLI::App* const show =
+        device.add_subcommand("show", "Print the values of a device file, each with its line");
+    const auto name = std::make_shared<std::string>();
+    const auto reveal = std::make_shared<bool>(false);
+    show->add_option("DEVICE", *name, "The device (default: that of --device)");
+    show->add_flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
+    show->add_flag("--json", invocation.json, "Print one JSON object");
+    setFooter(*show, "Example: coresystem device show phone.toml\n"
+                     "Exit code 4: the file has mistakes; they are on standard error.");
+    show->callback([&invocation, name, reveal] {
+        invocation.command = [&invocation, name, reveal] {
+            return runShow(invocation, *name, *reveal);
+        };
+    });
+}

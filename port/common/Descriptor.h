@@ -1,0 +1,40 @@
+// SPDX-License-Identifier: Apache-2.0
+// A file descriptor that is closed with its owner.
+#ifndef PORT_COMMON_DESCRIPTOR_H
+#define PORT_COMMON_DESCRIPTOR_H
+
+#include <utility>
+
+#include <unistd.h>
+
+namespace port {
+
+class Descriptor {
+public:
+    Descriptor() = default;
+    /// Takes it over; a negative number is none.
+    explicit Descriptor(int number) : number_(number) {}
+    Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+    Descriptor& operator=(Descriptor&& other) noexcept
+    {
+        std::swap(number_, other.number_);
+        return *this;
+    }
+    ~Descriptor()
+    {
+        if (number_ >= 0)
+            close(number_);
+    }
+
+    int number() const
+    {
+        return number_;
+    }
+
+private:
+    int number_ = -1;
+};
+
+} // namespace port
+
+#endif

@@ -1,0 +1,186 @@
+// SPDX-License-Identifier: Apache-2.0
+// How files that others read are changed.
+#include <csignal>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+#include <gmock/gmock.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "common/ChangeFile.h"
+#include "support/Child.h"
+#include "support/TemporaryTree.h"
+
+using testing::AllOf;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr std::size_t LIMIT = 1 << 20;
+
+class ChangeFileTest : public testing::Test {
+protected:
+    // Why a line could not be added; empty when it was.
+    std::string addLine(const std::string& line) const
+    {
+        return addLineTo(path, line);
+    }
+    static std::string addLineTo(const std::string& file, const std::string& line)
+    {
+        return port::changeFile(file, LIMIT, [&](std::string& content) {
+            content += line + "\n";
+            return std::string();
+        });
+    }
+
+    std::string content() const
+    {
+        std::ostringstream text;
+        text << std::ifstream(path).rdbuf();
+        return text.str();
+    }
+
+    // What lies in the folder: a file left behind would be told.
+    std::vector<std::string> names() const
+    {
+        std::vector<std::string> found;
+        for (const auto& entry : fs::directory_iterator(tree.root()))
+            found.push_back(entry.path().filename());
+        return found;
+    }
+
+    struct stat status() const
+    {
+        struct stat found = {};
+        stat(path.c_str(), &found);
+        return found;
+    }
+
+    const TemporaryTree tree;
+    const std::string path = tree.write("/file", "first\n");
+};
+
+TEST_F(ChangeFileTest, NewContentTakesTheOldOnesPlaceWithItsMode)
+{
+    ASSERT_EQ(0, chmod(path.c_str(), 0640));
+    const struct stat before = status();
+    EXPECT_EQ("", addLine("second"));
+    EXPECT_EQ("first\nsecond\n", content());
+    EXPECT_NE(before.st_ino, status().st_ino);
+    EXPECT_EQ(before.st_mode, status().st_mode);
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, OwnerIsKeptWhereThatIsPermitted)
+{
+    if (chown(path.c_str(), 12345, 54321) != 0)
+        GTEST_SKIP() << "only root gives files away";
+    EXPECT_EQ("", addLine("second"));
+    EXPECT_EQ(12345U, status().st_uid);
+    EXPECT_EQ(54321U, status().st_gid);
+}
+
+TEST_F(ChangeFileTest, UnchangedContentIsNotWritten)
+{
+    const ino_t before = status().st_ino;
+    EXPECT_EQ("", port::changeFile(path, LIMIT, [](std::string&) { return std::string(); }));
+    EXPECT_EQ(before, status().st_ino);
+}
+
+TEST_F(ChangeFileTest, RefusalLeavesTheFile)
+{
+    EXPECT_EQ("no", port::changeFile(path, LIMIT, [](std::string& text) {
+                  text = "other";
+                  return std::string("no");
+              }));
+    EXPECT_EQ("first\n", content());
+    EXPECT_THAT(addLineTo(tree.path("/none"), "x"), HasSubstr("No such file or directory"));
+    EXPECT_THAT(addLineTo(tree.root(), "x"), HasSubstr("Is a directory"));
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, LinkGoesOnLeadingToTheFile)
+{
+    const TemporaryTree links;
+    fs::create_symlink(path, links.path("/link"));
+    EXPECT_EQ("", addLineTo(links.path("/link"), "second"));
+    EXPECT_TRUE(fs::is_symlink(links.path("/link")));
+    EXPECT_EQ("first\nsecond\n", content());
+}
+
+TEST_F(ChangeFileTest, ReadOnlyFileIsRefusedWhereTheFolderIsNot)
+{
+    ASSERT_EQ(0, chmod(path.c_str(), 0444));
+    EXPECT_THAT(addLine("second"), HasSubstr("Permission denied"));
+    EXPECT_EQ("first\n", content());
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, ReadOnlyFolderIsAnError)
+{
+    ASSERT_EQ(0, chmod(path.c_str(), 0666));
+    ASSERT_EQ(0, chmod(tree.root().c_str(), 0555));
+    EXPECT_THAT(inChild([this] {
+                    const bool isPlainUser = geteuid() != 0 || setuid(65534) == 0;
+                    return isPlainUser ? addLine("second") : "root stays root";
+                }),
+                HasSubstr("Permission denied"));
+    ASSERT_EQ(0, chmod(tree.root().c_str(), 0755));
+    EXPECT_EQ("first\n", content());
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, FullDiskLeavesTheOldFileWhole)
+{
+    EXPECT_THAT(inChild([this] {
+                    const rlimit tiny = {3, 3};
+                    std::signal(SIGXFSZ, SIG_IGN);
+                    return setrlimit(RLIMIT_FSIZE, &tiny) == 0 ? addLine("second") : "no limit";
+                }),
+                HasSubstr("File too large"));
+    EXPECT_EQ("first\n", content());
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, ManyWritersLoseNothing)
+{
+    constexpr int WRITERS = 12;
+    constexpr int LINES = 20;
+    std::vector<pid_t> children;
+    for (int writer = 0; writer < WRITERS; ++writer) {
+        const pid_t child = fork();
+        if (child == 0) {
+            bool good = true;
+            for (int line = 0; line < LINES; ++line)
+                good = addLine(std::to_string(writer) + "." + std::to_string(line)).empty() && good;
+            _exit(good ? 0 : 1);
+        }
+        children.push_back(child);
+    }
+    for (const pid_t child : children) {
+        int result = -1;
+        EXPECT_EQ(child, waitpid(child, &result, 0));
+        EXPECT_EQ(0, result);
+    }
+    std::istringstream lines(content());
+    std::vector<int> next(WRITERS);
+    std::string line;
+    std::getline(lines, line);
+    EXPECT_EQ("first", line);
+    int count = 0;
+    for (; std::getline(lines, line); ++count) {
+        const int writer = std::stoi(line);
+        EXPECT_EQ(std::to_string(writer) + "." + std::to_string(next.at(writer)++), line);
+    }
+    EXPECT_EQ(WRITERS * LINES, count);
+    EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+} // namespace

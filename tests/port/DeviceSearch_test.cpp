@@ -1,0 +1,133 @@
+// SPDX-License-Identifier: Apache-2.0
+// Where a device is found by its name.
+#include <cstdlib>
+#include <filesystem>
+
+#include <gmock/gmock.h>
+#include <unistd.h>
+
+#include "simulator/DeviceSearch.h"
+#include "support/Child.h"
+#include "support/TemporaryTree.h"
+
+using port::simulator::findDevice;
+using testing::AllOf;
+using testing::EndsWith;
+using testing::HasSubstr;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr const char* SHIPPED = "tablet"; // one of those in devices/
+
+// A user's home, and the folder that the user is in.
+class DeviceSearchTest : public testing::Test {
+protected:
+    void own(const std::string& name) const
+    {
+        tree.write("/config/coresystem/devices/" + name, "schema = 1\n");
+    }
+    void here(const std::string& name) const
+    {
+        tree.write("/here/" + name, "schema = 1\n");
+    }
+
+    // What is answered there: the path, or the path and where else it was looked for.
+    std::string found(const std::string& name, const std::string& config = "/config") const
+    {
+        return inChild([&] {
+            fs::create_directories(tree.path("/here"));
+            fs::current_path(tree.path("/here"));
+            setenv("HOME", tree.path("/home").c_str(), 1);
+            config.empty() ? unsetenv("XDG_CONFIG_HOME")
+                           : setenv("XDG_CONFIG_HOME", tree.path(config).c_str(), 1);
+            const auto device = findDevice(name);
+            return device.path + device.elsewhere;
+        });
+    }
+
+    std::string ownPath(const std::string& name) const
+    {
+        return tree.path("/config/coresystem/devices/" + name);
+    }
+
+    const TemporaryTree tree;
+};
+
+TEST_F(DeviceSearchTest, SlashMeansAPath)
+{
+    own("phone");
+    EXPECT_EQ("./phone", found("./phone"));
+    EXPECT_EQ("/nowhere/phone", found("/nowhere/phone"));
+}
+
+TEST_F(DeviceSearchTest, NameIsLookedForWithAndWithoutItsEnding)
+{
+    own("phone.toml");
+    EXPECT_EQ(ownPath("phone.toml"), found("phone"));
+    EXPECT_EQ(ownPath("phone.toml"), found("phone.toml"));
+    own("phone");
+    EXPECT_EQ(ownPath("phone"), found("phone"));
+}
+
+TEST_F(DeviceSearchTest, OwnDevicesHideShippedOnes)
+{
+    EXPECT_THAT(found(SHIPPED), EndsWith("/share/coresystem/devices/tablet.toml"));
+    own("tablet.toml");
+    EXPECT_EQ(ownPath("tablet.toml"), found(SHIPPED));
+}
+
+TEST_F(DeviceSearchTest, NameOfAFileMeansTheOneHereFirst)
+{
+    here("tablet.toml");
+    here("tablet");
+    EXPECT_EQ("tablet.toml", found("tablet.toml"));
+    EXPECT_THAT(found("tablet"), EndsWith("/share/coresystem/devices/tablet.toml"));
+}
+
+TEST_F(DeviceSearchTest, AnyFileHereIsTheLastResort)
+{
+    here("odd");
+    EXPECT_EQ("odd", found("odd"));
+    own("odd.toml");
+    EXPECT_EQ(ownPath("odd.toml"), found("odd"));
+    fs::create_directories(tree.path("/here/folder"));
+    EXPECT_THAT(found("folder"), HasSubstr(", here or in "));
+}
+
+TEST_F(DeviceSearchTest, ConfigurationFolderIsTheHomesByDefault)
+{
+    tree.write("/home/.config/coresystem/devices/mine.toml", "schema = 1\n");
+    EXPECT_EQ(tree.path("/home/.config/coresystem/devices/mine.toml"), found("mine", ""));
+}
+
+TEST_F(DeviceSearchTest, MissingDeviceNamesThePlacesAndTheNearestOne)
+{
+    const std::string places = "talbet, here or in " + tree.path("/config/coresystem/devices") +
+                               " or in ";
+    EXPECT_THAT(found("talbet"), AllOf(HasSubstr(places), EndsWith("; did you mean \"tablet\"?")));
+    EXPECT_THAT(found("tablte.toml"), EndsWith("; did you mean \"tablet\"?"));
+    EXPECT_THAT(found("qqqqqqqq"), testing::Not(HasSubstr("did you mean")));
+}
+
+TEST_F(DeviceSearchTest, ListHasEveryNameOnce)
+{
+    own("tablet.toml");
+    own("mine.toml");
+    own("no_device.txt");
+    const std::string list = inChild([&] {
+        setenv("XDG_CONFIG_HOME", tree.path("/config").c_str(), 1);
+        std::string all;
+        for (const auto& device : port::simulator::listDevices())
+            all += device.name + (device.isShipped ? " shipped\n" : " " + device.path + "\n");
+        return all;
+    });
+    EXPECT_THAT(list, HasSubstr("mine " + ownPath("mine.toml") + "\n"));
+    EXPECT_THAT(list, HasSubstr("tablet " + ownPath("tablet.toml") + "\n"));
+    EXPECT_THAT(list, testing::Not(HasSubstr("tablet shipped")));
+    EXPECT_THAT(list, testing::Not(HasSubstr("no_device")));
+    EXPECT_THAT(list, HasSubstr(" shipped\n"));
+}
+
+} // namespace
