@@ -33,7 +33,8 @@ std::vector<std::string> devicePaths()
     std::vector<std::string> paths;
     for (const SectionRow* row = beginSections(); row != endSections(); ++row)
         for (const std::string& key : keyNames(*row))
-            paths.push_back(std::string(row->name) + (row->form == Form::List ? "[0]." : ".") + key);
+            paths.push_back(std::string(row->name) + (row->form == Form::List ? "[0]." : ".") +
+                            key);
     return paths;
 }
 

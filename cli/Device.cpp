@@ -10,7 +10,7 @@ std::string cli::chosenDevice()
 {
     const char* const name = secure_getenv("CORESYSTEM_DEVICE"); // --device has set it
     if (name == nullptr || *name == '\0')
-        throw UsageError("no device is chosen; --device FILE or CORESYSTEM_DEVICE names one");
+        throw UsageError("no device is chosen; --device or CORESYSTEM_DEVICE names one");
     return name;
 }
 

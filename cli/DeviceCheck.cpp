@@ -34,5 +34,6 @@ void cli::addDeviceCheckCommand(CLI::App& device, Invocation& invocation)
     setFooter(*check, "Example: coresystem device check phone.toml\n"
                       "Each mistake is one line, FILE:LINE:COLUMN: what is wrong.\n"
                       "Exit code 1: there is a mistake, or a file cannot be read.");
-    check->callback([&invocation, names] { invocation.command = [names] { return runCheck(*names); }; });
+    check->callback(
+        [&invocation, names] { invocation.command = [names] { return runCheck(*names); }; });
 }

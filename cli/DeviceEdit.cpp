@@ -71,8 +71,9 @@ void addGet(CLI::App& device, Invocation& invocation)
     CLI::App* const get = device.add_subcommand("get", "Print one value of the device file");
     const auto path = std::make_shared<std::string>();
     get->add_option("PATH", *path, "The value")->required();
-    setFooter(*get, std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
-                        PATHS + "\nExit code 1: the file does not have it.");
+    setFooter(*get,
+              std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
+                  PATHS + "\nExit code 1: the file does not have it.");
     get->callback([&invocation, path] { invocation.command = [path] { return runGet(*path); }; });
 }
 
@@ -103,7 +104,6 @@ void cli::addDeviceEditCommands(CLI::App& device, Invocation& invocation)
               "Change values of the device file",
               "Example: coresystem device set settings.flight_mode=true network.wifi=deactivated "
               "--device phone.toml\n");
-    addChange(device, invocation, "unset", "PATH", removalOf,
-              "Remove values from the device file",
+    addChange(device, invocation, "unset", "PATH", removalOf, "Remove values from the device file",
               "Example: coresystem device unset slot[0].number --device phone.toml\n");
 }

@@ -89,7 +89,8 @@ void checkWritable(const LockedFile& file)
 class Successor {
 public:
     explicit Successor(const std::string& path)
-        : name_(fs::path(path).parent_path() / ("." + fs::path(path).filename().string() + ".XXXXXX")),
+        : name_(fs::path(path).parent_path() /
+                ("." + fs::path(path).filename().string() + ".XXXXXX")),
           file_(mkostemp(name_.data(), O_CLOEXEC))
     {
         must(file_.number() >= 0);

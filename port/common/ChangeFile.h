@@ -14,9 +14,9 @@ namespace port {
 /// `limit` bytes) and makes it the new one, or tells why not; then, as after any other failure, the
 /// file stays as it is. An unchanged content is not written.
 ///
-/// Who comes through here takes turns, whatever process it is in. The file's mode is kept, its owner
-/// where that is permitted; a symbolic link goes on leading to the file. A file that may not be
-/// written is refused, even where its folder would permit it.
+/// Who comes through here takes turns, whatever process it is in. The file's mode is kept, its
+/// owner where that is permitted; a symbolic link goes on leading to the file. A file that may not
+/// be written is refused, even where its folder would permit it.
 ///
 /// The reason for people when it failed, else empty.
 std::string changeFile(const std::string& path, std::size_t limit,

@@ -242,7 +242,8 @@ private:
     {
         const SectionRow* const row = findSection(name.str());
         if (row == nullptr)
-            return refuse(name.source(), "unknown key " + quoted(name) + hint(name, sectionNames()));
+            return refuse(name.source(),
+                          "unknown key " + quoted(name) + hint(name, sectionNames()));
         if (row->form == Form::List)
             return readList(*row, node);
         if (!node.is_table())
@@ -303,8 +304,8 @@ private:
         const Type* const type = findKey(row, key.str());
         std::optional<Content> content;
         if (type == nullptr)
-            refuse(key.source(), "unknown key " + quoted(key) + " in " + titleOf(row) +
-                                     hint(key, keyNames(row)));
+            refuse(key.source(),
+                   "unknown key " + quoted(key) + " in " + titleOf(row) + hint(key, keyNames(row)));
         else if (isFault(*type) && node.is_table())
             content = readFaultTable(*type, key, *node.as_table());
         else

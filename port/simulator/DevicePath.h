@@ -14,8 +14,9 @@ namespace port::simulator {
 /// The names on the way from the file to a value; an index in a list is its number.
 using DevicePath = std::vector<std::string>;
 
-/// Reads settings.flight_mode, slot[0].sim (or slot.0.sim) and packages."org.example.app". A section
-/// with keys of any name takes all that follows for one, so that the quotes may be left out.
+/// Reads settings.flight_mode, slot[0].sim (or slot.0.sim) and packages."org.example.app". A
+/// section with keys of any name takes all that follows for one, so that the quotes may be left
+/// out.
 Result<DevicePath> parsePath(const std::string& text);
 
 /// The number of an index; nothing when it is none.

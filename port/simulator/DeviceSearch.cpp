@@ -49,7 +49,8 @@ fs::path ownFile()
     return fs::read_symlink("/proc/self/exe", error); // a program knows no path of itself
 }
 
-// Found from the place of the library, so that an installed tree can be moved. Empty when not there.
+// Found from the place of the library, so that an installed tree can be moved. Empty when not
+// there.
 fs::path shippedFolder()
 {
     fs::path above = ownFile().parent_path();
@@ -106,7 +107,8 @@ std::string placesOf(const std::string& name)
     return places + (meant.empty() ? "" : "; did you mean \"" + meant + "\"?");
 }
 
-void addDevices(const fs::path& folder, bool areShipped, std::map<std::string, NamedDevice>& devices)
+void addDevices(const fs::path& folder, bool areShipped,
+                std::map<std::string, NamedDevice>& devices)
 {
     std::error_code error;
     for (auto entry = fs::directory_iterator(folder, error); entry != fs::directory_iterator();

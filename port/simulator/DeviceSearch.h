@@ -9,16 +9,17 @@
 namespace port::simulator {
 
 struct FoundDevice {
-    std::string path;      // the name itself when no file was found
-    std::string elsewhere; // goes on "NAME: No such file or directory": where else it was looked for
+    std::string path; // the name itself when no file was found
+    std::string
+        elsewhere; // goes on "NAME: No such file or directory": where else it was looked for
 };
 
 /// The file that a user's name of a device means.
 ///
-/// With a slash it is a path. Otherwise NAME or NAME.toml is looked for among the user's own devices,
-/// $XDG_CONFIG_HOME/coresystem/devices (by default in ~/.config), then among those that are installed
-/// with the library. The current folder comes first when the name says that it is a file's, by ending
-/// in ".toml", and last when it does not.
+/// With a slash it is a path. Otherwise NAME or NAME.toml is looked for among the user's own
+/// devices, $XDG_CONFIG_HOME/coresystem/devices (by default in ~/.config), then among those that
+/// are installed with the library. The current folder comes first when the name says that it is a
+/// file's, by ending in ".toml", and last when it does not.
 FoundDevice findDevice(const std::string& name);
 
 struct NamedDevice {

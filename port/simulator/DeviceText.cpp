@@ -157,7 +157,8 @@ std::string shownPath(const DevicePath& path)
     const bool hasIndex = isInList(path);
     std::string shown = writtenKey(path.front());
     for (std::size_t i = 1; i < path.size(); ++i)
-        shown = hasIndex && i == 1 ? shown + "[" + path[i] + "]" : below(shown, writtenKey(path[i]));
+        shown =
+            hasIndex && i == 1 ? shown + "[" + path[i] + "]" : below(shown, writtenKey(path[i]));
     return shown;
 }
 
@@ -183,9 +184,7 @@ public:
     {
         if (!value_ && !isThere())
             return notAvailable("it is not there");
-        const Text changed = !value_     ? removed()
-                             : isThere() ? replaced()
-                                         : added();
+        const Text changed = !value_ ? removed() : isThere() ? replaced() : added();
         if (!changed || isRight(changed.value()))
             return changed;
         return notAvailable("the file is written in a way that this cannot be done in; edit it by "
@@ -311,12 +310,15 @@ Text setValue(const std::string& text, const std::string& file, const DevicePath
               const std::string& value)
 {
     const std::string old(Edit(text, path, value).old());
-    Text best = Edit(text, path, inQuotesLike(old, value)).make();
+    const std::string inQuotes = inQuotesLike(old, value);
+    if (toml::parse("v=" + inQuotes)["v"].value<std::string>() != value)
+        return notAvailable("the value is no UTF-8");
+    Text best = Edit(text, path, inQuotes).make();
     if (!best || !isValue(value))
         return best;
     Text plain = Edit(text, path, value).make();
-    const bool isBetter = plain && mistakesOf(plain.value(), file).size() <
-                                       mistakesOf(best.value(), file).size();
+    const bool isBetter =
+        plain && mistakesOf(plain.value(), file).size() < mistakesOf(best.value(), file).size();
     return isBetter ? plain : best;
 }
 
@@ -341,8 +343,9 @@ std::vector<std::string> knownPaths(const DevicePath& like)
         for (const std::string& key : keyNames(*row)) {
             const std::string section(row->name);
             const bool isList = row->form == Form::List;
-            paths.push_back((isList ? section + "[" + (like.size() > 2 ? like[1] : "0") + "]" : section) +
-                            "." + key);
+            paths.push_back(
+                (isList ? section + "[" + (like.size() > 2 ? like[1] : "0") + "]" : section) + "." +
+                key);
         }
     return paths;
 }
@@ -352,6 +355,12 @@ bool isKnown(const DevicePath& path)
     const SectionRow* const section = findSection(path.front());
     const std::size_t key = section != nullptr && section->form == Form::List ? 2 : 1;
     return section != nullptr && path.size() > key && findKey(*section, path[key]) != nullptr;
+}
+
+Error cannot(const Change& change, const std::string& why)
+{
+    return notAvailable(change.path + " cannot be " + (change.value ? "set" : "removed") + ": " +
+                        why);
 }
 
 Error missing(const std::string& file, const std::string& path, const DevicePath& words)
@@ -469,14 +478,14 @@ Result<std::string> changeText(const std::string& text, const std::string& file,
     for (const Change& change : changes) {
         const Text next = applied(changed, file, change);
         if (!next)
-            return notAvailable(change.path + " cannot be " + (change.value ? "set" : "removed") +
-                                ": " + next.error().reason);
+            return cannot(change, next.error().reason);
         changed = next.value();
     }
-    if (const std::string why = newMistake(mistakesOf(text, file), mistakesOf(changed, file));
-        !why.empty())
-        return notAvailable(why);
-    return changed;
+    // At last only: two changes may be right together.
+    const std::string why = newMistake(mistakesOf(text, file), mistakesOf(changed, file));
+    if (why.empty())
+        return changed;
+    return changes.size() == 1 ? cannot(changes.front(), why) : notAvailable(why);
 }
 
 } // namespace port::simulator

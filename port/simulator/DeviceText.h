@@ -2,9 +2,9 @@
 // Reads and changes single values in the text of a device file. No input or output here.
 //
 // What a change promises: the new text is TOML in which the value is the one asked for and every
-// other value is what it was. Of the text only the value's own bytes change, or, for a key that comes
-// or goes, one run of bytes: comments, order, blanks, quotes, line endings and a byte order mark
-// stay, as does a missing line ending at the end. A change that cannot be made so is an error.
+// other value is what it was. Of the text only the value's own bytes change, or, for a key that
+// comes or goes, one run of bytes: comments, order, blanks, quotes, line endings and a byte order
+// mark stay, as does a missing line ending at the end. A change that cannot be made so is an error.
 #ifndef PORT_SIMULATOR_DEVICE_TEXT_H
 #define PORT_SIMULATOR_DEVICE_TEXT_H
 
@@ -22,7 +22,8 @@ namespace port::simulator {
 struct Entry {
     std::string section; // settings, slot[0]; empty for "schema"
     std::string key;     // as it stands in the file
-    std::variant<std::string, bool, std::int64_t> value; // of another type: as it stands in the file
+    std::variant<std::string, bool, std::int64_t>
+        value; // of another type: as it stands in the file
     std::size_t line;
 
     std::string path() const
@@ -43,9 +44,9 @@ struct Change {
     std::optional<std::string> value; // as getValue() tells it; none: the key is removed
 };
 
-/// The text with all changes made, or the reason why one of them cannot be. A value becomes what its
-/// key wants: a text in quotes, a switch, a number; a fault may also be a table in braces. A file
-/// with mistakes may be changed when it is TOML: a change must not add one.
+/// The text with all changes made, or the reason why one of them cannot be. A value becomes what
+/// its key wants: a text in quotes, a switch, a number; a fault may also be a table in braces. A
+/// file with mistakes may be changed when it is TOML: a change must not add one.
 Result<std::string> changeText(const std::string& text, const std::string& file,
                                const std::vector<Change>& changes);
 

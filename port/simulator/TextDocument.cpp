@@ -93,8 +93,8 @@ const TextDocument::Line* TextDocument::lastLineOf(const toml::table& table) con
     const bool isRoot = &table == &root_;
     const bool isDotted = !isRoot && !hasHeader(table);
     const std::size_t begin = isRoot ? 0 : beginOf(table);
-    const auto next = isRoot ? headers_.begin()
-                             : std::upper_bound(headers_.begin(), headers_.end(), begin);
+    const auto next =
+        isRoot ? headers_.begin() : std::upper_bound(headers_.begin(), headers_.end(), begin);
     const std::size_t end = next != headers_.end() ? *next : text_.size();
     const Line* last = nullptr;
     for (const Line& line : lines_)
@@ -170,8 +170,9 @@ std::string TextDocument::withoutLine(const Line& line) const
     if (ending != std::string::npos)
         return spliced(begin, ending + 1, "");
     // The line before becomes the one without an ending.
-    const bool hasEnding = begin >= lineEnding_.size() &&
-                           text_.compare(begin - lineEnding_.size(), lineEnding_.size(), lineEnding_) == 0;
+    const bool hasEnding =
+        begin >= lineEnding_.size() &&
+        text_.compare(begin - lineEnding_.size(), lineEnding_.size(), lineEnding_) == 0;
     return text_.substr(0, begin - (hasEnding ? lineEnding_.size() : 0));
 }
 

@@ -104,8 +104,8 @@ TEST_F(DeviceSearchTest, ConfigurationFolderIsTheHomesByDefault)
 
 TEST_F(DeviceSearchTest, MissingDeviceNamesThePlacesAndTheNearestOne)
 {
-    const std::string places = "talbet, here or in " + tree.path("/config/coresystem/devices") +
-                               " or in ";
+    const std::string places =
+        "talbet, here or in " + tree.path("/config/coresystem/devices") + " or in ";
     EXPECT_THAT(found("talbet"), AllOf(HasSubstr(places), EndsWith("; did you mean \"tablet\"?")));
     EXPECT_THAT(found("tablte.toml"), EndsWith("; did you mean \"tablet\"?"));
     EXPECT_THAT(found("qqqqqqqq"), testing::Not(HasSubstr("did you mean")));

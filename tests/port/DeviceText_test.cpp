@@ -12,6 +12,7 @@ using port::simulator::getValue;
 using port::simulator::parsePath;
 using testing::ElementsAre;
 using testing::HasSubstr;
+using testing::StartsWith;
 
 namespace {
 
@@ -96,9 +97,9 @@ TEST(DeviceTextTest, OnlyTheValuesBytesChange)
 
 TEST(DeviceTextTest, NewKeyGoesToTheEndOfItsSection)
 {
-    EXPECT_EQ(oddWith("flight_mode =   false\r\n",
-                      "flight_mode =   false\r\nfont_size = \"huge\"\r\n"),
-              withSet(ODD, "settings.font_size", "huge"));
+    EXPECT_EQ(
+        oddWith("flight_mode =   false\r\n", "flight_mode =   false\r\nfont_size = \"huge\"\r\n"),
+        withSet(ODD, "settings.font_size", "huge"));
     EXPECT_EQ(oddWith("# long\n", "# long\nbluetooth = \"not_supported\"\r\n"),
               withSet(ODD, "network.bluetooth", "not_supported"));
     EXPECT_EQ(std::string(ODD) + "\r\nserial = \"42\"", withSet(ODD, "device.serial", "42"));
@@ -108,9 +109,9 @@ TEST(DeviceTextTest, NewKeyIsIndentedLikeItsNeighbour)
 {
     EXPECT_EQ("schema = 1\n[settings]\n\t language = 'a'\n\t sales_code = \"X\"\n",
               withSet("schema = 1\n[settings]\n\t language = 'a'\n", "settings.sales_code", "X"));
-    EXPECT_EQ("schema = 1\n[settings] # none yet\nsales_code = \"X\"\n\n[network]\n",
-              withSet("schema = 1\n[settings] # none yet\n\n[network]\n", "settings.sales_code",
-                      "X"));
+    EXPECT_EQ(
+        "schema = 1\n[settings] # none yet\nsales_code = \"X\"\n\n[network]\n",
+        withSet("schema = 1\n[settings] # none yet\n\n[network]\n", "settings.sales_code", "X"));
 }
 
 TEST(DeviceTextTest, NewSectionGoesToTheEndOfTheFile)
@@ -204,7 +205,8 @@ TEST(DeviceTextTest, ValueThatItsKeyDoesNotTakeIsRefused)
     EXPECT_THAT(withSet(text, "slot[0].imei", "12"), HasSubstr("14 to 16 digits"));
     EXPECT_THAT(withSet(text, "settings.device_name", std::string("a\0b", 3)),
                 HasSubstr("must not hold a NUL"));
-    EXPECT_THAT(withSet(text, "settings.device_name", "\xFF"), HasSubstr("refused: "));
+    EXPECT_EQ("refused: settings.device_name cannot be set: the value is no UTF-8",
+              withSet(text, "settings.device_name", "\xFF"));
     EXPECT_THAT(withSet(text, "settings.device_name", std::string(2000, 'a')),
                 HasSubstr("a line longer than"));
     EXPECT_THAT(withSet(text, "fault.telephony_init", "{ error = \"empty\" } # x"),
@@ -229,8 +231,8 @@ TEST(DeviceTextTest, FileWithMistakesMayBeRepaired)
               withSet(text, "settings.flight_mode", "true"));
     EXPECT_EQ("schema = 1\n[settings]\nflight_mode = \"on\"\n", without(text, "settings.volume"));
     EXPECT_THAT(withSet(text, "settings.data_roaming", "on"), HasSubstr("refused: "));
-    EXPECT_EQ("refused: d.toml:2:1: Error while parsing key-value pair: expected '=', saw '\\n'",
-              withSet("schema = 1\n[\n", "settings.language", "a").substr(0, 71));
+    EXPECT_THAT(withSet("schema = 1\n[\n", "settings.language", "a"),
+                StartsWith("refused: d.toml:2:2: Error while parsing key"));
     EXPECT_EQ("schema = 1\n[device]\n", withSet("[device]\n", "schema", "1"));
 }
 
