@@ -16,7 +16,7 @@ HERE = pathlib.Path(__file__).resolve().parent
 HEADERS = (HERE.parent / "port/api", HERE.parent / "port/coreutil/include")
 
 SOURCE = "void {0}(void);\nvoid {0}(void) {{ __builtin_trap(); }}\n"
-MODULE = """prefix=/usr
+MODULE = """prefix=${{pcfiledir}}/../..
 Name: {module}
 Description: stands in for the device's {soname}
 Version: 0
