@@ -621,15 +621,22 @@ std::string with(int code, std::string seen)
     return seen;
 }
 
-// The library's own imports of the platform: the first block of their list.
+// What the library takes of the device's own libraries, but for the utility and the bus library.
 std::set<std::string> importsOfPlatform()
 {
+    const std::set<std::string> others = {"[coreutil]", "[gio-2.0]", "[gobject-2.0]", "[glib-2.0]"};
     std::ifstream list(IMPORTS);
     std::set<std::string> names;
-    std::string line;
-    while (std::getline(list, line) && !line.empty())
-        if (line[0] != '#')
-            names.insert(line);
+    bool isOfPlatform = false;
+    bool isSymbol = false;
+    for (std::string line; std::getline(list, line);) {
+        if (line.rfind('[', 0) == 0)
+            isOfPlatform = others.count(line) == 0;
+        if (line.rfind("    ", 0) != 0)
+            isSymbol = line == "symbols =";
+        else if (isOfPlatform && isSymbol)
+            names.insert(line.substr(4));
+    }
     return names;
 }
 
