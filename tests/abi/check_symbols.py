@@ -68,6 +68,15 @@ def check_exports(library, listed, strings):
             yield f"must never be exported: {name}"
 
 
+def check_debian(library, symbols_file):
+    lines = run("nm", "-D", "--defined-only", library).splitlines()
+    found = {line.split()[2] for line in lines}
+    listed = {line.split("@")[0].strip() for line in symbols_file.read_text().splitlines()
+              if line.startswith(" ")}
+    for problem in compare("exported", found, listed, readable):
+        yield f"{problem} ({symbols_file.name})"
+
+
 def is_of_runtime(symbol, patterns):
     name = symbol.split("@")[0]
     return any(fnmatch.fnmatchcase(text, pattern) for text in (name, symbol)
@@ -147,6 +156,7 @@ def main():
     parser = argparse.ArgumentParser(description=__doc__)
     parser.add_argument("library")
     parser.add_argument("--exports", type=pathlib.Path, help="list of all exported names")
+    parser.add_argument("--debian", type=pathlib.Path, help="the symbols file of its Debian package")
     parser.add_argument("--imports", type=pathlib.Path, help="libraries and all imported names ...")
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
     parser.add_argument("--strings", choices=("new", "old"), default="new",
@@ -162,6 +172,8 @@ def main():
     problems = []
     if arguments.exports:
         problems += check_exports(library, read_list(arguments.exports), arguments.strings)
+    if arguments.debian:
+        problems += check_debian(library, arguments.debian)
     if arguments.runtime:
         problems += check_imports(library, libraries, arguments.strings,
                                   read_list(arguments.runtime))
