@@ -8,6 +8,7 @@ _coresystem()
             compopt -o filenames 2>/dev/null
             mapfile -t -O ${#COMPREPLY[@]} COMPREPLY < <(compgen -f -- "$current")
         else
+            [[ $word == *= ]] && compopt -o nospace 2>/dev/null
             COMPREPLY+=("$word")
         fi
     done < <("${COMP_WORDS[0]}" __complete "${COMP_WORDS[@]:1:COMP_CWORD}" 2>/dev/null)

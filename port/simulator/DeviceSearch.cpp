@@ -136,6 +136,7 @@ std::vector<NamedDevice> listDevices()
     addDevices(ownFolder(), false, byName);
     addDevices(shippedFolder(), true, byName);
     std::vector<NamedDevice> devices;
+    devices.reserve(byName.size());
     for (auto& [name, device] : byName)
         devices.push_back(std::move(device));
     return devices;

@@ -74,6 +74,8 @@ std::string inQuotesLike(std::string_view old, const std::string& text)
 // Whether a text is one value of TOML and nothing else, on one line.
 bool isValue(const std::string& text)
 {
+    if (text.size() > LINE_LIMIT) // bounds how deep it nests
+        return false;
     try {
         const toml::table table = toml::parse("v=" + text);
         return text.find('\n') == std::string::npos && table.size() == 1 &&
@@ -157,8 +159,7 @@ std::string shownPath(const DevicePath& path)
     const bool hasIndex = isInList(path);
     std::string shown = writtenKey(path.front());
     for (std::size_t i = 1; i < path.size(); ++i)
-        shown =
-            hasIndex && i == 1 ? shown + "[" + path[i] + "]" : below(shown, writtenKey(path[i]));
+        shown.append(hasIndex && i == 1 ? "[" + path[i] + "]" : "." + writtenKey(path[i]));
     return shown;
 }
 
@@ -335,18 +336,15 @@ Text applied(const std::string& text, const std::string& file, const Change& cha
     }
 }
 
-// The paths that a file may have.
+// The paths that a file may have; in a list those of the same index.
 std::vector<std::string> knownPaths(const DevicePath& like)
 {
+    const std::string index = "[" + (like.size() > 2 ? like[1] : "0") + "].";
     std::vector<std::string> paths;
     for (const SectionRow* row = beginSections(); row != endSections(); ++row)
-        for (const std::string& key : keyNames(*row)) {
-            const std::string section(row->name);
-            const bool isList = row->form == Form::List;
+        for (const std::string& key : keyNames(*row))
             paths.push_back(
-                (isList ? section + "[" + (like.size() > 2 ? like[1] : "0") + "]" : section) + "." +
-                key);
-        }
+                std::string(row->name).append(row->form == Form::List ? index : ".").append(key));
     return paths;
 }
 
