@@ -16,12 +16,11 @@ std::string cli::chosenDevice()
 
 cli::DeviceText cli::readDevice(const std::string& name)
 {
-    const auto [path, elsewhere] =
-        port::simulator::findDevice(name.empty() ? chosenDevice() : name);
-    const auto text = port::simulator::readDeviceText(path);
+    const auto found = port::simulator::findDevice(name.empty() ? chosenDevice() : name);
+    const auto text = port::simulator::readDeviceText(found.path);
     if (!text)
-        return {path, "", text.error().reason + elsewhere};
-    return {path, text.value(), ""};
+        return {found.path, "", text.error().reason + found.elsewhere};
+    return {found.path, text.value(), ""};
 }
 
 std::vector<std::string> cli::problemsOf(const DeviceText& device)

@@ -54,16 +54,18 @@ Change removalOf(const std::string& path)
 
 ExitCode runChange(const std::vector<Change>& changes)
 {
-    const auto [path, elsewhere] = port::simulator::findDevice(chosenDevice());
+    const port::simulator::FoundDevice device = port::simulator::findDevice(chosenDevice());
+    if (device.isShipped)
+        return reportFailure(device.path + " comes with the library; change a copy of it");
     const std::string problem = port::changeFile(
-        path, port::simulator::SIZE_LIMIT, [&, file = path](std::string& content) -> std::string {
-            const auto changed = port::simulator::changeText(content, file, changes);
+        device.path, port::simulator::SIZE_LIMIT, [&](std::string& content) -> std::string {
+            const auto changed = port::simulator::changeText(content, device.path, changes);
             if (!changed)
                 return changed.error().reason;
             content = changed.value();
             return {};
         });
-    return problem.empty() ? SUCCESS : reportFailure(problem + elsewhere);
+    return problem.empty() ? SUCCESS : reportFailure(problem + device.elsewhere);
 }
 
 void addGet(CLI::App& device, Invocation& invocation)

@@ -124,10 +124,10 @@ void addDevices(const fs::path& folder, bool areShipped,
 FoundDevice findDevice(const std::string& name)
 {
     if (name.find('/') != std::string::npos)
-        return {name, ""};
+        return {name, "", false};
     if (const std::string file = fileOf(name); !file.empty())
-        return {file, ""};
-    return {name, placesOf(name)};
+        return {file, "", file != name && fs::path(file).parent_path() == shippedFolder()};
+    return {name, placesOf(name), false};
 }
 
 std::vector<NamedDevice> listDevices()

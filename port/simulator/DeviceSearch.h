@@ -9,9 +9,9 @@
 namespace port::simulator {
 
 struct FoundDevice {
-    std::string path; // the name itself when no file was found
-    std::string
-        elsewhere; // goes on "NAME: No such file or directory": where else it was looked for
+    std::string path;       // the name itself when no file was found
+    std::string elsewhere;  // ends a message about a missing one: where else it was looked for
+    bool isShipped = false; // found by its name among those that come with the library
 };
 
 /// The file that a user's name of a device means.
