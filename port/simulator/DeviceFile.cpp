@@ -9,10 +9,10 @@
 #include <tuple>
 
 #include <gio/gio.h>
-#include <toml++/toml.h>
 
 #include "../common/Closest.h"
 #include "../common/RegularFile.h"
+#include "Toml.h"
 
 namespace port::simulator {
 namespace {
@@ -396,7 +396,7 @@ Reading readDevice(const std::string& text, const std::string& path)
         return Reader(path).read(toml::parse(text, path));
     } catch (const toml::parse_error& error) {
         const toml::source_position where = error.source().begin;
-        return {{}, {{where.line, where.column, std::string(error.description())}}, false};
+        return {{}, {{where.line, where.column, reasonOf(error)}}, false};
     }
 }
 

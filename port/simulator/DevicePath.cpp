@@ -5,11 +5,10 @@
 #include <regex>
 #include <sstream>
 
-#include <toml++/toml.h>
-
 #include "DeviceFile.h"
 #include "Schema.h"
 #include "TextPlaces.h"
+#include "Toml.h"
 
 namespace port::simulator {
 namespace {

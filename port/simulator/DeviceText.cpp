@@ -332,7 +332,7 @@ Text applied(const std::string& text, const std::string& file, const Change& cha
         return change.value ? setValue(text, file, path.value(), *change.value)
                             : Edit(text, path.value(), {}).make();
     } catch (const toml::parse_error& error) { // of a value that is no UTF-8, say
-        return notAvailable(std::string(error.description()));
+        return notAvailable(reasonOf(error));
     }
 }
 

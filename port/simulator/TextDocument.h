@@ -8,9 +8,8 @@
 #include <string_view>
 #include <vector>
 
-#include <toml++/toml.h>
-
 #include "TextPlaces.h"
+#include "Toml.h"
 
 namespace port::simulator {
 

@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include <toml++/toml.h>
+#include "Toml.h"
 
 namespace port::simulator {
 

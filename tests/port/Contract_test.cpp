@@ -6,13 +6,13 @@
 #include <memory>
 
 #include <gmock/gmock.h>
-#include <toml++/toml.h>
 
 #include "coresystem_port.h"
 #include "linux/DeviceInfo.h"
 #include "linux/Settings.h"
 #include "simulator/DeviceInfo.h"
 #include "simulator/Settings.h"
+#include "simulator/Toml.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/Together.h"

@@ -8,11 +8,11 @@
 
 #include <ModemManager/ModemManager.h>
 #include <gmock/gmock.h>
-#include <toml++/toml.h>
 
 #include "coresystem_port.h"
 #include "linux/Telephony.h"
 #include "simulator/Telephony.h"
+#include "simulator/Toml.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"

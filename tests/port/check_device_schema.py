@@ -7,6 +7,7 @@ With --write it puts the schema of the rows in its place.
 """
 import argparse
 import json
+import re
 import subprocess
 import sys
 import tempfile
@@ -116,6 +117,16 @@ class DeviceSchema(unittest.TestCase):
             for text in texts:
                 with self.subTest(text=text):
                     self.assertEqual((verdict, verdict), self.judge_text(text))
+
+    def test_errors_are_all_those_of_the_platforms_headers(self):
+        declared = set()
+        for header in (TREE / "port" / "api").glob("*.h"):
+            declared |= set(re.findall(r"^ +((?!TIZEN)[A-Z]+[A-Z_]*_ERROR_\w+|TAPI_(?:API|SIM_ACCESS)_\w+) =",
+                                       header.read_text(), re.MULTILINE))
+        offered = set(re.findall(r'"((?:[A-Z_]+_ERROR|TAPI_[A-Z]+)_\w+)"', SCHEMA.read_text()))
+        none = {name for name in declared if name.endswith(("_NONE", "_SUCCESS"))}
+        self.assertGreater(len(offered), 60)
+        self.assertEqual(declared - none, offered)
 
     def test_schema_is_asked_for(self):
         self.assertFalse(self.validator.is_valid({}))
