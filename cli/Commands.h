@@ -12,7 +12,7 @@
 
 namespace cli {
 
-enum ExitCode {
+enum ExitCode : int { // `device run` also passes on its command's
     SUCCESS = 0,
     FAILURE = 1,
     USAGE = 2,
@@ -31,6 +31,7 @@ struct Invocation {
     std::string deviceFile;
     bool verbose = false;
     bool json = false;
+    std::vector<std::string> tail; // behind "--", of a command that takes another one
     std::function<ExitCode()> command;
 };
 

@@ -45,6 +45,9 @@ void cli::addDeviceCommands(CLI::App& app, Invocation& invocation)
     addDeviceCheckCommand(*device, invocation);
     addDeviceShowCommand(*device, invocation);
     addDeviceEditCommands(*device, invocation);
+    addDeviceCaptureCommand(*device, invocation);
+    addDevicePlayCommand(*device, invocation);
+    addDeviceRunCommand(*device, invocation);
     device->callback([device] {
         if (device->get_subcommands().empty())
             throw UsageError("device takes a command: " + listed(namesOfCommands(*device)));

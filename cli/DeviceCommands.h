@@ -14,6 +14,9 @@ void addDeviceListCommand(CLI::App& device, Invocation& invocation);
 void addDeviceCheckCommand(CLI::App& device, Invocation& invocation);
 void addDeviceShowCommand(CLI::App& device, Invocation& invocation);
 void addDeviceEditCommands(CLI::App& device, Invocation& invocation);
+void addDeviceCaptureCommand(CLI::App& device, Invocation& invocation);
+void addDevicePlayCommand(CLI::App& device, Invocation& invocation);
+void addDeviceRunCommand(CLI::App& device, Invocation& invocation);
 
 /// The name of the device that --device or CORESYSTEM_DEVICE chooses; throws UsageError when there
 /// is none.

@@ -3,9 +3,9 @@
 #include <optional>
 
 #include "DeviceCommands.h"
+#include "DeviceWrite.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "common/ChangeFile.h"
 #include "simulator/DevicePath.h"
 #include "simulator/DeviceSearch.h"
 #include "simulator/DeviceText.h"
@@ -57,15 +57,12 @@ ExitCode runChange(const std::vector<Change>& changes)
     const port::simulator::FoundDevice device = port::simulator::findDevice(chosenDevice());
     if (device.isShipped)
         return reportFailure(device.path + " comes with the library; change a copy of it");
-    const std::string problem = port::changeFile(
-        device.path, port::simulator::SIZE_LIMIT, [&](std::string& content) -> std::string {
-            const auto changed = port::simulator::changeText(content, device.path, changes);
-            if (!changed)
-                return changed.error().reason;
-            content = changed.value();
-            return {};
-        });
-    return problem.empty() ? SUCCESS : reportFailure(problem + device.elsewhere);
+    try {
+        changeDevice(device.path, changes);
+        return SUCCESS;
+    } catch (const std::runtime_error& error) {
+        return reportFailure(error.what() + device.elsewhere);
+    }
 }
 
 void addGet(CLI::App& device, Invocation& invocation)

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The command `coresystem`.
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <exception>
@@ -105,6 +106,17 @@ ExitCode execute(const Program& program)
     return program.invocation.command();
 }
 
+// Takes the words behind "--" away, which are another command's: none of them is ours to read.
+std::vector<std::string> takeTail(std::vector<std::string>& words)
+{
+    const auto end = std::find(words.begin(), words.end(), "--");
+    if (end == words.end() || std::find(words.begin(), end, "run") == end)
+        return {};
+    std::vector<std::string> tail(end + 1, words.end());
+    words.erase(end, words.end());
+    return tail;
+}
+
 ExitCode run(int argc, char** argv)
 {
     Program program;
@@ -113,7 +125,10 @@ ExitCode run(int argc, char** argv)
         return SUCCESS;
     }
     try {
-        program.app.parse(argc, argv);
+        std::vector<std::string> words(argv + 1, argv + argc);
+        program.invocation.tail = takeTail(words);
+        std::reverse(words.begin(), words.end()); // as the parser takes them
+        program.app.parse(words);
         return execute(program);
     } catch (const CLI::CallForHelp&) {
         writeOut(program.app.help());

@@ -79,6 +79,17 @@ struct Service {
 /// Looks for everything that the backend draws on. Waits for an unresponsive bus at most 2 seconds.
 CORESYSTEM_PORT_API std::vector<Service> findServices();
 
+/// What captureDevice() writes down.
+struct CaptureOptions {
+    bool reveal = false;               ///< who the device and its user are, too
+    std::vector<std::string> packages; ///< those whose versions are wanted
+};
+
+/// The device as the backend tells of it now, as the text of a device file: each fact with a
+/// comment where it came from, each that is missing with the reason. What identifies the device or
+/// its user is as many zeros unless it is to be revealed. May take as long as the slowest service.
+CORESYSTEM_PORT_API std::string captureDevice(const CaptureOptions& options);
+
 /// Where log lines go.
 enum class LogSink {
     Automatic,     ///< the journal when its socket is there, else standard error

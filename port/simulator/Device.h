@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "../backend/Result.h"
+#include "DeviceText.h"
 #include "Schema.h"
 
 namespace port::simulator {
@@ -79,9 +80,18 @@ private:
     std::map<std::string, Value> values_;
 };
 
+// What a scenario changes, all at once, some time after the step before it.
+struct Step {
+    std::int64_t afterMs = 0;
+    std::string note;
+    std::vector<Change> changes;
+    std::string source; // FILE:LINE
+};
+
 struct Device {
     std::map<std::string, Section, std::less<>> sections; // every one, there or not
     std::vector<Section> slots;                           // each with a cp_name of its own
+    std::vector<Step> steps;
 
     const Section& section(const std::string& name) const
     {

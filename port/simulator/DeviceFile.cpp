@@ -12,6 +12,7 @@
 
 #include "../common/Closest.h"
 #include "../common/RegularFile.h"
+#include "DevicePath.h"
 #include "Toml.h"
 
 namespace port::simulator {
@@ -124,6 +125,10 @@ std::string expected(const Type& type)
         return "true or false";
     case Type::Kind::Whole:
         return "a whole number " + rangeOf(type);
+    case Type::Kind::Changes:
+        return "a table of paths and their values";
+    case Type::Kind::Paths:
+        return "a list of paths in quotes";
     case Type::Kind::BusFault:
         return listOf(type.names) + ", or an error name of D-Bus in quotes";
     case Type::Kind::Fault:
@@ -188,6 +193,47 @@ std::optional<Content> readNode(const Type& type, const toml::node& node)
     return std::nullopt;
 }
 
+// None when it is no path.
+DevicePath pathIn(std::string_view text)
+{
+    const auto path = parsePath(std::string(text));
+    return path ? path.value() : DevicePath();
+}
+
+std::string noPath(std::string_view text)
+{
+    return quoted(text) + " must be a path like settings.flight_mode or slot.0.sim";
+}
+
+bool isWhole(const SectionRow& section, const DevicePath& path)
+{
+    return path.size() == (section.form == Form::List ? 3 : 2);
+}
+
+std::string writtenPath(const DevicePath& path)
+{
+    std::string text;
+    for (const std::string& name : path)
+        text += (text.empty() ? "" : ".") + writtenKey(name);
+    return text;
+}
+
+// As changeText() takes it.
+std::string plainText(const toml::node& node)
+{
+    if (const auto text = node.value_exact<std::string>())
+        return *text;
+    std::ostringstream stream;
+    if (const toml::table* const table = node.as_table()) {
+        toml::table inBraces(*table);
+        inBraces.is_inline(true);
+        stream << toml::toml_formatter{inBraces, toml::format_flags::none};
+    } else {
+        stream << toml::node_view<const toml::node>(node);
+    }
+    return stream.str();
+}
+
 // Reads the tables of a file into a device, past every mistake.
 class Reader {
 public:
@@ -227,6 +273,11 @@ private:
             refuse(schema->source(), "this version reads schema = 1 only");
     }
 
+    static std::string unknownKey(const SectionRow& row, std::string_view key)
+    {
+        return "unknown key " + quoted(key) + " in " + titleOf(row) + hint(key, keyNames(row));
+    }
+
     static std::string titleOf(const SectionRow& row)
     {
         const std::string name(row.name);
@@ -263,11 +314,93 @@ private:
                 refuse(element.source(), titleOf(row) + " must be a list of sections");
                 continue;
             }
+            if (row.name == "step") {
+                readStep(row, *element.as_table());
+                continue;
+            }
             Section section(titleOf(row), sourceOf(element));
             readKeys(row, *element.as_table(), section);
             completeSlot(section, *element.as_table());
             device_.slots.push_back(std::move(section));
         }
+    }
+
+    void readStep(const SectionRow& row, const toml::table& table)
+    {
+        Step step;
+        step.source = sourceOf(table);
+        Section section(titleOf(row), step.source);
+        for (const auto& [key, node] : table)
+            if (key == "set" && node.is_table())
+                readChanges({}, *node.as_table(), step);
+            else if (key == "unset" && node.is_array())
+                readRemovals(*node.as_array(), step);
+            else if (std::optional<Value> value = readValue(row, key, node))
+                section.set(std::string(key.str()), std::move(*value));
+        if (const auto after = section.get<std::int64_t>("after_ms"))
+            step.afterMs = after.value().value;
+        if (const auto note = section.get<std::string>("note"))
+            step.note = note.value().value;
+        device_.steps.push_back(std::move(step));
+    }
+
+    // A key is a path, or a part of one that the table below it goes on with.
+    void readChanges(const DevicePath& begun, const toml::table& table, Step& step)
+    {
+        for (const auto& [key, node] : table) {
+            DevicePath path = begun;
+            if (begun.empty())
+                path = pathIn(key.str());
+            else
+                path.emplace_back(key.str());
+            const SectionRow* const section = sectionOfStep(path, key.source());
+            if (section == nullptr)
+                continue;
+            if (isWhole(*section, path))
+                readChange(*section, path, key, node, step);
+            else if (node.is_table())
+                readChanges(path, *node.as_table(), step);
+            else
+                refuse(key.source(), noPath(key.str()));
+        }
+    }
+
+    void readChange(const SectionRow& section, const DevicePath& path, const toml::key& key,
+                    const toml::node& node, Step& step)
+    {
+        if (readValue(section, toml::key(path.back(), key.source()), node))
+            step.changes.push_back({writtenPath(path), plainText(node)});
+    }
+
+    void readRemovals(const toml::array& list, Step& step)
+    {
+        for (const toml::node& node : list) {
+            const DevicePath path = pathIn(node.value_or(std::string()));
+            const SectionRow* const section = sectionOfStep(path, node.source());
+            if (section == nullptr)
+                continue;
+            if (!isWhole(*section, path))
+                refuse(node.source(), noPath(path.front()));
+            else if (findKey(*section, path.back()) == nullptr)
+                refuse(node.source(), unknownKey(*section, path.back()));
+            else
+                step.changes.push_back({writtenPath(path), std::nullopt});
+        }
+    }
+
+    // The section that a step's path leads into; null after a refusal.
+    const SectionRow* sectionOfStep(const DevicePath& path, const toml::source_region& where)
+    {
+        const SectionRow* const section = path.empty() ? nullptr : findSection(path.front());
+        if (section == nullptr)
+            refuse(where, path.empty() ? noPath("")
+                                       : "unknown section " + quoted(path.front()) +
+                                             hint(path.front(), sectionNames()));
+        else if (section->name == "step")
+            refuse(where, "a step cannot change a step");
+        else
+            return section;
+        return nullptr;
     }
 
     // What holds between a slot's keys, and between slots.
@@ -304,8 +437,7 @@ private:
         const Type* const type = findKey(row, key.str());
         std::optional<Content> content;
         if (type == nullptr)
-            refuse(key.source(),
-                   "unknown key " + quoted(key) + " in " + titleOf(row) + hint(key, keyNames(row)));
+            refuse(key.source(), unknownKey(row, key.str()));
         else if (isFault(*type) && node.is_table())
             content = readFaultTable(*type, key, *node.as_table());
         else

@@ -148,7 +148,7 @@ constexpr Type fault(const Rows& names, Type::Kind kind = Type::Kind::Fault)
 constexpr SectionRow SECTIONS[] = {
     {"device", Form::Section},        {"settings", Form::Section}, {"slot", Form::List},
     {"subscriptions", Form::Section}, {"network", Form::Section},  {"storage", Form::Section},
-    {"packages", Form::Free},         {"fault", Form::Section},
+    {"packages", Form::Free},         {"fault", Form::Section},    {"step", Form::List},
 };
 
 struct KeyRow {
@@ -204,6 +204,12 @@ constexpr KeyRow KEYS[] = {
     {"storage", "available_blocks", whole(0, ANY)},
 
     {"packages", "", TEXT},
+
+    // A scenario; nothing of it is said of the device until it is played.
+    {"step", "after_ms", whole(0, 24 * 60 * 60 * 1000)}, // since the step before it
+    {"step", "note", TEXT},
+    {"step", "set", {Type::Kind::Changes}},
+    {"step", "unset", {Type::Kind::Paths}},
 
     // The calls of the platform by their own names, and what is asked over the bus.
     {"fault", "__dlog_print", fault(DLOG_ERRORS)},

@@ -51,6 +51,8 @@ struct Type {
         Whole,    // a whole number from `least` to `most`
         Name,     // one of `names` in quotes, or a whole number from `least` to `most`
         Fault,    // one of `names` in quotes, or a table with it as "error" and the keys of a fault
+        Changes,  // a table of paths and values; of a step
+        Paths,    // a list of paths in quotes; of a step
         BusFault, // the same, and the error may be any error name of the bus
     };
     Kind kind;

@@ -73,6 +73,10 @@ private:
         case Type::Kind::Name:
             return type.most < type.least ? namesOf(type)
                                           : Json{{"anyOf", {namesOf(type), wholeNumber(type)}}};
+        case Type::Kind::Changes: // paths are the reader's to judge
+            return {{"type", "object"}};
+        case Type::Kind::Paths:
+            return {{"type", "array"}, {"items", {{"type", "string"}}}};
         case Type::Kind::Fault:
         case Type::Kind::BusFault:
             break;

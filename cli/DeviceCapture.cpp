@@ -1,0 +1,68 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem device capture`: the device that answers now, as a device file.
+#include <memory>
+
+#include <coresystem_port.h>
+
+#include "DeviceCommands.h"
+#include "DeviceWrite.h"
+#include "Session.h"
+#include "Terminal.h"
+
+namespace cli {
+namespace {
+
+struct Capture {
+    coresystem_port::CaptureOptions options;
+    std::string file;
+    bool force = false;
+};
+
+// What the machine tells may be more than a device file can say.
+void checkCaptured(const std::string& text)
+{
+    const auto reading = port::simulator::readDevice(text, "captured");
+    if (!reading.problems.empty())
+        throw std::runtime_error("a device file cannot say all of it: " +
+                                 describe("captured", reading.problems.front()));
+}
+
+ExitCode runCapture(const Capture& capture)
+{
+    if (reportDeviceFileProblem())
+        return BAD_DEVICE_FILE;
+    const std::string text = coresystem_port::captureDevice(capture.options);
+    checkCaptured(text);
+    if (capture.file.empty())
+        writeOut(text);
+    else
+        writeDevice(capture.file, text, capture.force);
+    return SUCCESS;
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addDeviceCaptureCommand(CLI::App& device, Invocation& invocation)
+{
+    CLI::App* const command = device.add_subcommand(
+        "capture", "Write the device that answers now, this machine or another, as a device file");
+    const auto capture = std::make_shared<Capture>();
+    command
+        ->add_option("-o,--output", capture->file, "The file to write; standard output without it")
+        ->type_name("FILE");
+    command->add_flag("--force", capture->force, "Replace a file that is there");
+    command->add_flag("--reveal", capture->options.reveal,
+                      "Also what identifies the device and its user, in place of zeros");
+    command
+        ->add_option("--package", capture->options.packages,
+                     "The version of this package, too; may be given several times")
+        ->type_name("NAME")
+        ->take_all();
+    setFooter(*command, "Examples: coresystem device capture -o this.toml\n"
+                        "          coresystem device capture --reveal --package bash\n"
+                        "Each fact has a comment where it came from.");
+    command->callback([&invocation, capture] {
+        invocation.command = [capture] { return runCapture(*capture); };
+    });
+}

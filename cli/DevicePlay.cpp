@@ -1,0 +1,228 @@
+// SPDX-License-Identifier: Apache-2.0
+// `coresystem device play`: the steps of a scenario, one after the other, onto another device file.
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+#include <optional>
+
+#include <poll.h>
+#include <sys/signalfd.h>
+#include <unistd.h>
+
+#include "Child.h"
+#include "DeviceCommands.h"
+#include "DeviceWrite.h"
+#include "Terminal.h"
+#include "Text.h"
+#include "simulator/DeviceSearch.h"
+#include "simulator/DeviceText.h"
+
+namespace fs = std::filesystem;
+
+namespace cli {
+namespace {
+
+using port::simulator::Step;
+
+// In a file that was made by playing: it may be made anew.
+const char MARK[] = "# Made by coresystem device play";
+
+struct Play {
+    std::string scenario;
+    bool isFast = false;
+    bool isByLine = false;
+    bool force = false;
+};
+
+// Waits for the time of a step, a line of standard input, or a signal that ends it all.
+class Pace {
+public:
+    Pace() : signals_(signalfd(-1, &signalsOfChildren(), SFD_CLOEXEC))
+    {
+        if (signals_ < 0)
+            throw std::runtime_error(std::string("no signals: ") + std::strerror(errno));
+    }
+    ~Pace()
+    {
+        close(signals_);
+    }
+    Pace(const Pace&) = delete;
+    Pace& operator=(const Pace&) = delete;
+
+    /// False when it is to end.
+    bool awaitTime(int milliseconds) const
+    {
+        pollfd signal = {signals_, POLLIN, 0};
+        return poll(&signal, 1, milliseconds) == 0;
+    }
+    bool awaitLine() const
+    {
+        char byte = 0;
+        while (byte != '\n') {
+            pollfd either[] = {{signals_, POLLIN, 0}, {STDIN_FILENO, POLLIN, 0}};
+            if (poll(either, 2, -1) < 0 || either[0].revents != 0 ||
+                read(STDIN_FILENO, &byte, 1) != 1)
+                return false;
+        }
+        return true;
+    }
+
+private:
+    const HeldSignals held_;
+    const int signals_;
+};
+
+// What is shown of a scenario while it runs.
+class Progress {
+public:
+    explicit Progress(std::size_t steps) : steps_(steps) {}
+
+    void countDown(std::size_t number, const Step& step, std::int64_t milliseconds) const
+    {
+        if (isTerminal_)
+            writeOut("\r\033[K" + lineOf(number, step) + " in " +
+                     std::to_string((milliseconds + 999) / 1000) + " s");
+    }
+    void tell(std::size_t number, const Step& step) const
+    {
+        writeOut((isTerminal_ ? "\r\033[K" : "") + lineOf(number, step) + "\n");
+    }
+    void stop(std::size_t number) const
+    {
+        if (isTerminal_)
+            writeOut("\r\033[K");
+        complain("stopped before step " + std::to_string(number) + " of " + std::to_string(steps_));
+    }
+
+private:
+    std::string lineOf(std::size_t number, const Step& step) const
+    {
+        return "step " + std::to_string(number) + " of " + std::to_string(steps_) +
+               (step.note.empty() ? "" : ": " + printable(step.note));
+    }
+
+    const std::size_t steps_;
+    const bool isTerminal_ = isatty(STDOUT_FILENO) == 1;
+};
+
+bool awaitStep(const Play& play, const Pace& pace, const Progress& progress, std::size_t number,
+               const Step& step)
+{
+    if (play.isByLine)
+        return pace.awaitLine();
+    std::int64_t left = play.isFast ? 0 : step.afterMs;
+    for (; left > 0; left -= 1000) {
+        progress.countDown(number, step, left);
+        if (!pace.awaitTime(static_cast<int>(std::min<std::int64_t>(left, 1000))))
+            return false;
+    }
+    return pace.awaitTime(0);
+}
+
+// Every step must be possible before the first one is made.
+void rehearse(const DeviceText& scenario, const std::vector<Step>& steps)
+{
+    std::string text = scenario.text;
+    for (const Step& step : steps) {
+        const auto next = port::simulator::changeText(text, scenario.path, step.changes);
+        if (!next)
+            throw std::runtime_error(step.source +
+                                     ": the step is not possible: " + next.error().reason);
+        text = next.value();
+    }
+}
+
+// A file that is not there yet may have the name of a device that comes with the library.
+std::string fileFor(const std::string& name)
+{
+    if (name.find('/') != std::string::npos || fs::path(name).extension() == ".toml")
+        return name;
+    const port::simulator::FoundDevice device = port::simulator::findDevice(name);
+    if (device.isShipped)
+        throw std::runtime_error(device.path + " comes with the library; play onto another file");
+    return device.path;
+}
+
+// Where the scenario is played, which keeps nothing of the file that is there.
+std::string stageFor(const Play& play, const DeviceText& scenario)
+{
+    const std::string path = fileFor(chosenDevice());
+    std::error_code none;
+    if (fs::equivalent(path, scenario.path, none))
+        throw UsageError(path +
+                         " is the scenario itself; --device names the file it is played onto");
+    const DeviceText there = readDevice(path);
+    const bool isFree = !fs::exists(path) || there.text == scenario.text ||
+                        there.text.find(MARK) != std::string::npos;
+    if (!isFree && !play.force)
+        throw std::runtime_error(path + " was not made by playing; --force replaces it");
+    return path;
+}
+
+std::string firstScene(const DeviceText& scenario)
+{
+    const bool endsLine = scenario.text.empty() || scenario.text.back() == '\n';
+    return scenario.text + (endsLine ? "" : "\n") + MARK + ", from " + printable(scenario.path) +
+           "\n";
+}
+
+ExitCode playSteps(const Play& play, const std::string& stage, const DeviceText& scenario,
+                   const std::vector<Step>& steps)
+{
+    const Pace pace;
+    const Progress progress(steps.size());
+    writeDevice(stage, firstScene(scenario), true);
+    for (std::size_t i = 0; i < steps.size(); ++i) {
+        if (!awaitStep(play, pace, progress, i + 1, steps[i])) {
+            progress.stop(i + 1);
+            return FAILURE;
+        }
+        changeDevice(stage, steps[i].changes);
+        progress.tell(i + 1, steps[i]);
+    }
+    if (play.isByLine)
+        pace.awaitLine();
+    return SUCCESS;
+}
+
+ExitCode runPlay(const Play& play)
+{
+    const DeviceText scenario = readDevice(play.scenario);
+    const std::vector<std::string> problems = problemsOf(scenario);
+    for (const std::string& problem : problems)
+        writeErrorLine(printable(problem));
+    if (!problems.empty())
+        return BAD_DEVICE_FILE;
+    const std::vector<Step> steps =
+        port::simulator::readDevice(scenario.text, scenario.path).device.steps;
+    if (steps.empty())
+        throw std::runtime_error(printable(scenario.path) + " has no [[step]]");
+    const std::string stage = stageFor(play, scenario);
+    rehearse(scenario, steps);
+    return playSteps(play, stage, scenario, steps);
+}
+
+} // namespace
+} // namespace cli
+
+void cli::addDevicePlayCommand(CLI::App& device, Invocation& invocation)
+{
+    CLI::App* const command = device.add_subcommand(
+        "play", "Make the steps of a scenario, one after the other, on the file of --device");
+    const auto play = std::make_shared<Play>();
+    command->add_option("DEVICE", play->scenario, "The scenario: a device file with steps")
+        ->required();
+    CLI::Option* const fast = command->add_flag("--fast", play->isFast, "Do not wait");
+    command
+        ->add_flag("--by-line", play->isByLine,
+                   "Wait for a line of standard input before each step, not for its time")
+        ->excludes(fast);
+    command->add_flag("--force", play->force, "Replace a file that was not made by playing");
+    setFooter(*command, "Examples: coresystem device play --device phone.toml travel\n"
+                        "          ./application | coresystem device play --by-line travel.toml\n"
+                        "The scenario's own file is never written. It stops between steps only.");
+    command->callback(
+        [&invocation, play] { invocation.command = [play] { return runPlay(*play); }; });
+}

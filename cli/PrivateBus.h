@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+// A system bus for one command alone, with the device daemon on it.
+#ifndef CLI_PRIVATE_BUS_H
+#define CLI_PRIVATE_BUS_H
+
+#include <string>
+
+#include <sys/types.h>
+
+namespace cli {
+
+/// A folder that only this user may enter, with a bus in it. From start() on both are kept by a
+/// process of their own, the keeper, which ends the bus and removes the folder when this object or
+/// this process ends, however it ends.
+class PrivateBus {
+public:
+    /// Makes the folder. Throws std::runtime_error, as start() does.
+    PrivateBus();
+    ~PrivateBus();
+    PrivateBus(const PrivateBus&) = delete;
+    PrivateBus& operator=(const PrivateBus&) = delete;
+
+    const std::string& folder() const
+    {
+        return folder_;
+    }
+    /// As DBUS_SYSTEM_BUS_ADDRESS takes it.
+    std::string address() const;
+
+    /// Returns when the bus listens. It starts the device daemon when that is first asked, with the
+    /// environment as it is now. Without the bus nobody listens at the address. The process must
+    /// have one thread only.
+    void start(bool withBus);
+
+private:
+    std::string path(const char* name) const;
+    void writeConfiguration() const;
+    [[noreturn]] void keep(bool withBus, int readiness, int lifeline) const;
+    pid_t startBus() const;
+
+    std::string folder_;
+    pid_t keeper_ = 0;
+    int lifeline_ = -1; // the keeper sees it close
+};
+
+} // namespace cli
+
+#endif

@@ -1,0 +1,218 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "simulator/Capture.h"
+
+#include <gmock/gmock.h>
+
+#include "simulator/DeviceFile.h"
+#include "support/DeviceFileTest.h"
+#include "support/FakeBackend.h"
+
+using coresystem_port::CaptureOptions;
+using port::CardStatus;
+using port::simulator::capture;
+using port::simulator::Device;
+using port::simulator::Section;
+using testing::HasSubstr;
+using testing::Not;
+
+namespace {
+
+const char EVERYTHING[] = R"([device]
+platform_id = "5d3f0a9c71e84b62a0c4d8e6f1b27390"
+platform_name = "Tizen"
+platform_version = "2.3.1"
+model_name = "A \"model\"\n"
+serial = "R38DUAL0001"
+[settings]
+device_name = "Küchentelefon"
+language = "ko_KR.UTF-8"
+sales_code = ""
+font_size = "huge"
+flight_mode = false
+data_roaming = false
+mobile_data = true
+packet_data = true
+utc_offset = -12600
+[[slot]]
+sim = "available"
+card_changed = true
+mcc = "310"
+mnc = "260"
+msin = "123456789"
+number = "+12025550143"
+imei = "356938035643809"
+service = "in_service"
+roaming = true
+sms = true
+cp_name = "modem"
+[[slot]]
+init_status = "sim_spck_required"
+imei = "490154203237518"
+service = "emergency_only"
+roaming = false
+sms = false
+[[slot]]
+denied = true
+[[slot]]
+sim = "available"
+mcc = "262"
+mnc = "01"
+msin = "0123456789"
+number = "null"
+[subscriptions]
+network = 0
+data = 1
+voice = "ask_always"
+[network]
+cellular = "call_only_available"
+wifi = "connected"
+wifi_connection = "configuration"
+bluetooth = "not_supported"
+[storage]
+block_size = 4096
+fragment_size = 1024
+blocks = 4194304
+available_blocks = 9223372036854775807
+[packages]
+"org.example.clock" = "1.2.3"
+)";
+
+Device deviceOf(const std::string& text)
+{
+    const auto reading = port::simulator::readDevice(text, "captured");
+    for (const auto& problem : reading.problems)
+        ADD_FAILURE() << describe("captured", problem) << "\n" << text;
+    return reading.device;
+}
+
+// One value as text, "absent" when there is none.
+std::string shown(const Section& section, const std::string& key)
+{
+    const auto* const value = section.find(key);
+    if (value == nullptr)
+        return "absent";
+    if (const auto* const text = std::get_if<std::string>(&value->content))
+        return '"' + *text + '"';
+    if (const auto* const flag = std::get_if<bool>(&value->content))
+        return *flag ? "true" : "false";
+    return std::to_string(std::get<std::int64_t>(value->content));
+}
+
+void expectSame(const port::simulator::SectionRow& row, const Section& wanted, const Section& got)
+{
+    for (const std::string& key : keyNames(row))
+        EXPECT_EQ(shown(wanted, key), shown(got, key)) << row.name << "." << key;
+}
+
+class CaptureTest : public DeviceFileTest {
+protected:
+    static CaptureOptions everything()
+    {
+        return {true, {"org.example.clock", "org.example.radio"}};
+    }
+
+    static std::string captured(FakeBackend& fake, bool reveal = false)
+    {
+        const std::string text = capture(fake, {reveal, {}});
+        deviceOf(text);
+        return text;
+    }
+};
+
+TEST_F(CaptureTest, EveryKeyOfADeviceFileIsCaptured)
+{
+    describe(EVERYTHING);
+    ASSERT_EQ("", backend->deviceFileProblem());
+    const Device wanted = deviceOf("schema = 1\n" + std::string(EVERYTHING));
+    const Device got = deviceOf(capture(*backend, everything()));
+    for (const char* const name : {"device", "settings", "subscriptions", "network", "storage"})
+        expectSame(*port::simulator::findSection(name), wanted.section(name), got.section(name));
+    ASSERT_EQ(wanted.slots.size(), got.slots.size());
+    for (std::size_t i = 0; i < got.slots.size(); ++i)
+        expectSame(*port::simulator::findSection("slot"), wanted.slots[i], got.slots[i]);
+    EXPECT_EQ("\"1.2.3\"", shown(got.section("packages"), "org.example.clock"));
+    EXPECT_EQ("absent", shown(got.section("packages"), "org.example.radio"));
+}
+
+TEST_F(CaptureTest, EachFactTellsWhereItCameFrom)
+{
+    describe("[settings]\nlanguage = \"de_DE\"\n");
+    const std::string text = capture(*backend, {});
+    EXPECT_THAT(text, HasSubstr("\nlanguage = \"de_DE\" # " + line(3) + "\n"));
+    EXPECT_THAT(text,
+                HasSubstr("\n# no sales_code: " + line(2) + ": [settings] has no sales_code"));
+    EXPECT_THAT(text, HasSubstr("\n# no [storage]: "));
+}
+
+TEST_F(CaptureTest, IdentityIsMaskedUnlessRevealed)
+{
+    describe(EVERYTHING);
+    const std::string text = capture(*backend, {});
+    for (const char* const secret :
+         {"5d3f0a9c71e84b62a0c4d8e6f1b27390", "R38DUAL0001", "chentelefon", "123456789",
+          "2025550143", "356938035643809", "490154203237518"})
+        EXPECT_THAT(text, Not(HasSubstr(secret)));
+    const Device device = deviceOf(text);
+    EXPECT_EQ("\"+00000000000\"", shown(device.slots[0], "number"));
+    EXPECT_EQ("\"000000000\"", shown(device.slots[0], "msin"));
+    EXPECT_EQ("\"310\"", shown(device.slots[0], "mcc"));
+    EXPECT_THAT(text, HasSubstr("masked\n"));
+}
+
+TEST_F(CaptureTest, ServiceThatDoesNotAnswerIsNoServiceWithoutModem)
+{
+    FakeBackend fake;
+    fake.fakeTelephony.slotsAnswer = port::notAvailable("nobody\nanswers");
+    EXPECT_THAT(captured(fake), testing::AllOf(HasSubstr("\ntelephony_init = \"TELEPHONY_ERROR_"
+                                                         "OPERATION_FAILED\" # nobody answers\n"),
+                                               HasSubstr("\ntel_init = \"null\""),
+                                               HasSubstr("\ntel_get_cp_name_list = \"null\"")));
+    fake.fakeTelephony.slotsAnswer = port::denied("not yours");
+    EXPECT_THAT(captured(fake), HasSubstr("\"TELEPHONY_ERROR_PERMISSION_DENIED\" # not yours\n"));
+    fake.fakeTelephony.slotsAnswer = port::notSupported("a tablet");
+    EXPECT_THAT(captured(fake), HasSubstr("\ntelephony = false # a tablet\n"));
+    fake.fakeTelephony.slotsAnswer = answered(FakeTelephony::Names());
+    EXPECT_THAT(captured(fake), Not(HasSubstr("[fault]")));
+}
+
+TEST_F(CaptureTest, EveryCardStatusComesBack)
+{
+    for (int number = 0; number <= static_cast<int>(CardStatus::Unknown); ++number) {
+        FakeBackend fake;
+        fake.fakeTelephony.cardAnswer =
+            answered(port::Card{static_cast<CardStatus>(number), false});
+        tree.write("/d.toml", captured(fake));
+        const auto card = backend->telephony().card("modem0");
+        ASSERT_TRUE(card) << number << card.error().reason;
+        EXPECT_EQ(number, static_cast<int>(card.value().value.status));
+    }
+}
+
+TEST_F(CaptureTest, RadioThatFailsIsNotOneThatIsOffOrMissing)
+{
+    FakeBackend fake;
+    fake.fakeNetwork.change([](FakeNetwork::Answers& answers) {
+        answers.flightMode = answered(true);
+        answers.wifi = port::denied("not yours");
+        answers.cellular = port::notAvailable("no answer");
+        answers.bluetooth = port::notSupported("no such radio");
+    });
+    EXPECT_THAT(
+        captured(fake),
+        testing::AllOf(
+            HasSubstr("\nconnection_get_wifi_state = \"CONNECTION_ERROR_PERMISSION_DENIED\""),
+            HasSubstr("\nconnection_get_cellular_state = "
+                      "\"CONNECTION_ERROR_OPERATION_FAILED\" # no answer\n"),
+            HasSubstr("\nbluetooth = \"not_supported\" # no such radio\n")));
+}
+
+TEST_F(CaptureTest, BadTextsStayReadable)
+{
+    FakeBackend fake;
+    fake.fakeTelephony.slotsAnswer =
+        port::Sourced<FakeTelephony::Names>{{"a\xff\x01\n\"b"}, std::string(2000, 'x')};
+    fake.fakeTelephony.imeiAnswer = port::notAvailable("\x1b[31m" + std::string(2000, '\xfe'));
+    captured(fake);
+}
+
+} // namespace
