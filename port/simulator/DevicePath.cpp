@@ -2,7 +2,6 @@
 #include "DevicePath.h"
 
 #include <charconv>
-#include <regex>
 #include <sstream>
 
 #include "DeviceFile.h"
@@ -16,8 +15,13 @@ namespace {
 // An index is no key of TOML's: it becomes one of digits.
 std::string withIndexAsKey(const std::string& text)
 {
-    static const std::regex index("^([A-Za-z0-9_-]+)\\[([0-9]+)\\]");
-    return std::regex_replace(text, index, "$1.$2", std::regex_constants::format_first_only);
+    const std::size_t open = text.find_first_of("[.\"'");
+    const std::size_t close = text.find(']');
+    if (open == std::string::npos || text[open] != '[' || close == std::string::npos)
+        return text;
+    const auto index = indexOf(text.substr(open + 1, close - open - 1));
+    return index ? text.substr(0, open) + "." + std::to_string(*index) + text.substr(close + 1)
+                 : text;
 }
 
 // Whether the key ends where the text does, unlike that of "a = 1 #".

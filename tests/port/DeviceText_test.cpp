@@ -95,6 +95,16 @@ TEST(DeviceTextTest, OnlyTheValuesBytesChange)
         EXPECT_EQ(oddWith(row.was, row.is), withSet(ODD, row.path, row.value)) << row.path;
 }
 
+TEST(DeviceTextTest, ByteOrderMarkStaysFirst)
+{
+    const std::string mark = "\xEF\xBB\xBF";
+    EXPECT_EQ(mark + "device.serial = 'b' # é\nschema = 1\n",
+              withSet(mark + "device.serial = 'a' # é\nschema = 1\n", "device.serial", "b"));
+    EXPECT_EQ(mark + "schema = 1\n[device]\n", withSet(mark + "[device]\n", "schema", "1"));
+    EXPECT_EQ(mark + "schema = 1\n",
+              without(mark + "device.serial = 'a'\nschema = 1\n", "device.serial"));
+}
+
 TEST(DeviceTextTest, NewKeyGoesToTheEndOfItsSection)
 {
     EXPECT_EQ(
