@@ -49,6 +49,7 @@ HeldSignals::~HeldSignals()
 pid_t startChild(std::vector<std::string> command, const Streams& streams)
 {
     std::vector<char*> arguments;
+    arguments.reserve(command.size() + 1);
     for (std::string& word : command)
         arguments.push_back(word.data());
     arguments.push_back(nullptr);
