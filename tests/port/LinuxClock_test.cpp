@@ -53,6 +53,8 @@ TEST_F(LinuxClockTest, NowIsNow)
 
 TEST_F(LinuxClockTest, YearBeyondTheCalendarIsTold)
 {
+    if (sizeof(std::time_t) < 8)
+        GTEST_SKIP() << "the machine counts seconds with 32 bits";
     const auto answer = localTime(std::numeric_limits<std::time_t>::max());
     ASSERT_FALSE(answer);
     EXPECT_EQ("the clock is set to a year that no calendar holds", answer.error().reason);

@@ -34,9 +34,10 @@ TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
 {
     const TemporaryTree tree;
     struct statvfs folder = {};
-    if (geteuid() != 0 || statvfs(tree.root().c_str(), &folder) != 0 ||
+    if (PROBE_IS_EMULATED != 0 || geteuid() != 0 || statvfs(tree.root().c_str(), &folder) != 0 ||
         (folder.f_flag & ST_NOSUID) != 0)
-        GTEST_SKIP() << "needs root and a temporary folder that allows set-user-ID programs";
+        GTEST_SKIP() << "needs a program of this machine, root and a temporary folder that allows "
+                        "set-user-ID programs";
     const std::string probe = tree.path("/probe");
     fs::copy_file(ENVIRONMENT_PROBE, probe);
     const fs::path module = CIPHER_MODULE;
