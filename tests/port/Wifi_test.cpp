@@ -80,7 +80,10 @@ std::string initializedWith(const Answer<LinkState>& wifi)
 // Here no process has initialised anything yet.
 TEST(WifiInitializationTest, NothingGoesBeforeIt)
 {
-    EXPECT_EQ("0 -38 -38 -38 -38", resultsAfter([] { return 0; }));
+    EXPECT_EQ("0 -38 -38 -38 -38", resultsAfter([] {
+                  networkBackend();
+                  return 0;
+              }));
 }
 
 TEST(WifiInitializationTest, SecondOneIsInvalid)

@@ -20,6 +20,7 @@ namespace {
 const char DAEMON[] = "/usr/sbin/ModemManager";
 const char POLICY_DAEMON[] = "/usr/lib/polkit-1/polkitd";
 constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
+constexpr int AGAIN_MS = 500;
 
 GDBusConnection* connectTo(const std::string& address)
 {
@@ -198,6 +199,11 @@ bool ModemsOnBus::waitUntil(const std::function<bool()>& condition) const
     const guint subscription =
         g_dbus_connection_signal_subscribe(connection_, nullptr, nullptr, nullptr, nullptr, nullptr,
                                            G_DBUS_SIGNAL_FLAGS_NONE, &onSignal, nullptr, nullptr);
+    // On a busy machine a look may find no answer in time, and no signal come after it.
+    GSource* const again = g_timeout_source_new(AGAIN_MS);
+    g_source_set_callback(
+        again, [](gpointer) -> gboolean { return G_SOURCE_CONTINUE; }, nullptr, nullptr);
+    g_source_attach(again, context_);
     GSource* const timer = g_timeout_source_new(PATIENCE_MS);
     g_source_set_callback(timer, &onTimeout, &isOver, nullptr);
     g_source_attach(timer, context_);
@@ -205,8 +211,10 @@ bool ModemsOnBus::waitUntil(const std::function<bool()>& condition) const
     bool isMet = condition();
     for (; !isMet && !isOver; isMet = condition())
         g_main_context_iteration(context_, TRUE);
-    g_source_destroy(timer);
-    g_source_unref(timer);
+    for (GSource* const source : {again, timer}) {
+        g_source_destroy(source);
+        g_source_unref(source);
+    }
     g_dbus_connection_signal_unsubscribe(connection_, subscription);
     g_main_context_pop_thread_default(context_);
     return isMet;

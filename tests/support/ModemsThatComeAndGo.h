@@ -6,8 +6,8 @@
 #include <atomic>
 #include <chrono>
 #include <cstdlib>
+#include <future>
 #include <string>
-#include <thread>
 
 #include "support/ModemsOnBus.h"
 #include "support/Together.h"
@@ -40,18 +40,23 @@ public:
     int whileTheyComeAndGo(Ask ask)
     {
         std::atomic<bool> done{false};
-        std::thread askers([&] {
+        auto askers = std::async(std::launch::async, [&] {
             together(THREADS, [&](int number) {
                 for (int round = number; !done; ++round)
                     ask(round);
             });
         });
-        const auto end = std::chrono::steady_clock::now() + duration();
         int steps = 0;
-        while (std::chrono::steady_clock::now() < end)
-            disturb(steps++);
+        try {
+            const auto end = std::chrono::steady_clock::now() + duration();
+            while (std::chrono::steady_clock::now() < end)
+                disturb(steps++);
+        } catch (...) {
+            done = true;
+            throw;
+        }
         done = true;
-        askers.join();
+        askers.get();
         return steps;
     }
 
