@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include <CLI/CLI.hpp>
+#include "Arguments.h"
 
 namespace cli {
 
@@ -35,21 +35,15 @@ struct Invocation {
     std::function<ExitCode()> command;
 };
 
-/// Ends a command's help with its own remarks and those that hold for every command.
-void setFooter(CLI::App& command, const std::string& remarks);
-
-/// The names of the commands below one.
-std::vector<std::string> namesOfCommands(const CLI::App& command);
-
-void addInfoCommands(CLI::App& app, Invocation& invocation);
-void addCountryCommand(CLI::App& app, Invocation& invocation);
-void addSimCommand(CLI::App& app, Invocation& invocation);
-void addPackageCommand(CLI::App& app, Invocation& invocation);
-void addStorageCommand(CLI::App& app, Invocation& invocation);
-void addWatchCommand(CLI::App& app, Invocation& invocation);
-void addLogCommands(CLI::App& app, Invocation& invocation);
-void addDoctorCommand(CLI::App& app, Invocation& invocation);
-void addDeviceCommands(CLI::App& app, Invocation& invocation);
+void addInfoCommands(const Command& app, Invocation& invocation);
+void addCountryCommand(const Command& app, Invocation& invocation);
+void addSimCommand(const Command& app, Invocation& invocation);
+void addPackageCommand(const Command& app, Invocation& invocation);
+void addStorageCommand(const Command& app, Invocation& invocation);
+void addWatchCommand(const Command& app, Invocation& invocation);
+void addLogCommands(const Command& app, Invocation& invocation);
+void addDoctorCommand(const Command& app, Invocation& invocation);
+void addDeviceCommands(const Command& app, Invocation& invocation);
 
 } // namespace cli
 

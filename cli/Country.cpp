@@ -233,23 +233,22 @@ ExitCode runCountry(const Invocation& invocation, const std::string& key)
 } // namespace
 } // namespace cli
 
-void cli::addCountryCommand(CLI::App& app, Invocation& invocation)
+void cli::addCountryCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const country =
-        app.add_subcommand("country", "Print every conversion of a country key");
+    const Command country = app.add("country", "Print every conversion of a country key");
     const auto key = std::make_shared<std::string>();
     country
-        ->add_option("KEY", *key,
-                     "An MCC, an alpha-2 code, a calling code or a service locale, exactly as the "
-                     "library writes it")
-        ->required();
-    country->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*country, "Examples: coresystem country 450\n"
-                        "          coresystem country kr\n"
-                        "          coresystem country 82\n"
-                        "          coresystem country ko_KR\n"
-                        "Exit code 5: no such key.");
-    country->callback([&invocation, key] {
+        .option("KEY", *key,
+                "An MCC, an alpha-2 code, a calling code or a service locale, exactly as the "
+                "library writes it")
+        .required();
+    country.flag("--json", invocation.json, "Print one JSON object");
+    country.setFooter("Examples: coresystem country 450\n"
+                      "          coresystem country kr\n"
+                      "          coresystem country 82\n"
+                      "          coresystem country ko_KR\n"
+                      "Exit code 5: no such key.");
+    country.onUse([&invocation, key] {
         invocation.command = [&invocation, key] { return runCountry(invocation, *key); };
     });
 }

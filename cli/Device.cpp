@@ -33,23 +33,19 @@ std::vector<std::string> cli::problemsOf(const DeviceText& device)
     return lines;
 }
 
-void cli::addDeviceCommands(CLI::App& app, Invocation& invocation)
+void cli::addDeviceCommands(const Command& app, Invocation& invocation)
 {
-    CLI::App* const device = app.add_subcommand("device", "Look at device files and change them");
-    setFooter(*device, "Examples: coresystem device list\n"
-                       "          coresystem device check phone.toml\n"
-                       "          coresystem device set settings.flight_mode=true "
-                       "--device phone.toml");
-    device->require_subcommand(0, 1);
-    addDeviceListCommand(*device, invocation);
-    addDeviceCheckCommand(*device, invocation);
-    addDeviceShowCommand(*device, invocation);
-    addDeviceEditCommands(*device, invocation);
-    addDeviceCaptureCommand(*device, invocation);
-    addDevicePlayCommand(*device, invocation);
-    addDeviceRunCommand(*device, invocation);
-    device->callback([device] {
-        if (device->get_subcommands().empty())
-            throw UsageError("device takes a command: " + listed(namesOfCommands(*device)));
-    });
+    const Command device = app.add("device", "Look at device files and change them");
+    device.setFooter("Examples: coresystem device list\n"
+                     "          coresystem device check phone.toml\n"
+                     "          coresystem device set settings.flight_mode=true "
+                     "--device phone.toml");
+    device.requireCommand();
+    addDeviceListCommand(device, invocation);
+    addDeviceCheckCommand(device, invocation);
+    addDeviceShowCommand(device, invocation);
+    addDeviceEditCommands(device, invocation);
+    addDeviceCaptureCommand(device, invocation);
+    addDevicePlayCommand(device, invocation);
+    addDeviceRunCommand(device, invocation);
 }

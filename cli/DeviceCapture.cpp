@@ -43,26 +43,25 @@ ExitCode runCapture(const Capture& capture)
 } // namespace
 } // namespace cli
 
-void cli::addDeviceCaptureCommand(CLI::App& device, Invocation& invocation)
+void cli::addDeviceCaptureCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const command = device.add_subcommand(
+    const Command command = device.add(
         "capture", "Write the device that answers now, this machine or another, as a device file");
     const auto capture = std::make_shared<Capture>();
+    command.option("-o,--output", capture->file, "The file to write; standard output without it")
+        .called("FILE");
+    command.flag("--force", capture->force, "Replace a file that is there");
+    command.flag("--reveal", capture->options.reveal,
+                 "Also what identifies the device and its user, in place of zeros");
     command
-        ->add_option("-o,--output", capture->file, "The file to write; standard output without it")
-        ->type_name("FILE");
-    command->add_flag("--force", capture->force, "Replace a file that is there");
-    command->add_flag("--reveal", capture->options.reveal,
-                      "Also what identifies the device and its user, in place of zeros");
-    command
-        ->add_option("--package", capture->options.packages,
-                     "The version of this package, too; may be given several times")
-        ->type_name("NAME")
-        ->take_all();
-    setFooter(*command, "Examples: coresystem device capture -o this.toml\n"
-                        "          coresystem device capture --reveal --package bash\n"
-                        "Each fact has a comment where it came from.");
-    command->callback([&invocation, capture] {
+        .option("--package", capture->options.packages,
+                "The version of this package, too; may be given several times")
+        .called("NAME")
+        .takesAll();
+    command.setFooter("Examples: coresystem device capture -o this.toml\n"
+                      "          coresystem device capture --reveal --package bash\n"
+                      "Each fact has a comment where it came from.");
+    command.onUse([&invocation, capture] {
         invocation.command = [capture] { return runCapture(*capture); };
     });
 }

@@ -26,14 +26,14 @@ ExitCode runCheck(const std::vector<std::string>& names)
 } // namespace
 } // namespace cli
 
-void cli::addDeviceCheckCommand(CLI::App& device, Invocation& invocation)
+void cli::addDeviceCheckCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const check = device.add_subcommand("check", "Print every mistake in device files");
+    const Command check = device.add("check", "Print every mistake in device files");
     const auto names = std::make_shared<std::vector<std::string>>();
-    check->add_option("DEVICE", *names, "The devices, as --device takes them")->required();
-    setFooter(*check, "Example: coresystem device check phone.toml\n"
-                      "Each mistake is one line, FILE:LINE:COLUMN: what is wrong.\n"
-                      "Exit code 1: there is a mistake, or a file cannot be read.");
-    check->callback(
+    check.option("DEVICE", *names, "The devices, as --device takes them").required();
+    check.setFooter("Example: coresystem device check phone.toml\n"
+                    "Each mistake is one line, FILE:LINE:COLUMN: what is wrong.\n"
+                    "Exit code 1: there is a mistake, or a file cannot be read.");
+    check.onUse(
         [&invocation, names] { invocation.command = [names] { return runCheck(*names); }; });
 }

@@ -10,13 +10,13 @@
 
 namespace cli {
 
-void addDeviceListCommand(CLI::App& device, Invocation& invocation);
-void addDeviceCheckCommand(CLI::App& device, Invocation& invocation);
-void addDeviceShowCommand(CLI::App& device, Invocation& invocation);
-void addDeviceEditCommands(CLI::App& device, Invocation& invocation);
-void addDeviceCaptureCommand(CLI::App& device, Invocation& invocation);
-void addDevicePlayCommand(CLI::App& device, Invocation& invocation);
-void addDeviceRunCommand(CLI::App& device, Invocation& invocation);
+void addDeviceListCommand(const Command& device, Invocation& invocation);
+void addDeviceCheckCommand(const Command& device, Invocation& invocation);
+void addDeviceShowCommand(const Command& device, Invocation& invocation);
+void addDeviceEditCommands(const Command& device, Invocation& invocation);
+void addDeviceCaptureCommand(const Command& device, Invocation& invocation);
+void addDevicePlayCommand(const Command& device, Invocation& invocation);
+void addDeviceRunCommand(const Command& device, Invocation& invocation);
 
 /// The name of the device that --device or CORESYSTEM_DEVICE chooses; throws UsageError when there
 /// is none.

@@ -65,27 +65,27 @@ ExitCode runChange(const std::vector<Change>& changes)
     }
 }
 
-void addGet(CLI::App& device, Invocation& invocation)
+void addGet(const Command& device, Invocation& invocation)
 {
-    CLI::App* const get = device.add_subcommand("get", "Print one value of the device file");
+    const Command get = device.add("get", "Print one value of the device file");
     const auto path = std::make_shared<std::string>();
-    get->add_option("PATH", *path, "The value")->required();
-    setFooter(*get,
-              std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
+    get.option("PATH", *path, "The value").required();
+    get.setFooter(std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
                   PATHS + "\nExit code 1: the file does not have it.");
-    get->callback([&invocation, path] { invocation.command = [path] { return runGet(*path); }; });
+    get.onUse([&invocation, path] { invocation.command = [path] { return runGet(*path); }; });
 }
 
 // A command that changes values, each of which an argument tells.
-void addChange(CLI::App& device, Invocation& invocation, const char* name, const char* argument,
-               Change (*changeOf)(const std::string&), const char* description, const char* remarks)
+void addChange(const Command& device, Invocation& invocation, const char* name,
+               const char* argument, Change (*changeOf)(const std::string&),
+               const char* description, const char* remarks)
 {
-    CLI::App* const command = device.add_subcommand(name, description);
+    const Command command = device.add(name, description);
     const auto arguments = std::make_shared<std::vector<std::string>>();
-    command->add_option(argument, *arguments, "The values")->required();
-    setFooter(*command, std::string(remarks) + PATHS +
-                            "\nAll changes are made at once, or none. Exit code 1: none was.");
-    command->callback([&invocation, arguments, changeOf] {
+    command.option(argument, *arguments, "The values").required();
+    command.setFooter(std::string(remarks) + PATHS +
+                      "\nAll changes are made at once, or none. Exit code 1: none was.");
+    command.onUse([&invocation, arguments, changeOf] {
         std::vector<Change> changes;
         for (const std::string& text : *arguments)
             changes.push_back(changeOf(text));
@@ -96,7 +96,7 @@ void addChange(CLI::App& device, Invocation& invocation, const char* name, const
 } // namespace
 } // namespace cli
 
-void cli::addDeviceEditCommands(CLI::App& device, Invocation& invocation)
+void cli::addDeviceEditCommands(const Command& device, Invocation& invocation)
 {
     addGet(device, invocation);
     addChange(device, invocation, "set", "PATH=VALUE", assignmentOf,

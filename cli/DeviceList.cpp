@@ -83,14 +83,13 @@ ExitCode runList(const Invocation& invocation)
 } // namespace
 } // namespace cli
 
-void cli::addDeviceListCommand(CLI::App& device, Invocation& invocation)
+void cli::addDeviceListCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const list =
-        device.add_subcommand("list", "Print the devices that --device knows by name");
-    list->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*list, "The user's own devices are the files of $XDG_CONFIG_HOME/coresystem/devices "
-                     "(by default\n~/.config/coresystem/devices); they hide shipped ones of the "
-                     "same name.");
-    list->callback(
+    const Command list = device.add("list", "Print the devices that --device knows by name");
+    list.flag("--json", invocation.json, "Print one JSON object");
+    list.setFooter("The user's own devices are the files of $XDG_CONFIG_HOME/coresystem/devices "
+                   "(by default\n~/.config/coresystem/devices); they hide shipped ones of the "
+                   "same name.");
+    list.onUse(
         [&invocation] { invocation.command = [&invocation] { return runList(invocation); }; });
 }

@@ -207,22 +207,20 @@ ExitCode runPlay(const Play& play)
 } // namespace
 } // namespace cli
 
-void cli::addDevicePlayCommand(CLI::App& device, Invocation& invocation)
+void cli::addDevicePlayCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const command = device.add_subcommand(
+    const Command command = device.add(
         "play", "Make the steps of a scenario, one after the other, on the file of --device");
     const auto play = std::make_shared<Play>();
-    command->add_option("DEVICE", play->scenario, "The scenario: a device file with steps")
-        ->required();
-    CLI::Option* const fast = command->add_flag("--fast", play->isFast, "Do not wait");
+    command.option("DEVICE", play->scenario, "The scenario: a device file with steps").required();
+    const Argument fast = command.flag("--fast", play->isFast, "Do not wait");
     command
-        ->add_flag("--by-line", play->isByLine,
-                   "Wait for a line of standard input before each step, not for its time")
-        ->excludes(fast);
-    command->add_flag("--force", play->force, "Replace a file that was not made by playing");
-    setFooter(*command, "Examples: coresystem device play --device phone.toml travel\n"
-                        "          ./application | coresystem device play --by-line travel.toml\n"
-                        "The scenario's own file is never written. It stops between steps only.");
-    command->callback(
-        [&invocation, play] { invocation.command = [play] { return runPlay(*play); }; });
+        .flag("--by-line", play->isByLine,
+              "Wait for a line of standard input before each step, not for its time")
+        .excludes(fast);
+    command.flag("--force", play->force, "Replace a file that was not made by playing");
+    command.setFooter("Examples: coresystem device play --device phone.toml travel\n"
+                      "          ./application | coresystem device play --by-line travel.toml\n"
+                      "The scenario's own file is never written. It stops between steps only.");
+    command.onUse([&invocation, play] { invocation.command = [play] { return runPlay(*play); }; });
 }

@@ -122,24 +122,24 @@ ExitCode runCommand(const Invocation& invocation, const Run& run)
 } // namespace
 } // namespace cli
 
-void cli::addDeviceRunCommand(CLI::App& device, Invocation& invocation)
+void cli::addDeviceRunCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const command =
-        device.add_subcommand("run", "Run a program on a simulated device, with a system bus of "
-                                     "its own: run DEVICE -- COMMAND...");
+    const Command command =
+        device.add("run", "Run a program on a simulated device, with a system bus of "
+                          "its own: run DEVICE -- COMMAND...");
     const auto run = std::make_shared<Run>();
-    command->add_option("DEVICE", run->file, "The device, as --device takes it")->required();
-    command->add_flag("--copy", run->onCopy,
-                      "Give the program a copy of the file, which goes away with it");
-    setFooter(*command,
-              "Examples: coresystem device run phone.toml -- ./application --option\n"
-              "          coresystem device run --copy phone.toml -- make check\n"
-              "The program gets CORESYSTEM_DEVICE and DBUS_SYSTEM_BUS_ADDRESS. The bus ends with "
-              "it.\n"
-              "Exit code: the program's; 128+N when signal N ended it; 127: there is no such "
-              "program;\n"
-              "126: it cannot be executed; 125: the bus cannot be started.");
-    command->callback([&invocation, run] {
+    command.option("DEVICE", run->file, "The device, as --device takes it").required();
+    command.flag("--copy", run->onCopy,
+                 "Give the program a copy of the file, which goes away with it");
+    command.setFooter(
+        "Examples: coresystem device run phone.toml -- ./application --option\n"
+        "          coresystem device run --copy phone.toml -- make check\n"
+        "The program gets CORESYSTEM_DEVICE and DBUS_SYSTEM_BUS_ADDRESS. The bus ends with "
+        "it.\n"
+        "Exit code: the program's; 128+N when signal N ended it; 127: there is no such "
+        "program;\n"
+        "126: it cannot be executed; 125: the bus cannot be started.");
+    command.onUse([&invocation, run] {
         chooseDevice(run->file);
         invocation.command = [&invocation, run] { return runCommand(invocation, *run); };
     });

@@ -92,18 +92,18 @@ ExitCode runShow(const Invocation& invocation, const std::string& name, bool rev
 } // namespace
 } // namespace cli
 
-void cli::addDeviceShowCommand(CLI::App& device, Invocation& invocation)
+void cli::addDeviceShowCommand(const Command& device, Invocation& invocation)
 {
-    CLI::App* const show =
-        device.add_subcommand("show", "Print the values of a device file, each with its line");
+    const Command show =
+        device.add("show", "Print the values of a device file, each with its line");
     const auto name = std::make_shared<std::string>();
     const auto reveal = std::make_shared<bool>(false);
-    show->add_option("DEVICE", *name, "The device (default: that of --device)");
-    show->add_flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
-    show->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*show, "Example: coresystem device show phone.toml\n"
-                     "Exit code 4: the file has mistakes; they are on standard error.");
-    show->callback([&invocation, name, reveal] {
+    show.option("DEVICE", *name, "The device (default: that of --device)");
+    show.flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
+    show.flag("--json", invocation.json, "Print one JSON object");
+    show.setFooter("Example: coresystem device show phone.toml\n"
+                   "Exit code 4: the file has mistakes; they are on standard error.");
+    show.onUse([&invocation, name, reveal] {
         invocation.command = [&invocation, name, reveal] {
             return runShow(invocation, *name, *reveal);
         };

@@ -104,12 +104,12 @@ ExitCode runDoctor(const Invocation& invocation)
 } // namespace
 } // namespace cli
 
-void cli::addDoctorCommand(CLI::App& app, Invocation& invocation)
+void cli::addDoctorCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const doctor = app.add_subcommand(
-        "doctor", "Tell which services answer, and what each missing one takes away");
-    doctor->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*doctor, "Exit code 1: the log key is unusable. A missing service is no failure.");
-    doctor->callback(
+    const Command doctor =
+        app.add("doctor", "Tell which services answer, and what each missing one takes away");
+    doctor.flag("--json", invocation.json, "Print one JSON object");
+    doctor.setFooter("Exit code 1: the log key is unusable. A missing service is no failure.");
+    doctor.onUse(
         [&invocation] { invocation.command = [&invocation] { return runDoctor(invocation); }; });
 }

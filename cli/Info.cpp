@@ -112,17 +112,17 @@ ExitCode listFacts()
     return SUCCESS;
 }
 
-void addGet(CLI::App& app, Invocation& invocation)
+void addGet(const Command& app, Invocation& invocation)
 {
-    CLI::App* const get = app.add_subcommand("get", "Print one fact: the value and nothing else");
+    const Command get = app.add("get", "Print one fact: the value and nothing else");
     const auto name = std::make_shared<std::string>();
     const auto list = std::make_shared<bool>(false);
-    get->add_option("FACT", *name, "The fact, as `coresystem get --list` names it");
-    get->add_flag("--list", *list, "Print the names of all facts");
-    get->add_flag("--json", invocation.json, "Print a JSON object with value and source");
-    setFooter(*get, "Example: coresystem get device_name\n"
-                    "Exit code 3: the fact is not available; the reason is on standard error.");
-    get->callback([&invocation, name, list] {
+    get.option("FACT", *name, "The fact, as `coresystem get --list` names it");
+    get.flag("--list", *list, "Print the names of all facts");
+    get.flag("--json", invocation.json, "Print a JSON object with value and source");
+    get.setFooter("Example: coresystem get device_name\n"
+                  "Exit code 3: the fact is not available; the reason is on standard error.");
+    get.onUse([&invocation, name, list] {
         if (name->empty() != *list)
             throw UsageError("get takes one fact (or --list)");
         invocation.command = [&invocation, name, list] {
@@ -131,27 +131,27 @@ void addGet(CLI::App& app, Invocation& invocation)
     });
 }
 
-void addNetwork(CLI::App& app, Invocation& invocation)
+void addNetwork(const Command& app, Invocation& invocation)
 {
-    CLI::App* const network =
-        app.add_subcommand("network", "Print what applications may learn of the connections");
-    network->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*network, "A connection over Wi-Fi or Bluetooth counts beside the cellular one: "
-                        "\"connected_wifi\" is yes when either is there.");
-    network->callback([&invocation] {
+    const Command network =
+        app.add("network", "Print what applications may learn of the connections");
+    network.flag("--json", invocation.json, "Print one JSON object");
+    network.setFooter("A connection over Wi-Fi or Bluetooth counts beside the cellular one: "
+                      "\"connected_wifi\" is yes when either is there.");
+    network.onUse([&invocation] {
         invocation.command = [&invocation] { return runInfo(invocation, NETWORK_FACTS, false); };
     });
 }
 
-void addSerial(CLI::App& app, Invocation& invocation)
+void addSerial(const Command& app, Invocation& invocation)
 {
-    CLI::App* const serial =
-        app.add_subcommand("serial", "Print the serial number that the device daemon tells");
-    serial->add_flag("--json", invocation.json, "Print a JSON object with value and source");
-    setFooter(*serial, "The daemon answers by the device file that it was started with, not by "
-                       "--device.\n"
-                       "Exit code 3: there is no serial number; the reason is on standard error.");
-    serial->callback([&invocation] {
+    const Command serial =
+        app.add("serial", "Print the serial number that the device daemon tells");
+    serial.flag("--json", invocation.json, "Print a JSON object with value and source");
+    serial.setFooter("The daemon answers by the device file that it was started with, not by "
+                     "--device.\n"
+                     "Exit code 3: there is no serial number; the reason is on standard error.");
+    serial.onUse([&invocation] {
         invocation.command = [&invocation] { return runGet(invocation, "device_serial"); };
     });
 }
@@ -159,16 +159,15 @@ void addSerial(CLI::App& app, Invocation& invocation)
 } // namespace
 } // namespace cli
 
-void cli::addInfoCommands(CLI::App& app, Invocation& invocation)
+void cli::addInfoCommands(const Command& app, Invocation& invocation)
 {
-    CLI::App* const info =
-        app.add_subcommand("info", "Print every fact about the device, with its source");
+    const Command info = app.add("info", "Print every fact about the device, with its source");
     const auto reveal = std::make_shared<bool>(false);
-    info->add_flag("--reveal", *reveal, "Show phone number, IMEI and serial number, unmasked");
-    info->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*info, "Examples: coresystem info\n"
-                     "          coresystem info --json --device phone.toml");
-    info->callback([&invocation, reveal] {
+    info.flag("--reveal", *reveal, "Show phone number, IMEI and serial number, unmasked");
+    info.flag("--json", invocation.json, "Print one JSON object");
+    info.setFooter("Examples: coresystem info\n"
+                   "          coresystem info --json --device phone.toml");
+    info.onUse([&invocation, reveal] {
         invocation.command = [&invocation, reveal] {
             return runInfo(invocation, factNames(), *reveal);
         };

@@ -145,27 +145,23 @@ ExitCode runDecipher(const std::string& keyFile)
 } // namespace
 } // namespace cli
 
-void cli::addLogCommands(CLI::App& app, Invocation& invocation)
+void cli::addLogCommands(const Command& app, Invocation& invocation)
 {
-    CLI::App* const log = app.add_subcommand("log", "Work with the library's log");
-    setFooter(*log, "Example: coresystem log decipher --key key <trace");
-    log->require_subcommand(0, 1);
-    log->callback([log] {
-        if (log->get_subcommands().empty())
-            throw UsageError("log takes a command: decipher");
-    });
-    CLI::App* const decipher = log->add_subcommand(
-        "decipher", "Copy log lines from standard input, with their bodies deciphered");
+    const Command log = app.add("log", "Work with the library's log");
+    log.setFooter("Example: coresystem log decipher --key key <trace");
+    log.requireCommand();
+    const Command decipher =
+        log.add("decipher", "Copy log lines from standard input, with their bodies deciphered");
     const auto keyFile = std::make_shared<std::string>();
-    CLI::Option* const key = decipher->add_option(
+    const Argument key = decipher.option(
         "--key", *keyFile, "The key file (default: the one that CORESYSTEM_LOG_KEY names)");
-    key->type_name("FILE");
-    setFooter(*decipher,
-              "Example: CORESYSTEM_LOG_DEBUG=1 CORESYSTEM_LOG_KEY=key coresystem info 2>&1 |\n"
-              "             coresystem log decipher --key key\n"
-              "Exit code 1: a body could not be deciphered, or there is no usable key.");
-    decipher->callback([&invocation, key, keyFile] {
-        if (key->count() > 0 && keyFile->empty())
+    key.called("FILE");
+    decipher.setFooter(
+        "Example: CORESYSTEM_LOG_DEBUG=1 CORESYSTEM_LOG_KEY=key coresystem info 2>&1 |\n"
+        "             coresystem log decipher --key key\n"
+        "Exit code 1: a body could not be deciphered, or there is no usable key.");
+    decipher.onUse([&invocation, key, keyFile] {
+        if (key.isGiven() && keyFile->empty())
             throw UsageError("--key names no file");
         invocation.command = [keyFile] { return runDecipher(*keyFile); };
     });

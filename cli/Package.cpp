@@ -79,16 +79,15 @@ ExitCode runPackage(const Invocation& invocation, const std::vector<std::string>
 } // namespace
 } // namespace cli
 
-void cli::addPackageCommand(CLI::App& app, Invocation& invocation)
+void cli::addPackageCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const package =
-        app.add_subcommand("package", "Print the versions of installed packages");
+    const Command package = app.add("package", "Print the versions of installed packages");
     const auto names = std::make_shared<std::vector<std::string>>();
-    package->add_option("NAME", *names, "The packages, by their exact names")->required();
-    package->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*package, "Example: coresystem package dpkg bash\n"
-                        "Exit code 3: a package is not installed, or nobody knows.");
-    package->callback([&invocation, names] {
+    package.option("NAME", *names, "The packages, by their exact names").required();
+    package.flag("--json", invocation.json, "Print one JSON object");
+    package.setFooter("Example: coresystem package dpkg bash\n"
+                      "Exit code 3: a package is not installed, or nobody knows.");
+    package.onUse([&invocation, names] {
         invocation.command = [&invocation, names] { return runPackage(invocation, *names); };
     });
 }

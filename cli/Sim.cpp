@@ -153,17 +153,16 @@ ExitCode runSim(const Invocation& invocation, bool reveal)
 } // namespace
 } // namespace cli
 
-void cli::addSimCommand(CLI::App& app, Invocation& invocation)
+void cli::addSimCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const sim =
-        app.add_subcommand("sim", "Print what applications may learn of each SIM slot");
+    const Command sim = app.add("sim", "Print what applications may learn of each SIM slot");
     const auto reveal = std::make_shared<bool>(false);
-    sim->add_flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
-    sim->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*sim, "Examples: coresystem sim\n"
-                    "          coresystem sim --reveal --device phone.toml\n"
-                    "Exit code 3: there is no SIM slot; the reason is on standard error.");
-    sim->callback([&invocation, reveal] {
+    sim.flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
+    sim.flag("--json", invocation.json, "Print one JSON object");
+    sim.setFooter("Examples: coresystem sim\n"
+                  "          coresystem sim --reveal --device phone.toml\n"
+                  "Exit code 3: there is no SIM slot; the reason is on standard error.");
+    sim.onUse([&invocation, reveal] {
         invocation.command = [&invocation, reveal] { return runSim(invocation, *reveal); };
     });
 }

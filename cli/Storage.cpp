@@ -49,20 +49,19 @@ ExitCode runStorage(const Invocation& invocation, double megabytes)
 } // namespace
 } // namespace cli
 
-void cli::addStorageCommand(CLI::App& app, Invocation& invocation)
+void cli::addStorageCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const storage =
-        app.add_subcommand("storage", "Print whether enough internal storage is free");
+    const Command storage = app.add("storage", "Print whether enough internal storage is free");
     const auto megabytes = std::make_shared<double>(0);
     storage
-        ->add_option("--at-least", *megabytes,
-                     "How many megabytes (of 1048576 bytes); exactly as many are not enough")
-        ->type_name("MB")
-        ->required();
-    storage->add_flag("--json", invocation.json, "Print one JSON object");
-    setFooter(*storage, "Example: coresystem storage --at-least 500\n"
-                        "Exit code 1: less is free; 3: nobody knows.");
-    storage->callback([&invocation, megabytes] {
+        .option("--at-least", *megabytes,
+                "How many megabytes (of 1048576 bytes); exactly as many are not enough")
+        .called("MB")
+        .required();
+    storage.flag("--json", invocation.json, "Print one JSON object");
+    storage.setFooter("Example: coresystem storage --at-least 500\n"
+                      "Exit code 1: less is free; 3: nobody knows.");
+    storage.onUse([&invocation, megabytes] {
         invocation.command = [&invocation, megabytes] {
             return runStorage(invocation, *megabytes);
         };

@@ -156,15 +156,15 @@ ExitCode runWatch(const Invocation& invocation)
 } // namespace
 } // namespace cli
 
-void cli::addWatchCommand(CLI::App& app, Invocation& invocation)
+void cli::addWatchCommand(const Command& app, Invocation& invocation)
 {
-    CLI::App* const watch =
-        app.add_subcommand("watch", "Print connection changes, one line each, until interrupted");
-    watch->add_flag("--json", invocation.json, "Print one JSON object a line");
-    setFooter(*watch, "Examples: coresystem watch\n"
-                      "          coresystem watch -v --device phone.toml   also what is wrong "
-                      "with an edit\n"
-                      "Ends with exit code 0 at SIGINT (Ctrl-C) or SIGTERM.");
-    watch->callback(
+    const Command watch =
+        app.add("watch", "Print connection changes, one line each, until interrupted");
+    watch.flag("--json", invocation.json, "Print one JSON object a line");
+    watch.setFooter("Examples: coresystem watch\n"
+                    "          coresystem watch -v --device phone.toml   also what is wrong "
+                    "with an edit\n"
+                    "Ends with exit code 0 at SIGINT (Ctrl-C) or SIGTERM.");
+    watch.onUse(
         [&invocation] { invocation.command = [&invocation] { return runWatch(invocation); }; });
 }

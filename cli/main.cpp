@@ -5,6 +5,8 @@
 #include <cstring>
 #include <exception>
 
+#include <CLI/CLI.hpp>
+
 #include "Commands.h"
 #include "Completion.h"
 #include "Session.h"
@@ -50,15 +52,16 @@ struct Program {
                      "Show the library's log lines and the backend on standard error");
         app.fallthrough(); // options of every command may also stand behind it; inherited
         app.require_subcommand(0, 1);
-        addInfoCommands(app, invocation);
-        addCountryCommand(app, invocation);
-        addSimCommand(app, invocation);
-        addPackageCommand(app, invocation);
-        addStorageCommand(app, invocation);
-        addWatchCommand(app, invocation);
-        addLogCommands(app, invocation);
-        addDoctorCommand(app, invocation);
-        addDeviceCommands(app, invocation);
+        const Command command(app);
+        addInfoCommands(command, invocation);
+        addCountryCommand(command, invocation);
+        addSimCommand(command, invocation);
+        addPackageCommand(command, invocation);
+        addStorageCommand(command, invocation);
+        addWatchCommand(command, invocation);
+        addLogCommands(command, invocation);
+        addDoctorCommand(command, invocation);
+        addDeviceCommands(command, invocation);
         app.footer(FOOTER);
     }
 };
@@ -154,20 +157,6 @@ ExitCode reportOutputFailure(int error)
 }
 
 } // namespace
-
-std::vector<std::string> namesOfCommands(const CLI::App& command)
-{
-    std::vector<std::string> names;
-    for (const CLI::App* const below : command.get_subcommands({}))
-        names.push_back(below->get_name());
-    return names;
-}
-
-void setFooter(CLI::App& command, const std::string& remarks)
-{
-    command.footer(remarks + "\n--device FILE and -v go with every command; \"coresystem --help\" "
-                             "lists all exit codes.");
-}
 
 } // namespace cli
 
