@@ -104,6 +104,9 @@ void ModemsOnBus::run() const
 
 void ModemsOnBus::start()
 {
+    // The bus may not have noticed yet that the one before was killed.
+    if (!waitUntil([this] { return !hasName(); }))
+        throw std::runtime_error("ModemManager does not leave the bus");
     process_ = fork();
     if (process_ == 0)
         run();
