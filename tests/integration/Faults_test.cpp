@@ -322,6 +322,7 @@ public:
         return inChild([&] {
             coresystem_port::setLogSink(coresystem_port::LogSink::StandardError);
             CapturedStandardError log;
+            library(); // which a probe of its inner parts takes for granted
             const std::string seen = probe();
             return seen + errorLines(log.take());
         });
