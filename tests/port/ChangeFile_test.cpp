@@ -177,7 +177,9 @@ TEST_F(ChangeFileTest, ManyWritersLoseNothing)
     int count = 0;
     for (; std::getline(lines, line); ++count) {
         const int writer = std::stoi(line);
-        EXPECT_EQ(std::to_string(writer) + "." + std::to_string(next.at(writer)++), line);
+        EXPECT_EQ(std::to_string(writer) + "." +
+                      std::to_string(next.at(static_cast<std::size_t>(writer))++),
+                  line);
     }
     EXPECT_EQ(WRITERS * LINES, count);
     EXPECT_THAT(names(), ElementsAre("file"));
