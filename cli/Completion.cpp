@@ -4,8 +4,8 @@
 #include <set>
 
 #include "Facts.h"
-#include "simulator/DeviceSearch.h"
-#include "simulator/Schema.h"
+#include "devicefile/DeviceSearch.h"
+#include "devicefile/Schema.h"
 
 namespace cli {
 namespace {
@@ -21,7 +21,7 @@ struct Values {
 std::vector<std::string> deviceNames()
 {
     std::vector<std::string> names;
-    for (const auto& device : port::simulator::listDevices())
+    for (const auto& device : port::devicefile::listDevices())
         names.push_back(device.name);
     return names;
 }
@@ -29,7 +29,7 @@ std::vector<std::string> deviceNames()
 // "settings.flight_mode"; of slots the first one's, and no section with keys of any name.
 std::vector<std::string> devicePaths()
 {
-    using namespace port::simulator;
+    using namespace port::devicefile;
     std::vector<std::string> paths;
     for (const SectionRow* row = beginSections(); row != endSections(); ++row)
         for (const std::string& key : keyNames(*row))

@@ -4,7 +4,7 @@
 
 #include "DeviceCommands.h"
 #include "Text.h"
-#include "simulator/DeviceSearch.h"
+#include "devicefile/DeviceSearch.h"
 
 std::string cli::chosenDevice()
 {
@@ -16,8 +16,8 @@ std::string cli::chosenDevice()
 
 cli::DeviceText cli::readDevice(const std::string& name)
 {
-    const auto found = port::simulator::findDevice(name.empty() ? chosenDevice() : name);
-    const auto text = port::simulator::readDeviceText(found.path);
+    const auto found = port::devicefile::findDevice(name.empty() ? chosenDevice() : name);
+    const auto text = port::devicefile::readDeviceText(found.path);
     if (!text)
         return {found.path, "", text.error().reason + found.elsewhere};
     return {found.path, text.value(), ""};
@@ -28,7 +28,7 @@ std::vector<std::string> cli::problemsOf(const DeviceText& device)
     if (!device.problem.empty())
         return {device.problem};
     std::vector<std::string> lines;
-    for (const auto& problem : port::simulator::readDevice(device.text, device.path).problems)
+    for (const auto& problem : port::devicefile::readDevice(device.text, device.path).problems)
         lines.push_back(describe(device.path, problem));
     return lines;
 }

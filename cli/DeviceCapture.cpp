@@ -21,7 +21,7 @@ struct Capture {
 // What the machine tells may be more than a device file can say.
 void checkCaptured(const std::string& text)
 {
-    const auto reading = port::simulator::readDevice(text, "captured");
+    const auto reading = port::devicefile::readDevice(text, "captured");
     if (!reading.problems.empty())
         throw std::runtime_error("a device file cannot say all of it: " +
                                  describe("captured", reading.problems.front()));

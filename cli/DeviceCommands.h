@@ -6,7 +6,7 @@
 #include <string>
 
 #include "Commands.h"
-#include "simulator/DeviceFile.h"
+#include "devicefile/DeviceFile.h"
 
 namespace cli {
 

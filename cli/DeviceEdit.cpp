@@ -6,14 +6,14 @@
 #include "DeviceWrite.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "simulator/DevicePath.h"
-#include "simulator/DeviceSearch.h"
-#include "simulator/DeviceText.h"
+#include "devicefile/DevicePath.h"
+#include "devicefile/DeviceSearch.h"
+#include "devicefile/DeviceText.h"
 
 namespace cli {
 namespace {
 
-using port::simulator::Change;
+using port::devicefile::Change;
 
 const char* const PATHS = "A path is settings.flight_mode, slot[0].sim, fault.telephony_init or "
                           "packages.org.example.app.";
@@ -29,7 +29,7 @@ ExitCode runGet(const std::string& path)
     const DeviceText device = readDevice("");
     if (!device.problem.empty())
         return reportFailure(device.problem);
-    const auto value = port::simulator::getValue(device.text, device.path, path);
+    const auto value = port::devicefile::getValue(device.text, device.path, path);
     if (!value)
         return reportFailure(value.error().reason);
     writeOut(printable(value.value()) + "\n");
@@ -40,21 +40,21 @@ ExitCode runGet(const std::string& path)
 Change assignmentOf(const std::string& argument)
 {
     for (std::size_t at = 0; (at = argument.find('=', at)) != std::string::npos; ++at)
-        if (const std::string path = argument.substr(0, at); port::simulator::parsePath(path))
+        if (const std::string path = argument.substr(0, at); port::devicefile::parsePath(path))
             return {path, argument.substr(at + 1)};
     throw UsageError(quoted(argument) + " is no PATH=VALUE. " + PATHS);
 }
 
 Change removalOf(const std::string& path)
 {
-    if (!port::simulator::parsePath(path))
+    if (!port::devicefile::parsePath(path))
         throw UsageError(quoted(path) + " is no path. " + PATHS);
     return {path, std::nullopt};
 }
 
 ExitCode runChange(const std::vector<Change>& changes)
 {
-    const port::simulator::FoundDevice device = port::simulator::findDevice(chosenDevice());
+    const port::devicefile::FoundDevice device = port::devicefile::findDevice(chosenDevice());
     if (device.isShipped)
         return reportFailure(device.path + " comes with the library; change a copy of it");
     try {

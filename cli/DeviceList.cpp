@@ -4,12 +4,12 @@
 #include "Session.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "simulator/DeviceSearch.h"
+#include "devicefile/DeviceSearch.h"
 
 namespace cli {
 namespace {
 
-using port::simulator::NamedDevice;
+using port::devicefile::NamedDevice;
 
 // A word that a comment for an editor begins with: no description.
 constexpr const char* DIRECTIVE = "#:";
@@ -38,7 +38,7 @@ std::string descriptionOf(const std::string& text)
 std::vector<ListedDevice> askDevices()
 {
     std::vector<ListedDevice> devices;
-    for (const NamedDevice& device : port::simulator::listDevices()) {
+    for (const NamedDevice& device : port::devicefile::listDevices()) {
         const DeviceText text = readDevice(device.path);
         devices.push_back({device, descriptionOf(text.text), problemsOf(text)});
     }

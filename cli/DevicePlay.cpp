@@ -16,15 +16,15 @@
 #include "DeviceWrite.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "simulator/DeviceSearch.h"
-#include "simulator/DeviceText.h"
+#include "devicefile/DeviceSearch.h"
+#include "devicefile/DeviceText.h"
 
 namespace fs = std::filesystem;
 
 namespace cli {
 namespace {
 
-using port::simulator::Step;
+using port::devicefile::Step;
 
 // In a file that was made by playing: it may be made anew.
 const char MARK[] = "# Made by coresystem device play";
@@ -126,7 +126,7 @@ void rehearse(const DeviceText& scenario, const std::vector<Step>& steps)
 {
     std::string text = scenario.text;
     for (const Step& step : steps) {
-        const auto next = port::simulator::changeText(text, scenario.path, step.changes);
+        const auto next = port::devicefile::changeText(text, scenario.path, step.changes);
         if (!next)
             throw std::runtime_error(step.source +
                                      ": the step is not possible: " + next.error().reason);
@@ -139,7 +139,7 @@ std::string fileFor(const std::string& name)
 {
     if (name.find('/') != std::string::npos || fs::path(name).extension() == ".toml")
         return name;
-    const port::simulator::FoundDevice device = port::simulator::findDevice(name);
+    const port::devicefile::FoundDevice device = port::devicefile::findDevice(name);
     if (device.isShipped)
         throw std::runtime_error(device.path + " comes with the library; play onto another file");
     return device.path;
@@ -196,7 +196,7 @@ ExitCode runPlay(const Play& play)
     if (!problems.empty())
         return BAD_DEVICE_FILE;
     const std::vector<Step> steps =
-        port::simulator::readDevice(scenario.text, scenario.path).device.steps;
+        port::devicefile::readDevice(scenario.text, scenario.path).device.steps;
     if (steps.empty())
         throw std::runtime_error(printable(scenario.path) + " has no [[step]]");
     const std::string stage = stageFor(play, scenario);

@@ -78,8 +78,8 @@ int awaitEnd(pid_t child)
 // Whether the device has a system bus at all.
 bool hasBus(const std::string& file)
 {
-    const auto text = port::simulator::readDeviceText(file);
-    const auto device = text ? port::simulator::parseDevice(text.value(), file) : text.error();
+    const auto text = port::devicefile::readDeviceText(file);
+    const auto device = text ? port::devicefile::parseDevice(text.value(), file) : text.error();
     return !device || device.value().section("fault").find("g_bus_get_sync") == nullptr;
 }
 

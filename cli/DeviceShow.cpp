@@ -8,12 +8,12 @@
 #include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "simulator/DeviceText.h"
+#include "devicefile/DeviceText.h"
 
 namespace cli {
 namespace {
 
-using port::simulator::Entry;
+using port::devicefile::Entry;
 
 // What is of a person or of one device only.
 bool isIdentity(const Entry& entry)
@@ -84,7 +84,7 @@ ExitCode runShow(const Invocation& invocation, const std::string& name, bool rev
         writeErrorLine(printable(problem));
     if (!problems.empty())
         return BAD_DEVICE_FILE;
-    const auto entries = port::simulator::listEntries(device.text, device.path);
+    const auto entries = port::devicefile::listEntries(device.text, device.path);
     writeOut((invocation.json ? showJson : showText)(device, entries.value(), reveal));
     return SUCCESS;
 }

@@ -8,8 +8,8 @@
 #include <fcntl.h>
 #include <unistd.h>
 
-#include "common/ChangeFile.h"
-#include "simulator/DeviceFile.h"
+#include "devicefile/ChangeFile.h"
+#include "devicefile/DeviceFile.h"
 
 namespace {
 
@@ -34,7 +34,7 @@ void cli::writeDevice(const std::string& path, const std::string& text, bool rep
     const bool isNew = make(path);
     throwUnless(path + " is there; --force replaces it", isNew || replace);
     const std::string problem =
-        port::changeFile(path, port::simulator::SIZE_LIMIT, [&](std::string& content) {
+        port::devicefile::changeFile(path, port::devicefile::SIZE_LIMIT, [&](std::string& content) {
             content = text;
             return std::string();
         });
@@ -43,11 +43,12 @@ void cli::writeDevice(const std::string& path, const std::string& text, bool rep
     throwUnless(problem, problem.empty());
 }
 
-void cli::changeDevice(const std::string& path, const std::vector<port::simulator::Change>& changes)
+void cli::changeDevice(const std::string& path,
+                       const std::vector<port::devicefile::Change>& changes)
 {
     const std::string problem =
-        port::changeFile(path, port::simulator::SIZE_LIMIT, [&](std::string& content) {
-            const auto changed = port::simulator::changeText(content, path, changes);
+        port::devicefile::changeFile(path, port::devicefile::SIZE_LIMIT, [&](std::string& content) {
+            const auto changed = port::devicefile::changeText(content, path, changes);
             content = changed ? changed.value() : content;
             return changed ? std::string() : changed.error().reason;
         });

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "simulator/DeviceText.h"
+#include "devicefile/DeviceText.h"
 
 namespace cli {
 
@@ -15,7 +15,7 @@ namespace cli {
 void writeDevice(const std::string& path, const std::string& text, bool replace);
 
 /// Some values of a file, all at once.
-void changeDevice(const std::string& path, const std::vector<port::simulator::Change>& changes);
+void changeDevice(const std::string& path, const std::vector<port::devicefile::Change>& changes);
 
 } // namespace cli
 

@@ -10,7 +10,7 @@
 #include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "common/Closest.h"
+#include "devicefile/Closest.h"
 
 namespace cli {
 namespace {
@@ -83,7 +83,8 @@ void checkFactName(const std::string& name)
     const std::vector<std::string> names = factNames();
     if (std::find(names.begin(), names.end(), name) == names.end())
         throw UsageError("no fact is called " + quoted(name) + "; did you mean \"" +
-                         port::closest(name, names) + "\"? The facts are " + listed(names));
+                         port::devicefile::closest(name, names) + "\"? The facts are " +
+                         listed(names));
 }
 
 ExitCode reportMissing(const Fact& fact)

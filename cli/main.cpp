@@ -12,7 +12,7 @@
 #include "Session.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "common/Closest.h"
+#include "devicefile/Closest.h"
 
 namespace cli {
 namespace {
@@ -89,7 +89,8 @@ ExitCode reportExtras(const CLI::App& app)
         return reportUsage("unexpected argument " + quoted(word));
     const std::string kind = &chosen == &app ? "" : chosen.get_name() + " ";
     return reportUsage("no " + kind + "command is called " + quoted(word) + "; did you mean \"" +
-                       port::closest(word, names) + "\"? The commands are " + listed(names));
+                       port::devicefile::closest(word, names) + "\"? The commands are " +
+                       listed(names));
 }
 
 ExitCode execute(const Program& program)

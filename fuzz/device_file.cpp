@@ -6,9 +6,9 @@
 #include <string>
 
 #include "Fuzz.h"
-#include "simulator/DeviceFile.h"
+#include "devicefile/DeviceFile.h"
 
-using namespace port::simulator;
+using namespace port::devicefile;
 
 namespace {
 

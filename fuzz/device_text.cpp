@@ -10,12 +10,12 @@
 #include <vector>
 
 #include "Fuzz.h"
-#include "simulator/DeviceFile.h"
-#include "simulator/DevicePath.h"
-#include "simulator/DeviceText.h"
-#include "simulator/Toml.h"
+#include "devicefile/DeviceFile.h"
+#include "devicefile/DevicePath.h"
+#include "devicefile/DeviceText.h"
+#include "devicefile/Toml.h"
 
-using namespace port::simulator;
+using namespace port::devicefile;
 
 namespace {
 

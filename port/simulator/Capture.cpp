@@ -6,14 +6,20 @@
 #include <sstream>
 #include <type_traits>
 
+#include "../../devicefile/Schema.h"
+#include "../../devicefile/Toml.h"
 #include "../common/GLibTypes.h"
-#include "Schema.h"
-#include "Toml.h"
 
 namespace port::simulator {
 namespace {
 
 using coresystem_port::CaptureOptions;
+using devicefile::findKey;
+using devicefile::findSection;
+using devicefile::Form;
+using devicefile::Name;
+using devicefile::NOT_SUPPORTED;
+using devicefile::Type;
 
 std::string validUtf8(const std::string& text)
 {

@@ -3,8 +3,8 @@
 #ifndef PORT_SIMULATOR_CLOCK_H
 #define PORT_SIMULATOR_CLOCK_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Clock.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
@@ -14,12 +14,12 @@ std::tm timeAt(std::time_t moment, std::int64_t offset);
 
 class SimulatedClock : public Clock {
 public:
-    explicit SimulatedClock(DeviceFile& file) : file_(file) {}
+    explicit SimulatedClock(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Sourced<std::tm>> now() override;
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

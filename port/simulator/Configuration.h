@@ -3,14 +3,14 @@
 #ifndef PORT_SIMULATOR_CONFIGURATION_H
 #define PORT_SIMULATOR_CONFIGURATION_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Configuration.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedConfiguration : public Configuration {
 public:
-    explicit SimulatedConfiguration(DeviceFile& file) : file_(file) {}
+    explicit SimulatedConfiguration(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Fact> text(const std::string& key) override
     {
@@ -20,7 +20,7 @@ public:
     }
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

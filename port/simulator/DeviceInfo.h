@@ -3,14 +3,14 @@
 #ifndef PORT_SIMULATOR_DEVICE_INFO_H
 #define PORT_SIMULATOR_DEVICE_INFO_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/DeviceInfo.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedDeviceInfo : public DeviceInfo {
 public:
-    explicit SimulatedDeviceInfo(DeviceFile& file) : file_(file) {}
+    explicit SimulatedDeviceInfo(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Fact> platformId() override
     {
@@ -34,7 +34,7 @@ public:
     }
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

@@ -4,6 +4,12 @@
 namespace port::simulator {
 namespace {
 
+using devicefile::BUS_ERROR;
+using devicefile::Fault;
+using devicefile::NOT_A_STRING;
+using devicefile::NOTHING;
+using devicefile::Value;
+
 bool isSame(const Fault& one, const Fault& other)
 {
     return one.error == other.error && one.delayMs == other.delayMs && one.call == other.call;

@@ -7,28 +7,28 @@
 #include <mutex>
 #include <string>
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Faults.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedFaults : public Faults {
 public:
-    explicit SimulatedFaults(DeviceFile& file) : file_(file) {}
+    explicit SimulatedFaults(devicefile::DeviceFile& file) : file_(file) {}
 
     std::optional<CallFault> meet(const char* call) override;
 
 private:
     // The calls of a function since its fault was first met as it is now.
     struct Count {
-        Fault rule;
+        devicefile::Fault rule;
         std::int64_t calls = 0;
     };
 
-    bool isTheCall(const std::string& call, const Fault& rule);
+    bool isTheCall(const std::string& call, const devicefile::Fault& rule);
     void forget(const std::string& call);
 
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
     std::mutex mutex_;
     std::map<std::string, Count> counts_;
 };

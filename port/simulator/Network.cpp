@@ -8,6 +8,9 @@
 namespace port::simulator {
 namespace {
 
+using devicefile::Device;
+using devicefile::Section;
+
 // A radio's state, from one reading of the file.
 template <typename State>
 Result<Sourced<State>> radio(const Device& device, const char* key, State switchedOff)

@@ -3,8 +3,8 @@
 #ifndef PORT_SIMULATOR_NETWORK_H
 #define PORT_SIMULATOR_NETWORK_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Network.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
@@ -12,7 +12,7 @@ namespace port::simulator {
 // connection without one is as its radio's state tells.
 class SimulatedNetwork : public Network {
 public:
-    explicit SimulatedNetwork(DeviceFile& file) : file_(file) {}
+    explicit SimulatedNetwork(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Sourced<CellularState>> cellular() override;
     Result<Sourced<LinkState>> wifi() override;
@@ -26,7 +26,7 @@ public:
     std::unique_ptr<Watch> watch(std::function<void()> changed) override;
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

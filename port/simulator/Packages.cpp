@@ -3,6 +3,9 @@
 
 namespace port::simulator {
 
+using devicefile::Device;
+using devicefile::Section;
+
 Result<Sourced<std::optional<std::string>>> SimulatedPackages::version(const std::string& name)
 {
     using Version = std::optional<std::string>;

@@ -3,19 +3,19 @@
 #ifndef PORT_SIMULATOR_PACKAGES_H
 #define PORT_SIMULATOR_PACKAGES_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Packages.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedPackages : public Packages {
 public:
-    explicit SimulatedPackages(DeviceFile& file) : file_(file) {}
+    explicit SimulatedPackages(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Sourced<std::optional<std::string>>> version(const std::string& name) override;
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

@@ -3,14 +3,14 @@
 #ifndef PORT_SIMULATOR_SETTINGS_H
 #define PORT_SIMULATOR_SETTINGS_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Settings.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedSettings : public Settings {
 public:
-    explicit SimulatedSettings(DeviceFile& file) : file_(file) {}
+    explicit SimulatedSettings(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Fact> deviceName() override
     {
@@ -26,7 +26,7 @@ public:
     }
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

@@ -2,13 +2,13 @@
 // A device described in a TOML file.
 #include <dlog.h>
 
+#include "../../devicefile/DeviceFile.h"
+#include "../../devicefile/DeviceSearch.h"
 #include "../backend/Backend.h"
 #include "../backend/Log.h"
 #include "Clock.h"
 #include "Configuration.h"
-#include "DeviceFile.h"
 #include "DeviceInfo.h"
-#include "DeviceSearch.h"
 #include "Faults.h"
 #include "Network.h"
 #include "Packages.h"
@@ -20,6 +20,8 @@ namespace port::simulator {
 namespace {
 
 using coresystem_port::Service;
+using devicefile::DeviceFile;
+using devicefile::FoundDevice;
 
 // The log is where an application learns of a mistake in the file.
 void logProblem(const std::string& problem)
@@ -110,5 +112,5 @@ private:
 
 std::unique_ptr<port::Backend> port::makeSimulatorBackend(const std::string& deviceFile)
 {
-    return std::make_unique<simulator::SimulatorBackend>(simulator::findDevice(deviceFile));
+    return std::make_unique<simulator::SimulatorBackend>(devicefile::findDevice(deviceFile));
 }

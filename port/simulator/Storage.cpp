@@ -4,6 +4,9 @@
 namespace port::simulator {
 namespace {
 
+using devicefile::Device;
+using devicefile::Section;
+
 constexpr struct {
     const char* key;
     std::uint64_t VolumeSize::*size;

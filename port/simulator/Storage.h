@@ -3,19 +3,19 @@
 #ifndef PORT_SIMULATOR_STORAGE_H
 #define PORT_SIMULATOR_STORAGE_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Storage.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedStorage : public Storage {
 public:
-    explicit SimulatedStorage(DeviceFile& file) : file_(file) {}
+    explicit SimulatedStorage(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Sourced<VolumeSize>> internal() override;
 
 private:
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

@@ -4,6 +4,9 @@
 namespace port::simulator {
 namespace {
 
+using devicefile::Device;
+using devicefile::Section;
+
 // A switch that is off where the file does not say so.
 bool isOn(const Section& section, const char* key)
 {

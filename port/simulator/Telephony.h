@@ -3,14 +3,14 @@
 #ifndef PORT_SIMULATOR_TELEPHONY_H
 #define PORT_SIMULATOR_TELEPHONY_H
 
+#include "../../devicefile/DeviceFile.h"
 #include "../backend/Telephony.h"
-#include "DeviceFile.h"
 
 namespace port::simulator {
 
 class SimulatedTelephony : public Telephony {
 public:
-    explicit SimulatedTelephony(DeviceFile& file) : file_(file) {}
+    explicit SimulatedTelephony(devicefile::DeviceFile& file) : file_(file) {}
 
     Result<Sourced<std::vector<SlotName>>> slots() override;
     Result<Sourced<Card>> card(const SlotName& name) override;
@@ -23,12 +23,12 @@ public:
     Result<Sourced<bool>> smsReady(const SlotName& name) override;
 
 private:
-    Result<std::shared_ptr<const Device>> device();
-    Result<Section> slot(const SlotName& name);
+    Result<std::shared_ptr<const devicefile::Device>> device();
+    Result<devicefile::Section> slot(const SlotName& name);
     template <typename T>
     Result<Sourced<T>> get(const SlotName& name, const char* key);
 
-    DeviceFile& file_;
+    devicefile::DeviceFile& file_;
 };
 
 } // namespace port::simulator

@@ -11,7 +11,7 @@ CONDITION = re.compile(r"^[ \t]*#[ \t]*(?:if|ifdef|ifndef|elif)\b(.*)$", re.MULT
 MACRO = re.compile(r"\b[A-Za-z_]\w*")
 
 # Where an include may be found, besides beside the file that includes it.
-INCLUDE_FOLDERS = ("include", "src", "port/api", "port/coreutil/include", "port/include")
+INCLUDE_FOLDERS = ("", "include", "src", "port/api", "port/coreutil/include", "port/include")
 
 # The standard headers of C++11 that the library may use; none of a platform, none of a later C++.
 LIBRARY_MAY_USE = frozenset("""
@@ -109,6 +109,22 @@ def check_backends(tree):
                     yield f"{file}: reaches {target} of the other backend"
 
 
+def check_device_files(tree):
+    allowed = ("devicefile/", "port/api/", "port/common/", "port/backend/")
+    for file in tree.files("devicefile"):
+        for _, target in tree.includes(file):
+            if target is not None and not target.startswith(allowed):
+                yield f"{file}: includes {target}; device files know none of the backends"
+
+
+def check_command(tree):
+    allowed = ("cli/", "devicefile/", "include/", "port/api/", "port/coreutil/include/", "port/include/")
+    for file in tree.files("cli"):
+        for _, target in tree.includes(file):
+            if target is not None and not target.startswith(allowed):
+                yield f"{file}: includes {target}; the command asks as any application does"
+
+
 def main():
     parser = argparse.ArgumentParser(description=__doc__)
     parser.add_argument("root", type=pathlib.Path, help="top folder of the tree")
@@ -117,7 +133,7 @@ def main():
         sys.exit(f"{tree.root}: no source file of the library is here")
     problems = [problem
                 for check in (check_library, check_conditions, check_platform_headers, check_shims,
-                              check_backends)
+                              check_backends, check_device_files, check_command)
                 for problem in check(tree)]
     for problem in problems:
         print(problem)

@@ -126,6 +126,11 @@ class Layers(CheckerTest):
         self.write("port/simulator/bad.cpp", "#include \"../linux/Bus.h\"\n")
         self.assert_fails(self.check(), "port/simulator/bad.cpp: reaches port/linux/Bus.h")
 
+    def test_DeviceFilesAndTheCommandReachingABackendFail(self):
+        for folder in ("devicefile", "cli"):
+            self.write(f"{folder}/bad.cpp", "#include \"../port/simulator/File.h\"\n")
+            self.assert_fails(self.check(), f"{folder}/bad.cpp: includes port/simulator/File.h")
+
 
 class Symbols(CheckerTest):
     def setUp(self):

@@ -3,15 +3,15 @@
 
 #include <gmock/gmock.h>
 
-#include "simulator/DeviceFile.h"
+#include "devicefile/DeviceFile.h"
 #include "support/DeviceFileTest.h"
 #include "support/FakeBackend.h"
 
 using coresystem_port::CaptureOptions;
 using port::CardStatus;
+using port::devicefile::Device;
+using port::devicefile::Section;
 using port::simulator::capture;
-using port::simulator::Device;
-using port::simulator::Section;
 using testing::HasSubstr;
 using testing::Not;
 
@@ -79,7 +79,7 @@ available_blocks = 9223372036854775807
 
 Device deviceOf(const std::string& text)
 {
-    const auto reading = port::simulator::readDevice(text, "captured");
+    const auto reading = port::devicefile::readDevice(text, "captured");
     for (const auto& problem : reading.problems)
         ADD_FAILURE() << describe("captured", problem) << "\n" << text;
     return reading.device;
@@ -98,7 +98,7 @@ std::string shown(const Section& section, const std::string& key)
     return std::to_string(std::get<std::int64_t>(value->content));
 }
 
-void expectSame(const port::simulator::SectionRow& row, const Section& wanted, const Section& got)
+void expectSame(const port::devicefile::SectionRow& row, const Section& wanted, const Section& got)
 {
     for (const std::string& key : keyNames(row))
         EXPECT_EQ(shown(wanted, key), shown(got, key)) << row.name << "." << key;
@@ -126,10 +126,10 @@ TEST_F(CaptureTest, EveryKeyOfADeviceFileIsCaptured)
     const Device wanted = deviceOf("schema = 1\n" + std::string(EVERYTHING));
     const Device got = deviceOf(capture(*backend, everything()));
     for (const char* const name : {"device", "settings", "subscriptions", "network", "storage"})
-        expectSame(*port::simulator::findSection(name), wanted.section(name), got.section(name));
+        expectSame(*port::devicefile::findSection(name), wanted.section(name), got.section(name));
     ASSERT_EQ(wanted.slots.size(), got.slots.size());
     for (std::size_t i = 0; i < got.slots.size(); ++i)
-        expectSame(*port::simulator::findSection("slot"), wanted.slots[i], got.slots[i]);
+        expectSame(*port::devicefile::findSection("slot"), wanted.slots[i], got.slots[i]);
     EXPECT_EQ("\"1.2.3\"", shown(got.section("packages"), "org.example.clock"));
     EXPECT_EQ("absent", shown(got.section("packages"), "org.example.radio"));
 }

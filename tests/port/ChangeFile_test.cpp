@@ -11,7 +11,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include "common/ChangeFile.h"
+#include "devicefile/ChangeFile.h"
 #include "support/Child.h"
 #include "support/TemporaryTree.h"
 
@@ -34,7 +34,7 @@ protected:
     }
     static std::string addLineTo(const std::string& file, const std::string& line)
     {
-        return port::changeFile(file, LIMIT, [&](std::string& content) {
+        return port::devicefile::changeFile(file, LIMIT, [&](std::string& content) {
             content += line + "\n";
             return std::string();
         });
@@ -90,13 +90,14 @@ TEST_F(ChangeFileTest, OwnerIsKeptWhereThatIsPermitted)
 TEST_F(ChangeFileTest, UnchangedContentIsNotWritten)
 {
     const ino_t before = status().st_ino;
-    EXPECT_EQ("", port::changeFile(path, LIMIT, [](std::string&) { return std::string(); }));
+    EXPECT_EQ(
+        "", port::devicefile::changeFile(path, LIMIT, [](std::string&) { return std::string(); }));
     EXPECT_EQ(before, status().st_ino);
 }
 
 TEST_F(ChangeFileTest, RefusalLeavesTheFile)
 {
-    EXPECT_EQ("no", port::changeFile(path, LIMIT, [](std::string& text) {
+    EXPECT_EQ("no", port::devicefile::changeFile(path, LIMIT, [](std::string& text) {
                   text = "other";
                   return std::string("no");
               }));

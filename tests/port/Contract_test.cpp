@@ -8,11 +8,11 @@
 #include <gmock/gmock.h>
 
 #include "coresystem_port.h"
+#include "devicefile/Toml.h"
 #include "linux/DeviceInfo.h"
 #include "linux/Settings.h"
 #include "simulator/DeviceInfo.h"
 #include "simulator/Settings.h"
-#include "simulator/Toml.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/Together.h"
@@ -80,7 +80,7 @@ private:
     }
 
     TemporaryTree tree_;
-    port::simulator::DeviceFile file_{tree_.path("/device.toml")};
+    port::devicefile::DeviceFile file_{tree_.path("/device.toml")};
     port::simulator::SimulatedDeviceInfo deviceInfo_{file_};
     port::simulator::SimulatedSettings settings_{file_};
 };

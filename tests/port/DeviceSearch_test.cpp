@@ -6,11 +6,11 @@
 #include <gmock/gmock.h>
 #include <unistd.h>
 
-#include "simulator/DeviceSearch.h"
+#include "devicefile/DeviceSearch.h"
 #include "support/Child.h"
 #include "support/TemporaryTree.h"
 
-using port::simulator::findDevice;
+using port::devicefile::findDevice;
 using testing::AllOf;
 using testing::EndsWith;
 using testing::HasSubstr;
@@ -119,7 +119,7 @@ TEST_F(DeviceSearchTest, ListHasEveryNameOnce)
     const std::string list = inChild([&] {
         setenv("XDG_CONFIG_HOME", tree.path("/config").c_str(), 1);
         std::string all;
-        for (const auto& device : port::simulator::listDevices())
+        for (const auto& device : port::devicefile::listDevices())
             all += device.name + (device.isShipped ? " shipped\n" : " " + device.path + "\n");
         return all;
     });

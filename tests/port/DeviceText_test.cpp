@@ -2,14 +2,14 @@
 // What becomes of a device file's text when single values change.
 #include <gmock/gmock.h>
 
-#include "simulator/DevicePath.h"
-#include "simulator/DeviceText.h"
+#include "devicefile/DevicePath.h"
+#include "devicefile/DeviceText.h"
 
-using port::simulator::Change;
-using port::simulator::changeText;
-using port::simulator::DevicePath;
-using port::simulator::getValue;
-using port::simulator::parsePath;
+using port::devicefile::Change;
+using port::devicefile::changeText;
+using port::devicefile::DevicePath;
+using port::devicefile::getValue;
+using port::devicefile::parsePath;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::StartsWith;
@@ -264,7 +264,7 @@ TEST(DeviceTextTest, ValuesAreReadAsPlainText)
 
 TEST(DeviceTextTest, EntriesStandInTheOrderOfTheText)
 {
-    const auto entries = port::simulator::listEntries(ODD, FILE_NAME);
+    const auto entries = port::devicefile::listEntries(ODD, FILE_NAME);
     ASSERT_TRUE(entries);
     std::vector<std::string> lines;
     for (const auto& entry : entries.value())

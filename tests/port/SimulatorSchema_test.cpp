@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a device file may say, and how it is told what it may not.
-#include "simulator/DeviceFile.h"
+#include "devicefile/DeviceFile.h"
 #include "support/DeviceFileTest.h"
 
 using port::CardStatus;
 using port::CellularState;
 using port::FontSize;
 using port::LinkState;
-using port::simulator::DeviceFile;
-using port::simulator::Fault;
+using port::devicefile::DeviceFile;
+using port::devicefile::Fault;
 using testing::EndsWith;
 using testing::HasSubstr;
 
@@ -226,7 +226,7 @@ TEST_F(SimulatorSchemaTest, FaultIsAnErrorByItsName)
     EXPECT_EQ(0, refused.value().value.delayMs);
     EXPECT_EQ(0, refused.value().value.call);
     EXPECT_EQ(1, file.get<Fault>("fault", "tel_get_sim_imsi").value().value.value);
-    EXPECT_EQ(port::simulator::NOTHING,
+    EXPECT_EQ(port::devicefile::NOTHING,
               file.get<Fault>("fault", "vconf_get_str").value().value.value);
     EXPECT_FALSE(file.get<Fault>("fault", "wifi_initialize"));
 }
@@ -251,8 +251,8 @@ TEST_F(SimulatorSchemaTest, FaultMayBeLateAndOfOneCall)
 TEST_F(SimulatorSchemaTest, BusOfAProgramMayBeMissing)
 {
     describe("[fault]\ng_bus_get_sync = 'no_bus'\n");
-    expectAnswer(port::simulator::BusFault::NoBus, line(3),
-                 file.get<port::simulator::BusFault>("fault", "g_bus_get_sync"));
+    expectAnswer(port::devicefile::BusFault::NoBus, line(3),
+                 file.get<port::devicefile::BusFault>("fault", "g_bus_get_sync"));
     EXPECT_EQ(":3:18: \"g_bus_get_sync\" must be one of \"no_bus\"",
               refusal("[fault]", "g_bus_get_sync = 'off'"));
 }

@@ -9,7 +9,7 @@
 
 #include "backend/Backend.h"
 #include "coresystem_port.h"
-#include "simulator/DeviceFile.h"
+#include "devicefile/DeviceFile.h"
 #include "support/CapturedStandardError.h"
 #include "support/TemporaryTree.h"
 #include "support/Together.h"

@@ -10,9 +10,9 @@
 #include <gmock/gmock.h>
 
 #include "coresystem_port.h"
+#include "devicefile/Toml.h"
 #include "linux/Telephony.h"
 #include "simulator/Telephony.h"
-#include "simulator/Toml.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
@@ -52,7 +52,7 @@ public:
 
 private:
     TemporaryTree tree_;
-    port::simulator::DeviceFile file_{tree_.path("/device.toml")};
+    port::devicefile::DeviceFile file_{tree_.path("/device.toml")};
     port::simulator::SimulatedTelephony telephony_{file_};
 };
 

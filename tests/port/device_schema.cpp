@@ -10,11 +10,11 @@
 
 #include <nlohmann/json.hpp>
 
-#include "simulator/DeviceFile.h"
-#include "simulator/Schema.h"
+#include "devicefile/DeviceFile.h"
+#include "devicefile/Schema.h"
 
 using Json = nlohmann::ordered_json;
-using namespace port::simulator;
+using namespace port::devicefile;
 
 namespace {
 

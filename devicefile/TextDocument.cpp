@@ -5,7 +5,7 @@
 
 #include "DevicePath.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 constexpr const char* BLANKS = " \t";
@@ -230,4 +230,4 @@ std::string TextDocument::withElement(const toml::array& list, const std::string
                           lineEnding_ + header + lineEnding_ + entry);
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

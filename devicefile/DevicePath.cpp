@@ -9,7 +9,7 @@
 #include "TextPlaces.h"
 #include "Toml.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 // An index is no key of TOML's: it becomes one of digits.
@@ -89,4 +89,4 @@ std::string writtenKey(const std::string& name)
     return written.substr(0, written.rfind(" = 0"));
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

@@ -5,8 +5,8 @@
 // other value is what it was. Of the text only the value's own bytes change, or, for a key that
 // comes or goes, one run of bytes: comments, order, blanks, quotes, line endings and a byte order
 // mark stay, as does a missing line ending at the end. A change that cannot be made so is an error.
-#ifndef PORT_SIMULATOR_DEVICE_TEXT_H
-#define PORT_SIMULATOR_DEVICE_TEXT_H
+#ifndef DEVICEFILE_DEVICE_TEXT_H
+#define DEVICEFILE_DEVICE_TEXT_H
 
 #include <cstdint>
 #include <optional>
@@ -14,9 +14,9 @@
 #include <variant>
 #include <vector>
 
-#include "../backend/Result.h"
+#include "../port/backend/Result.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 /// A value of a device file.
 struct Entry {
@@ -50,6 +50,6 @@ struct Change {
 Result<std::string> changeText(const std::string& text, const std::string& file,
                                const std::vector<Change>& changes);
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

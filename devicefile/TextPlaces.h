@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Where the parser's lines and columns are in a text.
-#ifndef PORT_SIMULATOR_TEXT_PLACES_H
-#define PORT_SIMULATOR_TEXT_PLACES_H
+#ifndef DEVICEFILE_TEXT_PLACES_H
+#define DEVICEFILE_TEXT_PLACES_H
 
 #include <algorithm>
 #include <string_view>
@@ -9,7 +9,7 @@
 
 #include "Toml.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 inline bool beginsCharacter(char byte)
 {
@@ -59,6 +59,6 @@ private:
     std::vector<std::size_t> lines_; // where each begins
 };
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

@@ -8,13 +8,13 @@
 #include <set>
 #include <sstream>
 
-#include "../common/Closest.h"
+#include "Closest.h"
 #include "DeviceFile.h"
 #include "DevicePath.h"
 #include "Schema.h"
 #include "TextDocument.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 bool isListOfTables(const toml::node& node)
@@ -486,4 +486,4 @@ Result<std::string> changeText(const std::string& text, const std::string& file,
     return changes.size() == 1 ? cannot(changes.front(), why) : notAvailable(why);
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

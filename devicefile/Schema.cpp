@@ -4,12 +4,12 @@
 #include <algorithm>
 #include <iterator>
 
-#include "../backend/Network.h"
-#include "../backend/Settings.h"
-#include "../backend/Telephony.h"
+#include "../port/backend/Network.h"
+#include "../port/backend/Settings.h"
+#include "../port/backend/Telephony.h"
 #include "ErrorNames.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 template <typename Enumeration>
@@ -320,4 +320,4 @@ std::vector<std::string> faultKeyNames()
     return names;
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

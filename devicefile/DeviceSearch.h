@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // Where a device file is looked for.
-#ifndef PORT_SIMULATOR_DEVICE_SEARCH_H
-#define PORT_SIMULATOR_DEVICE_SEARCH_H
+#ifndef DEVICEFILE_DEVICE_SEARCH_H
+#define DEVICEFILE_DEVICE_SEARCH_H
 
 #include <string>
 #include <vector>
 
-namespace port::simulator {
+namespace port::devicefile {
 
 struct FoundDevice {
     std::string path;       // the name itself when no file was found
@@ -31,6 +31,6 @@ struct NamedDevice {
 /// Every device that a name alone leads to, by name. One of the user's own hides the shipped one.
 std::vector<NamedDevice> listDevices();
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

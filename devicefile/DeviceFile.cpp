@@ -10,12 +10,12 @@
 
 #include <gio/gio.h>
 
-#include "../common/Closest.h"
-#include "../common/RegularFile.h"
+#include "../port/common/RegularFile.h"
+#include "Closest.h"
 #include "DevicePath.h"
 #include "Toml.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 constexpr long SCHEMA = 1;
@@ -584,4 +584,4 @@ void DeviceFile::report(const std::string& problem)
         onProblem_(problem);
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The errors of the platform's interfaces by the names that their headers give them.
-#ifndef PORT_SIMULATOR_ERROR_NAMES_H
-#define PORT_SIMULATOR_ERROR_NAMES_H
+#ifndef DEVICEFILE_ERROR_NAMES_H
+#define DEVICEFILE_ERROR_NAMES_H
 
 #include <array>
 
@@ -26,7 +26,7 @@
 #enumerator, enumerator \
     }
 
-namespace port::simulator {
+namespace port::devicefile {
 
 constexpr Name ALARM_ERRORS[] = {
     PORT_NAMED(ALARM_ERROR_INVALID_PARAMETER), PORT_NAMED(ALARM_ERROR_INVALID_TIME),
@@ -141,7 +141,7 @@ constexpr std::array<Name, First + Second> joined(const Name (&first)[First],
     return all;
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #undef PORT_NAMED
 

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // The one way in which a file that others read is changed.
-#ifndef PORT_COMMON_CHANGE_FILE_H
-#define PORT_COMMON_CHANGE_FILE_H
+#ifndef DEVICEFILE_CHANGE_FILE_H
+#define DEVICEFILE_CHANGE_FILE_H
 
 #include <cstddef>
 #include <functional>
 #include <string>
 
-namespace port {
+namespace port::devicefile {
 
 /// Puts a new content in the place of a regular file's: at once, so that every reader finds the old
 /// one or the new one whole, and on the disk before it returns. `change` gets the content (at most
@@ -22,6 +22,6 @@ namespace port {
 std::string changeFile(const std::string& path, std::size_t limit,
                        const std::function<std::string(std::string& content)>& change);
 
-} // namespace port
+} // namespace port::devicefile
 
 #endif

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // The TOML parser, made fit for texts that anybody may have written. Nobody includes it but by
 // this.
-#ifndef PORT_SIMULATOR_TOML_H
-#define PORT_SIMULATOR_TOML_H
+#ifndef DEVICEFILE_TOML_H
+#define DEVICEFILE_TOML_H
 
 #include <cstdio>
 #include <string>
@@ -25,7 +25,7 @@
 
 #include <toml++/toml.h>
 
-namespace port::simulator {
+namespace port::devicefile {
 
 /// Why a text is no TOML, on one line: the parser quotes what it met, line endings and all.
 inline std::string reasonOf(const toml::parse_error& error)
@@ -41,6 +41,6 @@ inline std::string reasonOf(const toml::parse_error& error)
     return reason;
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

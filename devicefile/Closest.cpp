@@ -24,7 +24,8 @@ std::size_t editsBetween(const std::string& from, const std::string& to)
 
 } // namespace
 
-std::string port::closest(const std::string& word, const std::vector<std::string>& candidates)
+std::string port::devicefile::closest(const std::string& word,
+                                      const std::vector<std::string>& candidates)
 {
     return *std::min_element(candidates.begin(), candidates.end(),
                              [&](const std::string& left, const std::string& right) {
@@ -32,7 +33,8 @@ std::string port::closest(const std::string& word, const std::vector<std::string
                              });
 }
 
-std::string port::similar(const std::string& word, const std::vector<std::string>& candidates)
+std::string port::devicefile::similar(const std::string& word,
+                                      const std::vector<std::string>& candidates)
 {
     if (candidates.empty())
         return {};

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // A text of TOML with the places of what stands in it; how it reads with one thing more, less or
 // other. Nothing here knows what a device is.
-#ifndef PORT_SIMULATOR_TEXT_DOCUMENT_H
-#define PORT_SIMULATOR_TEXT_DOCUMENT_H
+#ifndef DEVICEFILE_TEXT_DOCUMENT_H
+#define DEVICEFILE_TEXT_DOCUMENT_H
 
 #include <string>
 #include <string_view>
@@ -11,7 +11,7 @@
 #include "TextPlaces.h"
 #include "Toml.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 /// The text that differs from the document's own in one run of bytes is what each with…() gives.
 /// Values are as they are to be written. Where a text cannot be, it is empty.
@@ -73,6 +73,6 @@ private:
     std::vector<std::size_t> headers_;
 };
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // A device described in a TOML file.
-#ifndef PORT_SIMULATOR_DEVICE_FILE_H
-#define PORT_SIMULATOR_DEVICE_FILE_H
+#ifndef DEVICEFILE_DEVICE_FILE_H
+#define DEVICEFILE_DEVICE_FILE_H
 
 #include <functional>
 #include <memory>
@@ -9,10 +9,10 @@
 #include <string>
 #include <vector>
 
-#include "../backend/Result.h"
+#include "../port/backend/Result.h"
 #include "Device.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024; // of a file, in bytes
 constexpr std::size_t LINE_LIMIT = 1024;        // of one line
@@ -93,6 +93,6 @@ private:
     std::string reported_; // the problem that was told last; empty when there is none
 };
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

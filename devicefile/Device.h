@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a device file says, as values that know where they stand.
-#ifndef PORT_SIMULATOR_DEVICE_H
-#define PORT_SIMULATOR_DEVICE_H
+#ifndef DEVICEFILE_DEVICE_H
+#define DEVICEFILE_DEVICE_H
 
 #include <cstdint>
 #include <map>
@@ -11,11 +11,11 @@
 #include <variant>
 #include <vector>
 
-#include "../backend/Result.h"
+#include "../port/backend/Result.h"
 #include "DeviceText.h"
 #include "Schema.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 // What a call is told to do in place of what it does.
 struct Fault {
@@ -99,6 +99,6 @@ struct Device {
     }
 };
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a device file may say: its sections, their keys and the type of each.
-#ifndef PORT_SIMULATOR_SCHEMA_H
-#define PORT_SIMULATOR_SCHEMA_H
+#ifndef DEVICEFILE_SCHEMA_H
+#define DEVICEFILE_SCHEMA_H
 
 #include <cstdint>
 #include <limits>
@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-namespace port::simulator {
+namespace port::devicefile {
 
 // The value of the name "not_supported": this device has no such thing.
 constexpr std::int64_t NOT_SUPPORTED = std::numeric_limits<std::int64_t>::min();
@@ -90,6 +90,6 @@ std::vector<std::string> faultKeyNames();
 const SectionRow* beginSections();
 const SectionRow* endSections();
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

@@ -9,9 +9,9 @@
 #include <dlfcn.h>
 #include <link.h>
 
-#include "../common/Closest.h"
+#include "Closest.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 namespace {
 
 namespace fs = std::filesystem;
@@ -142,4 +142,4 @@ std::vector<NamedDevice> listDevices()
     return devices;
 }
 
-} // namespace port::simulator
+} // namespace port::devicefile

@@ -1,15 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 // The path of a value in a device file, as people write it.
-#ifndef PORT_SIMULATOR_DEVICE_PATH_H
-#define PORT_SIMULATOR_DEVICE_PATH_H
+#ifndef DEVICEFILE_DEVICE_PATH_H
+#define DEVICEFILE_DEVICE_PATH_H
 
 #include <optional>
 #include <string>
 #include <vector>
 
-#include "../backend/Result.h"
+#include "../port/backend/Result.h"
 
-namespace port::simulator {
+namespace port::devicefile {
 
 /// The names on the way from the file to a value; an index in a list is its number.
 using DevicePath = std::vector<std::string>;
@@ -25,6 +25,6 @@ std::optional<std::size_t> indexOf(const std::string& word);
 /// A name as it stands before "=" in a device file: in quotes where it needs them.
 std::string writtenKey(const std::string& name);
 
-} // namespace port::simulator
+} // namespace port::devicefile
 
 #endif

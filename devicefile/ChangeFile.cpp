@@ -12,10 +12,10 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "Descriptor.h"
-#include "RegularFile.h"
+#include "../port/common/Descriptor.h"
+#include "../port/common/RegularFile.h"
 
-namespace port {
+namespace port::devicefile {
 namespace {
 
 namespace fs = std::filesystem;
@@ -146,9 +146,10 @@ void replace(const LockedFile& file, const std::string& content)
 }
 
 } // namespace
-} // namespace port
+} // namespace port::devicefile
 
-std::string port::changeFile(const std::string& path, std::size_t limit,
+std::string
+port::devicefile::changeFile(const std::string& path, std::size_t limit,
                              const std::function<std::string(std::string& content)>& change)
 {
     try {

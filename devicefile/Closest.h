@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a mistyped word was meant to be.
-#ifndef PORT_COMMON_CLOSEST_H
-#define PORT_COMMON_CLOSEST_H
+#ifndef DEVICEFILE_CLOSEST_H
+#define DEVICEFILE_CLOSEST_H
 
 #include <string>
 #include <vector>
 
-namespace port {
+namespace port::devicefile {
 
 /// The candidate that takes the fewest edits to make from the word; there must be one.
 std::string closest(const std::string& word, const std::vector<std::string>& candidates);
@@ -14,6 +14,6 @@ std::string closest(const std::string& word, const std::vector<std::string>& can
 /// The same, but empty when even that one takes more edits than half of the word.
 std::string similar(const std::string& word, const std::vector<std::string>& candidates);
 
-} // namespace port
+} // namespace port::devicefile
 
 #endif
