@@ -26,9 +26,9 @@ Argument Argument::takesAll() const
     return *this;
 }
 
-Argument Argument::excludes(const Argument& other) const
+Argument Argument::checkedBy(std::string (*problemOf)(const std::string& value)) const
 {
-    option_->excludes(other.option_);
+    option_->check(CLI::Validator([problemOf](std::string& text) { return problemOf(text); }, ""));
     return *this;
 }
 
@@ -48,7 +48,7 @@ void Command::requireCommand() const
     app_->callback([app = app_] {
         if (app->get_subcommands().empty())
             throw UsageError(app->get_name() +
-                             " takes a command: " + listed(namesOfCommands(*app)));
+                             " needs a command: " + listed(namesOfCommands(*app)));
     });
 }
 
@@ -63,12 +63,6 @@ Argument Command::option(const std::string& names, std::string& value,
     return Argument(*app_->add_option(names, value, description));
 }
 
-Argument Command::option(const std::string& names, double& value,
-                         const std::string& description) const
-{
-    return Argument(*app_->add_option(names, value, description));
-}
-
 Argument Command::option(const std::string& names, std::vector<std::string>& values,
                          const std::string& description) const
 {
@@ -77,8 +71,7 @@ Argument Command::option(const std::string& names, std::vector<std::string>& val
 
 void Command::setFooter(const std::string& remarks) const
 {
-    app_->footer(remarks + "\n--device FILE and -v go with every command; \"coresystem --help\" "
-                           "lists all exit codes.");
+    app_->footer(remarks + "\nMore options and all exit codes: coresystem help");
 }
 
 void Command::onUse(const std::function<void()>& action) const

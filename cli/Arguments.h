@@ -25,7 +25,8 @@ public:
     Argument called(const std::string& name) const;
     /// Of a list: each time that it is given adds a value.
     Argument takesAll() const;
-    Argument excludes(const Argument& other) const;
+    /// What is wrong with a value; empty when nothing is.
+    Argument checkedBy(std::string (*problemOf)(const std::string& value)) const;
 
     bool isGiven() const;
 
@@ -46,7 +47,6 @@ public:
     Argument flag(const std::string& names, bool& value, const std::string& description) const;
     Argument option(const std::string& names, std::string& value,
                     const std::string& description) const;
-    Argument option(const std::string& names, double& value, const std::string& description) const;
     Argument option(const std::string& names, std::vector<std::string>& values,
                     const std::string& description) const;
 

@@ -19,6 +19,7 @@ enum ExitCode : int { // `device run` also passes on its command's
     NOT_AVAILABLE = 3,
     BAD_DEVICE_FILE = 4,
     UNKNOWN_COUNTRY = 5,
+    ENDED_BY_SIGNAL = 128, // and its number
 };
 
 // A mistake in the arguments, told to the user as it is.
@@ -31,6 +32,8 @@ struct Invocation {
     std::string deviceFile;
     bool verbose = false;
     bool json = false;
+    bool wide = false;
+    std::string color = "auto";
     std::vector<std::string> tail; // behind "--", of a command that takes another one
     std::function<ExitCode()> command;
 };

@@ -235,14 +235,14 @@ ExitCode runCountry(const Invocation& invocation, const std::string& key)
 
 void cli::addCountryCommand(const Command& app, Invocation& invocation)
 {
-    const Command country = app.add("country", "Print every conversion of a country key");
+    const Command country = app.add("country", "Convert country codes");
     const auto key = std::make_shared<std::string>();
     country
         .option("KEY", *key,
                 "An MCC, an alpha-2 code, a calling code or a service locale, exactly as the "
                 "library writes it")
         .required();
-    country.flag("--json", invocation.json, "Print one JSON object");
+    country.flag("--json", invocation.json, "Print JSON");
     country.setFooter("Examples: coresystem country 450\n"
                       "          coresystem country kr\n"
                       "          coresystem country 82\n"

@@ -35,7 +35,7 @@ std::vector<std::string> cli::problemsOf(const DeviceText& device)
 
 void cli::addDeviceCommands(const Command& app, Invocation& invocation)
 {
-    const Command device = app.add("device", "Look at device files and change them");
+    const Command device = app.add("device", "Manage simulated devices");
     device.setFooter("Examples: coresystem device list\n"
                      "          coresystem device check phone.toml\n"
                      "          coresystem device set settings.flight_mode=true "

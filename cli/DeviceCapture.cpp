@@ -45,17 +45,15 @@ ExitCode runCapture(const Capture& capture)
 
 void cli::addDeviceCaptureCommand(const Command& device, Invocation& invocation)
 {
-    const Command command = device.add(
-        "capture", "Write the device that answers now, this machine or another, as a device file");
+    const Command command = device.add("capture", "Write this machine as a device file");
     const auto capture = std::make_shared<Capture>();
-    command.option("-o,--output", capture->file, "The file to write; standard output without it")
+    command.option("-o,--output", capture->file, "File to write (default: standard output)")
         .called("FILE");
     command.flag("--force", capture->force, "Replace a file that is there");
-    command.flag("--reveal", capture->options.reveal,
-                 "Also what identifies the device and its user, in place of zeros");
+    command.flag("--reveal", capture->options.reveal, "Write what is masked in full");
     command
         .option("--package", capture->options.packages,
-                "The version of this package, too; may be given several times")
+                "Write the version of a package, too; may be repeated")
         .called("NAME")
         .takesAll();
     command.setFooter("Examples: coresystem device capture -o this.toml\n"

@@ -28,9 +28,9 @@ ExitCode runCheck(const std::vector<std::string>& names)
 
 void cli::addDeviceCheckCommand(const Command& device, Invocation& invocation)
 {
-    const Command check = device.add("check", "Print every mistake in device files");
+    const Command check = device.add("check", "Check device files");
     const auto names = std::make_shared<std::vector<std::string>>();
-    check.option("DEVICE", *names, "The devices, as --device takes them").required();
+    check.option("DEVICE", *names, "Devices, by file or name").required();
     check.setFooter("Example: coresystem device check phone.toml\n"
                     "Each mistake is one line, FILE:LINE:COLUMN: what is wrong.\n"
                     "Exit code 1: there is a mistake, or a file cannot be read.");

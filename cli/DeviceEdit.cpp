@@ -67,9 +67,9 @@ ExitCode runChange(const std::vector<Change>& changes)
 
 void addGet(const Command& device, Invocation& invocation)
 {
-    const Command get = device.add("get", "Print one value of the device file");
+    const Command get = device.add("get", "Show a value");
     const auto path = std::make_shared<std::string>();
-    get.option("PATH", *path, "The value").required();
+    get.option("PATH", *path, "Where the value is").required();
     get.setFooter(std::string("Example: coresystem device get slot[0].sim --device phone.toml\n") +
                   PATHS + "\nExit code 1: the file does not have it.");
     get.onUse([&invocation, path] { invocation.command = [path] { return runGet(*path); }; });
@@ -82,7 +82,7 @@ void addChange(const Command& device, Invocation& invocation, const char* name,
 {
     const Command command = device.add(name, description);
     const auto arguments = std::make_shared<std::vector<std::string>>();
-    command.option(argument, *arguments, "The values").required();
+    command.option(argument, *arguments, "What to change").required();
     command.setFooter(std::string(remarks) + PATHS +
                       "\nAll changes are made at once, or none. Exit code 1: none was.");
     command.onUse([&invocation, arguments, changeOf] {
@@ -99,10 +99,9 @@ void addChange(const Command& device, Invocation& invocation, const char* name,
 void cli::addDeviceEditCommands(const Command& device, Invocation& invocation)
 {
     addGet(device, invocation);
-    addChange(device, invocation, "set", "PATH=VALUE", assignmentOf,
-              "Change values of the device file",
+    addChange(device, invocation, "set", "PATH=VALUE", assignmentOf, "Set values",
               "Example: coresystem device set settings.flight_mode=true network.wifi=deactivated "
               "--device phone.toml\n");
-    addChange(device, invocation, "unset", "PATH", removalOf, "Remove values from the device file",
+    addChange(device, invocation, "unset", "PATH", removalOf, "Remove values",
               "Example: coresystem device unset slot[0].number --device phone.toml\n");
 }

@@ -85,10 +85,10 @@ ExitCode runList(const Invocation& invocation)
 
 void cli::addDeviceListCommand(const Command& device, Invocation& invocation)
 {
-    const Command list = device.add("list", "Print the devices that --device knows by name");
-    list.flag("--json", invocation.json, "Print one JSON object");
+    const Command list = device.add("list", "Show the devices that have names");
+    list.flag("--json", invocation.json, "Print JSON");
     list.setFooter("The user's own devices are the files of $XDG_CONFIG_HOME/coresystem/devices "
-                   "(by default\n~/.config/coresystem/devices); they hide shipped ones of the "
+                   "(by default ~/.config/coresystem/devices); they hide shipped ones of the "
                    "same name.");
     list.onUse(
         [&invocation] { invocation.command = [&invocation] { return runList(invocation); }; });

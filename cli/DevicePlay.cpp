@@ -54,19 +54,31 @@ public:
     /// False when it is to end.
     bool awaitTime(int milliseconds) const
     {
-        pollfd signal = {signals_, POLLIN, 0};
-        return poll(&signal, 1, milliseconds) == 0;
+        pollfd either[] = {{signals_, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+        return poll(either, 2, milliseconds) == 0;
     }
     bool awaitLine() const
     {
         char byte = 0;
         while (byte != '\n') {
-            pollfd either[] = {{signals_, POLLIN, 0}, {STDIN_FILENO, POLLIN, 0}};
-            if (poll(either, 2, -1) < 0 || either[0].revents != 0 ||
+            pollfd any[] = {
+                {signals_, POLLIN, 0}, {STDIN_FILENO, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+            if (poll(any, 3, -1) < 0 || any[0].revents != 0 || any[2].revents != 0 ||
                 read(STDIN_FILENO, &byte, 1) != 1)
                 return false;
         }
         return true;
+    }
+
+    /// What it ends with before its time: a signal, a reader that is gone, or no more input.
+    ExitCode endBefore() const
+    {
+        signalfd_siginfo signal = {};
+        pollfd either[] = {{signals_, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+        poll(either, 2, 0);
+        if (either[0].revents != 0 && read(signals_, &signal, sizeof signal) == sizeof signal)
+            return static_cast<ExitCode>(ENDED_BY_SIGNAL + static_cast<int>(signal.ssi_signo));
+        return either[1].revents != 0 ? SUCCESS : FAILURE;
     }
 
 private:
@@ -104,7 +116,7 @@ private:
     }
 
     const std::size_t steps_;
-    const bool isTerminal_ = isatty(STDOUT_FILENO) == 1;
+    const bool isTerminal_ = isSmartTerminal();
 };
 
 bool awaitStep(const Play& play, const Pace& pace, const Progress& progress, std::size_t number,
@@ -177,7 +189,7 @@ ExitCode playSteps(const Play& play, const std::string& stage, const DeviceText&
     for (std::size_t i = 0; i < steps.size(); ++i) {
         if (!awaitStep(play, pace, progress, i + 1, steps[i])) {
             progress.stop(i + 1);
-            return FAILURE;
+            return pace.endBefore();
         }
         changeDevice(stage, steps[i].changes);
         progress.tell(i + 1, steps[i]);
@@ -209,18 +221,18 @@ ExitCode runPlay(const Play& play)
 
 void cli::addDevicePlayCommand(const Command& device, Invocation& invocation)
 {
-    const Command command = device.add(
-        "play", "Make the steps of a scenario, one after the other, on the file of --device");
+    const Command command = device.add("play", "Play a scenario onto the file of --device");
     const auto play = std::make_shared<Play>();
-    command.option("DEVICE", play->scenario, "The scenario: a device file with steps").required();
-    const Argument fast = command.flag("--fast", play->isFast, "Do not wait");
-    command
-        .flag("--by-line", play->isByLine,
-              "Wait for a line of standard input before each step, not for its time")
-        .excludes(fast);
+    command.option("DEVICE", play->scenario, "Scenario: a device file with steps").required();
+    command.flag("--fast", play->isFast, "Do not wait");
+    command.flag("--by-line", play->isByLine, "Wait for a line of standard input before each step");
     command.flag("--force", play->force, "Replace a file that was not made by playing");
     command.setFooter("Examples: coresystem device play --device phone.toml travel\n"
                       "          ./application | coresystem device play --by-line travel.toml\n"
                       "The scenario's own file is never written. It stops between steps only.");
-    command.onUse([&invocation, play] { invocation.command = [play] { return runPlay(*play); }; });
+    command.onUse([&invocation, play] {
+        if (play->isFast && play->isByLine)
+            throw UsageError("--fast and --by-line cannot go together");
+        invocation.command = [play] { return runPlay(*play); };
+    });
 }

@@ -26,7 +26,6 @@ enum : int {
     CANNOT_PREPARE = 125,
     CANNOT_EXECUTE = 126,
     NO_SUCH_COMMAND = 127,
-    ENDED_BY_SIGNAL = 128, // and its number
 };
 
 struct Run {
@@ -124,13 +123,10 @@ ExitCode runCommand(const Invocation& invocation, const Run& run)
 
 void cli::addDeviceRunCommand(const Command& device, Invocation& invocation)
 {
-    const Command command =
-        device.add("run", "Run a program on a simulated device, with a system bus of "
-                          "its own: run DEVICE -- COMMAND...");
+    const Command command = device.add("run", "Run a program: run DEVICE -- COMMAND...");
     const auto run = std::make_shared<Run>();
-    command.option("DEVICE", run->file, "The device, as --device takes it").required();
-    command.flag("--copy", run->onCopy,
-                 "Give the program a copy of the file, which goes away with it");
+    command.option("DEVICE", run->file, "Device, by file or name").required();
+    command.flag("--copy", run->onCopy, "Run on a copy of the file, which goes away");
     command.setFooter(
         "Examples: coresystem device run phone.toml -- ./application --option\n"
         "          coresystem device run --copy phone.toml -- make check\n"

@@ -43,7 +43,7 @@ std::string sourceOf(const DeviceText& device, const Entry& entry)
 
 std::string showText(const DeviceText& device, const std::vector<Entry>& entries, bool reveal)
 {
-    std::string text;
+    std::string text = device.path + "\n";
     for (auto first = entries.begin(); first != entries.end();) {
         const auto behind = std::find_if(first, entries.end(), [&](const Entry& entry) {
             return entry.section != first->section;
@@ -51,11 +51,11 @@ std::string showText(const DeviceText& device, const std::vector<Entry>& entries
         Rows rows;
         std::transform(first, behind, std::back_inserter(rows), [&](const Entry& entry) {
             return std::vector<std::string>{entry.key, shown(valueOf(entry, reveal)),
-                                            sourceOf(device, entry)};
+                                            isFullWidth() ? sourceOf(device, entry)
+                                                          : "line " + std::to_string(entry.line)};
         });
         if (!first->section.empty()) // the schema's number is none of the device's values
-            text += (text.empty() ? "" : "\n") + heading("[" + first->section + "]") + "\n" +
-                    aligned(rows);
+            text += "\n" + heading("[" + first->section + "]") + "\n" + aligned(rows);
         first = behind;
     }
     const bool hides = !reveal && std::any_of(entries.begin(), entries.end(), isIdentity);
@@ -94,13 +94,12 @@ ExitCode runShow(const Invocation& invocation, const std::string& name, bool rev
 
 void cli::addDeviceShowCommand(const Command& device, Invocation& invocation)
 {
-    const Command show =
-        device.add("show", "Print the values of a device file, each with its line");
+    const Command show = device.add("show", "Show the values, each with its line");
     const auto name = std::make_shared<std::string>();
     const auto reveal = std::make_shared<bool>(false);
-    show.option("DEVICE", *name, "The device (default: that of --device)");
-    show.flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
-    show.flag("--json", invocation.json, "Print one JSON object");
+    show.option("DEVICE", *name, "Device, by file or name (default: that of --device)");
+    show.flag("--reveal", *reveal, "Show what is masked in full");
+    show.flag("--json", invocation.json, "Print JSON");
     show.setFooter("Example: coresystem device show phone.toml\n"
                    "Exit code 4: the file has mistakes; they are on standard error.");
     show.onUse([&invocation, name, reveal] {

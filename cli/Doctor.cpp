@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem doctor`: what the answers rest on, and what is missing.
+#include <algorithm>
+#include <utility>
+
 #include <AESCrypto.h>
 #include <CoreLogger.h>
 #include <coresystem_port.h>
@@ -24,18 +27,29 @@ struct LogState {
 
 std::string servicesText(const std::vector<Service>& services)
 {
-    Rows all;
-    Rows missing;
+    Rows rows;
+    for (const Service& service : services)
+        rows.push_back({service.found ? "found" : "missing", service.name, service.serves});
+    return heading("Services") + "\n" + aligned(rows);
+}
+
+// Each reason once, with all that is missing for it and what that means.
+std::string missingText(const std::vector<Service>& services)
+{
+    std::vector<std::pair<std::string, Rows>> reasons;
     for (const Service& service : services) {
-        all.push_back(
-            {service.found ? "found" : "missing", service.name, service.serves, service.state});
-        if (!service.found)
-            missing.push_back({service.name, service.consequence});
+        if (service.found)
+            continue;
+        auto same = std::find_if(reasons.begin(), reasons.end(),
+                                 [&](const auto& each) { return each.first == service.state; });
+        if (same == reasons.end())
+            same = reasons.insert(same, {service.state, {}});
+        same->second.push_back({service.name, service.consequence});
     }
-    std::string text = heading("Services") + "\n" + aligned(all);
-    if (!missing.empty())
-        text += "\n" + heading("Without the missing ones") + "\n" + aligned(missing);
-    return text;
+    std::string text;
+    for (const auto& [reason, rows] : reasons)
+        text += wrapped(reason, 2) + aligned(rows, "    ");
+    return text.empty() ? "" : "\n" + heading("Missing") + "\n" + text;
 }
 
 std::string keyText(const LogState& log)
@@ -93,9 +107,9 @@ ExitCode runDoctor(const Invocation& invocation)
     const std::vector<Service> services = coresystem_port::findServices();
     const LogState log;
     const bool deviceFileBad = reportDeviceFileProblem();
-    writeOut(invocation.json
-                 ? doctorJson(services, log)
-                 : backendLine() + "\n\n" + servicesText(services) + "\n" + logText(log));
+    writeOut(invocation.json ? doctorJson(services, log)
+                             : backendLine() + "\n\n" + servicesText(services) +
+                                   missingText(services) + "\n" + logText(log));
     if (deviceFileBad)
         return BAD_DEVICE_FILE;
     return log.keyProblem.empty() ? SUCCESS : FAILURE;
@@ -106,9 +120,8 @@ ExitCode runDoctor(const Invocation& invocation)
 
 void cli::addDoctorCommand(const Command& app, Invocation& invocation)
 {
-    const Command doctor =
-        app.add("doctor", "Tell which services answer, and what each missing one takes away");
-    doctor.flag("--json", invocation.json, "Print one JSON object");
+    const Command doctor = app.add("doctor", "Check the services");
+    doctor.flag("--json", invocation.json, "Print JSON");
     doctor.setFooter("Exit code 1: the log key is unusable. A missing service is no failure.");
     doctor.onUse(
         [&invocation] { invocation.command = [&invocation] { return runDoctor(invocation); }; });

@@ -26,9 +26,9 @@ std::string shortReason(const std::string& reason)
 std::vector<std::string> rowOf(const Fact& fact)
 {
     if (fact.value.is_null())
-        return {fact.name, "not available", "(" + shortReason(fact.reason) + ")"};
+        return {fact.name, "not available", "(" + shortened(shortReason(fact.reason)) + ")"};
     const std::string text = textOf(fact.value);
-    return {fact.name, text.empty() ? "\"\"" : text, fact.source};
+    return {fact.name, text.empty() ? "\"\"" : text, shortened(fact.source)};
 }
 
 std::string infoText(const std::vector<Fact>& facts)
@@ -81,10 +81,12 @@ ExitCode runInfo(const Invocation& invocation, const std::vector<std::string>& n
 void checkFactName(const std::string& name)
 {
     const std::vector<std::string> names = factNames();
-    if (std::find(names.begin(), names.end(), name) == names.end())
-        throw UsageError("no fact is called " + quoted(name) + "; did you mean \"" +
-                         port::devicefile::closest(name, names) + "\"? The facts are " +
-                         listed(names));
+    if (std::find(names.begin(), names.end(), name) != names.end())
+        return;
+    const std::string meant = port::devicefile::similar(name, names);
+    throw UsageError("there is no fact " + quoted(name) +
+                     (meant.empty() ? "" : "; did you mean " + quoted(meant) + "?") +
+                     "\n\"coresystem get --list\" names them.");
 }
 
 ExitCode reportMissing(const Fact& fact)
@@ -95,15 +97,35 @@ ExitCode reportMissing(const Fact& fact)
     return NOT_AVAILABLE;
 }
 
-ExitCode runGet(const Invocation& invocation, const std::string& name)
+// What `get` is asked for.
+struct Wanted {
+    std::vector<std::string> names;
+    bool list = false;
+    bool endsWithNul = false;
+};
+
+// A fact that is not available is an empty line among others, so that each stays in its place.
+std::string valueLine(const Fact& fact, const Wanted& wanted)
 {
-    checkFactName(name);
-    const Fact fact = askFact(name);
+    if (fact.value.is_null() && wanted.names.size() == 1)
+        return "";
+    const std::string text = fact.value.is_null() ? "" : textOf(fact.value);
+    return wanted.endsWithNul ? text + '\0' : printable(text) + "\n";
+}
+
+ExitCode runGet(const Invocation& invocation, const Wanted& wanted)
+{
+    const std::vector<Fact> facts = askAll(wanted.names, true);
+    ExitCode code = SUCCESS;
     if (invocation.json)
-        writeOut(infoJson({fact}));
-    else if (!fact.value.is_null())
-        writeOut(printable(textOf(fact.value)) + "\n");
-    return fact.value.is_null() ? reportMissing(fact) : SUCCESS;
+        writeOut(infoJson(facts));
+    for (const Fact& fact : facts) {
+        if (!invocation.json)
+            writeOut(valueLine(fact, wanted));
+        if (fact.value.is_null() && code != BAD_DEVICE_FILE)
+            code = reportMissing(fact);
+    }
+    return code;
 }
 
 ExitCode listFacts()
@@ -115,28 +137,29 @@ ExitCode listFacts()
 
 void addGet(const Command& app, Invocation& invocation)
 {
-    const Command get = app.add("get", "Print one fact: the value and nothing else");
-    const auto name = std::make_shared<std::string>();
-    const auto list = std::make_shared<bool>(false);
-    get.option("FACT", *name, "The fact, as `coresystem get --list` names it");
-    get.flag("--list", *list, "Print the names of all facts");
-    get.flag("--json", invocation.json, "Print a JSON object with value and source");
-    get.setFooter("Example: coresystem get device_name\n"
-                  "Exit code 3: the fact is not available; the reason is on standard error.");
-    get.onUse([&invocation, name, list] {
-        if (name->empty() != *list)
-            throw UsageError("get takes one fact (or --list)");
-        invocation.command = [&invocation, name, list] {
-            return *list ? listFacts() : runGet(invocation, *name);
+    const Command get = app.add("get", "Show facts, for scripts");
+    const auto wanted = std::make_shared<Wanted>();
+    get.option("FACT", wanted->names, "Facts, as `coresystem get --list` names them");
+    get.flag("--list", wanted->list, "Show the names of all facts");
+    get.flag("-0,--null", wanted->endsWithNul, "End each value with NUL, and escape nothing");
+    get.flag("--json", invocation.json, "Print JSON");
+    get.setFooter("Example: coresystem get device_name sw_version\n"
+                  "Exit code 3: a fact is not available; the reason is on standard error.");
+    get.onUse([&invocation, wanted] {
+        if (wanted->names.empty() != wanted->list)
+            throw UsageError("get needs facts, or --list");
+        for (const std::string& name : wanted->names)
+            checkFactName(name);
+        invocation.command = [&invocation, wanted] {
+            return wanted->list ? listFacts() : runGet(invocation, *wanted);
         };
     });
 }
 
 void addNetwork(const Command& app, Invocation& invocation)
 {
-    const Command network =
-        app.add("network", "Print what applications may learn of the connections");
-    network.flag("--json", invocation.json, "Print one JSON object");
+    const Command network = app.add("network", "Show connections and their switches");
+    network.flag("--json", invocation.json, "Print JSON");
     network.setFooter("A connection over Wi-Fi or Bluetooth counts beside the cellular one: "
                       "\"connected_wifi\" is yes when either is there.");
     network.onUse([&invocation] {
@@ -146,14 +169,13 @@ void addNetwork(const Command& app, Invocation& invocation)
 
 void addSerial(const Command& app, Invocation& invocation)
 {
-    const Command serial =
-        app.add("serial", "Print the serial number that the device daemon tells");
-    serial.flag("--json", invocation.json, "Print a JSON object with value and source");
-    serial.setFooter("The daemon answers by the device file that it was started with, not by "
-                     "--device.\n"
+    const Command serial = app.add("serial", "Show the serial number");
+    serial.flag("--json", invocation.json, "Print JSON");
+    serial.setFooter("The device daemon tells it, of the device file that it was started with: "
+                     "--device does not count.\n"
                      "Exit code 3: there is no serial number; the reason is on standard error.");
     serial.onUse([&invocation] {
-        invocation.command = [&invocation] { return runGet(invocation, "device_serial"); };
+        invocation.command = [&invocation] { return runGet(invocation, {{"device_serial"}}); };
     });
 }
 
@@ -162,12 +184,12 @@ void addSerial(const Command& app, Invocation& invocation)
 
 void cli::addInfoCommands(const Command& app, Invocation& invocation)
 {
-    const Command info = app.add("info", "Print every fact about the device, with its source");
+    const Command info = app.add("info", "Show every fact, with its source");
     const auto reveal = std::make_shared<bool>(false);
-    info.flag("--reveal", *reveal, "Show phone number, IMEI and serial number, unmasked");
-    info.flag("--json", invocation.json, "Print one JSON object");
+    info.flag("--reveal", *reveal, "Show phone number, IMEI and serial number in full");
+    info.flag("--json", invocation.json, "Print JSON");
     info.setFooter("Examples: coresystem info\n"
-                   "          coresystem info --json --device phone.toml");
+                   "          coresystem info --json --device phone");
     info.onUse([&invocation, reveal] {
         invocation.command = [&invocation, reveal] {
             return runInfo(invocation, factNames(), *reveal);

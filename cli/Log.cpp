@@ -147,14 +147,13 @@ ExitCode runDecipher(const std::string& keyFile)
 
 void cli::addLogCommands(const Command& app, Invocation& invocation)
 {
-    const Command log = app.add("log", "Work with the library's log");
+    const Command log = app.add("log", "Read the library's log");
     log.setFooter("Example: coresystem log decipher --key key <trace");
     log.requireCommand();
-    const Command decipher =
-        log.add("decipher", "Copy log lines from standard input, with their bodies deciphered");
+    const Command decipher = log.add("decipher", "Decipher log lines from standard input");
     const auto keyFile = std::make_shared<std::string>();
-    const Argument key = decipher.option(
-        "--key", *keyFile, "The key file (default: the one that CORESYSTEM_LOG_KEY names)");
+    const Argument key =
+        decipher.option("--key", *keyFile, "Key file (default: that of CORESYSTEM_LOG_KEY)");
     key.called("FILE");
     decipher.setFooter(
         "Example: CORESYSTEM_LOG_DEBUG=1 CORESYSTEM_LOG_KEY=key coresystem info 2>&1 |\n"

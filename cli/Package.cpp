@@ -37,9 +37,9 @@ Package ask(const std::string& name)
 std::vector<std::string> rowOf(const Package& package)
 {
     if (package.version.is_string())
-        return {package.name, package.version.get<std::string>(), package.source};
+        return {package.name, package.version.get<std::string>(), shortened(package.source)};
     return {package.name, package.isKnownMissing ? "not installed" : "not available",
-            "(" + package.source + ")"};
+            "(" + shortened(package.source) + ")"};
 }
 
 std::string packagesText(const std::vector<Package>& packages)
@@ -81,12 +81,12 @@ ExitCode runPackage(const Invocation& invocation, const std::vector<std::string>
 
 void cli::addPackageCommand(const Command& app, Invocation& invocation)
 {
-    const Command package = app.add("package", "Print the versions of installed packages");
+    const Command package = app.add("package", "Show package versions");
     const auto names = std::make_shared<std::vector<std::string>>();
-    package.option("NAME", *names, "The packages, by their exact names").required();
-    package.flag("--json", invocation.json, "Print one JSON object");
+    package.option("NAME", *names, "Packages by their exact names").required();
+    package.flag("--json", invocation.json, "Print JSON");
     package.setFooter("Example: coresystem package dpkg bash\n"
-                      "Exit code 3: a package is not installed, or nobody knows.");
+                      "Exit code 3: a package is not installed, or that is not known.");
     package.onUse([&invocation, names] {
         invocation.command = [&invocation, names] { return runPackage(invocation, *names); };
     });

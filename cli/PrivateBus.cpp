@@ -81,7 +81,11 @@ std::string contentOf(const std::string& path)
 std::string placeOfFolder()
 {
     const std::string name = "/coresystem-XXXXXX";
-    const std::string place = fs::temp_directory_path().string();
+    std::error_code error;
+    const std::string place = fs::temp_directory_path(error).string();
+    if (error)
+        throw std::runtime_error("the folder for temporary files (TMPDIR) cannot be used: " +
+                                 error.message());
     const bool fits = place.size() + name.size() + sizeof "/bus" <= sizeof sockaddr_un::sun_path;
     return (fits ? place : "/tmp") + name;
 }

@@ -67,6 +67,26 @@ std::string cli::backendLine()
     return "backend: " + coresystem_port::backendName() + " (" + place + ")";
 }
 
+std::string cli::shortened(const std::string& text)
+{
+    const std::string file = coresystem_port::deviceFile();
+    if (file.empty() || isFullWidth())
+        return text;
+    std::string rest = text;
+    std::string shown;
+    for (std::size_t at = 0; (at = rest.find(file)) != std::string::npos;) {
+        shown += rest.substr(0, at);
+        rest.erase(0, at + file.size());
+        if (rest.size() > 1 && rest[0] == ':' && rest[1] >= '0' && rest[1] <= '9')
+            shown += "line ", rest.erase(0, 1);
+        else if (rest.rfind(": ", 0) == 0)
+            rest.erase(0, 2);
+        else
+            shown += "device file";
+    }
+    return shown + rest;
+}
+
 bool cli::reportDeviceFileProblem()
 {
     const std::string problem = coresystem_port::deviceFileProblem();

@@ -37,6 +37,10 @@ private:
 /// "backend: simulator (device file phone.toml)"
 std::string backendLine();
 
+/// A source or a reason without the name of the device file, which backendLine() says: of a line of
+/// it "line 12". As it is with --wide.
+std::string shortened(const std::string& text);
+
 /// Tells the user what is wrong with the device file; false when nothing is.
 bool reportDeviceFileProblem();
 

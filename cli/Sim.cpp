@@ -56,7 +56,7 @@ std::string slotsText(const std::vector<SimSlot>& slots, bool reveal)
         for (const Column& column : COLUMNS)
             rows.back().push_back(cellOf(column, slot, reveal));
     }
-    return aligned(rows, "");
+    return table(rows);
 }
 
 // Each reason once for a slot, with everything that it takes away.
@@ -71,8 +71,8 @@ std::string reasonsText(const std::vector<SimSlot>& slots)
                 continue;
             const auto [found, isNew] = rowOfReason.emplace(answer.reason, rows.size());
             if (isNew)
-                rows.push_back(
-                    {"slot " + std::to_string(slot.number), column.title, answer.reason});
+                rows.push_back({"slot " + std::to_string(slot.number), column.title,
+                                shortened(answer.reason)});
             else
                 rows[found->second][1] += std::string(", ") + column.title;
         }
@@ -84,7 +84,7 @@ std::string defaultsText(const std::vector<DefaultSlot>& defaults)
 {
     Rows rows;
     for (const auto& [use, slot] : defaults)
-        rows.push_back({use, slot.value.is_null() ? "not available (" + slot.reason + ")"
+        rows.push_back({use, slot.value.is_null() ? "not available (" + shortened(slot.reason) + ")"
                                                   : slot.value.get<std::string>()});
     return "\n" + heading("Default slots") + "\n" + aligned(rows);
 }
@@ -103,7 +103,7 @@ std::string simText(const Sims& sims, bool reveal)
     std::string text = backendLine() + "\n\n" + slotsText(sims.slots, reveal) +
                        reasonsText(sims.slots) + defaultsText(sims.defaults);
     if (!reveal && hidesAnything(sims.slots))
-        text += "\nWhat identifies the subscriber is masked; --reveal shows it.\n";
+        text += "\n" + wrapped("What identifies the subscriber is masked; --reveal shows it.", 0);
     return text;
 }
 
@@ -155,12 +155,12 @@ ExitCode runSim(const Invocation& invocation, bool reveal)
 
 void cli::addSimCommand(const Command& app, Invocation& invocation)
 {
-    const Command sim = app.add("sim", "Print what applications may learn of each SIM slot");
+    const Command sim = app.add("sim", "Show SIM cards");
     const auto reveal = std::make_shared<bool>(false);
-    sim.flag("--reveal", *reveal, "Show what identifies the subscriber, unmasked");
-    sim.flag("--json", invocation.json, "Print one JSON object");
+    sim.flag("--reveal", *reveal, "Show MSIN and phone number in full");
+    sim.flag("--json", invocation.json, "Print JSON");
     sim.setFooter("Examples: coresystem sim\n"
-                  "          coresystem sim --reveal --device phone.toml\n"
+                  "          coresystem sim --reveal --device phone\n"
                   "Exit code 3: there is no SIM slot; the reason is on standard error.");
     sim.onUse([&invocation, reveal] {
         invocation.command = [&invocation, reveal] { return runSim(invocation, *reveal); };

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem storage`: whether enough of the internal storage is free.
+#include <cmath>
 #include <iomanip>
 #include <limits>
 #include <sstream>
@@ -19,7 +20,8 @@ std::string storageText(double megabytes, bool isFree, const std::string& source
     std::ostringstream question;
     question << std::setprecision(std::numeric_limits<double>::digits10) << "more than "
              << megabytes << " MB free";
-    return backendLine() + "\n\n" + aligned({{question.str(), isFree ? "yes" : "no", source}}, "");
+    return backendLine() + "\n\n" +
+           aligned({{question.str(), isFree ? "yes" : "no", shortened(source)}}, "");
 }
 
 std::string storageJson(double megabytes, bool isFree, const std::string& source)
@@ -29,6 +31,22 @@ std::string storageJson(double megabytes, bool isFree, const std::string& source
     json["available"] = isFree;
     json["source"] = source;
     return jsonText(json);
+}
+
+// Every number that is no NaN, infinite or negative.
+bool parseMegabytes(const std::string& text, double& megabytes)
+{
+    std::istringstream number(text);
+    number.imbue(std::locale::classic());
+    return number >> megabytes && number.eof() && std::isfinite(megabytes) && megabytes >= 0;
+}
+
+std::string problemOf(const std::string& text)
+{
+    double megabytes = 0;
+    return parseMegabytes(text, megabytes)
+               ? ""
+               : quoted(text) + " is no size: write megabytes as a number from 0";
 }
 
 ExitCode runStorage(const Invocation& invocation, double megabytes)
@@ -51,19 +69,20 @@ ExitCode runStorage(const Invocation& invocation, double megabytes)
 
 void cli::addStorageCommand(const Command& app, Invocation& invocation)
 {
-    const Command storage = app.add("storage", "Print whether enough internal storage is free");
-    const auto megabytes = std::make_shared<double>(0);
-    storage
-        .option("--at-least", *megabytes,
-                "How many megabytes (of 1048576 bytes); exactly as many are not enough")
+    const Command storage = app.add("storage", "Check free storage");
+    const auto size = std::make_shared<std::string>();
+    storage.option("--at-least", *size, "Megabytes (1048576 bytes) of which more must be free")
         .called("MB")
+        .checkedBy(problemOf)
         .required();
-    storage.flag("--json", invocation.json, "Print one JSON object");
+    storage.flag("--json", invocation.json, "Print JSON");
     storage.setFooter("Example: coresystem storage --at-least 500\n"
-                      "Exit code 1: less is free; 3: nobody knows.");
-    storage.onUse([&invocation, megabytes] {
-        invocation.command = [&invocation, megabytes] {
-            return runStorage(invocation, *megabytes);
+                      "Exit code 1: less is free; 3: not known.");
+    storage.onUse([&invocation, size] {
+        invocation.command = [&invocation, size] {
+            double megabytes = 0;
+            parseMegabytes(*size, megabytes);
+            return runStorage(invocation, megabytes);
         };
     });
 }

@@ -6,11 +6,22 @@
 #include <cstdio>
 #include <cwchar>
 #include <cwctype>
+#include <numeric>
+
+#include "Terminal.h"
 
 namespace {
 
 // Wider cells stick out instead of pushing their whole column away.
 constexpr std::size_t WIDEST_COLUMN = 48;
+
+// A cell with less room than this goes into a line of its own.
+constexpr std::size_t NARROWEST_CELL = 18;
+
+// How much further in a row goes on.
+constexpr std::size_t HANGING = 4;
+
+constexpr std::size_t GAP = 2; // between columns
 
 struct Character {
     wchar_t code;
@@ -59,27 +70,94 @@ std::size_t widthOf(const std::string& text)
 
 std::vector<std::size_t> widthsOf(const cli::Rows& rows)
 {
+    const std::size_t widest = std::min(WIDEST_COLUMN, cli::outputWidth() / 2);
     std::vector<std::size_t> widths;
     for (const auto& row : rows) {
         widths.resize(std::max(widths.size(), row.size()));
         for (std::size_t i = 0; i < row.size(); ++i)
-            if (const std::size_t width = widthOf(row[i]); width <= WIDEST_COLUMN)
+            if (const std::size_t width = widthOf(row[i]); width <= widest)
                 widths[i] = std::max(widths[i], width);
     }
     return widths;
 }
 
-std::string joined(const std::vector<std::string>& row, const std::vector<std::size_t>& widths)
+std::string blanks(std::size_t count)
 {
-    std::string line;
-    for (std::size_t i = 0; i < row.size(); ++i) {
-        line += row[i];
-        if (i + 1 < row.size()) {
-            const std::size_t width = widthOf(row[i]);
-            line.append(std::max(widths[i], width) - width + 2, ' ');
-        }
+    return std::string(count, ' ');
+}
+
+// Words in lines of so many columns; a longer word sticks out.
+std::vector<std::string> linesOf(const std::string& text, std::size_t width)
+{
+    std::vector<std::string> lines(1);
+    std::size_t used = 0;
+    for (std::size_t at = 0; at < text.size();) {
+        const std::size_t end = std::min(text.find(' ', at), text.size());
+        const std::string word = text.substr(at, end - at);
+        if (at > 0 && used + 1 + widthOf(word) > width)
+            lines.emplace_back();
+        else if (at > 0)
+            lines.back() += ' ';
+        lines.back() += word;
+        used = widthOf(lines.back());
+        at = end + 1;
     }
-    return line;
+    return lines;
+}
+
+// A row whose cells go on below where the terminal ends.
+std::string rowText(const std::vector<std::string>& row, const std::vector<std::size_t>& widths,
+                    std::size_t indent)
+{
+    const std::size_t limit = cli::outputWidth();
+    std::string text;
+    std::size_t end = 0; // of the line so far
+    std::size_t start = indent;
+    for (std::size_t i = 0; i < row.size(); start += widths[i++] + GAP) {
+        if (row[i].empty())
+            continue;
+        start = std::max(start, end > 0 ? end + GAP : 0);
+        const std::size_t width = widthOf(row[i]);
+        if (end > 0 && width > limit - std::min(start, limit) &&
+            limit - std::min(start, limit) < NARROWEST_CELL) {
+            text += '\n';
+            end = 0;
+            start = indent + HANGING;
+        }
+        text += blanks(start - end);
+        const std::size_t room = limit - std::min(start, limit);
+        const auto lines = width <= room ? std::vector<std::string>{row[i]} : linesOf(row[i], room);
+        for (std::size_t line = 0; line < lines.size(); ++line)
+            text += (line > 0 ? "\n" + blanks(start) : "") + cli::colored(lines[line]);
+        end = start + widthOf(lines.back());
+    }
+    return text + "\n";
+}
+
+cli::Rows printableRows(cli::Rows rows)
+{
+    for (auto& row : rows)
+        std::transform(row.begin(), row.end(), row.begin(), cli::printable);
+    return rows;
+}
+
+// What the rows fill when none of them is broken.
+std::size_t fullWidthOf(const std::vector<std::size_t>& widths)
+{
+    return std::accumulate(widths.begin(), widths.end(), GAP * (widths.size() - 1));
+}
+
+// Each row as lines of a title and a cell.
+std::string records(const cli::Rows& rows)
+{
+    std::string text;
+    for (std::size_t i = 1; i < rows.size(); ++i) {
+        cli::Rows lines;
+        for (std::size_t column = 0; column < rows[i].size(); ++column)
+            lines.push_back({rows[0][column], rows[i][column]});
+        text += (i > 1 ? "\n" : "") + cli::aligned(lines, "");
+    }
+    return text;
 }
 
 } // namespace
@@ -119,12 +197,27 @@ std::string cli::listed(const std::vector<std::string>& words)
 
 std::string cli::aligned(const Rows& rows, const std::string& indent)
 {
-    Rows shown = rows;
-    for (auto& row : shown)
-        std::transform(row.begin(), row.end(), row.begin(), printable);
+    const Rows shown = printableRows(rows);
     const std::vector<std::size_t> widths = widthsOf(shown);
     std::string text;
     for (const auto& row : shown)
-        text += indent + joined(row, widths) + "\n";
+        text += rowText(row, widths, indent.size());
     return text;
+}
+
+std::string cli::table(const Rows& rows)
+{
+    const bool fits = fullWidthOf(widthsOf(printableRows(rows))) <= outputWidth();
+    return fits ? aligned(rows, "") : records(rows);
+}
+
+std::string cli::wrapped(const std::string& text, std::size_t indent)
+{
+    std::string all;
+    for (std::size_t at = 0; at < text.size();) {
+        const std::size_t end = std::min(text.find('\n', at), text.size());
+        all += rowText({text.substr(at, end - at)}, {0}, indent);
+        at = end + 1;
+    }
+    return all;
 }

@@ -21,8 +21,16 @@ std::string quoted(const std::string& text);
 std::string listed(const std::vector<std::string>& words);
 
 /// Rows of cells, aligned under each other, two blanks apart; printable() is applied to each cell.
+/// What does not fit the terminal goes on in lines below, further in.
 using Rows = std::vector<std::vector<std::string>>;
 std::string aligned(const Rows& rows, const std::string& indent = "  ");
+
+/// The same with titles in the first row; where a row is wider than the terminal, each is shown as
+/// lines of a title and a cell.
+std::string table(const Rows& rows);
+
+/// A text in lines of blanks and words that fit the terminal, `indent` blanks further in.
+std::string wrapped(const std::string& text, std::size_t indent);
 
 } // namespace cli
 

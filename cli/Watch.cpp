@@ -6,6 +6,7 @@
 
 #include <IConnectionStateListener.h>
 #include <glib-unix.h>
+#include <unistd.h>
 
 #include "Commands.h"
 #include "Session.h"
@@ -32,18 +33,20 @@ const char* nameOfConnection(int state)
     }
 }
 
-// The thread's main loop, which ends at an interruption.
+// The thread's main loop, which ends at an interruption, and when nobody reads the output any more.
 class Loop {
 public:
     Loop()
     {
-        for (const int signal : {SIGINT, SIGTERM})
-            g_unix_signal_add(signal, onSignal, this);
+        g_unix_signal_add(SIGINT, onSignal<SIGINT>, this);
+        g_unix_signal_add(SIGTERM, onSignal<SIGTERM>, this);
+        g_unix_fd_add(STDOUT_FILENO, G_IO_ERR, onReaderGone, this);
     }
 
-    void run()
+    ExitCode run()
     {
         g_main_loop_run(loop_.get());
+        return end_;
     }
     void quit()
     {
@@ -51,12 +54,20 @@ public:
     }
 
 private:
+    template <int number>
     static gboolean onSignal(gpointer self)
     {
+        static_cast<Loop*>(self)->end_ = static_cast<ExitCode>(ENDED_BY_SIGNAL + number);
         static_cast<Loop*>(self)->quit();
         return G_SOURCE_CONTINUE;
     }
+    static gboolean onReaderGone(int, GIOCondition, gpointer self)
+    {
+        static_cast<Loop*>(self)->quit();
+        return G_SOURCE_REMOVE;
+    }
 
+    ExitCode end_ = SUCCESS;
     std::unique_ptr<GMainLoop, void (*)(GMainLoop*)> loop_{g_main_loop_new(nullptr, FALSE),
                                                            g_main_loop_unref};
 };
@@ -143,14 +154,15 @@ ExitCode runWatch(const Invocation& invocation)
     if (reportDeviceFileProblem())
         return BAD_DEVICE_FILE;
     Loop loop;
+    ExitCode end = SUCCESS;
     Printer printer(loop, invocation.json);
     {
         const Listening listening(printer);
         printer.begin();
-        loop.run();
+        end = loop.run();
     }
     printer.rethrow();
-    return SUCCESS;
+    return end;
 }
 
 } // namespace
@@ -158,13 +170,12 @@ ExitCode runWatch(const Invocation& invocation)
 
 void cli::addWatchCommand(const Command& app, Invocation& invocation)
 {
-    const Command watch =
-        app.add("watch", "Print connection changes, one line each, until interrupted");
-    watch.flag("--json", invocation.json, "Print one JSON object a line");
+    const Command watch = app.add("watch", "Show connection changes as they happen");
+    watch.flag("--json", invocation.json, "Print a JSON object a line");
     watch.setFooter("Examples: coresystem watch\n"
-                    "          coresystem watch -v --device phone.toml   also what is wrong "
-                    "with an edit\n"
-                    "Ends with exit code 0 at SIGINT (Ctrl-C) or SIGTERM.");
+                    "          coresystem watch -v --device phone.toml\n"
+                    "-v also shows what is wrong with an edit. Ends at Ctrl-C (exit code 130) or "
+                    "when nobody reads any more (0).");
     watch.onUse(
         [&invocation] { invocation.command = [&invocation] { return runWatch(invocation); }; });
 }

@@ -9,10 +9,10 @@
 
 #include "Commands.h"
 #include "Completion.h"
+#include "Help.h"
 #include "Session.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "devicefile/Closest.h"
 
 namespace cli {
 namespace {
@@ -20,57 +20,71 @@ namespace {
 const char* const VERSION_TEXT = "coresystem " CORESYSTEM_VERSION;
 
 const char* const FOOTER = R"(Examples:
-  coresystem info                        every fact about this machine
-  coresystem info --device phone.toml    every fact about a simulated device
-  coresystem get device_name             one fact, for scripts
-  coresystem sim                         what applications may learn of the SIM cards
-  coresystem network                     connections, flight mode, mobile data
-  coresystem watch                       connection changes, until interrupted
-  coresystem package org.example.clock   the version of an installed package
-  coresystem storage --at-least 500      whether more than 500 MB are free
-  coresystem country 340                 what the library makes of a country key
-  coresystem log decipher --key key <log read a debug trace
-  coresystem doctor                      what the answers rest on
-  coresystem device list                 the simulated devices there are
+  coresystem info --device phone
+  coresystem get device_name sw_version
+  coresystem storage --at-least 500
+  coresystem country 340
+  coresystem device run phone.toml -- ./application
+"coresystem help COMMAND" tells more of a command, coresystem(1) everything.
 
 Exit codes:
   0 success   1 failure, or less storage   2 usage error   3 fact not available
-  4 device file unusable   5 no such country key)";
+  4 device file unusable   5 no such country key   128+N ended by signal N)";
+
+struct ColorWord {
+    const char* word;
+    Color color;
+};
+
+constexpr ColorWord COLORS[] = {
+    {"auto", Color::Auto}, {"always", Color::Always}, {"never", Color::Never}};
+
+const ColorWord* findColor(const std::string& word)
+{
+    for (const ColorWord& row : COLORS)
+        if (word == row.word)
+            return &row;
+    return nullptr;
+}
+
+std::string colorProblem(const std::string& word)
+{
+    return findColor(word) != nullptr ? "" : quoted(word) + " is not auto, always or never";
+}
 
 struct Program {
-    CLI::App app{"Asks the CoreSystem library about this device.", "coresystem"};
+    CLI::App app{"Show what an application learns about the device it runs on.", "coresystem"};
     Invocation invocation;
     CLI::Option* device = nullptr;
 
     Program()
     {
-        app.set_version_flag("--version", VERSION_TEXT, "Print the version and exit");
+        app.set_help_flag("-h,--help", "Show this help"); // inherited
+        app.set_version_flag("-V,--version", VERSION_TEXT, "Show the version");
         device = app.add_option("--device", invocation.deviceFile,
-                                "Ask a simulated device (overrides CORESYSTEM_DEVICE)");
+                                "Ask a simulated device, by file or name");
         device->type_name("DEVICE");
         app.add_flag("-v,--verbose", invocation.verbose,
-                     "Show the library's log lines and the backend on standard error");
+                     "Show the library's log lines on standard error");
+        app.add_flag("--wide", invocation.wide, "Wrap and shorten nothing");
+        app.add_option("--color", invocation.color, "Use color: auto, always or never")
+            ->type_name("WHEN")
+            ->check(CLI::Validator([](std::string& word) { return colorProblem(word); }, ""));
         app.fallthrough(); // options of every command may also stand behind it; inherited
         app.require_subcommand(0, 1);
         const Command command(app);
         addInfoCommands(command, invocation);
-        addCountryCommand(command, invocation);
         addSimCommand(command, invocation);
+        addCountryCommand(command, invocation);
         addPackageCommand(command, invocation);
         addStorageCommand(command, invocation);
         addWatchCommand(command, invocation);
-        addLogCommands(command, invocation);
         addDoctorCommand(command, invocation);
         addDeviceCommands(command, invocation);
+        addLogCommands(command, invocation);
         app.footer(FOOTER);
     }
 };
-
-ExitCode reportUsage(const std::string& text)
-{
-    complain(text + "\nRun \"coresystem --help\" for the commands and their options.");
-    return USAGE;
-}
 
 // The innermost command that was given.
 const CLI::App& chosenCommand(const CLI::App& app)
@@ -79,30 +93,25 @@ const CLI::App& chosenCommand(const CLI::App& app)
     return chosen.empty() ? app : chosenCommand(*chosen.front());
 }
 
-ExitCode reportExtras(const CLI::App& app)
+ExitCode reportUsage(const std::string& text, const CLI::App& chosen)
 {
-    const std::vector<std::string> extras = app.remaining(true);
-    const std::string word = extras.empty() ? "" : extras.front();
-    const CLI::App& chosen = chosenCommand(app);
-    const std::vector<std::string> names = namesOfCommands(chosen);
-    if (names.empty() || word.rfind('-', 0) == 0)
-        return reportUsage("unexpected argument " + quoted(word));
-    const std::string kind = &chosen == &app ? "" : chosen.get_name() + " ";
-    return reportUsage("no " + kind + "command is called " + quoted(word) + "; did you mean \"" +
-                       port::devicefile::closest(word, names) + "\"? The commands are " +
-                       listed(names));
+    complain(text + "\n" + hintAt(chosen));
+    return USAGE;
 }
 
 ExitCode execute(const Program& program)
 {
+    if (program.invocation.wide)
+        useFullWidth();
+    useColor(findColor(program.invocation.color)->color);
     if (program.device->count() > 0) {
         if (program.invocation.deviceFile.empty())
-            return reportUsage("--device names no file");
+            return reportUsage("--device needs a value: DEVICE", program.app);
         chooseDevice(program.invocation.deviceFile);
     }
     if (!program.invocation.command) {
-        writeOut(program.app.help());
-        return USAGE;
+        writeOut(startPage());
+        return SUCCESS;
     }
     chooseLogSink(program.invocation.verbose);
     if (program.invocation.verbose)
@@ -121,6 +130,24 @@ std::vector<std::string> takeTail(std::vector<std::string>& words)
     return tail;
 }
 
+ExitCode showHelp(const CLI::App& app)
+{
+    const CLI::App& chosen = chosenCommand(app);
+    if (const auto extras = app.remaining(true); !extras.empty())
+        return reportUsage(extrasProblem(extras, chosen), chosen);
+    writeOut(helpText(chosen));
+    return SUCCESS;
+}
+
+// "help COMMAND" is "COMMAND --help".
+void takeHelp(std::vector<std::string>& words)
+{
+    if (words.empty() || words.front() != "help")
+        return;
+    words.erase(words.begin());
+    words.push_back("--help");
+}
+
 ExitCode run(int argc, char** argv)
 {
     Program program;
@@ -131,21 +158,23 @@ ExitCode run(int argc, char** argv)
     try {
         std::vector<std::string> words(argv + 1, argv + argc);
         program.invocation.tail = takeTail(words);
+        takeHelp(words);
         std::reverse(words.begin(), words.end()); // as the parser takes them
         program.app.parse(words);
         return execute(program);
     } catch (const CLI::CallForHelp&) {
-        writeOut(program.app.help());
-        return SUCCESS;
+        return showHelp(program.app);
     } catch (const CLI::CallForVersion&) {
         writeOut(std::string(VERSION_TEXT) + "\n");
         return SUCCESS;
     } catch (const CLI::ExtrasError&) {
-        return reportExtras(program.app);
+        const CLI::App& chosen = chosenCommand(program.app);
+        return reportUsage(extrasProblem(program.app.remaining(true), chosen), chosen);
     } catch (const CLI::ParseError& error) {
-        return reportUsage(printable(error.what()));
+        const CLI::App& chosen = chosenCommand(program.app);
+        return reportUsage(usageProblem(error, chosen), chosen);
     } catch (const UsageError& error) {
-        return reportUsage(error.what());
+        return reportUsage(error.what(), chosenCommand(program.app));
     }
 }
 

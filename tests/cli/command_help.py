@@ -22,8 +22,8 @@ def _words_at_line_starts(text, pattern):
 def walk(program, command=()):
     """Yields each command as a tuple of words, () first, with its subcommands and its options."""
     text = _text(program, command)
-    subcommands = _words_at_line_starts(_section(text, "Subcommands"), "[a-z-]+")
-    options = re.findall(r"^  (?:-\w,)?(--[a-z-]+)", _section(text, "Options"), re.MULTILINE)
+    subcommands = _words_at_line_starts(_section(text, "Commands"), "[a-z-]+")
+    options = re.findall(r"^  (?:-\w, )?(--[a-z-]+)", _section(text, "Options"), re.MULTILINE)
     assert options, f"no options in the help of {command}:\n{text}"
     yield command, subcommands, options
     for name in subcommands:
