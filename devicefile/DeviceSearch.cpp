@@ -6,10 +6,8 @@
 #include <map>
 #include <system_error>
 
-#include <dlfcn.h>
-#include <link.h>
-
 #include "Closest.h"
+#include "port/common/OwnFile.h"
 
 namespace port::devicefile {
 namespace {
@@ -36,24 +34,11 @@ fs::path ownFolder()
     return config.is_absolute() ? config / DEVICES : fs::path();
 }
 
-// The library or program that this code is part of.
-fs::path ownFile()
-{
-    static const char here = 0;
-    Dl_info self = {};
-    void* loaded = nullptr;
-    std::error_code error;
-    if (dladdr1(&here, &self, &loaded, RTLD_DL_LINKMAP) != 0 && loaded != nullptr)
-        if (const char* const name = static_cast<const link_map*>(loaded)->l_name; *name != '\0')
-            return fs::canonical(name, error);
-    return fs::read_symlink("/proc/self/exe", error); // a program knows no path of itself
-}
-
 // Found from the place of the library, so that an installed tree can be moved. Empty when not
 // there.
 fs::path shippedFolder()
 {
-    fs::path above = ownFile().parent_path();
+    fs::path above = fs::path(ownFile()).parent_path();
     for (int level = 0; level < LEVELS_UP; ++level) {
         above = above.parent_path();
         std::error_code error;

@@ -79,13 +79,21 @@ void wifi_connection_state_changed(wifi_connection_state_e state, wifi_ap_h ap, 
         listener->OnWifiConnectionStateChanged(number, ap, userData);
 }
 
+// Read once and tested: while it is unset the pointer is null before the registration is gone.
+void tell(void (IConnectionStateListener::*operation)(bool, void*), bool value, void* userData)
+{
+    IConnectionStateListener* const listener = currentListener();
+    if (listener != nullptr)
+        (listener->*operation)(value, userData);
+}
+
 // Tells the listener a switch that is read again; nothing when it cannot be read.
-void tellSwitch(runtime_info_key_e key, void (IConnectionStateListener::*tell)(bool, void*),
+void tellSwitch(runtime_info_key_e key, void (IConnectionStateListener::*operation)(bool, void*),
                 void* userData)
 {
     bool isOn = false;
     if (runtime_info_get_value_bool(key, &isOn) == RUNTIME_INFO_ERROR_NONE)
-        (currentListener()->*tell)(isOn, userData);
+        tell(operation, isOn, userData);
 }
 
 void tellWifiStatus(void* userData)
@@ -93,12 +101,11 @@ void tellWifiStatus(void* userData)
     int status = RUNTIME_INFO_WIFI_STATUS_DISABLED;
     if (runtime_info_get_value_int(RUNTIME_INFO_KEY_WIFI_STATUS, &status) ==
         RUNTIME_INFO_ERROR_NONE)
-        currentListener()->OnWifiStatusChanged(status == RUNTIME_INFO_WIFI_STATUS_CONNECTED,
-                                               userData);
+        tell(&IConnectionStateListener::OnWifiStatusChanged,
+             status == RUNTIME_INFO_WIFI_STATUS_CONNECTED, userData);
 }
 
-// No test for a null listener, unlike the two above: meant, the registration is gone before the
-// listener is.
+// The read comes first, with and without a listener: the platform sees the same calls.
 void OnConnectionStateChanged(runtime_info_key_e key, void* userData)
 {
     DEBUG_LINE("OnConnectionStateChanged");

@@ -7,6 +7,7 @@
 
 #include <dlfcn.h>
 
+#include "../common/OwnFile.h"
 #include "../common/RegularFile.h"
 #include "cipher/CipherModule.h"
 
@@ -20,28 +21,29 @@ struct LoadedModule {
     std::string problem;
 };
 
-// The module stands in a folder beside this library, wherever that is.
-std::string modulePath()
+LoadedModule loadModule()
 {
-    static const char here = 0;
-    Dl_info self = {};
-    const std::string library = dladdr(&here, &self) != 0 ? self.dli_fname : "";
-    return library.substr(0, library.rfind('/') + 1) + COREUTIL_CIPHER_MODULE;
+    LoadedModule loaded;
+    // The module stands in a folder beside this library, wherever that is. Without that place there
+    // is none: a relative path would be another file in each folder that the program goes to.
+    const std::string self = port::ownFile();
+    if (self.empty()) {
+        loaded.problem = "the cipher cannot be loaded: the place of this library is not known";
+        return loaded;
+    }
+    const std::string path = self.substr(0, self.rfind('/') + 1) + COREUTIL_CIPHER_MODULE;
+    void* const library = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (library != nullptr)
+        loaded.cipher = static_cast<const CipherModule*>(dlsym(library, "coreutilCipherModule"));
+    if (loaded.cipher == nullptr)
+        loaded.problem = std::string("the cipher cannot be loaded: ") + dlerror();
+    return loaded;
 }
 
 // Loaded once and never unloaded.
 const LoadedModule& cipherModule()
 {
-    static const LoadedModule& module = *new LoadedModule([] {
-        LoadedModule loaded;
-        void* const library = dlopen(modulePath().c_str(), RTLD_NOW | RTLD_LOCAL);
-        if (library != nullptr)
-            loaded.cipher =
-                static_cast<const CipherModule*>(dlsym(library, "coreutilCipherModule"));
-        if (loaded.cipher == nullptr)
-            loaded.problem = std::string("the cipher cannot be loaded: ") + dlerror();
-        return loaded;
-    }());
+    static const LoadedModule& module = *new LoadedModule(loadModule());
     return module;
 }
 

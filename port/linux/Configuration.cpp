@@ -23,6 +23,21 @@ Result<Place> placeOf(const std::string& key)
     return Place{key.substr(0, slash), key.substr(slash + 1)};
 }
 
+// GLib's own texts repeat lines of the file, which may be anybody's: a reason never does.
+Error refusalOf(const GError& error)
+{
+    switch (error.code) {
+    case G_KEY_FILE_ERROR_GROUP_NOT_FOUND:
+    case G_KEY_FILE_ERROR_KEY_NOT_FOUND:
+        return notAvailable("it has no such key");
+    case G_KEY_FILE_ERROR_UNKNOWN_ENCODING:
+    case G_KEY_FILE_ERROR_INVALID_VALUE:
+        return notAvailable("it has no readable text for the key");
+    default:
+        return notAvailable("it is no file of groups and keys");
+    }
+}
+
 // The reason without the file, which the caller tells.
 Result<std::string> readText(const std::string& file, const Place& place)
 {
@@ -34,11 +49,11 @@ Result<std::string> readText(const std::string& file, const Place& place)
     const Owned<GKeyFile> keyFile(g_key_file_new());
     if (!g_key_file_load_from_data(keyFile.get(), content.data(), content.size(), G_KEY_FILE_NONE,
                                    Out(error)))
-        return notAvailable(error->message);
+        return refusalOf(*error);
     const Owned<char> text(
         g_key_file_get_string(keyFile.get(), place.group.c_str(), place.name.c_str(), Out(error)));
     if (!text)
-        return notAvailable(error->message);
+        return refusalOf(*error);
     return *text != '\0' ? Result<std::string>(text.get()) : notAvailable("it is empty");
 }
 

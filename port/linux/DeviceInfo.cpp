@@ -106,7 +106,7 @@ std::string problemOfSerial(const std::string& text)
     const bool isNone =
         repeatsOneCharacter(small) ||
         std::find(std::begin(NO_SERIALS), std::end(NO_SERIALS), small) != std::end(NO_SERIALS);
-    return isNone ? "\"" + text + "\" is no serial number" : "";
+    return isNone ? "holds what firmware says in place of a serial number" : "";
 }
 
 } // namespace

@@ -6,6 +6,7 @@
 #include "Clock.h"
 #include "Configuration.h"
 #include "DeviceInfo.h"
+#include "Environment.h"
 #include "Files.h"
 #include "Hostname1.h"
 #include "Locale1.h"
@@ -21,12 +22,6 @@ namespace port::linux_backend {
 namespace {
 
 using coresystem_port::Service;
-
-std::vector<std::string> configurationFiles()
-{
-    return {std::string(g_get_user_config_dir()) + "/coresystem/vconf.ini",
-            "/etc/coresystem/vconf.ini"};
-}
 
 class LinuxBackend : public Backend {
 public:
@@ -135,7 +130,7 @@ private:
     LinuxSettings settings_{bus_};
     LinuxTelephony telephony_{bus_};
     LinuxNetwork network_{bus_, ""};
-    LinuxStorage storage_{g_get_user_data_dir()};
+    LinuxStorage storage_{dataFolder()};
     LinuxPackages packages_{""};
     LinuxConfiguration configuration_{configurationFiles()};
     LinuxClock clock_;

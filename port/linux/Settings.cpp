@@ -8,6 +8,7 @@
 
 #include <sys/utsname.h>
 
+#include "Environment.h"
 #include "Hostname1.h"
 #include "Locale1.h"
 #include "TextScaling.h"
@@ -48,6 +49,8 @@ Result<Fact> languageOfMachine(Bus& bus)
 
 Result<Fact> languageOfProcess()
 {
+    if (hasMoreRightsThanItsCaller())
+        return notAvailable("the environment is not read in a set-user-ID process");
     // In the order in which POSIX looks at them.
     for (const char* const variable : {"LC_ALL", "LC_MESSAGES", "LANG"}) {
         const char* const value = std::getenv(variable);

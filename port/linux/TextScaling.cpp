@@ -10,6 +10,7 @@
 #include <gio/gsettingsbackend.h>
 
 #include "../common/GLibTypes.h"
+#include "Environment.h"
 
 namespace port::linux_backend {
 namespace {
@@ -46,6 +47,8 @@ bool isFactor(GVariant* value, GSettingsSchemaKey* key)
 
 Result<Sourced<double>> textScaling()
 {
+    if (hasMoreRightsThanItsCaller()) // the store, its schemas and its modules are the caller's
+        return missing("not read in a set-user-ID process");
     GSettingsSchemaSource* const schemas = g_settings_schema_source_get_default();
     const Owned<GSettingsSchema> schema(
         schemas != nullptr ? g_settings_schema_source_lookup(schemas, SCHEMA, TRUE) : nullptr);

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <cctype>
+#include <filesystem>
 #include <set>
 #include <string>
 
@@ -248,6 +249,25 @@ TEST_F(AESCryptoTest, ApplicationsErrorQueueIsLeftAlone)
     isRefused(cipher().Encrypt("balance").replace(20, 1, "!"));
     loadProblem(tree.write("/key", "g" + HEX_KEY.substr(1)));
     EXPECT_EQ(0U, ERR_peek_error());
+}
+
+// Run by the test below.
+TEST_F(AESCryptoTest, DISABLED_InAnotherFolder)
+{
+    ASSERT_EQ(0, chdir(tree.root().c_str()));
+    std::puts(cipher().GetProblem().empty() ? "there is a cipher" : "there is none");
+}
+
+// Loaded by a relative path, by a program that changes its folder afterwards.
+TEST_F(AESCryptoTest, ModuleStandsBesideTheLibraryWhereverTheProgramGoes)
+{
+    const std::string folder = std::filesystem::path(CIPHER_MODULE).parent_path().parent_path();
+    const std::string self = std::filesystem::read_symlink("/proc/self/exe");
+    if (PROBE_IS_EMULATED != 0)
+        GTEST_SKIP() << "needs a program of this machine";
+    EXPECT_THAT(outputOf("cd '" + folder + "' && LD_LIBRARY_PATH=. '" + self +
+                         "' --gtest_also_run_disabled_tests --gtest_filter=*InAnotherFolder"),
+                HasSubstr("there is a cipher\n"));
 }
 
 TEST_F(AESCryptoTest, ThreadsMayEncipherAtOnce)

@@ -8,7 +8,9 @@
 
 using port::linux_backend::LinuxConfiguration;
 using testing::AllOf;
+using testing::AnyOf;
 using testing::HasSubstr;
+using testing::Not;
 using testing::StartsWith;
 
 namespace {
@@ -66,6 +68,21 @@ TEST_F(LinuxConfigurationTest, ReasonNamesEveryFile)
     tree.write("/user.ini", "[db/csc]\nsalescode=\n");
     EXPECT_EQ("error: " + user + ": it is empty; " + machine + ": No such file or directory",
               ask(KEY));
+}
+
+// The file may be one that the asker must not read, as a link of a set-user-ID program's caller.
+TEST_F(LinuxConfigurationTest, NoReasonRepeatsWhatAFileHolds)
+{
+    for (const char* const text :
+         {"root:secret:1:", "[db/csc]\nsecret\n", "[secret", "[db/csc]\nsalescode=secret\xff\n",
+          "[db/csc]\nsalescode=\\", "Encoding=secret\n",
+          "[db/csc]\nEncoding=secret\nsalescode=x\\z\n", "[secret]\nsecret=secret\n",
+          "[db/csc]\nsecret[secret]=x\n", "\xffsecret\n"}) {
+        tree.write("/user.ini", text);
+        EXPECT_THAT(ask(KEY), AllOf(StartsWith("error: " + user + ": it "),
+                                    Not(AnyOf(HasSubstr("secret"), HasSubstr("\\")))))
+            << text;
+    }
 }
 
 TEST_F(LinuxConfigurationTest, OddFilesAreNeverWaitedFor)

@@ -204,9 +204,11 @@ TEST_F(LinuxFilesTest, PlaceholderIsNoSerial)
     }
     tree.write("/sys/class/dmi/id/product_serial", "Default string\n");
     tree.write("/proc/device-tree/serial-number", std::string("0\0", 2));
-    EXPECT_EQ("error: /proc/device-tree/serial-number: \"0\" is no serial number, "
-              "/sys/class/dmi/id/product_serial: \"Default string\" is no serial number",
-              show(device.serial()));
+    EXPECT_EQ(
+        "error: /proc/device-tree/serial-number: holds what firmware says in place of a serial "
+        "number, "
+        "/sys/class/dmi/id/product_serial: holds what firmware says in place of a serial number",
+        show(device.serial()));
 }
 
 TEST_F(LinuxFilesTest, AbsentSerialNamesEveryPlace)

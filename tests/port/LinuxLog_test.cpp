@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <algorithm>
+#include <atomic>
+#include <chrono>
 #include <cstring>
 #include <filesystem>
 #include <sstream>
@@ -94,6 +96,63 @@ TEST_F(LinuxLogTest, FullDiskIsToldToTheCaller)
     EXPECT_FALSE(written);
 }
 
+// A pipe in the place of standard error, as long as this lives. Nobody reads it.
+class StalledStandardError {
+public:
+    StalledStandardError()
+    {
+        int ends[2] = {-1, -1};
+        EXPECT_EQ(0, pipe(ends));
+        reader_ = ends[0];
+        fcntl(reader_, F_SETFL, O_NONBLOCK);
+        dup2(ends[1], STDERR_FILENO);
+        close(ends[1]);
+    }
+    ~StalledStandardError()
+    {
+        dup2(kept_, STDERR_FILENO);
+        close(kept_);
+        close(reader_);
+    }
+    std::string readAll() const
+    {
+        std::string all;
+        char block[65536];
+        for (ssize_t size = 1; size > 0;) {
+            size = read(reader_, block, sizeof block);
+            all.append(block, size > 0 ? static_cast<std::size_t>(size) : 0);
+        }
+        return all;
+    }
+
+private:
+    const int kept_ = dup(STDERR_FILENO);
+    int reader_ = -1;
+};
+
+TEST_F(LinuxLogTest, ReaderThatStallsIsNotWaitedForAndItsLostLinesAreCounted)
+{
+    const StalledStandardError log;
+    const auto start = std::chrono::steady_clock::now();
+    int lost = 0;
+    std::atomic<int> lostByThreads{0};
+    for (int line = 0; line < 200; ++line)
+        lost += write(DLOG_ERROR, "CoreSystem", std::string(998, 'x')) ? 0 : 1;
+    together(8, [&](int) {
+        for (int line = 0; line < 50; ++line)
+            lostByThreads += write(DLOG_ERROR, "CoreSystem", std::string(998, 'x')) ? 0 : 1;
+    });
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2)); // 100 ms, once
+    EXPECT_GT(lost, 100); // a pipe holds 64 KiB
+    EXPECT_EQ(400, lostByThreads);
+    log.readAll();
+    EXPECT_TRUE(write(DLOG_ERROR, "CoreSystem", "last"));
+    EXPECT_THAT(log.readAll(), MatchesRegex("E/CoreSystem\\([ 0-9]+\\): last\n"
+                                            "W/coresystem-port\\([ 0-9]+\\): " +
+                                            std::to_string(lost + lostByThreads) +
+                                            " log lines are lost: nobody took them\n"));
+}
+
 // A field as the journal's protocol writes it: name, length in little endian, value.
 std::string field(const std::string& name, const std::string& value)
 {
@@ -166,6 +225,24 @@ TEST_F(JournalTest, LongTextReachesTheJournalWhole)
     listen();
     standardErrorOf(DLOG_INFO, std::string(20000, 'x'), LogSink::Automatic);
     EXPECT_THAT(received(), HasSubstr(std::string(20000, 'x')));
+}
+
+TEST_F(JournalTest, LinesGoToStandardErrorWhenTheJournalStalls)
+{
+    listen(); // and never read
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_THAT(inChild([&]() -> std::string {
+                    if (!enterPrivateMounts() || !bindFolder(tree.root(), "/run"))
+                        return "failed";
+                    CapturedStandardError log;
+                    bool written = true;
+                    for (int line = 0; line < 3000; ++line)
+                        written = write(DLOG_WARN, "CoreSystem", "text") && written;
+                    const std::string taken = log.take();
+                    return written ? taken.substr(taken.rfind("W/")) : "not written";
+                }),
+                MatchesRegex("W/CoreSystem\\([ 0-9]+\\): text\n"));
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
 }
 
 TEST_F(JournalTest, WithoutAJournalLinesGoToStandardError)
