@@ -200,7 +200,8 @@ public:
     /// \return always 0.
     CORESYSTEM_API int GetIMEI(char** imei);
 
-    /// Whether the card in a slot is abroad.
+    /// Whether the card in a slot is abroad. Each call writes an error line to the log, also a good
+    /// one.
     /// \param slot 0-based.
     /// \param[out] roaming the answer; left as it was when `slot` is not in service or not there.
     /// \return whether `roaming` was answered.

@@ -3,7 +3,8 @@
 """Holds docs/device-file.schema.json to the rows that the reader of device files goes by, and to the
 reader's own judgement: of every device file of the tree, and of one mistake of each kind.
 
-With --write it puts the schema of the rows in its place.
+Its descriptions are the sentences of docs/device-file.md. With --write it puts the schema of the rows
+in its place.
 """
 import argparse
 import json
@@ -71,6 +72,37 @@ def printed(*arguments):
                           text=True).stdout
 
 
+def manual():
+    """What the manual says of each section, under "", and of each of its keys."""
+    parts = re.split(r"^### `\[+(\w+)\]+`\n", (TREE / "docs/device-file.md").read_text("utf-8"),
+                     flags=re.MULTILINE)
+    said = {}
+    for name, text in zip(parts[1::2], parts[2::2]):
+        text = re.split(r"^## ", text, flags=re.MULTILINE)[0].strip()
+        said[name] = {"": " ".join(text.split("\n\n")[0].split())}
+        for key, meaning in re.findall(r"^\| `(\w+)` \| ([A-Za-z`].*) \|$", text, re.MULTILINE):
+            said[name][key] = meaning
+    return {name: {key: re.sub(r"\[(.*?)\]\(.*?\)|`", r"\1", text) for key, text in keys.items()}
+            for name, keys in said.items()}
+
+
+def described():
+    """The schema of the rows with the manual's sentences."""
+    rows = json.loads(printed())
+    sentences = manual()
+    for name, section in rows["properties"].items():
+        if name == "schema":
+            continue
+        keys = section.get("items", section).get("properties", {})
+        section["description"] = sentences[name][""]
+        for key in keys:
+            if name == "fault":
+                keys[key] = {"description": f"How {key} fails.", **keys[key]}
+            else:
+                keys[key] = {"description": sentences[name][key], **keys[key]}
+    return json.dumps(rows, indent=1) + "\n"
+
+
 def schema():
     return json.loads(SCHEMA.read_text())
 
@@ -91,9 +123,8 @@ class DeviceSchema(unittest.TestCase):
         return by_schema, printed(path) == "\n"
 
     def test_schema_is_that_of_the_rows(self):
-        self.assertEqual(SCHEMA.read_text(), printed(),
-                         "docs/device-file.schema.json is out of date: run check_device_schema.py "
-                         "PROGRAM --write")
+        self.assertEqual(SCHEMA.read_text(), described(),
+                         "docs/device-file.schema.json is out of date: run tools/refresh")
 
     def test_schema_is_one(self):
         jsonschema.Draft7Validator.check_schema(schema())
@@ -140,6 +171,6 @@ if __name__ == "__main__":
     arguments = parser.parse_args()
     PROGRAM = arguments.program
     if arguments.write:
-        SCHEMA.write_text(printed())
+        SCHEMA.write_text(described())
     else:
         unittest.main(argv=sys.argv[:1])
