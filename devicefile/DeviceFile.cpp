@@ -498,7 +498,7 @@ private:
 };
 
 // Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the
-// line (and on nested values, TOML_MAX_NESTED_VALUES) keeps that from using up the stack.
+// line keeps that from using up the stack.
 std::vector<Problem> findLongLines(const std::string& text)
 {
     std::vector<Problem> problems;
@@ -525,10 +525,9 @@ Reading readDevice(const std::string& text, const std::string& path)
     if (std::vector<Problem> problems = findLongLines(text); !problems.empty())
         return {{}, std::move(problems), false};
     try {
-        return Reader(path).read(toml::parse(text, path));
-    } catch (const toml::parse_error& error) {
-        const toml::source_position where = error.source().begin;
-        return {{}, {{where.line, where.column, reasonOf(error)}}, false};
+        return Reader(path).read(parseToml(text, path));
+    } catch (const TomlError& error) {
+        return {{}, {{error.line, error.column, error.what()}}, false};
     }
 }
 

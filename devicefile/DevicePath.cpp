@@ -35,7 +35,7 @@ bool isWhole(const std::string& text, const toml::node& value)
 DevicePath keysOf(const std::string& text)
 {
     DevicePath path;
-    const toml::table root = toml::parse(text + "=0");
+    const toml::table root = parseToml(text + "=0");
     const toml::node* node = &root;
     while (const toml::table* const table = node->as_table()) {
         if (table->size() != 1)
@@ -66,7 +66,7 @@ Result<DevicePath> parsePath(const std::string& text)
         if (text.size() <= LINE_LIMIT)
             if (DevicePath path = keysOf(withIndexAsKey(text)); !path.empty())
                 return withFreeKeyJoined(std::move(path));
-    } catch (const toml::parse_error&) { // said below
+    } catch (const TomlError&) { // said below
     }
     return notAvailable("it is no path like settings.flight_mode, slot[0].sim or "
                         "packages.\"org.example.app\"");

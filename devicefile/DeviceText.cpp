@@ -77,10 +77,10 @@ bool isValue(const std::string& text)
     if (text.size() > LINE_LIMIT) // bounds how deep it nests
         return false;
     try {
-        const toml::table table = toml::parse("v=" + text);
+        const toml::table table = parseToml("v=" + text);
         return text.find('\n') == std::string::npos && table.size() == 1 &&
                table.get("v")->source().end.column == charactersOf(text) + 3;
-    } catch (const toml::parse_error&) { // plain text then
+    } catch (const TomlError&) { // plain text then
         return false;
     }
 }
@@ -260,7 +260,7 @@ private:
         if (text.empty())
             return false;
         Values before = valuesOf(document_.root());
-        Values after = valuesOf(toml::parse(text));
+        Values after = valuesOf(parseToml(text));
         const std::string path = shownPath(path_);
         extract(before, path);
         const Values taken = extract(after, path);
@@ -273,7 +273,7 @@ private:
     {
         Values values;
         if (value_) {
-            values = valuesOf(toml::parse("v=" + *value_));
+            values = valuesOf(parseToml("v=" + *value_));
             values = extract(values, "v");
         }
         return values;
@@ -312,7 +312,7 @@ Text setValue(const std::string& text, const std::string& file, const DevicePath
 {
     const std::string old(Edit(text, path, value).old());
     const std::string inQuotes = inQuotesLike(old, value);
-    if (toml::parse("v=" + inQuotes)["v"].value<std::string>() != value)
+    if (parseToml("v=" + inQuotes)["v"].value<std::string>() != value)
         return notAvailable("the value is no UTF-8");
     Text best = Edit(text, path, inQuotes).make();
     if (!best || !isValue(value))
@@ -331,8 +331,8 @@ Text applied(const std::string& text, const std::string& file, const Change& cha
     try {
         return change.value ? setValue(text, file, path.value(), *change.value)
                             : Edit(text, path.value(), {}).make();
-    } catch (const toml::parse_error& error) { // of a value that is no UTF-8, say
-        return notAvailable(reasonOf(error));
+    } catch (const TomlError& error) { // of a value that is no UTF-8, say
+        return notAvailable(error.what());
     }
 }
 

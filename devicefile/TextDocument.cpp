@@ -37,7 +37,7 @@ std::string assignment(const std::string& key, const std::string& value)
 
 TextDocument::TextDocument(std::string text)
     : text_(std::move(text)), places_(text_), lineEnding_(lineEndingOf(text_)),
-      root_(toml::parse(text_))
+      root_(parseToml(text_))
 {
     collect(root_);
     std::sort(lines_.begin(), lines_.end(),

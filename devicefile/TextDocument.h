@@ -17,7 +17,7 @@ namespace port::devicefile {
 /// Values are as they are to be written. Where a text cannot be, it is empty.
 class TextDocument {
 public:
-    /// Throws toml::parse_error.
+    /// Throws TomlError.
     explicit TextDocument(std::string text);
     TextDocument(const TextDocument&) = delete;
     TextDocument& operator=(const TextDocument&) = delete;

@@ -50,7 +50,7 @@ std::multiset<Leaf> others(const std::string& text, const DevicePath& path)
 {
     std::multiset<Leaf> all;
     std::vector<std::string> way;
-    collect(toml::parse(text), way, all);
+    collect(parseToml(text), way, all);
     std::multiset<Leaf> others;
     for (const Leaf& leaf : all)
         if (leaf.first.size() < path.size() ||

@@ -165,7 +165,33 @@ TEST_F(SimulatorTest, DeepNestingIsRefused)
     EXPECT_EQ(":1:1" + tooLong, problemOf("[" + dots + "]\n"));
     EXPECT_EQ(":2:1" + tooLong, problemOf("schema = 1\na = " + std::string(100000, '[')));
     EXPECT_THAT(problemOf("schema = 1\na = " + std::string(1000, '[')),
-                HasSubstr("nested value depth"));
+                StartsWith(":2:13: values nested deeper than 8"));
+}
+
+// The parser takes for granted that none of these comes.
+TEST_F(SimulatorTest, TextTheParserMustNotMeetIsRefused)
+{
+    const std::string inQuotes = ": a letter outside ASCII, which stands in quotes only";
+    const std::string header = ": a section header begins with a name";
+    const std::string behind = ": a letter outside ASCII behind a backslash";
+    for (const auto& [text, problemThere] : std::vector<std::pair<std::string, std::string>>{
+             {"[#]", ":1:2" + header},
+             {"[[ ]]", ":1:4" + header},
+             {"# [\n[\t=]", ":2:3" + header},
+             {"a = [\n[#\n]]\n[.b]", ":4:2" + header},
+             {"a = '''\n[#]'''''\n[\u00e9]", ":3:2" + header},
+             {"a = \"\"\"\\\"\"\"\"\"\n  [!]", ":2:4" + header},
+             {"a = 1 # \u00e9\nb = 'x' \u00a0", ":2:9" + inQuotes},
+             {"\xEF\xBB\xBF\u00e9 = 1", ":1:1" + inQuotes},
+             {"a = '\u00e9' \u3000", ":1:9" + inQuotes},
+             {"a = \"\"\"x\\ \n\n \u00e9\"\"\"", ":3:2" + behind},
+             {"a = \"\"\"\\\u00e9\"\"\"", ":1:9" + behind},
+         })
+        EXPECT_EQ(problemThere, problemOf(text)) << text;
+    for (const char* const text :
+         {"\"\u00e9\" = '\u00e9' # \u00e9\n", "a = \"\"\"\\n\u00e9\\\n  e\"\"\"\n",
+          "a = ['[#', \"\\\"\", '''\n[\u00e9''']\n", "[ 'a' ]\r\n[[b]] # [\n"})
+        EXPECT_THAT(problemOf(text), HasSubstr("schema = 1 is missing")) << text;
 }
 
 TEST_F(SimulatorTest, DeepestFileThatIsReadDoesNoHarm)
