@@ -45,7 +45,9 @@ std::string deviceFor(const Run& run, const std::string& folder)
     const fs::path file = fs::absolute(coresystem_port::deviceFile());
     if (!run.onCopy)
         return file;
-    const fs::path copy = fs::path(folder) / file.filename();
+    // In a folder of its own: it may be called as something of the bus is.
+    const fs::path copy = fs::path(folder) / "device" / file.filename();
+    fs::create_directory(copy.parent_path());
     fs::copy_file(file, copy);
     fs::permissions(copy, fs::perms::owner_write, fs::perm_options::add);
     return copy;

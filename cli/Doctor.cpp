@@ -23,6 +23,7 @@ struct LogState {
     std::string tag = CoreLogger::GetInstance()->GetLogTag();
     bool keyConfigured = AESCrypto::GetInstance()->HasConfiguredKey();
     std::string keyProblem = AESCrypto::GetInstance()->GetProblem();
+    std::string keyWarning = AESCrypto::GetInstance()->GetWarning();
 };
 
 std::string servicesText(const std::vector<Service>& services)
@@ -58,7 +59,7 @@ std::string keyText(const LogState& log)
         return "unusable: " + log.keyProblem;
     if (!log.keyConfigured)
         return "not configured: nobody can read debug lines (CORESYSTEM_LOG_KEY names a key file)";
-    return "configured and usable";
+    return "configured and usable" + (log.keyWarning.empty() ? "" : "; " + log.keyWarning);
 }
 
 std::string logText(const LogState& log)

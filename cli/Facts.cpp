@@ -2,12 +2,20 @@
 #include "Facts.h"
 
 #include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <condition_variable>
 #include <cstdlib>
+#include <exception>
 #include <functional>
+#include <memory>
+#include <mutex>
 #include <optional>
+#include <thread>
 #include <utility>
 
 #include <coresystem_port.h>
+#include <gio/gio.h>
 
 #include "Sims.h"
 
@@ -215,14 +223,27 @@ std::string reasonOfNoSerial(int code)
     }
 }
 
+const std::string DAEMON = "device daemon (org.tizen.system.deviced)";
+
+// The library asks over the bus library's shared connection, which would end this process with the
+// bus.
+void outliveTheBus()
+{
+    GDBusConnection* const bus = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
+    if (bus == nullptr)
+        return;
+    g_dbus_connection_set_exit_on_close(bus, FALSE);
+    g_object_unref(bus);
+}
+
 // The daemon has a backend of its own.
 Fact askSerial()
 {
+    outliveTheBus();
     const char* slot = nullptr;
     const int code = library().GetDeviceUniqueID(&slot);
     const auto serial = taken(const_cast<char*>(slot)); // the caller's, though it is read-only
-    return serial ? Fact{"", *serial, "device daemon (org.tizen.system.deviced)", ""}
-                  : noAnswer(reasonOfNoSerial(code));
+    return serial ? Fact{"", *serial, DAEMON, ""} : noAnswer(reasonOfNoSerial(code));
 }
 
 struct FactRow {
@@ -264,6 +285,114 @@ const std::vector<FactRow>& facts()
     return all;
 } // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
 
+const FactRow& rowOf(const std::string& name)
+{
+    return *std::find_if(facts().begin(), facts().end(),
+                         [&](const FactRow& each) { return each.name == name; });
+}
+
+constexpr std::chrono::seconds PATIENCE(4);
+std::atomic<int> askingThreads{0};
+
+// What threads of their own ask for, and one waits for as long as it likes.
+class Answers {
+public:
+    explicit Answers(const std::vector<std::string>& names)
+    {
+        for (const std::string& name : names)
+            facts_.push_back({name, nullptr, "", "", false});
+        states_.resize(names.size(), State::Waiting);
+    }
+
+    bool areThere(bool ofDaemon) const
+    {
+        return std::any_of(facts_.begin(), facts_.end(),
+                           [&](const Fact& fact) { return isDaemons(fact) == ofDaemon; });
+    }
+
+    // The next one that nobody has asked for yet; past the last when there is none.
+    std::size_t take(bool ofDaemon)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        std::size_t next = 0;
+        while (next < facts_.size() &&
+               (states_[next] != State::Waiting || isDaemons(facts_[next]) != ofDaemon))
+            ++next;
+        if (next < facts_.size())
+            states_[next] = State::Asked;
+        return next;
+    }
+    std::string name(std::size_t index)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        return facts_.at(index).name;
+    }
+    bool isIn(std::size_t index) const
+    {
+        return index < states_.size();
+    }
+    void give(std::size_t index, Fact fact)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        fact.name = facts_.at(index).name;
+        facts_.at(index) = std::move(fact);
+        states_.at(index) = State::Answered;
+        changed_.notify_all();
+    }
+    void fail(std::exception_ptr failure)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        failure_ = std::move(failure);
+        changed_.notify_all();
+    }
+
+    std::vector<Fact> await()
+    {
+        std::unique_lock<std::mutex> lock(mutex_);
+        changed_.wait_for(lock, PATIENCE, [this] {
+            return failure_ || std::count(states_.begin(), states_.end(), State::Answered) ==
+                                   static_cast<std::ptrdiff_t>(states_.size());
+        });
+        if (failure_)
+            std::rethrow_exception(failure_);
+        std::vector<Fact> facts = facts_;
+        const std::string time = " within " + std::to_string(PATIENCE.count()) + " seconds";
+        for (std::size_t i = 0; i < facts.size(); ++i)
+            if (states_[i] != State::Answered)
+                facts[i].reason = isDaemons(facts[i]) ? DAEMON + " does not answer" + time
+                                  : states_[i] == State::Asked
+                                      ? "what tells " + facts[i].name + " does not answer" + time
+                                      : "not asked: what comes before it is not answered" + time;
+        return facts;
+    }
+
+private:
+    enum class State { Waiting, Asked, Answered };
+
+    static bool isDaemons(const Fact& fact)
+    {
+        return fact.name == "device_serial";
+    }
+
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    std::vector<Fact> facts_;
+    std::vector<State> states_;
+    std::exception_ptr failure_;
+};
+
+void askOneByOne(Answers& answers, bool ofDaemon)
+{
+    ++askingThreads;
+    try {
+        for (std::size_t i = answers.take(ofDaemon); answers.isIn(i); i = answers.take(ofDaemon))
+            answers.give(i, rowOf(answers.name(i)).ask());
+    } catch (...) {
+        answers.fail(std::current_exception());
+    }
+    --askingThreads;
+}
+
 } // namespace
 
 std::vector<std::string> cli::factNames()
@@ -274,14 +403,22 @@ std::vector<std::string> cli::factNames()
     return names;
 }
 
-cli::Fact cli::askFact(const std::string& name)
+std::vector<cli::Fact> cli::askFacts(const std::vector<std::string>& names)
 {
-    const FactRow& row = *std::find_if(facts().begin(), facts().end(),
-                                       [&](const FactRow& each) { return each.name == name; });
-    Fact fact = row.ask();
-    fact.name = name;
-    fact.isIdentity = row.isIdentity;
-    return fact;
+    const auto answers = std::make_shared<Answers>(names);
+    // The daemon's answer may take longest, so that the others need not wait for it.
+    for (const bool ofDaemon : {false, true})
+        if (answers->areThere(ofDaemon))
+            std::thread([=] { askOneByOne(*answers, ofDaemon); }).detach();
+    std::vector<Fact> facts = answers->await();
+    for (Fact& fact : facts)
+        fact.isIdentity = rowOf(fact.name).isIdentity;
+    return facts;
+}
+
+bool cli::isStillAsking()
+{
+    return askingThreads != 0;
 }
 
 std::string cli::textOf(const Json& value)

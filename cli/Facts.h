@@ -21,8 +21,13 @@ struct Fact {
 /// The names of all facts, in the order in which they are shown.
 std::vector<std::string> factNames();
 
-/// Asks the library for one fact of factNames().
-Fact askFact(const std::string& name);
+/// Asks the library for facts of factNames(), in that order. Returns within seconds also when a
+/// source never answers: its fact has no value then, and a reason that says so.
+std::vector<Fact> askFacts(const std::vector<std::string>& names);
+
+/// Whether a question of askFacts() is still waiting for its answer. It cannot be called back: such
+/// a process must end without the destructors of its static objects.
+bool isStillAsking();
 
 /// The value as a user reads it; of a fact that has one.
 std::string textOf(const Json& value);

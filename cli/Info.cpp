@@ -61,12 +61,10 @@ const std::vector<std::string> NETWORK_FACTS = {
 
 std::vector<Fact> askAll(const std::vector<std::string>& names, bool reveal)
 {
-    std::vector<Fact> facts;
-    for (const std::string& name : names) {
-        facts.push_back(askFact(name));
-        if (facts.back().isIdentity && !reveal)
-            facts.back().value = masked(facts.back().value);
-    }
+    std::vector<Fact> facts = askFacts(names);
+    for (Fact& fact : facts)
+        if (fact.isIdentity && !reveal)
+            fact.value = masked(fact.value);
     return facts;
 }
 

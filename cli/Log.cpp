@@ -139,6 +139,8 @@ ExitCode runDecipher(const std::string& keyFile)
         complain(printable(problem));
         return FAILURE;
     }
+    if (const std::string warning = AESCrypto::GetInstance()->GetWarning(); !warning.empty())
+        complain("warning: " + printable(warning));
     return decipherInput();
 }
 

@@ -11,7 +11,9 @@
 
 #include <fcntl.h>
 #include <gio/gio.h>
+#include <sys/file.h>
 #include <sys/prctl.h>
+#include <sys/stat.h>
 #include <sys/un.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -90,6 +92,47 @@ std::string placeOfFolder()
     return (fits ? place : "/tmp") + name;
 }
 
+// The file in the folder that is locked for as long as the command or the keeper lives.
+constexpr char LOCK[] = "/lock";
+
+// None when another process has it, or somebody has removed it meanwhile.
+port::Descriptor lockIn(const std::string& folder, int flags)
+{
+    const std::string path = folder + LOCK;
+    port::Descriptor lock(open(path.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW | flags, 0600));
+    struct stat held = {};
+    struct stat there = {};
+    const bool isIt = lock.number() >= 0 && flock(lock.number(), LOCK_EX | LOCK_NB) == 0 &&
+                      fstat(lock.number(), &held) == 0 && stat(path.c_str(), &there) == 0 &&
+                      held.st_ino == there.st_ino && held.st_dev == there.st_dev;
+    return isIt ? std::move(lock) : port::Descriptor();
+}
+
+bool isOwnFolder(const std::string& path)
+{
+    struct stat status = {};
+    return lstat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode) &&
+           status.st_uid == geteuid();
+}
+
+// Removes the folders of runs whose command and keeper were both killed.
+void collectLeftovers(const fs::path& form)
+{
+    const std::string name = form.filename();
+    const std::string begin = name.substr(0, name.find('X'));
+    std::error_code ignored;
+    for (auto entry = fs::directory_iterator(form.parent_path(), ignored);
+         entry != fs::directory_iterator(); entry.increment(ignored)) {
+        const fs::path& path = entry->path();
+        const std::string found = path.filename();
+        if (found.size() != name.size() || found.compare(0, begin.size(), begin) != 0 ||
+            !isOwnFolder(path))
+            continue;
+        if (const port::Descriptor lock = lockIn(path, 0); lock.number() >= 0)
+            fs::remove_all(path, ignored);
+    }
+}
+
 // Beside this program in a build, where it is installed else.
 std::string deviceDaemon()
 {
@@ -147,10 +190,18 @@ void awaitChildren()
 
 } // namespace
 
-PrivateBus::PrivateBus() : folder_(placeOfFolder())
+PrivateBus::PrivateBus()
 {
-    if (mkdtemp(folder_.data()) == nullptr)
-        fail("no temporary folder " + folder_);
+    const std::string form = placeOfFolder();
+    collectLeftovers(form);
+    for (int attempt = 0; lock_.number() < 0; ++attempt) {
+        folder_ = form;
+        if (mkdtemp(folder_.data()) == nullptr)
+            fail("no temporary folder " + folder_);
+        lock_ = lockIn(folder_, O_CREAT);
+        if (lock_.number() < 0 && attempt == 9) // one may be taken for a leftover
+            fail(folder_ + LOCK);
+    }
 }
 
 PrivateBus::~PrivateBus()

@@ -7,11 +7,13 @@
 
 #include <sys/types.h>
 
+#include "port/common/Descriptor.h"
+
 namespace cli {
 
 /// A folder that only this user may enter, with a bus in it. From start() on both are kept by a
 /// process of their own, the keeper, which ends the bus and removes the folder when this object or
-/// this process ends, however it ends.
+/// this process ends, however it ends. When both are killed the next run removes the folder.
 class PrivateBus {
 public:
     /// Makes the folder. Throws std::runtime_error, as start() does.
@@ -39,6 +41,7 @@ private:
     pid_t startBus() const;
 
     std::string folder_;
+    port::Descriptor lock_; // shared with the keeper
     pid_t keeper_ = 0;
     int lifeline_ = -1; // the keeper sees it close
 };

@@ -105,5 +105,5 @@ cli::Json cli::jsonAnswer()
 
 std::string cli::jsonText(const Json& json)
 {
-    return json.dump(2, ' ', false, Json::error_handler_t::replace) + "\n";
+    return escapedInJson(json.dump(2, ' ', false, Json::error_handler_t::replace)) + "\n";
 }

@@ -3,10 +3,13 @@
 
 #include <algorithm>
 #include <clocale>
+#include <cstdint>
 #include <cstdio>
 #include <cwchar>
 #include <cwctype>
+#include <iterator>
 #include <numeric>
+#include <utility>
 
 #include "Terminal.h"
 
@@ -39,6 +42,39 @@ Character characterAt(const std::string& text, std::size_t position)
     if (character.valid)
         character.size = std::max<std::size_t>(size, 1); // NUL is said to have none
     return character;
+}
+
+// What a terminal does not show but obeys: marks that turn the order of letters, or are nothing to
+// see.
+bool isInvisible(wchar_t code)
+{
+    constexpr std::pair<wchar_t, wchar_t> RANGES[] = {
+        {0x00ad, 0x00ad},   {0x061c, 0x061c},   {0x115f, 0x1160},   {0x17b4, 0x17b5},
+        {0x180b, 0x180f},   {0x200b, 0x200f},   {0x2028, 0x202e},   {0x2060, 0x206f},
+        {0x3164, 0x3164},   {0xfeff, 0xfeff},   {0xffa0, 0xffa0},   {0xfff0, 0xfffb},
+        {0x1bca0, 0x1bca3}, {0x1d173, 0x1d17a}, {0xe0000, 0xe007f},
+    };
+    return std::any_of(std::begin(RANGES), std::end(RANGES), [&](const auto& range) {
+        return code >= range.first && code <= range.second;
+    });
+}
+
+bool isShown(const Character& character)
+{
+    return character.valid && std::iswprint(static_cast<wint_t>(character.code)) &&
+           !isInvisible(character.code);
+}
+
+// As UTF-16, of which JSON's escapes are.
+std::string asJsonEscape(std::uint32_t code)
+{
+    char text[16];
+    if (code < 0x10000)
+        std::snprintf(text, sizeof text, "\\u%04x", code);
+    else
+        std::snprintf(text, sizeof text, "\\u%04x\\u%04x", 0xd7c0 + (code >> 10),
+                      0xdc00 + (code & 0x3ff));
+    return text;
 }
 
 std::string escaped(char byte)
@@ -172,9 +208,24 @@ std::string cli::printable(const std::string& text)
     std::string shown;
     for (std::size_t at = 0; at < text.size();) {
         const Character character = characterAt(text, at);
-        const bool good = character.valid && std::iswprint(static_cast<wint_t>(character.code));
+        const bool good = isShown(character);
         for (const char byte : text.substr(at, character.size))
             good ? shown.push_back(byte) : void(shown += escaped(byte));
+        at += character.size;
+    }
+    return shown;
+}
+
+std::string cli::escapedInJson(const std::string& text)
+{
+    std::string shown;
+    for (std::size_t at = 0; at < text.size();) {
+        const Character character = characterAt(text, at);
+        const bool isAscii = static_cast<unsigned char>(text[at]) < 0x80;
+        if (isAscii || isShown(character))
+            shown.append(text, at, character.size);
+        else
+            shown += asJsonEscape(static_cast<std::uint32_t>(character.code));
         at += character.size;
     }
     return shown;

@@ -11,9 +11,12 @@ namespace cli {
 /// Takes characters as UTF-8, whatever the user's locale says; messages stay as they are.
 void useUtf8();
 
-/// The text with every control character and every byte that is no UTF-8 escaped: one line that
-/// cannot steer a terminal.
+/// The text with every control character, every mark that turns the order of letters or is not
+/// seen, and every byte that is no UTF-8 escaped: one line that cannot steer a terminal.
 std::string printable(const std::string& text);
+
+/// The same for a text that is JSON, by escapes of JSON.
+std::string escapedInJson(const std::string& text);
 
 std::string quoted(const std::string& text);
 

@@ -11,6 +11,7 @@
 #include "Commands.h"
 #include "Session.h"
 #include "Terminal.h"
+#include "Text.h"
 
 namespace cli {
 namespace {
@@ -116,7 +117,7 @@ public:
 private:
     static std::string lineOf(const Json& json)
     {
-        return json.dump(-1, ' ', false, Json::error_handler_t::replace) + "\n";
+        return escapedInJson(json.dump(-1, ' ', false, Json::error_handler_t::replace)) + "\n";
     }
 
     // The platform calls from C: no exception may pass.

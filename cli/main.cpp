@@ -2,13 +2,16 @@
 // The command `coresystem`.
 #include <algorithm>
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <exception>
 
 #include <CLI/CLI.hpp>
+#include <unistd.h>
 
 #include "Commands.h"
 #include "Completion.h"
+#include "Facts.h"
 #include "Help.h"
 #include "Session.h"
 #include "Terminal.h"
@@ -195,7 +198,11 @@ int main(int argc, char** argv)
     try {
         cli::useUtf8();
         cli::prepareStandardStreams();
-        return cli::run(argc, argv);
+        const cli::ExitCode code = cli::run(argc, argv);
+        if (!cli::isStillAsking())
+            return code;
+        std::fflush(nullptr);
+        _exit(code);
     } catch (const cli::OutputFailed& failure) {
         return cli::reportOutputFailure(failure.error);
     } catch (const std::exception& error) {

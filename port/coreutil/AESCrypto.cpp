@@ -6,10 +6,14 @@
 #include <mutex>
 
 #include <dlfcn.h>
+#include <dlog.h>
+#include <sys/stat.h>
 
 #include "../common/OwnFile.h"
 #include "../common/RegularFile.h"
 #include "cipher/CipherModule.h"
+
+#pragma weak __dlog_print
 
 using coreutil::CipherModule;
 using coreutil::Key;
@@ -73,6 +77,22 @@ bool loadKey(const std::string& path, Key& key, std::string& problem)
     return problem.empty();
 }
 
+std::string warningOf(const std::string& path)
+{
+    struct stat status = {};
+    if (stat(path.c_str(), &status) != 0 || (status.st_mode & (S_IROTH | S_IWOTH)) == 0)
+        return "";
+    return "key file " + path + " may be " +
+           ((status.st_mode & S_IROTH) != 0 ? "read" : "written") + " by every user";
+}
+
+// The platform's log, where the process has one.
+void writeWarning(const std::string& warning)
+{
+    if (!warning.empty() && __dlog_print != nullptr)
+        __dlog_print(LOG_ID_MAIN, DLOG_WARN, "coreutil", "%s", warning.c_str());
+}
+
 // Guarded by one mutex: debug mode is not where speed matters.
 struct KeyState {
     std::mutex mutex;
@@ -80,6 +100,7 @@ struct KeyState {
     bool configured = false;
     Key key{};
     std::string problem;
+    std::string warning;
 };
 
 KeyState& keyState()
@@ -93,7 +114,8 @@ void chooseKey(KeyState& state)
     if (const char* const path = secure_getenv("CORESYSTEM_LOG_KEY");
         path != nullptr && *path != '\0') {
         state.configured = true;
-        loadKey(path, state.key, state.problem);
+        if (loadKey(path, state.key, state.problem))
+            state.warning = warningOf(path);
         return;
     }
     const LoadedModule& module = cipherModule();
@@ -103,28 +125,34 @@ void chooseKey(KeyState& state)
         state.problem = "no random key can be made";
 }
 
-void useKey(KeyState& state, const Key& key)
+void useKey(KeyState& state, const Key& key, const std::string& warning)
 {
     const std::lock_guard<std::mutex> lock(state.mutex);
     state.key = key;
     state.ready = true;
     state.configured = true;
     state.problem.clear();
+    state.warning = warning;
 }
 
 // A copy of the key to work with, or the reason why there is none.
 bool currentKey(Key& key, std::string& problem)
 {
     KeyState& state = keyState();
-    const std::lock_guard<std::mutex> lock(state.mutex);
-    if (!state.ready) {
-        chooseKey(state);
-        state.ready = true;
+    std::string warning;
+    {
+        const std::lock_guard<std::mutex> lock(state.mutex);
+        if (!state.ready) {
+            chooseKey(state);
+            warning = state.warning;
+            state.ready = true;
+        }
+        problem = state.problem;
+        if (problem.empty())
+            problem = cipherModule().problem;
+        key = state.key;
     }
-    problem = state.problem;
-    if (problem.empty())
-        problem = cipherModule().problem;
-    key = state.key;
+    writeWarning(warning); // the log may come back for a key
     return problem.empty();
 }
 
@@ -161,7 +189,7 @@ void AESCrypto::SetKey(const unsigned char* bytes)
 {
     Key key;
     std::memcpy(key.data(), bytes, key.size());
-    useKey(keyState(), key);
+    useKey(keyState(), key, "");
 }
 
 bool AESCrypto::LoadKeyFile(const char* path, std::string& problem)
@@ -172,7 +200,9 @@ bool AESCrypto::LoadKeyFile(const char* path, std::string& problem)
         problem = reason;
         return false;
     }
-    useKey(keyState(), key);
+    const std::string warning = warningOf(path);
+    useKey(keyState(), key, warning);
+    writeWarning(warning);
     return true;
 }
 
@@ -182,6 +212,16 @@ std::string AESCrypto::GetProblem()
     std::string problem;
     currentKey(key, problem);
     return problem;
+}
+
+std::string AESCrypto::GetWarning()
+{
+    Key key;
+    std::string problem;
+    currentKey(key, problem);
+    KeyState& state = keyState();
+    const std::lock_guard<std::mutex> lock(state.mutex);
+    return state.warning;
 }
 
 bool AESCrypto::HasConfiguredKey()

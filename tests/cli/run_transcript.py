@@ -9,8 +9,8 @@ standard output, those of standard error behind "! ", and the exit code in brack
 "%" before a line of output is a regular expression for the whole line; "\\ no newline" says that the
 output did not end in one; the number of a line in a device file may be a "#". Other lines, up to the first command, are comments.
 
-The commands run in an empty directory with links to the device files (devices/) and the completion
-(completion/), and in an environment that hides this machine's own services.
+The commands run in an empty directory with links to the device files (devices/), the completion
+(completion/) and the tests' tools (support/), and in an environment that hides this machine's own services.
 """
 import argparse
 import os
@@ -63,7 +63,7 @@ def lines_of(output, mark=""):
 
 def run(shell_command, directory, variables):
     done = subprocess.run(["bash", "-c", shell_command], cwd=directory, env=variables,
-                          stdin=subprocess.DEVNULL, capture_output=True, timeout=50)
+                          stdin=subprocess.DEVNULL, capture_output=True, timeout=50, umask=0o077)
     code = [f"[{done.returncode}]"] if done.returncode != 0 else []
     return lines_of(done.stdout) + lines_of(done.stderr, "! ") + code
 
@@ -97,6 +97,7 @@ def main():
     good, updated = True, list(comment)
     with tempfile.TemporaryDirectory() as directory:
         Path(directory, "devices").symlink_to(TREE / "tests/devices")
+        Path(directory, "support").symlink_to(TREE / "tests/support")
         Path(directory, "completion").symlink_to(TREE / "cli/completion")
         variables = environment(options.command.resolve(), directory)
         for shell_command, expected in steps:

@@ -1,0 +1,91 @@
+#!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
+"""A bus that misbehaves, for the tests of all who must live with one.
+
+    hostile_bus.py SOCKET SCRIPT
+
+It listens at SOCKET, prints "ready" and meets every client by the script:
+
+    mute      accepts and never speaks
+    silent    authenticates, and answers nothing behind that, not even Hello
+    endless   answers the authentication with a line that does not end
+    garbage   authenticates, then sends bytes that are no message
+    vanish    authenticates, then closes at the first message
+
+It ends with its standard input.
+"""
+import os
+import socket
+import sys
+import threading
+
+
+def authenticate(client):
+    """As far as a client needs it that asks for EXTERNAL; False when it left."""
+    line = b""
+    while True:
+        byte = client.recv(1)
+        if not byte:
+            return False
+        line += byte
+        if not line.endswith(b"\r\n"):
+            continue
+        word = line.lstrip(b"\0").split()[0]
+        line = b""
+        if word == b"BEGIN":
+            return True
+        client.sendall({b"AUTH": b"OK 0123456789abcdef0123456789abcdef\r\n",
+                        b"NEGOTIATE_UNIX_FD": b"AGREE_UNIX_FD\r\n"}.get(word, b"ERROR\r\n"))
+
+
+def hold(client):
+    while client.recv(65536):
+        pass
+
+
+def endless(client):
+    while True:
+        client.sendall(b"DATA" + b"0" * 65536)
+
+
+def garbage(client):
+    if authenticate(client):
+        client.recv(1)
+        client.sendall(os.urandom(1 << 20))
+        hold(client)
+
+
+SCRIPTS = {
+    "mute": hold,
+    "silent": lambda client: authenticate(client) and hold(client),
+    "endless": endless,
+    "garbage": garbage,
+    "vanish": lambda client: authenticate(client) and client.recv(1),
+}
+
+
+def meet(client, script):
+    with client:
+        try:
+            script(client)
+        except OSError:
+            pass  # it has enough of us
+
+
+def main():
+    path, script = sys.argv[1], SCRIPTS[sys.argv[2]]
+    listener = socket.socket(socket.AF_UNIX)
+    listener.bind(path)
+    listener.listen(64)
+
+    def serve():
+        while True:
+            threading.Thread(target=meet, args=(listener.accept()[0], script), daemon=True).start()
+
+    threading.Thread(target=serve, daemon=True).start()
+    print("ready", flush=True)
+    sys.stdin.read()
+
+
+if __name__ == "__main__":
+    main()
