@@ -50,7 +50,7 @@ const Values VALUES[] = {
     {"FACT", factNames},
     {"DEVICE", deviceNames},
     {"PATH", devicePaths},
-    {"PATH=VALUE", deviceAssignments},
+    {"ASSIGNMENT", deviceAssignments},
 };
 
 // Where the last word stands.

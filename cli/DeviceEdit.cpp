@@ -77,12 +77,12 @@ void addGet(const Command& device, Invocation& invocation)
 
 // A command that changes values, each of which an argument tells.
 void addChange(const Command& device, Invocation& invocation, const char* name,
-               const char* argument, Change (*changeOf)(const std::string&),
+               const char* argument, const char* meaning, Change (*changeOf)(const std::string&),
                const char* description, const char* remarks)
 {
     const Command command = device.add(name, description);
     const auto arguments = std::make_shared<std::vector<std::string>>();
-    command.option(argument, *arguments, "What to change").required();
+    command.option(argument, *arguments, meaning).required();
     command.setFooter(std::string(remarks) + PATHS +
                       "\nAll changes are made at once, or none. Exit code 1: none was.");
     command.onUse([&invocation, arguments, changeOf] {
@@ -99,9 +99,10 @@ void addChange(const Command& device, Invocation& invocation, const char* name,
 void cli::addDeviceEditCommands(const Command& device, Invocation& invocation)
 {
     addGet(device, invocation);
-    addChange(device, invocation, "set", "PATH=VALUE", assignmentOf, "Set values",
+    addChange(device, invocation, "set", "ASSIGNMENT", "What to change, each PATH=VALUE",
+              assignmentOf, "Set values",
               "Example: coresystem device set settings.flight_mode=true network.wifi=deactivated "
               "--device phone.toml\n");
-    addChange(device, invocation, "unset", "PATH", removalOf, "Remove values",
+    addChange(device, invocation, "unset", "PATH", "What to remove", removalOf, "Remove values",
               "Example: coresystem device unset slot[0].number --device phone.toml\n");
 }

@@ -5,6 +5,9 @@ set(CORESYSTEM_SANITIZE "" CACHE STRING "Sanitizers to build with, as -fsanitize
 set(CORESYSTEM_STRINGS "new" CACHE STRING "Layout of std::string in the interface: new or old")
 set_property(CACHE CORESYSTEM_STRINGS PROPERTY STRINGS new old)
 
+if(NOT CMAKE_BUILD_TYPE)
+  set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "Debug, Release, RelWithDebInfo or MinSizeRel" FORCE)
+endif()
 set(CMAKE_CXX_EXTENSIONS OFF)
 set(CMAKE_CXX_STANDARD_REQUIRED ON)
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)

@@ -78,7 +78,7 @@ const char* const ALPHA2 = "GetCountryNameAlpha2FromCountryCallingCode";
 const Question ASK_NAME = &CoreSystem::GetCountryNameFromCountryCallingCode;
 const Question ASK_ALPHA2 = &CoreSystem::GetCountryNameAlpha2FromCountryCallingCode;
 
-const Converter& converter(const std::string& name)
+const Converter& converter(const char* name)
 {
     for (const Converter& row : converters())
         if (row.name == name)
