@@ -4,7 +4,10 @@
 #ifndef BENCH_CONVERSIONS_H
 #define BENCH_CONVERSIONS_H
 
+#include <cstring>
+#include <string_view>
 #include <type_traits>
+#include <unordered_map>
 
 #include <CoreSystem.h>
 
@@ -17,11 +20,30 @@ namespace bench {
 
 typedef void (CoreSystem::*Question)(const char* key, char** answer);
 
+using HashMap = std::unordered_map<std::string_view, const char*>;
+
+/// The first row of a key answers, as in the library.
+template <class Keys, class Values>
+HashMap hashMapOf(const Keys& keys, const Values& values)
+{
+    HashMap map;
+    for (std::size_t row = 0; row < Keys::rows; ++row)
+        map.emplace(keys.cells[row], values.cells[row]);
+    return map;
+}
+
+/// The answer as the library hands it out; null when there is none.
+inline char* copyOfAnswer(const HashMap& map, const char* key)
+{
+    const auto found = map.find(key);
+    return found != map.end() ? strdup(found->second) : nullptr;
+}
+
 /// Calls `visit(name, question, keys, values, keyThatNoRowHas)` for each.
 template <class Visit>
 void forEachConversion(Visit visit)
 {
-    namespace Mcc = coresystem::MccCountryTable;
+    using Mcc = coresystem::MccCountryTable;
     namespace Service = coresystem::ServiceCountryTable;
     namespace Calling = coresystem::CallingCodeTable;
     namespace Alpha3 = coresystem::Alpha3CountryTable;

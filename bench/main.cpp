@@ -40,7 +40,7 @@ int showPages()
 
 int main(int argc, char** argv)
 {
-    // Error lines are formatted but written nowhere: a journal's speed is not ours.
+    // Error lines are written nowhere: a journal's speed is not ours.
     coresystem_port::setLogSink(coresystem_port::LogSink::None);
     bench::addSharedParts();
     bench::addCountryQueries();

@@ -5,9 +5,6 @@
 #include "Cases.h"
 
 #include <cstdlib>
-#include <cstring>
-#include <string_view>
-#include <unordered_map>
 
 #include <phonenumbers/phonenumberutil.h>
 #include <unicode/uloc.h>
@@ -20,17 +17,13 @@ using i18n::phonenumbers::PhoneNumberUtil;
 namespace bench {
 namespace {
 
-// The first row of a key answers, as in the scan.
 template <class Keys, class Values>
 void addHashMap(const std::string& question, const Keys& keys, const Values& values,
                 const char* noMatch)
 {
-    std::unordered_map<std::string_view, const char*> map;
-    for (std::size_t row = 0; row < Keys::rows; ++row)
-        map.emplace(keys.cells[row], values.cells[row]);
+    const HashMap map = hashMapOf(keys, values);
     addRounds("hash map " + question, roundsOf(textsOf(keys), noMatch), [map](const char* key) {
-        const auto found = map.find(key);
-        char* const answer = found != map.end() ? strdup(found->second) : nullptr;
+        char* const answer = copyOfAnswer(map, key);
         benchmark::DoNotOptimize(answer);
         std::free(answer);
     });

@@ -346,7 +346,8 @@ void CoreSystem::GetISO639LangCodeFromDeviceLang(const std::string& upperCode, c
 {
     DEBUG_LINE("success to get capital : %s", upperCode.c_str());
     *iso639 = nullptr;
-    const std::size_t row = findFirst(LanguageCodeTable::UPPER_CASE, upperCode.c_str());
+    const std::size_t row = findFirst(LanguageCodeTable::UPPER_CASE,
+                                      LanguageCodeTable::UPPER_CASE_INDEX, upperCode.c_str());
     if (row < LanguageCodeTable::ROWS) {
         *iso639 = LanguageCodeTable::ISO639_2.cells[row];
         DEBUG_LINE("success to get ISO639Lang : %s", *iso639);
@@ -468,7 +469,7 @@ void CoreSystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryC
     }
     // The last row answers, unlike every other search, and the slot gets the table's own cell:
     // meant.
-    const std::size_t row = findLast(MccCountryTable::MCC, mcc);
+    const std::size_t row = findLast(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, mcc);
     *countryNameAlpha2 = row < MccCountryTable::ROWS
                              ? const_cast<char*>(MccCountryTable::ALPHA2.cells[row])
                              : nullptr;

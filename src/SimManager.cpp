@@ -35,12 +35,12 @@ struct ConversionLines {
 };
 
 // The one search behind all converters: the value of the first row whose key equals.
-template <class Keys, class Values>
-inline void convert(const Keys& keys, const Values& values, const char* key, char** slot,
-                    const ConversionLines& lines)
+template <class Keys, class KeyIndex, class Values>
+inline void convert(const Keys& keys, const KeyIndex& index, const Values& values, const char* key,
+                    char** slot, const ConversionLines& lines)
 {
     DEBUG_LINE_AT(lines.site, lines.entry, key);
-    const std::size_t row = findFirst(keys, key);
+    const std::size_t row = findFirst(keys, index, key);
     if (row < Keys::rows) {
         *slot = strdup(values.cells[row]);
         DEBUG_LINE_AT(lines.site, lines.success, *slot);
@@ -197,7 +197,7 @@ SimManager::~SimManager() {}
 bool SimManager::IsValidMcc(const char* mcc)
 {
     DEBUG_LINE("IsValidMcc [mcc : %s]", mcc);
-    if (findFirst(MccCountryTable::MCC, mcc) < MccCountryTable::ROWS) {
+    if (findFirst(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, mcc) < MccCountryTable::ROWS) {
         DEBUG_LINE("mcc is valid");
         return true;
     }
@@ -208,28 +208,32 @@ bool SimManager::IsValidMcc(const char* mcc)
 void SimManager::GetCountryCodeFromMcc(const char* mcc, char** countryCode)
 {
     // The entry text names another method: meant.
-    convert(MccCountryTable::MCC, MccCountryTable::ALPHA2, mcc, countryCode,
+    convert(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, MccCountryTable::ALPHA2, mcc,
+            countryCode,
             {LOG_SITE, "GetMccToCountryCode [mcc : %s]", "success to get countrycode : %s",
              LOG_PREFIX "fail to get countrycode"});
 }
 
 void SimManager::GetCountryNameFromMcc(const char* mcc, char** countryName)
 {
-    convert(MccCountryTable::MCC, MccCountryTable::NAME, mcc, countryName,
+    convert(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, MccCountryTable::NAME, mcc,
+            countryName,
             {LOG_SITE, "GetCountryNameFromMcc [mcc : %s]", "success to get countryName : %s",
              LOG_PREFIX "fail to get countryName"});
 }
 
 void SimManager::GetMccFromCountryCode(const char* countryCode, char** mcc)
 {
-    convert(MccCountryTable::ALPHA2, MccCountryTable::MCC, countryCode, mcc,
+    convert(MccCountryTable::ALPHA2, MccCountryTable::ALPHA2_INDEX, MccCountryTable::MCC,
+            countryCode, mcc,
             {LOG_SITE, "GetMccFromCountryCode [countryCode : %s]", "success to get mcc : %s",
              LOG_PREFIX "fail to get mcc"});
 }
 
 void SimManager::GetMccFromServiceCountryCode(const char* serviceCountryCode, char** mcc)
 {
-    convert(ServiceCountryTable::LOCALE, ServiceCountryTable::MCC, serviceCountryCode, mcc,
+    convert(ServiceCountryTable::LOCALE, ServiceCountryTable::LOCALE_INDEX,
+            ServiceCountryTable::MCC, serviceCountryCode, mcc,
             {LOG_SITE, "GetMccFromServiceCountryCode [serviceCountryCode : %s]",
              "success to get mcc : %s", LOG_PREFIX "fail to get mcc"});
 }
@@ -237,7 +241,8 @@ void SimManager::GetMccFromServiceCountryCode(const char* serviceCountryCode, ch
 void SimManager::GetServiceCountryCodeFromMcc(const char* mcc, char** serviceCountryCode)
 {
     // The "!! " of the success text is meant.
-    convert(ServiceCountryTable::MCC, ServiceCountryTable::LOCALE, mcc, serviceCountryCode,
+    convert(ServiceCountryTable::MCC, ServiceCountryTable::MCC_INDEX, ServiceCountryTable::LOCALE,
+            mcc, serviceCountryCode,
             {LOG_SITE, "GetServiceCountryCodeFromMcc [mcc : %s]",
              "!! success to get serviceCountryCode : %s",
              LOG_PREFIX "fail to get serviceCountryCode"});
@@ -245,14 +250,16 @@ void SimManager::GetServiceCountryCodeFromMcc(const char* mcc, char** serviceCou
 
 void SimManager::GetMccFromCountryCallingCode(const char* countryCallingCode, char** mcc)
 {
-    convert(CallingCodeTable::CALLING_CODE, CallingCodeTable::MCC, countryCallingCode, mcc,
+    convert(CallingCodeTable::CALLING_CODE, CallingCodeTable::CALLING_CODE_INDEX,
+            CallingCodeTable::MCC, countryCallingCode, mcc,
             {LOG_SITE, "GetMccFromCountryCallingCode [countryCallingCode : %s]",
              "success to get mcc : %s", LOG_PREFIX "fail to get mcc"});
 }
 
 void SimManager::GetCountryCallingCodeFromMcc(const char* mcc, char** countryCallingCode)
 {
-    convert(CallingCodeTable::MCC, CallingCodeTable::CALLING_CODE, mcc, countryCallingCode,
+    convert(CallingCodeTable::MCC, CallingCodeTable::MCC_INDEX, CallingCodeTable::CALLING_CODE, mcc,
+            countryCallingCode,
             {LOG_SITE, "GetCountryCallingCodeFromMcc [mcc : %s]",
              "success to get countryCallingCode : %s",
              LOG_PREFIX "fail to get countryCallingCode"});
@@ -260,7 +267,8 @@ void SimManager::GetCountryCallingCodeFromMcc(const char* mcc, char** countryCal
 
 void SimManager::GetAlpha3CountryCodeFromMcc(const char* mcc, char** alpha3CountryCode)
 {
-    convert(Alpha3CountryTable::MCC, Alpha3CountryTable::ALPHA3, mcc, alpha3CountryCode,
+    convert(Alpha3CountryTable::MCC, Alpha3CountryTable::MCC_INDEX, Alpha3CountryTable::ALPHA3, mcc,
+            alpha3CountryCode,
             {LOG_SITE, "GetAlpha3CountryCodeFromMcc [mcc : %s]",
              "success to get alpha3CountryCode : %s", LOG_PREFIX "fail to get alpha3CountryCode"});
 }

@@ -11,6 +11,9 @@ class Log {
 public:
     virtual ~Log() = default;
 
+    /// Whether lines are written at all. Where not, their texts need not be made.
+    virtual bool isOn() const = 0;
+
     /// Writes one line; false when it went nowhere. `priority` is a log_priority of dlog.h.
     virtual bool write(int priority, const std::string& tag, const std::string& text) = 0;
 };

@@ -94,7 +94,7 @@ CORESYSTEM_PORT_API std::string captureDevice(const CaptureOptions& options);
 enum class LogSink {
     Automatic,     ///< the journal when its socket is there, else standard error
     StandardError, ///< standard error, whatever is there
-    None,          ///< nowhere
+    None,          ///< nowhere: lines are not even formatted
 };
 
 /// Sets where the log lines of this process go from now on; Automatic at start.

@@ -177,6 +177,11 @@ std::atomic<unsigned long> lostLines{0};
 
 class MachineLog : public Log {
 public:
+    bool isOn() const override
+    {
+        return chosenSink != LogSink::None;
+    }
+
     bool write(int priority, const std::string& tag, const std::string& text) override
     {
         const LogSink sink = chosenSink;

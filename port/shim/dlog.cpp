@@ -10,19 +10,24 @@
 
 namespace {
 
-// The formatted text; empty and false when the format is no good.
+// The formatted text; empty and false when the format is no good. Most lines are short and are
+// formatted once.
 bool format(std::string& text, const char* fmt, va_list arguments)
 {
+    char line[512];
     va_list again;
     va_copy(again, arguments);
-    const int length = std::vsnprintf(nullptr, 0, fmt, again);
+    const int result = std::vsnprintf(line, sizeof line, fmt, arguments);
+    const auto length = static_cast<std::size_t>(result);
+    if (result >= 0 && length < sizeof line) {
+        text.assign(line, length);
+    } else if (result >= 0) {
+        text.resize(length + 1); // vsnprintf writes a NUL
+        std::vsnprintf(text.data(), text.size(), fmt, again);
+        text.pop_back();
+    }
     va_end(again);
-    if (length < 0)
-        return false;
-    text.resize(static_cast<std::size_t>(length) + 1); // vsnprintf writes a NUL
-    std::vsnprintf(text.data(), text.size(), fmt, arguments);
-    text.pop_back();
-    return true;
+    return result >= 0;
 }
 
 } // namespace
@@ -33,6 +38,8 @@ int __dlog_print(log_id_t, int prio, const char* tag, const char* fmt, ...)
         return refusal.code();
     if (fmt == nullptr)
         return DLOG_ERROR_INVALID_PARAMETER;
+    if (!port::processLog().isOn())
+        return 0; // the length of what was written
     va_list arguments;
     va_start(arguments, fmt);
     const int result = port::guarded([&]() -> int {

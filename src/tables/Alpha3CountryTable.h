@@ -257,6 +257,8 @@ static_assert(ROWS == 237, "a row was added or lost");
 constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_CELL_1_OF_2)}};
 constexpr Column<ROWS, 4> ALPHA3 = {{CORESYSTEM_ALPHA3_COUNTRY_ROWS(CORESYSTEM_CELL_2_OF_2)}};
 
+constexpr Index<ROWS, 4> MCC_INDEX = indexOfFirstRows(MCC);
+
 } // namespace Alpha3CountryTable
 } // namespace coresystem
 

@@ -256,6 +256,9 @@ static_assert(ROWS == 236, "a row was added or lost");
 constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_CALLING_CODE_ROWS(CORESYSTEM_CELL_1_OF_2)}};
 constexpr Column<ROWS, 4> CALLING_CODE = {{CORESYSTEM_CALLING_CODE_ROWS(CORESYSTEM_CELL_2_OF_2)}};
 
+constexpr Index<ROWS, 4> MCC_INDEX = indexOfFirstRows(MCC);
+constexpr Index<ROWS, 4> CALLING_CODE_INDEX = indexOfFirstRows(CALLING_CODE);
+
 } // namespace CallingCodeTable
 } // namespace coresystem
 

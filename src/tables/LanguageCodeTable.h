@@ -178,6 +178,8 @@ static_assert(ROWS == 159, "a row was added or lost");
 constexpr Column<ROWS, 4> ISO639_2 = {{CORESYSTEM_LANGUAGE_CODE_ROWS(CORESYSTEM_CELL_1_OF_2)}};
 constexpr Column<ROWS, 4> UPPER_CASE = {{CORESYSTEM_LANGUAGE_CODE_ROWS(CORESYSTEM_CELL_2_OF_2)}};
 
+constexpr Index<ROWS, 4> UPPER_CASE_INDEX = indexOfFirstRows(UPPER_CASE);
+
 } // namespace LanguageCodeTable
 } // namespace coresystem
 

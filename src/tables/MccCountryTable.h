@@ -248,16 +248,38 @@
 // clang-format on
 
 namespace coresystem {
-namespace MccCountryTable {
 
-constexpr std::size_t ROWS = 0 CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
-static_assert(ROWS == 236, "a row was added or lost");
+// A template only because the linker keeps one copy of its members, where constants of a namespace
+// would be copied into each source file that searches them.
+template <typename Unused>
+struct __attribute__((visibility("hidden"))) SharedMccCountryTable {
+    static constexpr std::size_t ROWS = 0 CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_COUNT_ROW);
+    static_assert(ROWS == 236, "a row was added or lost");
 
-constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_1_OF_3)}};
-constexpr Column<ROWS, 4> ALPHA2 = {{CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_2_OF_3)}};
-constexpr Column<ROWS, 36> NAME = {{CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_3_OF_3)}};
+    static constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_1_OF_3)}};
+    static constexpr Column<ROWS, 4> ALPHA2 = {
+        {CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_2_OF_3)}};
+    static constexpr Column<ROWS, 36> NAME = {
+        {CORESYSTEM_MCC_COUNTRY_ROWS(CORESYSTEM_CELL_3_OF_3)}};
 
-} // namespace MccCountryTable
+    static constexpr Index<ROWS, 4> MCC_INDEX = indexOfAllRows(MCC);
+    static constexpr Index<ROWS, 4> ALPHA2_INDEX = indexOfFirstRows(ALPHA2);
+};
+template <typename Unused>
+constexpr std::size_t SharedMccCountryTable<Unused>::ROWS;
+template <typename Unused>
+constexpr Column<SharedMccCountryTable<Unused>::ROWS, 4> SharedMccCountryTable<Unused>::MCC;
+template <typename Unused>
+constexpr Column<SharedMccCountryTable<Unused>::ROWS, 4> SharedMccCountryTable<Unused>::ALPHA2;
+template <typename Unused>
+constexpr Column<SharedMccCountryTable<Unused>::ROWS, 36> SharedMccCountryTable<Unused>::NAME;
+template <typename Unused>
+constexpr Index<SharedMccCountryTable<Unused>::ROWS, 4> SharedMccCountryTable<Unused>::MCC_INDEX;
+template <typename Unused>
+constexpr Index<SharedMccCountryTable<Unused>::ROWS, 4> SharedMccCountryTable<Unused>::ALPHA2_INDEX;
+
+typedef SharedMccCountryTable<void> MccCountryTable;
+
 } // namespace coresystem
 
 #endif

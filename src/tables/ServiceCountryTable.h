@@ -154,6 +154,9 @@ static_assert(ROWS == 134, "a row was added or lost");
 constexpr Column<ROWS, 4> MCC = {{CORESYSTEM_SERVICE_COUNTRY_ROWS(CORESYSTEM_CELL_1_OF_2)}};
 constexpr Column<ROWS, 8> LOCALE = {{CORESYSTEM_SERVICE_COUNTRY_ROWS(CORESYSTEM_CELL_2_OF_2)}};
 
+constexpr Index<ROWS, 4> MCC_INDEX = indexOfFirstRows(MCC);
+constexpr Index<ROWS, 8> LOCALE_INDEX = indexOfFirstRows(LOCALE);
+
 } // namespace ServiceCountryTable
 } // namespace coresystem
 
