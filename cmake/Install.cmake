@@ -42,6 +42,7 @@ install(FILES ${deviced_dir}/org.tizen.system.deviced.conf
 install(FILES ${deviced_build_dir}/org.tizen.system.deviced.service
         DESTINATION ${CMAKE_INSTALL_DATADIR}/dbus-1/system-services)
 install(FILES ${deviced_build_dir}/coresystem-deviced.service DESTINATION lib/systemd/system)
+install(FILES ${deviced_dir}/coresystem-deviced.sysusers RENAME coresystem-deviced.conf DESTINATION lib/sysusers.d)
 
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/coresystem)
 install(EXPORT coresystem NAMESPACE coresystem:: FILE coresystemConfig.cmake

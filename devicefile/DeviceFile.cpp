@@ -10,6 +10,7 @@
 
 #include <gio/gio.h>
 
+#include "../port/backend/Telephony.h"
 #include "../port/common/RegularFile.h"
 #include "Closest.h"
 #include "DevicePath.h"
@@ -29,9 +30,14 @@ std::string quoted(std::string_view name)
     return stream.str();
 }
 
-// What to add to a message about a name that is none of the known ones.
+// What to add to a message about a name that is none of the known ones. A text that is much longer
+// than any of them is meant to be none, and costs much to compare.
+constexpr std::size_t LONGEST_NAME = 64;
+
 std::string hint(std::string_view name, const std::vector<std::string>& known)
 {
+    if (name.size() > LONGEST_NAME)
+        return "";
     const std::string meant = similar(std::string(name), known);
     return meant.empty() ? "" : "; did you mean " + quoted(meant) + "?";
 }
@@ -273,9 +279,16 @@ private:
             refuse(schema->source(), "this version reads schema = 1 only");
     }
 
-    static std::string unknownKey(const SectionRow& row, std::string_view key)
+    // Who makes more mistakes than that wants another file, not a hint.
+    bool isHinted() const
     {
-        return "unknown key " + quoted(key) + " in " + titleOf(row) + hint(key, keyNames(row));
+        return problems_.size() < 100;
+    }
+
+    std::string unknownKey(const SectionRow& row, std::string_view key) const
+    {
+        return "unknown key " + quoted(key) + " in " + titleOf(row) +
+               (isHinted() ? hint(key, keyNames(row)) : "");
     }
 
     static std::string titleOf(const SectionRow& row)
@@ -293,8 +306,8 @@ private:
     {
         const SectionRow* const row = findSection(name.str());
         if (row == nullptr)
-            return refuse(name.source(),
-                          "unknown key " + quoted(name) + hint(name, sectionNames()));
+            return refuse(name.source(), "unknown key " + quoted(name) +
+                                             (isHinted() ? hint(name, sectionNames()) : ""));
         if (row->form == Form::List)
             return readList(*row, node);
         if (!node.is_table())
@@ -310,6 +323,9 @@ private:
         if (list == nullptr)
             return refuse(node.source(), titleOf(row) + " must be a list of sections");
         for (const toml::node& element : *list) {
+            if (row.name == "slot" && device_.slots.size() == SLOT_LIMIT)
+                return refuse(element.source(),
+                              "more than " + std::to_string(SLOT_LIMIT) + " slots");
             if (!element.is_table()) {
                 refuse(element.source(), titleOf(row) + " must be a list of sections");
                 continue;
@@ -344,10 +360,20 @@ private:
         device_.steps.push_back(std::move(step));
     }
 
+    // Each path is parsed by itself, which takes its time.
+    bool isTooMuch(const toml::source_region& where)
+    {
+        if (++changes_ == STEP_LIMIT + 1)
+            refuse(where, "more than " + std::to_string(STEP_LIMIT) + " changes in all steps");
+        return changes_ > STEP_LIMIT;
+    }
+
     // A key is a path, or a part of one that the table below it goes on with.
     void readChanges(const DevicePath& begun, const toml::table& table, Step& step)
     {
         for (const auto& [key, node] : table) {
+            if (isTooMuch(key.source()))
+                return;
             DevicePath path = begun;
             if (begun.empty())
                 path = pathIn(key.str());
@@ -375,6 +401,8 @@ private:
     void readRemovals(const toml::array& list, Step& step)
     {
         for (const toml::node& node : list) {
+            if (isTooMuch(node.source()))
+                return;
             const DevicePath path = pathIn(node.value_or(std::string()));
             const SectionRow* const section = sectionOfStep(path, node.source());
             if (section == nullptr)
@@ -393,9 +421,10 @@ private:
     {
         const SectionRow* const section = path.empty() ? nullptr : findSection(path.front());
         if (section == nullptr)
-            refuse(where, path.empty() ? noPath("")
-                                       : "unknown section " + quoted(path.front()) +
-                                             hint(path.front(), sectionNames()));
+            refuse(where, path.empty()
+                              ? noPath("")
+                              : "unknown section " + quoted(path.front()) +
+                                    (isHinted() ? hint(path.front(), sectionNames()) : ""));
         else if (section->name == "step")
             refuse(where, "a step cannot change a step");
         else
@@ -453,8 +482,9 @@ private:
         std::optional<Content> content = readNode(type, node);
         const auto* const text = content ? std::get_if<std::string>(&*content) : nullptr;
         if (!content)
-            refuse(node.source(), quoted(key) + " must be " + expected(type) +
-                                      hint(node.value_or(std::string()), namesOf(type)));
+            refuse(node.source(),
+                   quoted(key) + " must be " + expected(type) +
+                       (isHinted() ? hint(node.value_or(std::string()), namesOf(type)) : ""));
         else if (text != nullptr && text->find('\0') != std::string::npos)
             refuse(node.source(), quoted(key) + " must not hold a NUL");
         else
@@ -495,6 +525,7 @@ private:
     Device device_;
     std::vector<Problem> problems_;
     std::set<std::string> modems_;
+    std::size_t changes_ = 0; // of all steps
 };
 
 // Keys with many dots nest tables, which the parser's objects release by recursion: a bound on the
@@ -561,13 +592,15 @@ Result<std::shared_ptr<const Device>> DeviceFile::read()
     if (!text)
         return notAvailable(text.error().reason + elsewhere_);
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (parsed_ == nullptr || parsedText_ != text.value()) {
-        const Result<Device> fresh = parseDevice(text.value(), path_);
-        if (!fresh)
-            return fresh.error();
-        parsed_ = std::make_shared<const Device>(fresh.value());
+    if (!hasParsed_ || parsedText_ != text.value()) {
+        Result<Device> fresh = parseDevice(text.value(), path_);
+        parsed_ = fresh ? std::make_shared<const Device>(std::move(fresh.value())) : nullptr;
+        problem_ = fresh ? std::string() : fresh.error().reason;
         parsedText_ = text.value();
+        hasParsed_ = true;
     }
+    if (parsed_ == nullptr)
+        return notAvailable(problem_);
     return parsed_;
 }
 

@@ -16,6 +16,7 @@ namespace port::devicefile {
 
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024; // of a file, in bytes
 constexpr std::size_t LINE_LIMIT = 1024;        // of one line
+constexpr std::size_t STEP_LIMIT = 10000;       // changes of all steps together
 
 /// A mistake in a device file; lines and columns (of characters) are counted from 1.
 struct Problem {
@@ -89,7 +90,9 @@ private:
     const std::string elsewhere_;
     std::mutex mutex_;
     std::string parsedText_;
-    std::shared_ptr<const Device> parsed_;
+    std::shared_ptr<const Device> parsed_; // null when the text is no device,
+    std::string problem_;                  // for this reason
+    bool hasParsed_ = false;
     std::string reported_; // the problem that was told last; empty when there is none
 };
 

@@ -57,6 +57,9 @@ struct Subscriptions {
     Voice voice = Voice::Unknown;
 };
 
+/// The most slots that a device may have. Who was told of a slot may look it up in any later list.
+constexpr std::size_t SLOT_LIMIT = 64;
+
 class Telephony {
 public:
     virtual ~Telephony() = default;

@@ -46,8 +46,61 @@ void tellNumber(GDBusMethodInvocation* call)
 
 } // namespace
 
+void CallLimit::apply(GDBusConnection* connection)
+{
+    g_dbus_connection_add_filter(connection, &CallLimit::onMessage, this, nullptr);
+}
+
+// What goes out is the answer to a call that came in, whoever of this process gives it.
+GDBusMessage* CallLimit::onMessage(GDBusConnection* connection, GDBusMessage* message,
+                                   gboolean isIncoming, gpointer self)
+{
+    auto& limit = *static_cast<CallLimit*>(self);
+    const bool isCall = g_dbus_message_get_message_type(message) == G_DBUS_MESSAGE_TYPE_METHOD_CALL;
+    const char* const other = isIncoming != FALSE ? g_dbus_message_get_sender(message)
+                                                  : g_dbus_message_get_destination(message);
+    if (other == nullptr || isCall != (isIncoming != FALSE))
+        return message;
+    if (!isCall) {
+        limit.giveBack(other);
+        return message;
+    }
+    const Owned<GDBusMessage> call(message);
+    const bool wantsAnswer =
+        (g_dbus_message_get_flags(message) & G_DBUS_MESSAGE_FLAGS_NO_REPLY_EXPECTED) == 0;
+    if (!wantsAnswer) // nobody hears it
+        return nullptr;
+    if (limit.take(other))
+        return g_object_ref(message);
+    const Owned<GDBusMessage> refusal(g_dbus_message_new_method_error_literal(
+        message, "org.freedesktop.DBus.Error.LimitsExceeded", "too many calls under way"));
+    g_dbus_connection_send_message(connection, refusal.get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE,
+                                   nullptr, nullptr);
+    return nullptr;
+}
+
+// Counts a refused call too: its refusal gives it back.
+bool CallLimit::take(const std::string& caller)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    ++all_;
+    return ++underWay_[caller] <= CALLS_OF_ONE && all_ <= CALLS_OF_ALL;
+}
+
+void CallLimit::giveBack(const std::string& caller)
+{
+    const std::lock_guard<std::mutex> lock(mutex_);
+    const auto found = underWay_.find(caller);
+    if (found == underWay_.end()) // no call, as the answer that the bus gives to itself
+        return;
+    --all_;
+    if (--found->second == 0)
+        underWay_.erase(found);
+}
+
 bool Board::show(GDBusConnection* connection)
 {
+    limit_.apply(connection);
     static const GDBusInterfaceVTable table = {&Board::onCall, nullptr, nullptr, {}};
     GDBusNodeInfo* const node = g_dbus_node_info_new_for_xml(DESCRIPTION, nullptr);
     const guint id = g_dbus_connection_register_object(connection, PATH, node->interfaces[0],

@@ -3,6 +3,10 @@
 #ifndef PORT_DEVICED_BOARD_H
 #define PORT_DEVICED_BOARD_H
 
+#include <map>
+#include <mutex>
+#include <string>
+
 #include "../backend/DeviceInfo.h"
 #include "../backend/Faults.h"
 #include "../common/GLibTypes.h"
@@ -10,6 +14,27 @@
 namespace port::deviced {
 
 constexpr char BUS_NAME[] = "org.tizen.system.deviced";
+
+/// Keeps each caller from having more than so many calls under way: the rest is refused on the bus
+/// library's own thread, before it takes a place in a queue.
+class CallLimit {
+public:
+    static constexpr unsigned CALLS_OF_ONE = 64;
+    static constexpr unsigned CALLS_OF_ALL = 4096;
+
+    /// From now on for all calls that come by the connection, which must not outlive this.
+    void apply(GDBusConnection* connection);
+
+private:
+    static GDBusMessage* onMessage(GDBusConnection* connection, GDBusMessage* message,
+                                   gboolean isIncoming, gpointer self);
+    bool take(const std::string& caller);
+    void giveBack(const std::string& caller);
+
+    std::mutex mutex_;
+    std::map<std::string, unsigned> underWay_;
+    unsigned all_ = 0;
+};
 
 class Board {
 public:
@@ -29,6 +54,7 @@ private:
 
     DeviceInfo& deviceInfo_;
     Faults& faults_;
+    CallLimit limit_;
 };
 
 } // namespace port::deviced

@@ -40,6 +40,16 @@ inline telephony_sim_state_e simState(CardStatus status)
     return TELEPHONY_SIM_STATE_UNKNOWN;
 }
 
+/// The slots of the backend, unless they are more than the limit.
+inline Result<Sourced<std::vector<SlotName>>> slotsOfBackend()
+{
+    auto slots = backend().telephony().slots();
+    if (slots && slots.value().value.size() > SLOT_LIMIT)
+        return notAvailable(slots.value().source + " has more than " + std::to_string(SLOT_LIMIT) +
+                            " slots");
+    return slots;
+}
+
 /// Asks the slot that a handle stands for; `take` puts the value into *out and gives the result.
 template <typename Handle, typename T, typename Out, typename Take>
 int askSlot(const Codes& codes, Handle handle, coresystem_port::Question question,

@@ -27,7 +27,7 @@ constexpr Codes CODES{TAPI_API_OPERATION_FAILED,  TAPI_API_NOT_SUPPORTED,
 
 port::Result<port::Sourced<std::vector<port::SlotName>>> askSlots()
 {
-    auto slots = port::backend().telephony().slots();
+    auto slots = port::slotsOfBackend();
     port::recordOrigin(Question::SimSlots, slots);
     return slots;
 }
@@ -40,7 +40,7 @@ public:
     {
         for (port::SlotName& name : names_)
             pointers_.push_back(name.data());
-        pointers_.resize(names_.size() + ENDS, nullptr);
+        pointers_.resize(port::SLOT_LIMIT + 1, nullptr);
     }
 
     char** pointers()
@@ -49,11 +49,9 @@ public:
     }
 
 private:
-    // One end would do, but applications look at the place of a slot that they counted before, and
-    // its modem may be gone.
-    static constexpr std::size_t ENDS = 16;
-
     std::vector<port::SlotName> names_;
+    // As long as any list, and ended: applications look at the place of a slot that they counted
+    // before, whose modem may be gone.
     std::vector<char*> pointers_;
 };
 

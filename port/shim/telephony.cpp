@@ -131,7 +131,7 @@ int telephony_init(telephony_handle_list_s* list)
     return port::guarded(
         [&]() -> int {
             return port::pass(
-                Question::SimSlots, port::backend().telephony().slots(), CODES,
+                Question::SimSlots, port::slotsOfBackend(), CODES,
                 [&](const std::vector<port::SlotName>& slots) { return fill(*list, slots); });
         },
         CODES.failed, CODES.noMemory);

@@ -2,6 +2,7 @@
 // The service that stands in for the device daemon, started by a private system bus.
 #include <csignal>
 #include <cstdlib>
+#include <fstream>
 
 #include <gmock/gmock.h>
 #include <sys/wait.h>
@@ -102,6 +103,19 @@ protected:
     PrivateBus bus;
 };
 
+// Asks so many times and reads no answer.
+void send(const Client& client, int count, GDBusMessageFlags flags)
+{
+    for (int i = 0; i < count; ++i) {
+        const Owned<GDBusMessage> call(
+            g_dbus_message_new_method_call(NAME, PATH, INTERFACE, "GetSerial"));
+        g_dbus_message_set_flags(call.get(), flags);
+        ASSERT_TRUE(g_dbus_connection_send_message(
+            client.connection(), call.get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr, nullptr));
+    }
+    g_dbus_connection_flush_sync(client.connection(), nullptr, nullptr);
+}
+
 TEST_F(DevicedTest, SerialOfTheBackendIsAnswered)
 {
     bus.start();
@@ -142,9 +156,7 @@ TEST_F(DevicedTest, LateAnswerKeepsNobodyElseWaiting)
     useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { delay_ms = 60000, call = 2 }");
     EXPECT_EQ("('SN-4711',)", serial());
     const Client late(bus.address());
-    g_dbus_connection_call(late.connection(), NAME, PATH, INTERFACE, "GetSerial", nullptr, nullptr,
-                           G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr, nullptr);
-    g_dbus_connection_flush_sync(late.connection(), nullptr, nullptr);
+    send(late, 1, G_DBUS_MESSAGE_FLAGS_NONE);
     EXPECT_EQ("('SN-4711',)", late.serial());
 }
 
@@ -220,6 +232,41 @@ TEST_F(DevicedTest, EveryUserMayAskAndOnlyRootMayOwnTheName)
     EXPECT_THAT(outputOf(asNobody + "-d org.freedesktop.DBus -o /org/freedesktop/DBus " +
                          "-m org.freedesktop.DBus.RequestName " + NAME + " 0 || true"),
                 HasSubstr("is not allowed to own the service"));
+}
+
+// In kB, the most that a process ever had.
+long peakMemoryOf(pid_t process)
+{
+    std::ifstream status("/proc/" + std::to_string(process) + "/status");
+    for (std::string line; std::getline(status, line);)
+        if (line.rfind("VmHWM:", 0) == 0)
+            return std::strtol(line.c_str() + 6, nullptr, 10);
+    return 0;
+}
+
+TEST_F(DevicedTest, CallerWhoFloodsItHarmsNobodyAndItsNextCallIsAnswered)
+{
+    bus.start();
+    const Client other(bus.address());
+    ASSERT_EQ("('SN-4711',)", other.serial());
+    const pid_t service = processOfService();
+    const long before = peakMemoryOf(service);
+    const Client flooding(bus.address());
+    send(flooding, 40000, G_DBUS_MESSAGE_FLAGS_NO_REPLY_EXPECTED);
+    EXPECT_EQ("('SN-4711',)", other.serial());
+    EXPECT_EQ("('SN-4711',)", flooding.serial());
+    EXPECT_LT(peakMemoryOf(service) - before, 16 * 1024);
+}
+
+TEST_F(DevicedTest, CallerHasALimitedNumberOfCallsUnderWay)
+{
+    bus.start();
+    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { delay_ms = 60000 }");
+    const Client many(bus.address());
+    send(many, 64, G_DBUS_MESSAGE_FLAGS_NONE);
+    EXPECT_THAT(many.serial(), HasSubstr("LimitsExceeded: too many calls under way"));
+    useSerial("serial = \"SN-4711\"");
+    EXPECT_EQ("('SN-4711',)", serial()); // another caller
 }
 
 // Runs the service by hand.

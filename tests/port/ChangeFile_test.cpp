@@ -5,19 +5,23 @@
 #include <fstream>
 #include <sstream>
 
+#include <fcntl.h>
 #include <gmock/gmock.h>
+#include <sys/file.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include "devicefile/ChangeFile.h"
+#include "port/common/Descriptor.h"
 #include "support/Child.h"
 #include "support/TemporaryTree.h"
 
 using testing::AllOf;
 using testing::ElementsAre;
 using testing::HasSubstr;
+using testing::UnorderedElementsAre;
 
 namespace {
 
@@ -148,6 +152,54 @@ TEST_F(ChangeFileTest, FullDiskLeavesTheOldFileWhole)
                 HasSubstr("File too large"));
     EXPECT_EQ("first\n", content());
     EXPECT_THAT(names(), ElementsAre("file"));
+}
+
+TEST_F(ChangeFileTest, WhatKilledWritersLeftIsCollected)
+{
+    const std::string kept = tree.write("/.file.abcdef", "another program's");
+    for (int writer = 0; writer < 3; ++writer) {
+        const pid_t child = fork();
+        if (child == 0) {
+            const rlimit tiny = {5000, 5000}; // the signal ends the process while it writes
+            setrlimit(RLIMIT_FSIZE, &tiny);
+            addLine(std::string(100000, 'x'));
+            _exit(0);
+        }
+        int status = 0;
+        EXPECT_EQ(child, waitpid(child, &status, 0));
+        EXPECT_TRUE(WIFSIGNALED(status));
+    }
+    EXPECT_GE(names().size(), 4U); // the lock, what one writer left, and both files
+    EXPECT_EQ("", addLine("second"));
+    EXPECT_EQ("first\nsecond\n", content());
+    EXPECT_THAT(names(), UnorderedElementsAre("file", ".file.abcdef"));
+}
+
+TEST_F(ChangeFileTest, WhoMayOnlyReadCannotKeepWritersOut)
+{
+    const port::Descriptor reader(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    ASSERT_EQ(0, flock(reader.number(), LOCK_EX));
+    EXPECT_EQ("", addLine("second"));
+    EXPECT_THAT(inChild([this] {
+                    return port::devicefile::changeFile(path, LIMIT, [this](std::string&) {
+                        struct stat lock = {};
+                        return stat(tree.path("/.file.coresystem-lock").c_str(), &lock) == 0 &&
+                                       (lock.st_mode & 07777) == 0600
+                                   ? std::string("for its writers only")
+                                   : std::string("for others too");
+                    });
+                }),
+                HasSubstr("for its writers only"));
+}
+
+TEST_F(ChangeFileTest, WriterThatStandsStillIsNotWaitedForForEver)
+{
+    const std::string lock = tree.write("/.file.coresystem-lock", "");
+    const port::Descriptor other(open(lock.c_str(), O_RDWR | O_CLOEXEC));
+    ASSERT_EQ(0, flock(other.number(), LOCK_EX));
+    EXPECT_EQ(path + " cannot be changed: somebody else has been changing it for 5 seconds",
+              addLine("second"));
+    EXPECT_EQ("first\n", content());
 }
 
 TEST_F(ChangeFileTest, ManyWritersLoseNothing)

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a device file may say, and how it is told what it may not.
+#include <chrono>
+#include <functional>
+
 #include "devicefile/DeviceFile.h"
 #include "support/DeviceFileTest.h"
 
@@ -200,6 +203,62 @@ TEST_F(SimulatorSchemaTest, SlotsAreAList)
     EXPECT_EQ(":3:1: unknown key \"colour\" in [[slot]]", problemOf("[[slot]]\ncolour = 1\n"));
     EXPECT_EQ("", problemOf("slot = [{}, {}]\n"));
     EXPECT_EQ("", problemOf("slot = []\n"));
+}
+
+std::string repeated(std::size_t count, const std::function<std::string(std::size_t)>& text)
+{
+    std::string all;
+    for (std::size_t i = 0; i < count && all.size() < port::devicefile::SIZE_LIMIT - 2048; ++i)
+        all += text(i);
+    return all;
+}
+
+TEST_F(SimulatorSchemaTest, NumberOfSlotsAndOfChangesHasALimit)
+{
+    const auto slots = [](std::size_t) { return "[[slot]]\n"; };
+    EXPECT_EQ("", problemOf(repeated(64, slots)));
+    EXPECT_EQ(":66:1: more than 64 slots", problemOf(repeated(65, slots)));
+    const auto change = [](std::size_t i) {
+        return "\"packages.p" + std::to_string(i) + "\" = '1'\n";
+    };
+    EXPECT_EQ("", problemOf("[[step]]\n[step.set]\n" + repeated(10000, change)));
+    EXPECT_THAT(problemOf("[[step]]\n[step.set]\n" + repeated(10001, change)),
+                EndsWith(":1: more than 10000 changes in all steps"));
+}
+
+// Files of the size limit, made to be slow.
+TEST_F(SimulatorSchemaTest, NoFileTakesLong)
+{
+    const std::string longName(990, 'x');
+    const auto number = [](std::size_t i) { return std::to_string(i); };
+    const std::string texts[] = {
+        repeated(~0U, [](std::size_t) { return "[[slot]]\n"; }),
+        repeated(~0U, [](std::size_t) { return "[[step]]\n"; }),
+        "[fault]\n" + repeated(~0U, [&](std::size_t i) { return "get_imei" + number(i) + "=1\n"; }),
+        "[fault]\n" + repeated(~0U, [&](std::size_t i) { return longName + number(i) + "=1\n"; }),
+        "[settings]\n" +
+            repeated(~0U, [&](std::size_t i) { return "s" + number(i) + "='" + longName + "'\n"; }),
+        "[packages]\n" + repeated(~0U, [&](std::size_t i) { return "p" + number(i) + "='1'\n"; }),
+        "[[step]]\n[step.set]\n" +
+            repeated(~0U, [&](std::size_t i) { return "x.y" + number(i) + "=1\n"; }),
+        repeated(~0U,
+                 [&](std::size_t i) {
+                     return "a" + number(i) + repeated(400, [](std::size_t) { return ".a"; }) +
+                            "=1\n";
+                 }),
+    };
+    for (const std::string& text : texts) {
+        describe(text);
+        const auto start = std::chrono::steady_clock::now();
+        const std::string first = backend->deviceFileProblem();
+        const auto took = std::chrono::steady_clock::now() - start;
+        EXPECT_LT(took, std::chrono::seconds(2)) << text.substr(0, 60);
+        const auto again = std::chrono::steady_clock::now();
+        for (int question = 0; question < 10; ++question)
+            EXPECT_EQ(first, backend->deviceFileProblem());
+        EXPECT_LT(std::chrono::steady_clock::now() - again, took + std::chrono::milliseconds(200))
+            << "what was found broken is not read again: " << text.substr(0, 60);
+    }
 }
 
 TEST_F(SimulatorSchemaTest, PackagesHaveNamesOfTheirOwn)

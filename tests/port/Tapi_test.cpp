@@ -21,7 +21,9 @@ using port::CardStatus;
 using port::Subscriptions;
 using testing::Each;
 using testing::ElementsAre;
+using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::SizeIs;
 
 namespace {
 
@@ -83,8 +85,23 @@ TEST_F(TapiTest, PlaceOfASlotThatWentAwayHoldsNoName)
 {
     telephony.slotsAnswer = answered(FakeTelephony::Names{});
     char** const names = tel_get_cp_name_list();
-    for (int slot = 0; slot < 16; ++slot)
-        EXPECT_EQ(nullptr, names[slot]);
+    for (std::size_t slot = 0; slot <= port::SLOT_LIMIT; ++slot)
+        EXPECT_EQ(nullptr, names[slot]) << slot;
+}
+
+TEST_F(TapiTest, NoListIsLongerThanTheLimit)
+{
+    FakeTelephony::Names names;
+    while (names.size() < port::SLOT_LIMIT)
+        names.push_back("modem" + std::to_string(names.size()));
+    telephony.slotsAnswer = answered(names);
+    EXPECT_THAT(textsOf(tel_get_cp_name_list()), SizeIs(port::SLOT_LIMIT));
+    names.emplace_back("one more");
+    telephony.slotsAnswer = answered(names);
+    EXPECT_EQ(nullptr, tel_get_cp_name_list());
+    EXPECT_THAT(lastOrigin(Question::SimSlots).reason, HasSubstr("has more than 64 slots"));
+    telephony_handle_list_s list = {};
+    EXPECT_NE(TELEPHONY_ERROR_NONE, telephony_init(&list));
 }
 
 TEST_F(TapiTest, NoServiceIsNoList)
