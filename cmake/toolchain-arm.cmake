@@ -1,6 +1,6 @@
 # What the ARM toolchains share; the programs run here under qemu.
 set(CMAKE_SYSTEM_NAME Linux)
-set(CMAKE_SYSTEM_PROCESSOR armv7)
+set(CMAKE_SYSTEM_PROCESSOR ${arm_processor})
 
 list(APPEND CMAKE_TRY_COMPILE_PLATFORM_VARIABLES CORESYSTEM_SYSROOT)
 if(CORESYSTEM_SYSROOT)
@@ -31,4 +31,4 @@ endforeach()
 list(JOIN pkgconfig_dirs ":" pkgconfig_dirs)
 set(ENV{PKG_CONFIG_LIBDIR} ${pkgconfig_dirs})
 
-set(CMAKE_CROSSCOMPILING_EMULATOR qemu-arm -L ${CMAKE_SYSROOT})
+set(CMAKE_CROSSCOMPILING_EMULATOR ${arm_emulator} -L ${CMAKE_SYSROOT})

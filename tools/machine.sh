@@ -30,6 +30,20 @@ apt_get() {
     as_root env DEBIAN_FRONTEND=noninteractive apt-get -q -y -o DPkg::Lock::Timeout=300 "$@" </dev/null
 }
 
+# The repository that the machine's own Debian packages come from, without its updates.
+debian_mirror() {
+    local codename mirror
+    codename=$(. /etc/os-release && echo "$VERSION_CODENAME")
+    # shellcheck disable=SC2016 # expanded by apt
+    mirror=$(apt-get indextargets --format '$(CREATED_BY) $(RELEASE) $(COMPONENT) $(REPO_URI)' |
+        awk -v release="$codename" '$1 == "Packages" && $2 == release && $3 == "main" { print $4; exit }')
+    if [ -z "$mirror" ]; then
+        echo "apt has no Debian repository configured, see sources.list(5)" >&2
+        return 1
+    fi
+    echo "$mirror"
+}
+
 # Installs what is missing of the given stages; touches neither apt nor the network when nothing is.
 install_packages() {
     local package missing=()
