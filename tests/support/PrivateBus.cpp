@@ -140,14 +140,16 @@ void PrivateBus::usePolicy(const std::string& file) const
 void PrivateBus::useEtc(const std::string& folder)
 {
     etc_ = folder;
+    tree_.write("/run/systemd/why", "Where its services put their sockets.\n");
 }
 
 void PrivateBus::run(int addressPipe) const
 {
     // A test that ends before its time leaves no bus behind.
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    const bool ready = etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
-                                        bindFolder(etc_, "/etc"));
+    const bool ready =
+        etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
+                         bindFolder(etc_, "/etc") && bindFolder(tree_.path("/run"), "/run"));
     if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0) {
         const std::string configuration = "--config-file=" + tree_.path("/bus.conf");
         execlp("dbus-daemon", "dbus-daemon", configuration.c_str(), "--nofork", "--nopidfile",
