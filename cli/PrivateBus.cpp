@@ -95,17 +95,19 @@ std::string placeOfFolder()
 // The file in the folder that is locked for as long as the command or the keeper lives.
 constexpr char LOCK[] = "/lock";
 
-// None when another process has it, or somebody has removed it meanwhile.
-port::Descriptor lockIn(const std::string& folder, int flags)
+// Its descriptor; -1 when another process has it, or somebody has removed it meanwhile.
+int lockIn(const std::string& folder, int flags)
 {
     const std::string path = folder + LOCK;
-    port::Descriptor lock(open(path.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW | flags, 0600));
+    const int lock = open(path.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW | flags, 0600);
     struct stat held = {};
     struct stat there = {};
-    const bool isIt = lock.number() >= 0 && flock(lock.number(), LOCK_EX | LOCK_NB) == 0 &&
-                      fstat(lock.number(), &held) == 0 && stat(path.c_str(), &there) == 0 &&
-                      held.st_ino == there.st_ino && held.st_dev == there.st_dev;
-    return isIt ? std::move(lock) : port::Descriptor();
+    const bool isIt = lock >= 0 && flock(lock, LOCK_EX | LOCK_NB) == 0 && fstat(lock, &held) == 0 &&
+                      stat(path.c_str(), &there) == 0 && held.st_ino == there.st_ino &&
+                      held.st_dev == there.st_dev;
+    if (lock >= 0 && !isIt)
+        close(lock);
+    return isIt ? lock : -1;
 }
 
 bool isOwnFolder(const std::string& path)
@@ -128,8 +130,10 @@ void collectLeftovers(const fs::path& form)
         if (found.size() != name.size() || found.compare(0, begin.size(), begin) != 0 ||
             !isOwnFolder(path))
             continue;
-        if (const port::Descriptor lock = lockIn(path, 0); lock.number() >= 0)
+        if (const int lock = lockIn(path, 0); lock >= 0) {
             fs::remove_all(path, ignored);
+            close(lock);
+        }
     }
 }
 
@@ -194,18 +198,19 @@ PrivateBus::PrivateBus()
 {
     const std::string form = placeOfFolder();
     collectLeftovers(form);
-    for (int attempt = 0; lock_.number() < 0; ++attempt) {
+    for (int attempt = 0; lock_ < 0; ++attempt) {
         folder_ = form;
         if (mkdtemp(folder_.data()) == nullptr)
             fail("no temporary folder " + folder_);
         lock_ = lockIn(folder_, O_CREAT);
-        if (lock_.number() < 0 && attempt == 9) // one may be taken for a leftover
+        if (lock_ < 0 && attempt == 9) // one may be taken for a leftover
             fail(folder_ + LOCK);
     }
 }
 
 PrivateBus::~PrivateBus()
 {
+    close(lock_);
     std::error_code ignored;
     if (keeper_ == 0) {
         fs::remove_all(folder_, ignored);

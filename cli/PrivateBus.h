@@ -7,8 +7,6 @@
 
 #include <sys/types.h>
 
-#include "port/common/Descriptor.h"
-
 namespace cli {
 
 /// A folder that only this user may enter, with a bus in it. From start() on both are kept by a
@@ -41,7 +39,7 @@ private:
     pid_t startBus() const;
 
     std::string folder_;
-    port::Descriptor lock_; // shared with the keeper
+    int lock_ = -1; // shared with the keeper, which holds it until both have ended
     pid_t keeper_ = 0;
     int lifeline_ = -1; // the keeper sees it close
 };
