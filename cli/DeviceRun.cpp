@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem device run`: any program on a simulated device.
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
 #include <memory>
 #include <new>
+#include <sstream>
 
 #include <coresystem_port.h>
 #include <sys/wait.h>
@@ -31,6 +33,7 @@ enum : int {
 struct Run {
     std::string file;
     bool onCopy = false;
+    std::string services; // empty: all of them
 };
 
 void setVariable(const char* name, const std::string& value)
@@ -84,13 +87,47 @@ bool hasBus(const std::string& file)
     return !device || device.value().section("fault").find("g_bus_get_sync") == nullptr;
 }
 
+// The services that a program finds on its bus.
+constexpr const char* SERVICES[] = {"ModemManager", "NetworkManager", "bluez", "hostname1",
+                                    "locale1"};
+constexpr char NONE[] = "none";
+
+std::vector<std::string> servicesOf(const Run& run)
+{
+    const std::vector<std::string> all(std::begin(SERVICES), std::end(SERVICES));
+    if (run.services.empty())
+        return all;
+    if (run.services == NONE)
+        return {};
+    std::vector<std::string> chosen;
+    std::istringstream names(run.services);
+    for (std::string name; std::getline(names, name, ',');) {
+        if (std::find(all.begin(), all.end(), name) == all.end())
+            throw UsageError(
+                "--services takes none, or some of ModemManager, NetworkManager, bluez, "
+                "hostname1, locale1 with commas between them; not \"" +
+                name + "\"");
+        chosen.push_back(name);
+    }
+    return chosen;
+}
+
+// A program that plays a scenario need not know where this command is.
+void putOwnFolderOnPath()
+{
+    const std::string folder = fs::read_symlink("/proc/self/exe").parent_path();
+    const char* const path = std::getenv("PATH");
+    setVariable("PATH", path != nullptr && *path != '\0' ? path + (":" + folder) : folder);
+}
+
 int runOnDevice(const Run& run, const std::vector<std::string>& command)
 {
     const HeldSignals held;
     PrivateBus bus;
     setVariable("CORESYSTEM_DEVICE", deviceFor(run, bus.folder()));
     setVariable("DBUS_SYSTEM_BUS_ADDRESS", bus.address());
-    bus.start(hasBus(coresystem_port::deviceFile()));
+    putOwnFolderOnPath();
+    bus.start(hasBus(coresystem_port::deviceFile()), servicesOf(run));
     Streams streams;
     streams.sharesAll = true;
     return awaitEnd(startChild(command, streams));
@@ -115,6 +152,7 @@ ExitCode runCommand(const Invocation& invocation, const Run& run)
         throw UsageError("device run takes its device by itself, not by --device");
     if (invocation.tail.empty())
         throw UsageError("device run takes a command behind \"--\"");
+    servicesOf(run); // before anything is begun
     if (reportDeviceFileProblem())
         return BAD_DEVICE_FILE;
     return static_cast<ExitCode>(tryToRun(run, invocation.tail));
@@ -129,6 +167,8 @@ void cli::addDeviceRunCommand(const Command& device, Invocation& invocation)
     const auto run = std::make_shared<Run>();
     command.option("DEVICE", run->file, "Device, by file or name").required();
     command.flag("--copy", run->onCopy, "Run on a copy of the file, which goes away");
+    command.option("--services", run->services,
+                   "Services on its bus: some with commas between, or none");
     command.setFooter(
         "Examples: coresystem device run phone.toml -- ./application --option\n"
         "          coresystem device run --copy phone.toml -- make check\n"

@@ -138,13 +138,13 @@ void collectLeftovers(const fs::path& form)
 }
 
 // Beside this program in a build, where it is installed else.
-std::string deviceDaemon()
+std::string daemonNamed(const std::string& name)
 {
     const fs::path beside = fs::read_symlink("/proc/self/exe").parent_path();
-    for (const char* const place : {"coresystem-deviced", DEVICED_FROM_BIN "/coresystem-deviced"})
-        if (access((beside / place).c_str(), X_OK) == 0)
-            return (beside / place).lexically_normal();
-    throw std::runtime_error("coresystem-deviced is neither in " + beside.string() + " nor in " +
+    for (const fs::path& place : {beside, beside / DEVICED_FROM_BIN})
+        if (access((place / name).c_str(), X_OK) == 0)
+            return (place / name).lexically_normal();
+    throw std::runtime_error(name + " is neither in " + beside.string() + " nor in " +
                              (beside / DEVICED_FROM_BIN).lexically_normal().string());
 }
 
@@ -235,12 +235,12 @@ void PrivateBus::writeConfiguration() const
     fs::create_directory(path("services"));
     writeFile(path("bus.conf"),
               g_markup_printf_escaped(CONFIGURATION, address().c_str(), path("services").c_str()));
-    const std::string daemon = taken(g_shell_quote(deviceDaemon().c_str()));
+    const std::string daemon = taken(g_shell_quote(daemonNamed("coresystem-deviced").c_str()));
     writeFile(path("services/org.tizen.system.deviced.service"),
               g_strdup_printf(SERVICE, daemon.c_str()));
 }
 
-void PrivateBus::start(bool withBus)
+void PrivateBus::start(bool withBus, const std::vector<std::string>& services)
 {
     if (withBus)
         writeConfiguration();
@@ -251,7 +251,7 @@ void PrivateBus::start(bool withBus)
         fail("no process for the private bus");
     if (keeper_ == 0) {
         close(lifeline.in);
-        keep(withBus, readiness.in, lifeline.out);
+        keep(withBus, services, readiness.in, lifeline.out);
     }
     close(readiness.in);
     close(lifeline.out);
@@ -262,7 +262,8 @@ void PrivateBus::start(bool withBus)
         throw std::runtime_error(answer.empty() ? "the private bus does not start" : answer);
 }
 
-void PrivateBus::keep(bool withBus, int readiness, int lifeline) const
+void PrivateBus::keep(bool withBus, const std::vector<std::string>& services, int readiness,
+                      int lifeline) const
 {
     setsid();                         // what is typed at the terminal is the command's
     prctl(PR_SET_CHILD_SUBREAPER, 1); // the bus leaves the daemons that it started to it
@@ -271,17 +272,20 @@ void PrivateBus::keep(bool withBus, int readiness, int lifeline) const
     dup2(nowhere, STDIN_FILENO);
     dup2(nowhere, STDOUT_FILENO);
     pid_t bus = 0;
+    pid_t played = 0;
     std::string answer = READY;
     try {
         bus = withBus ? startBus() : 0;
+        played = withBus && !services.empty() ? startServices(services) : 0;
     } catch (const std::exception& error) {
         answer = error.what();
     }
     if (write(readiness, answer.data(), answer.size()) >= 0)
         close(readiness);
     readAll(lifeline);
-    if (bus != 0)
-        kill(bus, SIGTERM);
+    for (const pid_t each : {played, bus})
+        if (each != 0)
+            kill(each, SIGTERM);
     awaitChildren();
     std::error_code ignored;
     fs::remove_all(folder_, ignored);
@@ -307,6 +311,26 @@ pid_t PrivateBus::startBus() const
     if (!comesByte(address.out)) // it tells its address once it listens
         throw std::runtime_error("dbus-daemon does not start: " + contentOf(path("log")));
     return bus;
+}
+
+// A mistake in the device file that comes later is told to whoever runs the command.
+pid_t PrivateBus::startServices(const std::vector<std::string>& services) const
+{
+    const Pipe readiness = makePipe();
+    std::vector<std::string> command = {daemonNamed("coresystem-played")};
+    command.insert(command.end(), services.begin(), services.end());
+    pid_t played = 0;
+    try {
+        played = startChild(command, {readiness.in});
+    } catch (const NotStarted& failure) {
+        throw std::runtime_error(failure.reason);
+    }
+    close(readiness.in);
+    const bool isReady = comesByte(readiness.out);
+    close(readiness.out);
+    if (!isReady)
+        throw std::runtime_error("the services cannot be played");
+    return played;
 }
 
 } // namespace cli

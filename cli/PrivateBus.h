@@ -4,6 +4,7 @@
 #define CLI_PRIVATE_BUS_H
 
 #include <string>
+#include <vector>
 
 #include <sys/types.h>
 
@@ -30,13 +31,16 @@ public:
     /// Returns when the bus listens. It starts the device daemon when that is first asked, with the
     /// environment as it is now. Without the bus nobody listens at the address. The process must
     /// have one thread only.
-    void start(bool withBus);
+    /// The services named are played on it before it returns, for the device of CORESYSTEM_DEVICE.
+    void start(bool withBus, const std::vector<std::string>& services);
 
 private:
     std::string path(const char* name) const;
     void writeConfiguration() const;
-    [[noreturn]] void keep(bool withBus, int readiness, int lifeline) const;
+    [[noreturn]] void keep(bool withBus, const std::vector<std::string>& services, int readiness,
+                           int lifeline) const;
     pid_t startBus() const;
+    pid_t startServices(const std::vector<std::string>& services) const;
 
     std::string folder_;
     int lock_ = -1; // shared with the keeper, which holds it until both have ended

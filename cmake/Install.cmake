@@ -9,7 +9,8 @@ install(TARGETS coresystem platform coreutil EXPORT coresystem)
 
 install(FILES ${PROJECT_SOURCE_DIR}/include/CoreSystem.h
               ${PROJECT_SOURCE_DIR}/include/IConnectionStateListener.h
-              ${PROJECT_SOURCE_DIR}/port/include/coresystem_port.h TYPE INCLUDE)
+              ${PROJECT_SOURCE_DIR}/port/include/coresystem_port.h
+              ${PROJECT_SOURCE_DIR}/port/include/coresystem_testing.h TYPE INCLUDE)
 # The platform's own headers that the public ones include; an SDK has them, an ordinary machine has not.
 set(platform_headers_dir ${CMAKE_INSTALL_INCLUDEDIR}/coresystem-platform)
 foreach(header TelCall TelNetwork TelSim telephony telephony_common telephony_modem telephony_network
@@ -32,6 +33,9 @@ install(FILES ${PROJECT_SOURCE_DIR}/docs/device-file.schema.json
 # Simulated devices that --device and CORESYSTEM_DEVICE know by name.
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/devices DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem
         FILES_MATCHING PATTERN "*.toml")
+
+# What plays the other services of a machine for `coresystem device run`.
+install(TARGETS played_program DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})
 
 # The service that tells the serial number, its rights on the system bus, and who starts it.
 install(TARGETS deviced DESTINATION ${CMAKE_INSTALL_LIBEXECDIR})

@@ -114,6 +114,12 @@ constexpr auto TELEPHONY_ERRORS_OR_EMPTY = joined(TELEPHONY_ERRORS, OR_EMPTY);
 constexpr auto TELEPHONY_ERRORS_OR_NULL = joined(TELEPHONY_ERRORS, OR_NULL);
 
 constexpr Name SERIAL_FAULTS[] = {{"not_a_string", NOT_A_STRING}};
+constexpr Name SERVICE_FAULTS[] = {
+    name("absent", ServiceFault::Absent),
+    name("silent", ServiceFault::Silent),
+    name("slow", ServiceFault::Slow),
+    name("crashing", ServiceFault::Crashing),
+};
 constexpr Name BUS_FAULTS[] = {name("no_bus", BusFault::NoBus)};
 
 constexpr std::int64_t ANY = std::numeric_limits<std::int64_t>::max();
@@ -146,9 +152,11 @@ constexpr Type fault(const Rows& names, Type::Kind kind = Type::Kind::Fault)
 }
 
 constexpr SectionRow SECTIONS[] = {
-    {"device", Form::Section},        {"settings", Form::Section}, {"slot", Form::List},
-    {"subscriptions", Form::Section}, {"network", Form::Section},  {"storage", Form::Section},
-    {"packages", Form::Free},         {"fault", Form::Section},    {"step", Form::List},
+    {"device", Form::Section},  {"settings", Form::Section},
+    {"slot", Form::List},       {"subscriptions", Form::Section},
+    {"network", Form::Section}, {"storage", Form::Section},
+    {"packages", Form::Free},   {"fault", Form::Section},
+    {"service", Form::Section}, {"step", Form::List},
 };
 
 struct KeyRow {
@@ -166,6 +174,7 @@ constexpr KeyRow KEYS[] = {
     {"device", "telephony", SWITCH},
 
     {"settings", "device_name", TEXT},
+    {"settings", "host_name", TEXT},
     {"settings", "language", TEXT},
     {"settings", "sales_code", TEXT},
     {"settings", "font_size", oneOf(FONT_SIZES, 5, std::numeric_limits<int>::max())},
@@ -188,6 +197,11 @@ constexpr KeyRow KEYS[] = {
     {"slot", "sms", SWITCH},
     {"slot", "cp_name", SOME_TEXT},
     {"slot", "denied", SWITCH},
+    {"slot", "enabled", SWITCH},
+    {"slot", "pin", digits(4, 8)},
+    {"slot", "pin_retries", whole(1, 3)},
+    {"slot", "puk", digits(8, 8)},
+    {"slot", "puk_retries", whole(1, 10)},
 
     {"subscriptions", "network", oneOf(UNKNOWN_SLOT, 0, 1)},
     {"subscriptions", "data", oneOf(UNKNOWN_SLOT, 0, 1)},
@@ -204,6 +218,13 @@ constexpr KeyRow KEYS[] = {
     {"storage", "available_blocks", whole(0, ANY)},
 
     {"packages", "", TEXT},
+
+    // How the services misbehave that are played for a program that is run on the device.
+    {"service", "ModemManager", fault(SERVICE_FAULTS)},
+    {"service", "NetworkManager", fault(SERVICE_FAULTS)},
+    {"service", "bluez", fault(SERVICE_FAULTS)},
+    {"service", "hostname1", fault(SERVICE_FAULTS)},
+    {"service", "locale1", fault(SERVICE_FAULTS)},
 
     // A scenario; nothing of it is said of the device until it is played.
     {"step", "after_ms", whole(0, 24 * 60 * 60 * 1000)}, // since the step before it

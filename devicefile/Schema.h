@@ -22,6 +22,9 @@ constexpr std::int64_t BUS_ERROR = NOTHING - 2; // has a name only
 // What is wrong with the bus of a program that is run on a device.
 enum class BusFault { NoBus };
 
+// How a service misbehaves.
+enum class ServiceFault { None, Absent, Silent, Slow, Crashing };
+
 // A name in quotes and the number that it is kept as, which is an enumerator's.
 struct Name {
     std::string_view name;

@@ -1,0 +1,128 @@
+// SPDX-License-Identifier: Apache-2.0
+// BlueZ: one adapter, and the device that it is connected to.
+#include "Service.h"
+
+namespace port::played {
+namespace {
+
+constexpr char ADAPTER[] = "org.bluez.Adapter1";
+constexpr char DEVICE[] = "org.bluez.Device1";
+constexpr char AGENTS[] = "org.bluez.AgentManager1";
+// Of the range that is kept for documents (RFC 7042).
+constexpr char ADDRESS[] = "00:00:5E:00:53:02";
+constexpr char PEER[] = "00:00:5E:00:53:03";
+constexpr char ADAPTER_PATH[] = "/org/bluez/hci0";
+constexpr char PEER_PATH[] = "/org/bluez/hci0/dev_00_00_5E_00_53_03";
+
+Variant textOf(const std::string& text)
+{
+    return value("s", text.c_str());
+}
+
+bool isOn(const Facts& facts)
+{
+    return facts.bluetooth && facts.bluetooth != LinkState::Deactivated;
+}
+
+Face adapter(const Facts& facts)
+{
+    return face(ADAPTER, {{"Address", textOf(ADDRESS)},
+                          {"AddressType", textOf("public")},
+                          {"Name", textOf(facts.deviceName)},
+                          {"Alias", textOf(facts.deviceName)},
+                          {"Powered", value("b", isOn(facts))},
+                          {"PowerState", textOf(isOn(facts) ? "on" : "off")},
+                          {"DiscoverableTimeout", value("u", 180)},
+                          {"Pairable", value("b", isOn(facts))},
+                          {"Roles", texts({"central", "peripheral"})}});
+}
+
+Face peer()
+{
+    return face(DEVICE, {{"Address", textOf(PEER)},
+                         {"AddressType", textOf("public")},
+                         {"Alias", textOf("00-00-5E-00-53-03")},
+                         {"Paired", value("b", TRUE)},
+                         {"Bonded", value("b", TRUE)},
+                         {"Trusted", value("b", TRUE)},
+                         {"Connected", value("b", TRUE)},
+                         {"Adapter", value("o", ADAPTER_PATH)},
+                         {"ServicesResolved", value("b", TRUE)}});
+}
+
+World worldOf(const Scene& scene)
+{
+    World world = {
+        {"/org/bluez",
+         {face(AGENTS), face("org.bluez.HealthManager1"), face("org.bluez.ProfileManager1")}}};
+    if (scene.facts.bluetooth)
+        world.push_back({ADAPTER_PATH,
+                         {adapter(scene.facts), face("org.bluez.GattManager1"),
+                          face("org.bluez.LEAdvertisingManager1"), face("org.bluez.Media1"),
+                          face("org.bluez.NetworkServer1")}});
+    if (scene.facts.bluetooth == LinkState::Connected)
+        world.push_back({PEER_PATH, {peer()}});
+    return world;
+}
+
+Outcome setPowered(const Request& request)
+{
+    const bool on = g_variant_get_boolean(request.arguments) != FALSE;
+    if (on == isOn(request.scene.facts))
+        return {};
+    return Outcome::change({set("network.bluetooth", on ? "disconnected" : "deactivated")});
+}
+
+Outcome disconnect(const Request&)
+{
+    return Outcome::change({set("network.bluetooth", "disconnected")});
+}
+
+Outcome filters(const Request&)
+{
+    return Outcome::answer(g_variant_new_parsed("(['UUIDs', 'RSSI', 'Pathloss', 'Transport'],)"));
+}
+
+Outcome nothing(const Request&)
+{
+    return {};
+}
+
+Outcome refuse(const Request& request)
+{
+    if (!isOn(request.scene.facts))
+        return Outcome::refuse("org.bluez.Error.NotReady", "Resource Not Ready");
+    return Outcome::refuse("org.bluez.Error.NotSupported", "Operation is not supported");
+}
+
+bool isThere(const Facts&)
+{
+    return true;
+}
+
+} // namespace
+
+const Role& bluez()
+{
+    static const Role service = {
+        "bluez",
+        "org.bluez",
+        "/",
+        worldOf,
+        isThere,
+        {{AGENTS, "RegisterAgent", nothing},
+         {AGENTS, "UnregisterAgent", nothing},
+         {AGENTS, "RequestDefaultAgent", nothing},
+         {ADAPTER, "GetDiscoveryFilters", filters},
+         {DEVICE, "Connect", nothing},
+         {DEVICE, "Disconnect", disconnect}},
+        {{ADAPTER, "Powered", setPowered}},
+        {},
+        {},
+        refuse,
+        false,
+    };
+    return service;
+}
+
+} // namespace port::played

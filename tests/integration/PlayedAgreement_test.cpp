@@ -1,0 +1,516 @@
+// SPDX-License-Identifier: Apache-2.0
+// The services that are played from a device file, asked by the linux backend as it is, and the
+// simulator asked about the same file: both answer the same, but where a row says why they cannot.
+#include <algorithm>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <optional>
+#include <random>
+#include <sstream>
+
+#include <gmock/gmock.h>
+
+#include "backend/Backend.h"
+#include "devicefile/DeviceText.h"
+#include "support/PlayedDevice.h"
+
+namespace {
+
+using port::Backend;
+using port::CardStatus;
+using port::CellularState;
+using port::LinkState;
+using port::Result;
+using port::Service;
+using port::SlotName;
+using port::Sourced;
+using port::WifiConnection;
+using port::devicefile::Device;
+using port::devicefile::Section;
+using port::played::Facts;
+using port::played::SlotFacts;
+
+constexpr char NO_ANSWER[] = "-";
+
+std::string textOf(const std::string& text)
+{
+    return "\"" + text + "\"";
+}
+std::string textOf(const std::optional<std::string>& text)
+{
+    return text ? textOf(*text) : "none";
+}
+std::string textOf(const port::Imsi& imsi)
+{
+    return imsi.mcc + " " + imsi.mnc + " " + imsi.msin;
+}
+std::string textOf(const port::Card& card)
+{
+    return std::to_string(static_cast<int>(card.status));
+}
+std::string textOf(const std::vector<SlotName>& names)
+{
+    std::string text;
+    for (const SlotName& name : names)
+        text += name + " ";
+    return text;
+}
+std::string textOf(const port::Subscriptions& all)
+{
+    return std::to_string(all.data.value_or(-1));
+}
+template <typename T>
+std::string textOf(T value)
+{
+    return std::to_string(static_cast<int>(value));
+}
+
+// A service that is not there and a radio that is not there are the same to who asks.
+template <typename T>
+std::string answerOf(const Result<Sourced<T>>& result)
+{
+    if (result)
+        return textOf(result.value().value);
+    return result.error().kind == port::Error::Kind::NoSim ? "no SIM" : NO_ANSWER;
+}
+std::string answerOf(const Result<port::Fact>& result)
+{
+    return result ? textOf(result.value().value) : NO_ANSWER;
+}
+
+struct Question {
+    const char* name;
+    bool isOfSlot;
+    std::string (*ask)(Backend& backend, const SlotName& slot);
+};
+
+#define OF_DEVICE(name, part, question)                                                           \
+    {                                                                                             \
+        name, false,                                                                              \
+            [](Backend& backend, const SlotName&) { return answerOf(backend.part().question()); } \
+    }
+#define OF_SLOT(name, question)                                  \
+    {                                                            \
+        name, true, [](Backend& backend, const SlotName& slot) { \
+            return answerOf(backend.telephony().question(slot)); \
+        }                                                        \
+    }
+
+const Question QUESTIONS[] = {
+    OF_DEVICE("device name", settings, deviceName),
+    OF_DEVICE("language", settings, language),
+    OF_DEVICE("model", deviceInfo, modelName),
+    OF_DEVICE("slots", telephony, slots),
+    OF_DEVICE("data slot", telephony, subscriptions),
+    OF_DEVICE("cellular", network, cellular),
+    OF_DEVICE("wifi", network, wifi),
+    OF_DEVICE("wifi connection", network, wifiConnection),
+    OF_DEVICE("bluetooth", network, bluetooth),
+    OF_DEVICE("flight mode", network, flightMode),
+    OF_DEVICE("packet data", network, packetData),
+    OF_DEVICE("mobile data", network, mobileData),
+    OF_DEVICE("data roaming", network, dataRoaming),
+    OF_SLOT("card", card),
+    OF_SLOT("imsi", imsi),
+    OF_SLOT("number", number),
+    OF_SLOT("imei", imei),
+    OF_SLOT("service", service),
+    OF_SLOT("roaming", roaming),
+    OF_SLOT("messages", smsReady),
+};
+
+// What a row looks at.
+struct Case {
+    const Device& device;
+    const Facts& facts;
+    std::size_t index; // of the slot, when the question is of one
+
+    bool has(const char* section, const char* key) const
+    {
+        return device.section(section).find(key) != nullptr;
+    }
+    const Section& section() const
+    {
+        return device.slots[index];
+    }
+    const SlotFacts& slot() const
+    {
+        return facts.slots[index];
+    }
+};
+
+bool isRegistered(const Facts& facts, std::size_t index)
+{
+    const SlotFacts& slot = facts.slots[index];
+    return slot.isReady() && (slot.service == Service::InService || facts.connectedSlot() == index);
+}
+
+bool hasModem(const Case& now)
+{
+    return !now.facts.slots.empty();
+}
+
+bool isServed(const Facts& facts)
+{
+    for (std::size_t i = 0; i < facts.slots.size(); ++i)
+        if (isRegistered(facts, i))
+            return true;
+    return false;
+}
+
+// Whether every modem with service is abroad and must not carry data there.
+bool isKeptFromRoaming(const Facts& facts)
+{
+    bool atHome = false;
+    for (std::size_t i = 0; i < facts.slots.size(); ++i)
+        atHome = atHome || (isRegistered(facts, i) && !facts.slots[i].isRoaming);
+    return isServed(facts) && !atHome && !facts.dataRoaming.value_or(true);
+}
+
+// What NetworkManager's switches make of the radios that are there.
+bool areRadiosOff(const Facts& facts)
+{
+    const bool isWifiOff = !facts.isWifiOn();
+    const bool isCellularOff = !facts.isCellularOn();
+    if (facts.wifi.has_value() == !facts.slots.empty())
+        return isWifiOff && isCellularOff;
+    return facts.wifi ? isWifiOff : isCellularOff;
+}
+
+bool contradictsItsSlots(const Case& now)
+{
+    const Facts& facts = now.facts;
+    if (!facts.cellular)
+        return hasModem(now);
+    switch (*facts.cellular) {
+    case CellularState::OutOfService:
+        return !hasModem(now) || isServed(facts) || areRadiosOff(facts);
+    case CellularState::FlightMode:
+        return !hasModem(now) || !areRadiosOff(facts);
+    case CellularState::RoamingOff:
+        return !isKeptFromRoaming(facts) || areRadiosOff(facts);
+    case CellularState::Available:
+        return !isServed(facts) || isKeptFromRoaming(facts) || areRadiosOff(facts);
+    case CellularState::CallOnlyAvailable:
+        return !isServed(facts) || areRadiosOff(facts);
+    default:
+        return !facts.connectedSlot();
+    }
+}
+
+bool isPacketDataElsewhere(const Case& now)
+{
+    const auto on = now.facts.packetData;
+    if (!hasModem(now))
+        return on.has_value();
+    if (!on)
+        return true;
+    return (*on && !now.facts.isCellularOn()) ||
+           (!*on && now.facts.connectedSlot() && now.facts.isCellularOn());
+}
+
+bool differsFromItsWifi(const Case& now)
+{
+    const Facts& facts = now.facts;
+    if (!now.has("network", "wifi_connection"))
+        return false;
+    if (!facts.wifi || !facts.wifiConnection)
+        return true;
+    if (!facts.isWifiOn())
+        return facts.wifiConnection != WifiConnection::Disconnected;
+    return (facts.wifi == LinkState::Connected) !=
+           (facts.wifiConnection == WifiConnection::Connected);
+}
+
+bool carriesData(const Facts& facts)
+{
+    return facts.connectedSlot() && !(facts.isWifiOn() && facts.wifi == LinkState::Connected);
+}
+
+bool isPrivate(const Case& now)
+{
+    const auto denied = now.section().get<bool>("denied");
+    return denied && denied.value().value;
+}
+
+// Where the two cannot agree.
+struct Difference {
+    const char* question;
+    const char* reason;
+    bool (*holds)(const Case& now);
+};
+
+const Difference DIFFERENCES[] = {
+    {"device name", "without a pretty name a machine has its host name",
+     [](const Case& now) { return now.facts.deviceName.empty(); }},
+    {"model", "without hostname1's the firmware is asked",
+     [](const Case& now) { return now.facts.modelName.empty(); }},
+    {"data slot", "is known only while traffic goes over that modem",
+     [](const Case& now) {
+         const int slot = now.facts.dataSlot.value_or(-1);
+         return carriesData(now.facts) ? slot != static_cast<int>(*now.facts.connectedSlot())
+                                       : slot >= 0;
+     }},
+    {"cellular", "the file says of the network what its slots do not", contradictsItsSlots},
+    {"wifi", "NetworkManager has no flight mode in which a radio is on",
+     [](const Case& now) {
+         return now.facts.isFlying() && now.facts.wifi && now.facts.wifi != LinkState::Deactivated;
+     }},
+    {"wifi connection", "NetworkManager has no flight mode in which a radio is on",
+     [](const Case& now) {
+         return now.facts.isFlying() && now.facts.wifi == LinkState::Connected;
+     }},
+    {"wifi connection", "the file says of the connection what Wi-Fi is not", differsFromItsWifi},
+    {"flight mode", "is unknown in a file and never on a machine",
+     [](const Case& now) { return !now.facts.flightMode; }},
+    {"flight mode", "is what it is when every radio that is there is off",
+     [](const Case& now) { return !now.facts.isFlying() && areRadiosOff(now.facts); }},
+    {"packet data", "NetworkManager knows one setting, of a modem that is there and on",
+     isPacketDataElsewhere},
+    {"mobile data", "NetworkManager does not keep it apart from packet data",
+     [](const Case& now) {
+         return isPacketDataElsewhere(now) || now.facts.mobileData != now.facts.packetData;
+     }},
+    {"data roaming", "NetworkManager has it in a connection of a modem",
+     [](const Case& now) {
+         return hasModem(now) ? !now.facts.dataRoaming : now.facts.dataRoaming.has_value();
+     }},
+    {"", "a slot that is private to the platform is a modem of which nothing is known", isPrivate},
+    {"card", "ModemManager has fewer states of a card",
+     [](const Case& now) {
+         const auto card = now.slot().card;
+         return !card || card == CardStatus::Removed || card == CardStatus::Crashed ||
+                (card >= CardStatus::SubsetLocked && card <= CardStatus::DeviceLocked);
+     }},
+    {"imsi", "a card of which nothing is said cannot be read",
+     [](const Case& now) { return !now.slot().card; }},
+    {"number", "a card of which nothing is said cannot be read",
+     [](const Case& now) { return !now.slot().card; }},
+    {"number", "\"null\" is the platform's own success without a number",
+     [](const Case& now) {
+         return now.section().find("number") != nullptr && now.slot().number.empty();
+     }},
+    {"service", "a modem that is not in use is out of service",
+     [](const Case& now) { return !now.slot().service; }},
+    {"roaming", "a modem is abroad only where it has service",
+     [](const Case& now) {
+         return !now.slot().service || now.section().find("roaming") == nullptr ||
+                (now.slot().isRoaming && now.slot().service != Service::InService);
+     }},
+    {"messages", "are ready only on a modem that is registered",
+     [](const Case& now) {
+         return now.section().find("sms") == nullptr ||
+                (now.slot().hasMessages && !isRegistered(now.facts, now.index));
+     }},
+};
+
+std::string contentOf(const std::string& path)
+{
+    std::ifstream file(path);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+class PlayedAgreement : public testing::Test {
+protected:
+    static void SetUpTestSuite()
+    {
+        for (const char* const variable : {"LC_ALL", "LC_MESSAGES", "LANG"})
+            unsetenv(variable);
+        played_ = new PlayedDevice("schema = 1\n");
+        machine_ = port::makeLinuxBackend();
+        device_ = port::makeSimulatorBackend(played_->file());
+    }
+    static void TearDownTestSuite()
+    {
+        std::printf("%d devices, %d questions", devices_, questions_);
+        for (const auto& [row, count] : used_)
+            std::printf("\n  %-16s %5d  %s", row->question, count, row->reason);
+        std::printf("\n");
+        device_.reset();
+        machine_.reset();
+        delete played_;
+    }
+
+    // What differs without a reason; empty when nothing does.
+    static std::string compare(const std::string& text)
+    {
+        const auto device = port::devicefile::parseDevice(text, "device");
+        if (!device)
+            return device.error().reason;
+        played_->become(text);
+        ++devices_;
+        const Facts facts = port::played::factsOf(device.value());
+        std::string problems;
+        for (const Question& question : QUESTIONS) {
+            const std::size_t count = question.isOfSlot ? facts.slots.size() : 1;
+            for (std::size_t i = 0; i < count; ++i)
+                problems += compare(question, {device.value(), facts, i});
+        }
+        return problems;
+    }
+
+    static std::string compare(const Question& question, const Case& now)
+    {
+        const SlotName slot = question.isOfSlot ? now.slot().name : "";
+        const std::string simulated = question.ask(*device_, slot);
+        const std::string answered = question.ask(*machine_, slot);
+        ++questions_;
+        if (simulated == answered)
+            return "";
+        for (const Difference& row : DIFFERENCES)
+            if ((row.question == std::string(question.name) ||
+                 (*row.question == '\0' && question.isOfSlot)) &&
+                row.holds(now)) {
+                ++used_[&row];
+                return "";
+            }
+        return std::string(question.name) + " " + slot + ": the simulator answers " + simulated +
+               ", the machine " + answered + "\n";
+    }
+
+    // The fewest lines of a device that still differ.
+    static std::string smallest(std::vector<std::string> lines)
+    {
+        const auto joined = [](const std::vector<std::string>& all) {
+            std::string text;
+            for (const std::string& line : all)
+                text += line + "\n";
+            return text;
+        };
+        for (std::size_t i = lines.size(); i-- > 1;) {
+            std::vector<std::string> fewer = lines;
+            fewer.erase(fewer.begin() + static_cast<std::ptrdiff_t>(i));
+            if (port::devicefile::parseDevice(joined(fewer), "device") &&
+                !compare(joined(fewer)).empty())
+                lines = fewer;
+        }
+        return compare(joined(lines)) + joined(lines);
+    }
+
+    static PlayedDevice* played_;
+    static std::unique_ptr<Backend> machine_;
+    static std::unique_ptr<Backend> device_;
+    static int devices_;
+    static int questions_;
+    static std::map<const Difference*, int> used_;
+};
+
+PlayedDevice* PlayedAgreement::played_ = nullptr;
+std::unique_ptr<Backend> PlayedAgreement::machine_;
+std::unique_ptr<Backend> PlayedAgreement::device_;
+int PlayedAgreement::devices_ = 0;
+int PlayedAgreement::questions_ = 0;
+std::map<const Difference*, int> PlayedAgreement::used_;
+
+TEST_F(PlayedAgreement, EveryDeviceFileAndEveryStepOfItsScenario)
+{
+    for (const char* const folder : {DEVICES "/devices", DEVICES "/tests/devices"})
+        for (const auto& entry : std::filesystem::directory_iterator(folder)) {
+            std::string text = contentOf(entry.path());
+            const auto device = port::devicefile::parseDevice(text, entry.path());
+            if (!device)
+                continue; // the one that shows a mistake
+            EXPECT_EQ(compare(text), "") << entry.path();
+            for (const auto& step : device.value().steps) {
+                text = port::devicefile::changeText(text, "device", step.changes).value();
+                EXPECT_EQ(compare(text), "") << step.source;
+            }
+        }
+    EXPECT_GE(devices_, 20);
+}
+
+// Lines of a device file that say anything at all.
+class Generator {
+public:
+    explicit Generator(unsigned seed) : random_(seed) {}
+
+    std::vector<std::string> lines()
+    {
+        lines_ = {"schema = 1", "[device]"};
+        text("model_name");
+        maybe("telephony", {"true", "true", "true", "false"});
+        lines_.emplace_back("[settings]");
+        text("device_name");
+        maybe("language", {"\"de_DE.UTF-8\"", "\"ko_KR.UTF-8\""});
+        for (const char* const key : {"flight_mode", "data_roaming", "mobile_data", "packet_data"})
+            maybe(key, {"true", "false"});
+        lines_.emplace_back("[network]");
+        maybe("cellular",
+              {"\"out_of_service\"", "\"flight_mode\"", "\"roaming_off\"",
+               "\"call_only_available\"", "\"available\"", "\"connected\"", "\"not_supported\""});
+        maybe("wifi",
+              {"\"deactivated\"", "\"disconnected\"", "\"connected\"", "\"not_supported\""});
+        maybe("wifi_connection", {"\"failure\"", "\"disconnected\"", "\"association\"",
+                                  "\"configuration\"", "\"connected\"", "\"not_supported\""});
+        maybe("bluetooth",
+              {"\"deactivated\"", "\"disconnected\"", "\"connected\"", "\"not_supported\""});
+        lines_.emplace_back("[subscriptions]");
+        maybe("data", {"0", "1", "\"unknown\""});
+        for (unsigned slots = below(3); slots > 0; --slots)
+            slot();
+        return lines_;
+    }
+
+private:
+    unsigned below(unsigned limit)
+    {
+        return static_cast<unsigned>(random_() % limit); // the same everywhere, for a seed
+    }
+    void maybe(const char* key, const std::vector<const char*>& values)
+    {
+        if (below(6) != 0)
+            lines_.push_back(std::string(key) + " = " +
+                             values[below(static_cast<unsigned>(values.size()))]);
+    }
+    void text(const char* key)
+    {
+        maybe(key, {"\"Telefon\"", "\"\\u0418\\u0432\\u0430\\u043d\"", "\"a \\\"b\\\"\""});
+    }
+    void slot()
+    {
+        lines_.emplace_back("[[slot]]");
+        maybe("sim", {"\"available\"", "\"available\"", "\"available\"", "\"pin\"", "\"puk\"",
+                      "\"blocked\"", "\"network_locked\"", "\"absent\"", "\"removed\"", "\"error\"",
+                      "\"powered_off\"", "\"initializing\"", "\"unknown\""});
+        if (below(8) == 0)
+            maybe("init_status",
+                  {"\"sim_nsck_required\"", "\"sim_spck_required\"", "\"sim_init_completed\"",
+                   "\"card_crashed\"", "\"card_poweroff\""});
+        maybe("mcc", {"\"001\"", "\"310\""});
+        maybe("mnc", {"\"01\"", "\"260\""});
+        maybe("msin", {"\"1\"", "\"123456789\""});
+        maybe("number", {"\"+12025550143\"", "\"null\""});
+        maybe("imei", {"\"001017000000011\"", "\"00101700000001\""});
+        maybe("service",
+              {"\"in_service\"", "\"in_service\"", "\"out_of_service\"", "\"emergency_only\""});
+        maybe("roaming", {"true", "false"});
+        maybe("sms", {"true", "false"});
+        maybe("enabled", {"true", "false"});
+        if (below(10) == 0)
+            lines_.emplace_back("denied = true");
+    }
+
+    std::mt19937 random_;
+    std::vector<std::string> lines_;
+};
+
+class GeneratedDevices : public PlayedAgreement, public testing::WithParamInterface<unsigned> {};
+
+TEST_P(GeneratedDevices, Agree)
+{
+    constexpr unsigned COUNT = 40;
+    for (unsigned seed = GetParam() * COUNT; seed < (GetParam() + 1) * COUNT; ++seed) {
+        const auto lines = Generator(seed).lines();
+        std::string text;
+        for (const std::string& line : lines)
+            text += line + "\n";
+        if (!compare(text).empty())
+            FAIL() << "seed " << seed << "\n" << smallest(lines);
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Seeds, GeneratedDevices, testing::Range(0U, 8U));
+
+} // namespace
