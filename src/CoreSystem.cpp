@@ -47,7 +47,7 @@ int readPlatformString(const char* key, char** slot, const LogSite& site, const 
     return result;
 }
 
-// Reads a switch. No result code is looked at: meant, a read that fails leaves it off.
+// Reads a switch. No result code is looked at, a read that fails leaves it off: frozen 1.
 template <class Key>
 bool readSwitch(int (*read)(Key, bool*), Key key, const LogSite& site, const char* on,
                 const char* off)
@@ -100,7 +100,7 @@ inline void forwardCountryQuestion(CountrySearch search, const char* key, char**
     DEBUG_LINE_AT(site, resultFormat, *slot);
 }
 
-// The first step of both chained calling-code questions. Its answer is never released: meant,
+// The first step of both chained calling-code questions. Its answer is never released: frozen 2,
 // callers have lived with that small leak and nothing may start to free it.
 __attribute__((noinline)) const char* keptMccOfCallingCode(const char* countryCallingCode)
 {
@@ -113,7 +113,7 @@ __attribute__((noinline)) const char* keptMccOfCallingCode(const char* countryCa
 const int NO_HANDLES = 4;
 
 // A SIM identity question: how one slot is read, and what the walks over the slots make of it. The
-// texts and the differences between the rows are meant.
+// texts and the differences between the rows are frozen 3.
 struct SimRead {
     int (SimManager::*read)(telephony_handle_list_s list, int slot, char** value);
     int codeWithoutHandles;
@@ -219,7 +219,7 @@ int offsetFromUtc()
     return static_cast<int>(local.tm_gmtoff);
 }
 
-// Made of the zone alone, so that it stays the same as long as the zone does: meant.
+// Made of the zone alone, so that it stays the same as long as the zone does: frozen 4.
 char* fallbackImei()
 {
     try {
@@ -255,7 +255,7 @@ int CoreSystem::GetDeviceName(char** deviceName)
 
 int CoreSystem::GetTizenIdN(char** tizenId)
 {
-    DEBUG_LINE("CoreSystem::GetTizenID"); // without the N: meant
+    DEBUG_LINE("CoreSystem::GetTizenID"); // without the N: frozen 5
     char* value = nullptr;
     const int result = system_info_get_platform_string("tizen.org/system/tizenid", &value);
     if (result != SYSTEM_INFO_ERROR_NONE) {
@@ -278,7 +278,7 @@ int CoreSystem::GetPlatformName(char** platformName)
 int CoreSystem::GetSWVersion(char** swVersion)
 {
     DEBUG_LINE("CoreSystem::GetSWVersion");
-    // A feature key, unlike its neighbours: meant.
+    // A feature key, unlike its neighbours: frozen 6.
     return readPlatformString("tizen.org/feature/platform.version", swVersion, LOG_SITE,
                               "SW version : %s");
 }
@@ -303,7 +303,7 @@ int CoreSystem::GetDeviceLanguageCode(char** languageCode, bool convertToISO639)
     try {
         const std::string value(setting != nullptr ? setting : DEFAULT_LANGUAGE);
         const int separator = GetTagStartPosition(value, "_");
-        // Without a separator the length works out as the largest there is: the whole value, meant.
+        // Without a separator the length becomes the largest there is: the whole value, frozen 7.
         std::string language = GetValueFromPosition(value, 0, separator - 1);
         std::transform(language.begin(), language.end(), language.begin(), toUpperCase);
 
@@ -322,7 +322,7 @@ int CoreSystem::GetDeviceLanguageCode(char** languageCode, bool convertToISO639)
         // No exception crosses the interface; the slot stays as the caller set it.
     }
     std::free(setting);
-    return result; // the code of the read, also when the default language answered: meant
+    return result; // the code of the read, also when the default language answered: frozen 8
 }
 
 int CoreSystem::GetTagStartPosition(const std::string& value, const std::string& tag)
@@ -442,7 +442,7 @@ void CoreSystem::GetCountryNameFromCountryCallingCode(const char* countryCalling
         return;
     }
     const char* const mcc = keptMccOfCallingCode(countryCallingCode);
-    DEBUG_LINE("CoreSystem::GetCountryCallingCodeFromMcc"); // names the inverse step: meant
+    DEBUG_LINE("CoreSystem::GetCountryCallingCodeFromMcc"); // names the inverse step: frozen 9
     if (isEmpty(mcc)) {
         ERROR_LINE("mcc is empty. GetCountryNameFromCountryCallingCode finish.");
         return;
@@ -468,7 +468,7 @@ void CoreSystem::GetCountryNameAlpha2FromCountryCallingCode(const char* countryC
         return;
     }
     // The last row answers, unlike every other search, and the slot gets the table's own cell:
-    // meant.
+    // frozen 10.
     const std::size_t row = findLast(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, mcc);
     *countryNameAlpha2 = row < MccCountryTable::ROWS
                              ? const_cast<char*>(MccCountryTable::ALPHA2.cells[row])
@@ -506,7 +506,7 @@ bool CoreSystem::IsDualSimAvailable()
         return false;
     if (list.count < 2) {
         ERROR_LINE("[Single Sim Device] Not support Dual Sim.");
-        return false; // the list stays as it is, unlike on the other ways out: meant
+        return false; // the list stays as it is, unlike on the other ways out: frozen 11
     }
     const bool both = SimManager::GetInstance()->IsSimAvailable(list, 0) &&
                       SimManager::GetInstance()->IsSimAvailable(list, 1);
@@ -528,7 +528,7 @@ int CoreSystem::GetMCCFromSim(char** mcc)
 
 int CoreSystem::GetMNCFromSim(char** mnc)
 {
-    DEBUG_LINE("GetMCCFromSim [Vector]TYPE"); // another method's: meant
+    DEBUG_LINE("GetMCCFromSim [Vector]TYPE"); // another method's: frozen 12
     return readFirstSlot(MNC_READ, LOG_SITE, mnc);
 }
 
@@ -564,7 +564,7 @@ void CoreSystem::GetIMSIFromSim(std::vector<char*>& imsis, int* count)
 
 void CoreSystem::GetPhoneNumberFromSim(std::vector<char*>& phoneNumbers, int* count)
 {
-    DEBUG_LINE("GetPhoneNumberListFromSim [Vector]TYPE"); // "List" in this one only: meant
+    DEBUG_LINE("GetPhoneNumberListFromSim [Vector]TYPE"); // "List" in this one only: frozen 13
     readAllSlots(PHONE_NUMBER_READ, LOG_SITE, phoneNumbers, count);
 }
 
@@ -679,7 +679,7 @@ int CoreSystem::GetFontSize(int* fontSize)
     DEBUG_LINE("CoreSystem::GetFontSize");
     int value = 0;
     const int result = system_settings_get_value_int(SYSTEM_SETTINGS_KEY_FONT_SIZE, &value);
-    *fontSize = value; // also after a failed read: meant
+    *fontSize = value; // also after a failed read: frozen 14
     const char* const line = lineOfFontSize(value);
     if (line != nullptr)
         DEBUG_LINE("%s", line);
@@ -691,7 +691,7 @@ int CoreSystem::GetCurrentTime(struct tm* currentTime)
     DEBUG_LINE("CoreSystem::GetCurrentTime");
     struct tm now = {};
     const int result = alarm_get_current_time(&now);
-    *currentTime = now; // also after a failed read: meant
+    *currentTime = now; // also after a failed read: frozen 15
     DEBUG_LINE("currentTime : day %d,  %d:%d:%d", now.tm_mday, now.tm_hour, now.tm_min, now.tm_sec);
     return result;
 }
@@ -709,10 +709,10 @@ int CoreSystem::GetPackageVersion(const char* packageId, char** version)
     result = package_info_get_version(info, &text);
     if (result != PACKAGE_MANAGER_ERROR_NONE) {
         ERROR_LINE("package_info_get_version failed [%d]", result);
-        return result; // the handle stays: meant
+        return result; // the handle stays: frozen 16
     }
     package_info_destroy(info);
-    *version = copyOf(text); // the platform's own text is never released: meant
+    *version = copyOf(text); // the platform's own text is never released: frozen 17
     DEBUG_LINE("packageVersion : %s", *version);
     return PACKAGE_MANAGER_ERROR_NONE;
 }

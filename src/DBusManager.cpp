@@ -15,7 +15,7 @@ using namespace coresystem;
 
 namespace {
 
-// The text alone tells a time-out, not the error's domain or code: meant.
+// The text alone tells a time-out, not the error's domain or code: frozen 33.
 bool tellsTimeOut(const GError& error)
 {
     return std::strstr(error.message, "Time") != nullptr;

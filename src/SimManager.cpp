@@ -175,7 +175,7 @@ bool isInService(telephony_h handle)
 }
 
 // Asks a modem by its name. The handle is passed on as obtained, null or not, and stays open:
-// meant, as it was built.
+// frozen 18.
 template <class Answer>
 bool askModem(const char* cpName, int (*ask)(TapiHandle*, Answer*), Answer* answer)
 {
@@ -207,7 +207,7 @@ bool SimManager::IsValidMcc(const char* mcc)
 
 void SimManager::GetCountryCodeFromMcc(const char* mcc, char** countryCode)
 {
-    // The entry text names another method: meant.
+    // The entry text names another method: frozen 19.
     convert(MccCountryTable::MCC, MccCountryTable::MCC_INDEX, MccCountryTable::ALPHA2, mcc,
             countryCode,
             {LOG_SITE, "GetMccToCountryCode [mcc : %s]", "success to get countrycode : %s",
@@ -240,7 +240,7 @@ void SimManager::GetMccFromServiceCountryCode(const char* serviceCountryCode, ch
 
 void SimManager::GetServiceCountryCodeFromMcc(const char* mcc, char** serviceCountryCode)
 {
-    // The "!! " of the success text is meant.
+    // The "!! " of the success text is frozen 20.
     convert(ServiceCountryTable::MCC, ServiceCountryTable::MCC_INDEX, ServiceCountryTable::LOCALE,
             mcc, serviceCountryCode,
             {LOG_SITE, "GetServiceCountryCodeFromMcc [mcc : %s]",
@@ -294,7 +294,7 @@ bool SimManager::SuccessToInitTelephonyHandle(telephony_handle_list_s* list)
     telephony_handle_list_s own = {0, nullptr};
     if (telephony_init(&own) != TELEPHONY_ERROR_NONE || own.count == 0) {
         ERROR_LINE("telephony_init Failed.");
-        return false; // a list of no slots is not released either: meant
+        return false; // a list of no slots is not released either: frozen 21
     }
     DEBUG_LINE("Success! telephony_init, handle count : %d", static_cast<int>(own.count));
     *list = own;
@@ -328,7 +328,7 @@ bool SimManager::GetSimState(telephony_h* handle, telephony_sim_state_e* state)
     const CoreMutexLock lock(SIM_ACCESS);
     const int result = telephony_sim_get_state(*handle, state);
     DEBUG_LINE("SIM STATE[%d]", result);
-    return result != TELEPHONY_ERROR_NONE; // true is failure: meant
+    return result != TELEPHONY_ERROR_NONE; // true is failure: frozen 22
 }
 
 bool SimManager::IsSimExist()
@@ -341,7 +341,7 @@ bool SimManager::IsSimExist()
             telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
             const int result = telephony_sim_get_state(list.handle[slot], &state);
             DEBUG_LINE("RESULT sim_get_state[%d] : %d | %x", static_cast<int>(slot), result,
-                       static_cast<unsigned int>(result)); // the result twice: meant
+                       static_cast<unsigned int>(result)); // the result twice: frozen 23
             if (result != TELEPHONY_ERROR_NONE)
                 continue;
             DEBUG_LINE("SIM STATE[%d] : %s", static_cast<int>(slot),
@@ -349,7 +349,7 @@ bool SimManager::IsSimExist()
             exists = exists || numberOf(state) == TELEPHONY_SIM_STATE_AVAILABLE;
         }
     }
-    telephony_deinit(&list); // also of a list that was never filled: meant
+    telephony_deinit(&list); // also of a list that was never filled: frozen 24
     return exists;
 }
 
@@ -368,7 +368,7 @@ int SimManager::GetIMSIFromSim(telephony_handle_list_s list, int slot, char** im
     const LogSite site = LOG_SITE;
     DEBUG_LINE("GetIMSIFromSim : slot %d", slot + 1);
     const bool wasRead = useImsiOfSlot(*this, list, slot, [&](const TelSimImsiInfo_t& parts) {
-        // Whatever the parts hold: meant.
+        // Whatever the parts hold: frozen 25.
         DEBUG_LINE_AT(site, "Mcc exist");
         DEBUG_LINE_AT(site, "Mnc exist");
         DEBUG_LINE_AT(site, "Msin exist");
@@ -381,7 +381,7 @@ int SimManager::GetIMSIFromSim(telephony_handle_list_s list, int slot, char** im
 int SimManager::GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, char** number)
 {
     DEBUG_LINE("GetPhoneNumberFromSim : slot %d", slot + 1);
-    // A full stop here, a comma in IsSimAvailable(): meant.
+    // A full stop here, a comma in IsSimAvailable(): frozen 26.
     DEBUG_LINE("GetTelephonyHandle. handle count : %d", static_cast<int>(list.count));
     if (IsSimAvailable(list, slot)) {
         char* ofPlatform = nullptr;
@@ -390,7 +390,7 @@ int SimManager::GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, ch
             return telephony_sim_get_subscriber_number(list.handle[slot], &ofPlatform);
         });
         if (result == TELEPHONY_ERROR_NONE && ofPlatform != nullptr) {
-            *number = strdup(ofPlatform); // the platform's own string is never released: meant
+            *number = strdup(ofPlatform); // the platform's own string is never released: frozen 27
             DEBUG_LINE("phoneNumber exist");
             return 0;
         }
@@ -402,7 +402,7 @@ int SimManager::GetPhoneNumberFromSim(telephony_handle_list_s list, int slot, ch
 bool SimManager::GetRoamingStatus(int slot, bool* roaming)
 {
     const CoreMutexLock lock(SIM_ACCESS);
-    ERROR_LINE("SimManager::GetRoamingStatus()"); // an entry line that is always written: meant
+    ERROR_LINE("SimManager::GetRoamingStatus()"); // an entry line that is always written: frozen 28
     bool answered = false;
     telephony_handle_list_s list = {0, nullptr};
     if (telephony_init(&list) == TELEPHONY_ERROR_NONE) {
@@ -417,7 +417,7 @@ bool SimManager::GetRoamingStatus(int slot, bool* roaming)
             }
         }
     }
-    telephony_deinit(&list); // also of a list that was never filled: meant
+    telephony_deinit(&list); // also of a list that was never filled: frozen 24
     return answered;
 }
 
@@ -447,7 +447,7 @@ bool SimManager::IsAvaliableState(int slot, TelSimCardStatus_t* status)
         return false;
     int cardChanged = 0;
     if (tel_get_sim_init_info(modem, status, &cardChanged) != TAPI_API_SUCCESS)
-        return false; // the handle stays open on every way out: meant, as it was built
+        return false; // the handle stays open on every way out: frozen 29
     DEBUG_LINE("SIM_INIT_INFO[%x, %d]", static_cast<unsigned int>(numberOf(*status)), cardChanged);
     return numberOf(*status) == TAPI_SIM_STATUS_SIM_INIT_COMPLETED;
 }
@@ -494,7 +494,7 @@ bool SimManager::GetSimInfo(const char* cpName, std::string* mcc, std::string* m
     } catch (const std::bad_alloc&) { // only where short strings are allocated  GCOV_EXCL_LINE
         return false;                 // no exception crosses the interface      GCOV_EXCL_LINE
     }
-    return true; // the handle stays open: meant, as it was built
+    return true; // the handle stays open: frozen 29
 }
 
 bool SimManager::GetPhoneNumber(telephony_data** handle, char** number)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Mobile country code (ITU E.212), international calling code without "+" (ITU E.164).
 // Row order is behaviour: the first row that matches answers, so rows are never sorted.
-// The order differs from MccCountryTable in the rows 348, 332, 362 and 514: that is meant.
+// The order differs from MccCountryTable in the rows 348, 332, 362 and 514: frozen 36.
 #ifndef CORESYSTEM_TABLES_CALLING_CODE_TABLE_H
 #define CORESYSTEM_TABLES_CALLING_CODE_TABLE_H
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // ISO 639-2 code in lower case, ISO 639-1 code in upper case.
-// Languages that are missing (DE, FR, ZH, ...) and the pairs ine/IE and mol/MO are meant.
+// Languages that are missing (DE, FR, ZH, ...) and the pairs ine/IE and mol/MO: frozen 34.
 #ifndef CORESYSTEM_TABLES_LANGUAGE_CODE_TABLE_H
 #define CORESYSTEM_TABLES_LANGUAGE_CODE_TABLE_H
 

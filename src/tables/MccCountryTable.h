@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Mobile country code (ITU E.212), ISO 3166-1 alpha-2 code in lower case, English country name.
 // Row order is behaviour: the first row that matches answers, so rows are never sorted.
-// MCC 340 has two rows and "kh" stands at 456 and at 514: both are meant.
+// MCC 340 has two rows and "kh" stands at 456 and at 514: both are frozen 35.
 #ifndef CORESYSTEM_TABLES_MCC_COUNTRY_TABLE_H
 #define CORESYSTEM_TABLES_MCC_COUNTRY_TABLE_H
 

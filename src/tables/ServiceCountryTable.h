@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Mobile country code (ITU E.212), locale of the service country (language "_" country).
 // Row order is behaviour: the first row that matches answers, so rows are never sorted.
-// The locales gr_CY, en_AE and en_KH, and MCC 406 that no other table knows, are meant.
+// The locales gr_CY, en_AE and en_KH, and MCC 406 that no other table knows, are frozen 37.
 #ifndef CORESYSTEM_TABLES_SERVICE_COUNTRY_TABLE_H
 #define CORESYSTEM_TABLES_SERVICE_COUNTRY_TABLE_H
 
