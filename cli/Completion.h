@@ -16,7 +16,8 @@ namespace cli {
 extern const char* const COMPLETE;
 
 /// One line for each word that may take the place of the last one, with a tabulator and what it
-/// means behind it; the line ":files" says that the name of a file may, too.
+/// means behind it; the line ":files" says that the name of a file may, too, ":commands" that of
+/// another program.
 std::string completions(const CLI::App& app, const std::vector<std::string>& words);
 
 } // namespace cli

@@ -17,6 +17,7 @@
 #include <coresystem_port.h>
 #include <gio/gio.h>
 
+#include "Serial.h"
 #include "Sims.h"
 
 namespace {
@@ -211,18 +212,6 @@ Fact askSalesCode()
                 : noAnswer(lastOrigin(Question::SalesCode).reason);
 }
 
-std::string reasonOfNoSerial(int code)
-{
-    switch (code) {
-    case 1:
-        return "no connection to the system bus";
-    case 3:
-        return "the system bus does not answer in time";
-    default:
-        return "the device daemon does not answer with a serial number";
-    }
-}
-
 const std::string DAEMON = "device daemon (org.tizen.system.deviced)";
 
 // The library asks over the bus library's shared connection, which would end this process with the
@@ -243,7 +232,7 @@ Fact askSerial()
     const char* slot = nullptr;
     const int code = library().GetDeviceUniqueID(&slot);
     const auto serial = taken(const_cast<char*>(slot)); // the caller's, though it is read-only
-    return serial ? Fact{"", *serial, DAEMON, ""} : noAnswer(reasonOfNoSerial(code));
+    return serial ? Fact{"", *serial, DAEMON, ""} : noAnswer(cli::whyNoSerial(code));
 }
 
 struct FactRow {

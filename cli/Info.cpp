@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem info` and `coresystem get`.
 #include <algorithm>
+#include <utility>
 
 #include <coresystem_port.h>
 
@@ -23,20 +24,101 @@ std::string shortReason(const std::string& reason)
     return isOfTheFile ? "the device file is unusable" : reason;
 }
 
-std::vector<std::string> rowOf(const Fact& fact)
+struct Section {
+    const char* title;
+    std::vector<std::string> beginnings; // of the names of its facts
+};
+
+// What no section names is of the device itself.
+const std::vector<Section> SECTIONS = {
+    {"Device", {""}},
+    {"Language", {"language"}},
+    {"SIM card", {"sim_", "phone_number", "imei", "roaming"}},
+    {"Network", {"connected"}},
+    {"Settings", {"flight_mode", "data_roaming", "mobile_data", "sales_code"}},
+    {"Storage", {"storage"}},
+};
+
+bool isIn(const Section& section, const std::string& name)
 {
+    return std::any_of(section.beginnings.begin(), section.beginnings.end(),
+                       [&](const std::string& beginning) { return name.rfind(beginning, 0) == 0; });
+}
+
+// The last one that takes the name.
+const Section& sectionOf(const std::string& name)
+{
+    return *std::find_if(SECTIONS.rbegin(), SECTIONS.rend(),
+                         [&](const Section& section) { return isIn(section, name); });
+}
+
+std::vector<std::string> rowOf(const Fact& fact, std::size_t nameWidth)
+{
+    std::string name = fact.name;
+    name.resize(std::max(name.size(), nameWidth), ' ');
     if (fact.value.is_null())
-        return {fact.name, "not available", "(" + shortened(shortReason(fact.reason)) + ")"};
+        return {name, "not available"};
     const std::string text = textOf(fact.value);
-    return {fact.name, text.empty() ? "\"\"" : text, shortened(fact.source)};
+    return {name, text.empty() ? "\"\"" : text, shortened(fact.source)};
+}
+
+// Facts under what they have in common, in the order in which that comes up.
+using Groups = std::vector<std::pair<std::string, std::string>>;
+
+void addTo(Groups& groups, const std::string& what, const std::string& name)
+{
+    const auto same = std::find_if(groups.begin(), groups.end(),
+                                   [&](const auto& group) { return group.first == what; });
+    if (same == groups.end())
+        groups.emplace_back(what, name);
+    else
+        same->second += ", " + name;
+}
+
+const std::string TOLD = "applications are told ";
+
+// Each reason once, with all facts that it takes away, and what applications get all the same.
+std::string missingText(const std::vector<Fact>& facts)
+{
+    Groups reasons;
+    Groups told;
+    for (const Fact& fact : facts) {
+        const std::string reason =
+            fact.value.is_null() ? shortened(shortReason(fact.reason)) : std::string();
+        for (std::size_t at = 0; at < reason.size();) {
+            const std::size_t end = std::min(reason.find("; ", at), reason.size());
+            const std::string part = reason.substr(at, end - at);
+            part.rfind(TOLD, 0) == 0 ? addTo(told, part.substr(TOLD.size()), fact.name)
+                                     : addTo(reasons, part, fact.name);
+            at = end + 2;
+        }
+    }
+    std::string text = reasons.empty() ? "" : "\n" + heading("Not available") + "\n";
+    for (const auto& [reason, names] : reasons)
+        text += wrapped(printable(reason), 2) + wrapped(names, 4);
+    Rows rows;
+    for (const auto& [answer, names] : told)
+        rows.push_back({answer, names});
+    return text + (rows.empty()
+                       ? ""
+                       : "\n" + heading("What applications are told") + "\n" + aligned(rows));
 }
 
 std::string infoText(const std::vector<Fact>& facts)
 {
-    Rows rows;
+    std::size_t nameWidth = 0;
     for (const Fact& fact : facts)
-        rows.push_back(rowOf(fact));
-    return backendLine() + "\n\n" + aligned(rows, "");
+        nameWidth = std::max(nameWidth, fact.name.size());
+    std::string text = backendLine() + "\n";
+    for (const Section& section : SECTIONS) {
+        Rows rows;
+        for (const Fact& fact : facts)
+            if (&sectionOf(fact.name) == &section)
+                rows.push_back(rowOf(fact, nameWidth));
+        if (!rows.empty())
+            text += "\n" + heading(section.title) + "\n" + aligned(rows);
+    }
+    return text + missingText(facts);
 }
 
 std::string infoJson(const std::vector<Fact>& facts)

@@ -156,6 +156,7 @@ std::string rowText(const std::vector<std::string>& row, const std::vector<std::
         const std::size_t width = widthOf(row[i]);
         if (end > 0 && width > limit - std::min(start, limit) &&
             limit - std::min(start, limit) < NARROWEST_CELL) {
+            text.erase(text.find_last_not_of(' ') + 1);
             text += '\n';
             end = 0;
             start = indent + HANGING;

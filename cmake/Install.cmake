@@ -29,6 +29,8 @@ endforeach()
 # What editors check device files by.
 install(FILES ${PROJECT_SOURCE_DIR}/docs/device-file.schema.json
         DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem)
+# The forms of the command's --json.
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/docs/schema DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem)
 
 # Simulated devices that --device and CORESYSTEM_DEVICE know by name.
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/devices DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem

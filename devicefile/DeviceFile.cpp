@@ -2,6 +2,7 @@
 #include "DeviceFile.h"
 
 #include <algorithm>
+#include <cctype>
 #include <limits>
 #include <optional>
 #include <set>
@@ -551,15 +552,90 @@ std::string describe(const std::string& path, const Problem& problem)
            problem.text;
 }
 
+namespace {
+
+// How many words without quotes are told, each of which takes another look at the whole text.
+constexpr std::size_t BARE_WORDS_LIMIT = 20;
+
+// Words where a value is to be: "wifi = connected".
+struct BareWord {
+    std::size_t at = std::string::npos; // in the text; none without it
+    std::size_t size = 0;
+    std::size_t column = 0;
+};
+
+std::size_t beginOfLine(const std::string& text, std::size_t number)
+{
+    std::size_t begin = 0;
+    for (std::size_t line = 1; line < number && begin < text.size(); ++line)
+        begin = std::min(text.find('\n', begin), text.size() - 1) + 1;
+    return begin;
+}
+
+bool isCharacter(char byte) // or its first byte
+{
+    return (static_cast<unsigned char>(byte) & 0xc0U) != 0x80;
+}
+
+// Up to a comment; what has quotes is another mistake.
+BareWord bareWordOf(const std::string& text, std::size_t lineNumber)
+{
+    const std::size_t begin = beginOfLine(text, lineNumber);
+    const std::string line = text.substr(begin, text.find('\n', begin) - begin);
+    const std::size_t sign = line.find('=');
+    const std::size_t at =
+        sign == std::string::npos ? sign : line.find_first_not_of(" \t", sign + 1);
+    if (at == std::string::npos || std::isalpha(static_cast<unsigned char>(line[at])) == 0)
+        return {};
+    const std::string value = line.substr(at, line.find('#', at) - at);
+    if (value.find_first_of("\"'\\") != std::string::npos)
+        return {};
+    const auto before =
+        std::count_if(line.begin(), line.begin() + static_cast<std::ptrdiff_t>(at), isCharacter);
+    return {begin + at, value.find_last_not_of(" \t\r") + 1, static_cast<std::size_t>(before) + 1};
+}
+
+// Adds what was found on the way to the mistakes of a reading, unless its line has a better one.
+void addProblems(Reading& reading, const std::vector<Problem>& more)
+{
+    const std::vector<Problem> own = reading.problems;
+    for (const Problem& problem : more)
+        if (std::none_of(own.begin(), own.end(),
+                         [&](const Problem& each) { return each.line == problem.line; }))
+            reading.problems.push_back(problem);
+    std::stable_sort(
+        reading.problems.begin(), reading.problems.end(),
+        [](const Problem& left, const Problem& right) { return left.line < right.line; });
+}
+
+} // namespace
+
 Reading readDevice(const std::string& text, const std::string& path)
 {
     if (std::vector<Problem> problems = findLongLines(text); !problems.empty())
         return {{}, std::move(problems), false};
-    try {
-        return Reader(path).read(parseToml(text, path));
-    } catch (const TomlError& error) {
-        return {{}, {{error.line, error.column, error.what()}}, false};
+    std::string repaired = text; // with quotes around words that lack them
+    std::vector<Problem> problems;
+    Reading reading;
+    for (;;) {
+        try {
+            reading = Reader(path).read(parseToml(repaired, path));
+            reading.isToml = problems.empty();
+            break;
+        } catch (const TomlError& error) {
+            const BareWord bare = bareWordOf(repaired, error.line);
+            if (bare.at == std::string::npos || problems.size() == BARE_WORDS_LIMIT) {
+                reading.problems.push_back({error.line, error.column, error.what()});
+                break;
+            }
+            const std::string word = repaired.substr(bare.at, bare.size);
+            problems.push_back(
+                {error.line, bare.column, "put " + word + " in quotes: \"" + word + "\""});
+            repaired.replace(bare.at, bare.size, '"' + word + '"');
+        }
     }
+    addProblems(reading, problems);
+    return reading;
 }
 
 Result<Device> parseDevice(const std::string& text, const std::string& path)

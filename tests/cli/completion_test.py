@@ -27,6 +27,7 @@ printf '%s\\n' "${{COMPREPLY[@]}}"
 ZSH = f"""
 _describe() {{ print -l -- "${{(@P)2}}" | sed 's/:.*//' }}
 _files() {{ print -l -- *(N) }}
+_command_names() {{ print -l -- ${{(k)commands}} }}
 words=("$@")
 CURRENT=$#
 autoload -Uz compinit
@@ -79,6 +80,14 @@ def check(shell, program):
         shell.expect([*options, *everywhere], *command, "--")
     shell.expect(["language_code"], "--device", "phone.toml", "get", "lang")
     shell.expect(["phone.toml"], "info", "--device", "")
+    shell.expect(["--color=never"], "info", "--color=n")
+    shell.expect(["network.wifi=connected"], "device", "set", "network.wifi=con")
+    shell.expect(["slot[0].sim=puk"], "device", "set", "slot[0].sim=pu")
+    shell.expect(["fault.tel_init=null"], "device", "set", "fault.tel_init=")
+    shell.expect(["settings.flight_mode=true"], "device", "set", "settings.flight_mode=t")
+    shell.expect(["org.example.clock"], "package", "--device", "phone.toml", "org.")
+    shell.expect(["sort"], "device", "run", "phone.toml", "--", "sor")
+    shell.expect(["device"], "help", "dev")
     got = shell.complete("get", "device_n")
     assert got == ["device_name"], f"{shell.name}: the beginning of a fact offers {got}"
 
@@ -86,7 +95,8 @@ def check(shell, program):
 def main():
     name, program = sys.argv[1], Path(sys.argv[2]).resolve()
     with tempfile.TemporaryDirectory() as directory:
-        Path(directory, "phone.toml").write_text("schema = 1\n", "utf-8")
+        Path(directory, "phone.toml").write_text(
+            "schema = 1\n[packages]\n\"org.example.clock\" = \"1\"\n", "utf-8")
         check(Shell(name, program, directory), program)
 
 
