@@ -25,8 +25,8 @@ public:
     /// Before start(): by itself nobody may own a name or call anybody, as on a machine's own bus;
     /// this file of a bus configuration says who may.
     void usePolicy(const std::string& file) const;
-    /// Before start(): the bus and what it starts see this folder as /etc, in namespaces of their
-    /// own, so that nothing they change reaches the machine.
+    /// Before start(): the bus and what it starts see this folder as /etc, and a /run with nothing
+    /// but systemd's folder, in namespaces of their own: nothing they change reaches the machine.
     void useEtc(const std::string& folder);
 
     void start();
