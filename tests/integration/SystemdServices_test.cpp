@@ -43,6 +43,8 @@ protected:
         etc.write("/passwd", "root:x:0:0:root:/root:/bin/sh\n");
         etc.write("/group", "root:x:0:\n");
         etc.write("/hostname", "static-name\n");
+        // Newer ones answer nothing without it.
+        etc.write("/machine-id", "0123456789abcdef0123456789abcdef\n");
         setLocale("");
         bus.addActivatable(HOSTNAME1.name, HOSTNAMED);
         bus.addActivatable(LOCALE1.name, LOCALED);
