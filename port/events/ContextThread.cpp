@@ -1,34 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "ContextThread.h"
 
-#include <csignal>
 #include <utility>
 
+#include "../common/BlockedSignals.h"
+
 namespace port {
-namespace {
-
-// Signals are for the application's own threads: those made meanwhile get none.
-class BlockedSignals {
-public:
-    BlockedSignals()
-    {
-        sigset_t all;
-        sigfillset(&all);
-        pthread_sigmask(SIG_SETMASK, &all, &before_);
-    }
-    ~BlockedSignals()
-    {
-        pthread_sigmask(SIG_SETMASK, &before_, nullptr);
-    }
-    BlockedSignals(const BlockedSignals&) = delete;
-    BlockedSignals& operator=(const BlockedSignals&) = delete;
-
-private:
-    sigset_t before_;
-};
-
-} // namespace
-
 ContextThread::ContextThread()
 {
     const BlockedSignals blocked;

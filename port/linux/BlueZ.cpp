@@ -1,20 +1,26 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "BlueZ.h"
 
-#include "Properties.h"
-
 namespace port::linux_backend {
 
-Result<std::vector<bool>> adaptersIn(const Result<Reply>& reply)
+Look adapters()
 {
-    if (!reply)
-        return reply.error();
-    const auto objects = objectsIn(reply.value().body);
+    return {ADAPTERS, [](const Tree& objects) {
+                std::vector<Deciding> deciding;
+                for (const auto& [path, interfaces] : objects)
+                    if (interfaces.count(BLUEZ.interface) != 0)
+                        deciding.push_back({path, BLUEZ.interface, "Powered"});
+                return deciding;
+            }};
+}
+
+Result<std::vector<bool>> adaptersIn(const Result<Objects>& objects)
+{
     if (!objects)
-        return notAvailable("bluez: " + objects.error().reason);
+        return objects.error();
     std::vector<bool> adapters;
-    for (const Object& object : objects.value()) {
-        const auto adapter = object.properties(BLUEZ.interface);
+    for (const auto& [path, interfaces] : *objects.value()) {
+        const auto adapter = Object(path, interfaces).properties(BLUEZ.interface);
         if (!adapter)
             continue;
         const auto powered = adapter.value().flag("Powered");

@@ -10,9 +10,14 @@
 namespace port::linux_backend {
 
 constexpr BusObject BLUEZ = {"org.bluez", "/", "org.bluez.Adapter1", Start::Never};
+constexpr Names BLUEZ_INTERFACES = {BLUEZ.interface};
+constexpr ObjectService ADAPTERS = {BLUEZ, "/", nullptr, BLUEZ_INTERFACES, nullptr, nullptr};
 
-/// Whether each adapter is switched on, from the reply to objectsBelow(BLUEZ).
-Result<std::vector<bool>> adaptersIn(const Result<Reply>& reply);
+/// Asks for the adapters.
+Look adapters();
+
+/// Whether each adapter is switched on, from the objects of ADAPTERS.
+Result<std::vector<bool>> adaptersIn(const Result<Objects>& objects);
 
 } // namespace port::linux_backend
 

@@ -1,30 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
-// The one D-Bus transport: a connection to the system bus that is the port's own.
+// The one D-Bus transport: a connection to the system bus that is the port's own, and a picture of
+// the objects of each service that was asked.
 //
 // It never ends the application, never blocks without a bound, and is kept: it is opened again only
-// after the bus went away. A process that was forked from one that had asked the bus gets no answer
-// from it: GLib's bus thread stays behind in the parent, and waiting for it would never end.
+// after the bus went away. A picture is read once and kept true by the service's signals. It
+// answers only together with a reply that came after the question: what one sender sends arrives in
+// order, so that no signal sent before that reply is outstanding. A process that was forked from
+// one that had asked the bus gets no answer from it.
 #ifndef PORT_LINUX_BUS_H
 #define PORT_LINUX_BUS_H
 
 #include <atomic>
+#include <functional>
 #include <initializer_list>
-#include <mutex>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include <sys/types.h>
 
+#include "../backend/Network.h"
 #include "../backend/Result.h"
-#include "../common/GLibTypes.h"
+#include "BusMessage.h"
 #include "Properties.h"
 
 namespace port::linux_backend {
-
-using Connection = std::shared_ptr<GDBusConnection>;
-
-constexpr auto BUS_CLIENT = static_cast<GDBusConnectionFlags>(
-    G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
 
 // Whether asking a service may start it. hostname1 and locale1 live only while they are asked, so
 // the bus starts them on purpose; nothing else ever is.
@@ -38,37 +38,54 @@ struct BusObject {
     Start start;
 };
 
-// One method call. The texts of its object outlive it.
-struct Question {
-    BusObject object;
-    const char* method;
-    Variant arguments; // a tuple; null for none
-    const char* replyType;
+// A service that manages objects, and what is kept of them. A row of constants.
+struct ObjectService {
+    BusObject root;             // its main object
+    const char* managerPath;    // of the object that manages the others
+    const char* property;       // of the main object, asked where no other decides; null for none
+    Names interfaces;           // that are kept
+    const char* settings;       // interface of the objects that tell more by GetSettings, or null
+    const char* settingsSignal; // what such an object sends when that changes
 };
 
-/// All properties of the object's interface; the reply is an (a{sv}).
-Question propertiesOf(const BusObject& object);
+/// The settings of an object, from GetSettings, stand beside its interfaces under such names.
+std::string settingsName(const std::string& section);
 
-/// All objects below this one, which is an object manager; the reply is an (a{oa{sa{sv}}}).
-Question objectsBelow(const BusObject& manager);
+// What is asked anew: a property, or with an empty name all of an object that its service does not
+// manage; that object is among the others then.
+struct Deciding {
+    std::string path;
+    const char* interface;
+    const char* property;
+};
 
-struct Reply {
-    Variant body;
-    std::string sender; // which no other process of this bus ever has
+// A question to a service. What decides it is chosen from the objects as they were last known.
+struct Look {
+    const ObjectService& service;
+    std::function<std::vector<Deciding>(const Tree&)> deciding;
 };
 
 class Bus {
 public:
-    /// How long a connection and a call may take.
+    /// How long a connection and a reply are waited for, and a question in all, however many calls
+    /// it takes: calls that one thread makes one directly after the other are one question.
     static constexpr int CONNECT_TIMEOUT_MS = 500;
     static constexpr int CALL_TIMEOUT_MS = 1000;
+    static constexpr int QUESTION_TIMEOUT_MS = 1800;
+    /// How long a service, or a bus, is waited for that already let another question wait in vain.
+    static constexpr int GRACE_MS = 20;
 
-    /// Asks several questions in one round trip: all are sent before the first reply is awaited.
-    /// The replies stand in the order of the questions. `timeoutMs` is for all of them together,
-    /// connecting left out.
-    std::vector<Result<Reply>> ask(const std::vector<Question>& questions,
-                                   int timeoutMs = CALL_TIMEOUT_MS);
-    Result<Reply> ask(const Question& question);
+    /// `services` are tried when a connection is made, so that one that does not answer is known
+    /// before it is asked. The names outlive the process's use of it.
+    explicit Bus(std::initializer_list<const char*> services = {});
+    ~Bus();
+    Bus(const Bus&) = delete;
+    Bus& operator=(const Bus&) = delete;
+
+    /// The objects of services, as they are after this began; all in one round trip, as long as
+    /// nothing that is asked has gone.
+    std::vector<Result<Objects>> look(const std::vector<Look>& questions);
+    Result<Objects> look(const Look& question);
 
     /// All properties of an object's interface.
     Result<Properties> properties(const BusObject& object);
@@ -77,19 +94,23 @@ public:
     /// with each.
     Result<Fact> textProperty(const BusObject& object, std::initializer_list<const char*> names);
 
-    /// For each service "running", "starts on demand", or the error why neither.
+    /// For each service "running", "starts on demand", or the error why neither; a service that
+    /// runs is asked for a sign of life.
     std::vector<Result<std::string>> statesOf(const std::vector<BusObject>& services);
 
+    /// Calls `changed` whenever an object of one of the services changed, a service or the bus came
+    /// or went, or the kernel told of a radio or an interface. While it runs, look() tells on its
+    /// thread what was so at that change, without asking anybody. Null when there is no thread for
+    /// it.
+    std::unique_ptr<Watch> watch(std::vector<const ObjectService*> services,
+                                 std::function<void()> changed);
+
 private:
-    Result<Connection> connection();
+    bool isOfThisProcess();
 
-    bool isOwnedByThisProcess();
-
+    class Core;
     std::atomic<pid_t> owner_{0}; // the process that asked first
-    std::mutex mutex_;
-    Connection connection_;
-    Error problem_{};                   // of the last attempt to connect
-    std::atomic<unsigned> attempts_{0}; // to connect, finished
+    const std::unique_ptr<Core> core_;
 };
 
 } // namespace port::linux_backend

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // This machine's real services.
 #include "../backend/Backend.h"
+#include "../common/GLibTypes.h"
 #include "BlueZ.h"
 #include "Bus.h"
 #include "Clock.h"
@@ -125,7 +126,7 @@ private:
                 answer ? "readable" : answer.error().reason, serves, consequence};
     }
 
-    Bus bus_;
+    Bus bus_{HOSTNAME1.name, LOCALE1.name, MODEM_MANAGER.name, NETWORK_MANAGER.name, BLUEZ.name};
     LinuxDeviceInfo deviceInfo_{bus_, ""};
     LinuxSettings settings_{bus_};
     LinuxTelephony telephony_{bus_};

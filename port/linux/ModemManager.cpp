@@ -147,16 +147,32 @@ bool Modem::hasMessaging() const
     return object_.has(MM_DBUS_INTERFACE_MODEM_MESSAGING);
 }
 
-Result<std::vector<Modem>> modemsIn(const Reply& reply)
+Look modems()
 {
-    const Result<std::vector<Object>> objects = objectsIn(reply.body);
+    return {
+        MODEMS, [](const Tree& objects) {
+            std::vector<Deciding> deciding;
+            for (const auto& [path, interfaces] : objects)
+                if (deciding.empty() && interfaces.count(MM_DBUS_INTERFACE_MODEM) != 0)
+                    deciding.push_back({path, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE});
+            return deciding;
+        }};
+}
+
+Result<std::vector<Modem>> modemsIn(const Result<Objects>& objects)
+{
     if (!objects)
-        return notAvailable(std::string(MODEM_MANAGER.name) + " " + objects.error().reason);
+        return objects.error();
     std::vector<Modem> modems;
-    for (const Object& object : objects.value())
+    for (const auto& [path, interfaces] : *objects.value()) {
+        const Object object(path, interfaces);
         // A modem that comes or goes has only some of its interfaces for a while.
         if (const Result<Properties> modem = object.properties(MM_DBUS_INTERFACE_MODEM))
             modems.emplace_back(object, modem.value());
+        if (modems.size() > MOST_MODEMS)
+            return notAvailable(std::string(MODEM_MANAGER.name) + " told of more than " +
+                                std::to_string(MOST_MODEMS) + " modems");
+    }
     std::sort(modems.begin(), modems.end(),
               [](const Modem& a, const Modem& b) { return orderOf(a) < orderOf(b); });
     return modems;

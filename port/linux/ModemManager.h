@@ -17,6 +17,16 @@ namespace port::linux_backend {
 
 constexpr BusObject MODEM_MANAGER = {MM_DBUS_SERVICE, MM_DBUS_PATH, MM_DBUS_INTERFACE,
                                      Start::Never};
+constexpr Names MODEM_INTERFACES = {MM_DBUS_INTERFACE_MODEM, MM_DBUS_INTERFACE_MODEM_MODEM3GPP,
+                                    MM_DBUS_INTERFACE_MODEM_MODEMCDMA,
+                                    MM_DBUS_INTERFACE_MODEM_MESSAGING, MM_DBUS_INTERFACE_SIM};
+constexpr ObjectService MODEMS = {MODEM_MANAGER,    MM_DBUS_PATH, "Version",
+                                  MODEM_INTERFACES, nullptr,      nullptr};
+/// Asks for the modems.
+Look modems();
+
+/// More modems than this are not believed.
+constexpr std::size_t MOST_MODEMS = 16;
 
 // What a state of registration means.
 struct Registration {
@@ -80,8 +90,8 @@ private:
     std::size_t activeSim_ = 0;
 };
 
-/// The modems in the reply to objectsBelow(MODEM_MANAGER), ordered by device.
-Result<std::vector<Modem>> modemsIn(const Reply& reply);
+/// The modems among the objects of MODEMS, ordered by device.
+Result<std::vector<Modem>> modemsIn(const Result<Objects>& objects);
 
 } // namespace port::linux_backend
 

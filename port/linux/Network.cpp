@@ -5,13 +5,9 @@
 #include <tuple>
 
 #include "BlueZ.h"
-#include "BusWatch.h"
 
 namespace port::linux_backend {
 namespace {
-
-// Two of these and connecting last less than two seconds.
-constexpr int ROUND_TRIP_TIMEOUT_MS = 700;
 
 LinkState linkStateOf(std::uint32_t deviceState)
 {
@@ -157,48 +153,44 @@ Result<CellularState> furthestOf(const std::vector<Modem>& modems)
     return furthest ? *furthest : notSupported("ModemManager knows no modem");
 }
 
-// What tells of a change of one of the answers. Devices, connections and settings that come and go
-// show in lists that the manager and its settings keep.
-std::vector<BusSignal> networkSignals()
-{
-    constexpr const char* PROPERTIES = "org.freedesktop.DBus.Properties";
-    constexpr const char* OBJECTS = "org.freedesktop.DBus.ObjectManager";
-    std::vector<BusSignal> signals = {
-        {NM_DBUS_SERVICE, NM_DBUS_INTERFACE_SETTINGS_CONNECTION, "Updated", nullptr},
-        {MM_DBUS_SERVICE, OBJECTS, nullptr, nullptr},
-        {BLUEZ.name, OBJECTS, nullptr, nullptr},
-    };
-    const std::pair<const char*, const char*> properties[] = {
-        {NM_DBUS_SERVICE, NM_DBUS_INTERFACE},
-        {NM_DBUS_SERVICE, NM_DBUS_INTERFACE_SETTINGS},
-        {NM_DBUS_SERVICE, NM_DBUS_INTERFACE_DEVICE},
-        {NM_DBUS_SERVICE, NM_DBUS_INTERFACE_ACTIVE_CONNECTION},
-        {MM_DBUS_SERVICE, MM_DBUS_INTERFACE_MODEM},
-        {MM_DBUS_SERVICE, MM_DBUS_INTERFACE_MODEM_MODEM3GPP},
-        {MM_DBUS_SERVICE, MM_DBUS_INTERFACE_MODEM_MODEMCDMA},
-        {BLUEZ.name, BLUEZ.interface},
-    };
-    for (const auto& [service, interface] : properties)
-        signals.push_back({service, PROPERTIES, "PropertiesChanged", interface});
-    return signals;
-}
-
 // The connection that is up, else the one that would come up by itself first.
 auto rankOf(const CellularConnection& connection)
 {
     return std::make_tuple(connection.isActive, connection.connectsItself, connection.priority);
 }
 
+Result<bool> isRoamingAllowed(const NetworkView& view)
+{
+    const auto connections = view.cellularConnections();
+    if (!connections)
+        return connections.error();
+    const auto used =
+        std::max_element(connections.value().begin(), connections.value().end(),
+                         [](const auto& a, const auto& b) { return rankOf(a) < rankOf(b); });
+    if (used == connections.value().end())
+        return notAvailable("NetworkManager has no cellular connection");
+    return !used->isHomeOnly;
+}
+
+Result<bool> isPacketDataOn(const NetworkView& view)
+{
+    const auto isOn = view.isOn(Radio::Cellular);
+    if (!isOn || !isOn.value())
+        return isOn;
+    if (view.hasActiveCellularConnection())
+        return true;
+    const auto connections = view.cellularConnections();
+    if (!connections)
+        return connections.error();
+    return std::any_of(connections.value().begin(), connections.value().end(),
+                       [](const auto& connection) { return connection.connectsItself; });
+}
+
 } // namespace
 
 Result<NetworkView> LinuxNetwork::view()
 {
-    return NetworkView::from(bus_.ask({networkObjects()}, ROUND_TRIP_TIMEOUT_MS).front());
-}
-
-Result<std::vector<CellularConnection>> LinuxNetwork::cellularConnections(const NetworkView& view)
-{
-    return view.cellularConnections(bus_.ask(view.connectionSettings(), ROUND_TRIP_TIMEOUT_MS));
+    return NetworkView::from(bus_.look({NETWORKS, nullptr}));
 }
 
 Result<Sourced<LinkState>> LinuxNetwork::wifi()
@@ -215,7 +207,7 @@ Result<Sourced<WifiConnection>> LinuxNetwork::wifiConnection()
 
 Result<Sourced<LinkState>> LinuxNetwork::bluetooth()
 {
-    const auto replies = bus_.ask({objectsBelow(BLUEZ), networkObjects()}, ROUND_TRIP_TIMEOUT_MS);
+    const auto replies = bus_.look({adapters(), {NETWORKS, nullptr}});
     if (!replies[0] && !kernel_.hasBluetoothAdapter())
         return notSupported(replies[0].error().reason + "; no Bluetooth adapter in /sys/class");
     const auto adapters = adaptersIn(replies[0]);
@@ -243,36 +235,8 @@ Result<Sourced<bool>> LinuxNetwork::flightMode()
     return flightModeIn(view());
 }
 
-Result<bool> LinuxNetwork::isRoamingAllowed(const NetworkView& view)
-{
-    const auto connections = cellularConnections(view);
-    if (!connections)
-        return connections.error();
-    const auto used =
-        std::max_element(connections.value().begin(), connections.value().end(),
-                         [](const auto& a, const auto& b) { return rankOf(a) < rankOf(b); });
-    if (used == connections.value().end())
-        return notAvailable("NetworkManager has no cellular connection");
-    return !used->isHomeOnly;
-}
-
-Result<bool> LinuxNetwork::isPacketDataOn(const NetworkView& view)
-{
-    const auto isOn = view.isOn(Radio::Cellular);
-    if (!isOn || !isOn.value())
-        return isOn;
-    if (view.hasActiveCellularConnection())
-        return true;
-    const auto connections = cellularConnections(view);
-    if (!connections)
-        return connections.error();
-    return std::any_of(connections.value().begin(), connections.value().end(),
-                       [](const auto& connection) { return connection.connectsItself; });
-}
-
 // A setting of the cellular radio, for a machine that has one.
-Result<Sourced<bool>>
-LinuxNetwork::cellularSetting(Result<bool> (LinuxNetwork::*read)(const NetworkView&))
+Result<Sourced<bool>> LinuxNetwork::cellularSetting(Result<bool> (*read)(const NetworkView&))
 {
     const auto now = view();
     if (!now)
@@ -280,12 +244,12 @@ LinuxNetwork::cellularSetting(Result<bool> (LinuxNetwork::*read)(const NetworkVi
     const auto isThere = now.value().isThere(Radio::Cellular);
     if (!isThere || !isThere.value())
         return isThere ? notSupported("NetworkManager knows no modem") : isThere.error();
-    return from(NETWORK_MANAGER, (this->*read)(now.value()));
+    return from(NETWORK_MANAGER, read(now.value()));
 }
 
 Result<Sourced<bool>> LinuxNetwork::packetData()
 {
-    return cellularSetting(&LinuxNetwork::isPacketDataOn);
+    return cellularSetting(&isPacketDataOn);
 }
 
 // The platform keeps the setting and its effect apart; NetworkManager keeps one of them.
@@ -296,11 +260,11 @@ Result<Sourced<bool>> LinuxNetwork::mobileData()
 
 Result<Sourced<bool>> LinuxNetwork::dataRoaming()
 {
-    return cellularSetting(&LinuxNetwork::isRoamingAllowed);
+    return cellularSetting(&isRoamingAllowed);
 }
 
 Result<CellularState> LinuxNetwork::cellularIn(const std::vector<Modem>& modems,
-                                               const Result<NetworkView>& view)
+                                               const Result<NetworkView>& view) const
 {
     const auto state = furthestOf(modems);
     if (!state || state.value() == CellularState::Connected)
@@ -319,10 +283,8 @@ Result<CellularState> LinuxNetwork::cellularIn(const std::vector<Modem>& modems,
 
 Result<Sourced<CellularState>> LinuxNetwork::cellular()
 {
-    const auto replies =
-        bus_.ask({objectsBelow(MODEM_MANAGER), networkObjects()}, ROUND_TRIP_TIMEOUT_MS);
-    const auto modems =
-        replies[0] ? modemsIn(replies[0].value()) : Result<std::vector<Modem>>(replies[0].error());
+    const auto replies = bus_.look({modems(), {NETWORKS, nullptr}});
+    const auto modems = modemsIn(replies[0]);
     if (!modems)
         return modems.error();
     return from(MODEM_MANAGER, cellularIn(modems.value(), NetworkView::from(replies[1])));
@@ -330,7 +292,7 @@ Result<Sourced<CellularState>> LinuxNetwork::cellular()
 
 std::unique_ptr<Watch> LinuxNetwork::watch(std::function<void()> changed)
 {
-    return std::make_unique<BusWatch>(networkSignals(), std::move(changed));
+    return bus_.watch({&NETWORKS, &MODEMS, &ADAPTERS}, std::move(changed));
 }
 
 } // namespace port::linux_backend

@@ -28,13 +28,10 @@ public:
 
 private:
     Result<NetworkView> view();
-    Result<std::vector<CellularConnection>> cellularConnections(const NetworkView& view);
-    Result<bool> isRoamingAllowed(const NetworkView& view);
-    Result<bool> isPacketDataOn(const NetworkView& view);
-    Result<Sourced<bool>> cellularSetting(Result<bool> (LinuxNetwork::*read)(const NetworkView&));
+    Result<Sourced<bool>> cellularSetting(Result<bool> (*read)(const NetworkView&));
     Result<Sourced<bool>> flightModeIn(const Result<NetworkView>& view) const;
     Result<CellularState> cellularIn(const std::vector<Modem>& modems,
-                                     const Result<NetworkView>& view);
+                                     const Result<NetworkView>& view) const;
 
     Bus& bus_;
     const KernelNetwork kernel_;

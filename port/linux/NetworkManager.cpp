@@ -6,10 +6,6 @@
 namespace port::linux_backend {
 namespace {
 
-// The object manager stands above the service's main object.
-constexpr BusObject MANAGER_OF_OBJECTS = {NETWORK_MANAGER.name, "/org/freedesktop",
-                                          "org.freedesktop.DBus.ObjectManager",
-                                          NETWORK_MANAGER.start};
 // A connection's type, and the name of that type's settings.
 constexpr char GSM[] = "gsm";
 constexpr char CDMA[] = "cdma";
@@ -56,7 +52,7 @@ Result<T> orDefault(const Properties& settings, Result<T> (Properties::*read)(co
 Result<std::optional<CellularConnection>> cellularConnection(const Object& settings, bool isActive)
 {
     using Found = std::optional<CellularConnection>;
-    const Result<Properties> common = settings.properties("connection");
+    const Result<Properties> common = settings.properties(settingsName("connection").c_str());
     const auto type = common ? common.value().text("type") : Result<std::string>(common.error());
     if (!type || !isCellular(type.value()))
         return type ? Result<Found>(Found()) : type.error();
@@ -65,7 +61,7 @@ Result<std::optional<CellularConnection>> cellularConnection(const Object& setti
     const Result<std::int32_t> priority =
         orDefault(common.value(), &Properties::signedNumber, "autoconnect-priority", 0);
     // Only these have the setting; it forbids roaming.
-    const Result<Properties> gsm = settings.properties(GSM);
+    const Result<Properties> gsm = settings.properties(settingsName(GSM).c_str());
     const Result<bool> isHomeOnly =
         gsm ? orDefault(gsm.value(), &Properties::flag, "home-only", false) : Result<bool>(false);
     if (!connectsItself || !priority || !isHomeOnly)
@@ -75,27 +71,18 @@ Result<std::optional<CellularConnection>> cellularConnection(const Object& setti
 
 } // namespace
 
-Question networkObjects()
+Result<NetworkView> NetworkView::from(const Result<Objects>& objects)
 {
-    return objectsBelow(MANAGER_OF_OBJECTS);
-}
-
-Result<NetworkView> NetworkView::from(const Result<Reply>& reply)
-{
-    if (!reply)
-        return reply.error();
-    const Result<std::vector<Object>> objects = objectsIn(reply.value().body);
     if (!objects)
-        return fromNetworkManager(objects.error());
+        return objects.error();
     return NetworkView(objects.value());
 }
 
 Result<Properties> NetworkView::at(const std::string& path, const char* interface) const
 {
-    for (const Object& object : objects_)
-        if (object.path() == path)
-            return object.properties(interface);
-    return notAvailable(path + " is not there");
+    const auto found = objects_->find(path);
+    return found != objects_->end() ? Object(path, found->second).properties(interface)
+                                    : notAvailable(path + " is not there");
 }
 
 Result<Properties> NetworkView::manager() const
@@ -143,7 +130,8 @@ Result<bool> NetworkView::isThere(Radio radio) const
 Result<std::vector<std::uint32_t>> NetworkView::statesOf(NMDeviceType type) const
 {
     std::vector<std::uint32_t> states;
-    for (const Object& object : objects_) {
+    for (const auto& [path, interfaces] : *objects_) {
+        const Object object(path, interfaces);
         const Result<Properties> device = object.properties(NM_DBUS_INTERFACE_DEVICE);
         if (!device)
             continue;
@@ -160,9 +148,10 @@ Result<std::vector<std::uint32_t>> NetworkView::statesOf(NMDeviceType type) cons
 
 // Whether a predicate holds for one of the connections that are up or coming up.
 template <typename Predicate>
-bool anyActive(const std::vector<Object>& objects, Predicate holds)
+bool anyActive(const Tree& objects, Predicate holds)
 {
-    return std::any_of(objects.begin(), objects.end(), [holds](const Object& object) {
+    return std::any_of(objects.begin(), objects.end(), [holds](const auto& each) {
+        const Object object(each.first, each.second);
         const auto active = object.properties(NM_DBUS_INTERFACE_ACTIVE_CONNECTION);
         const auto state =
             active ? active.value().number("State") : Result<std::uint32_t>(active.error());
@@ -175,7 +164,7 @@ bool anyActive(const std::vector<Object>& objects, Predicate holds)
 
 bool NetworkView::hasActiveCellularConnection() const
 {
-    return anyActive(objects_, [](const Properties& connection) {
+    return anyActive(*objects_, [](const Properties& connection) {
         const auto type = connection.text("Type");
         return type && isCellular(type.value());
     });
@@ -183,54 +172,33 @@ bool NetworkView::hasActiveCellularConnection() const
 
 bool NetworkView::isActive(const std::string& connection) const
 {
-    return anyActive(objects_, [&connection](const Properties& active) {
+    return anyActive(*objects_, [&connection](const Properties& active) {
         const auto path = active.path("Connection");
         return path && path.value() == connection;
     });
 }
 
-std::vector<std::string> NetworkView::connectionPaths() const
+Result<std::vector<CellularConnection>> NetworkView::cellularConnections() const
 {
-    std::vector<std::string> paths;
-    for (const Object& object : objects_)
-        if (object.has(NM_DBUS_INTERFACE_SETTINGS_CONNECTION))
-            paths.push_back(object.path());
-    return paths;
-}
-
-std::vector<Question> NetworkView::connectionSettings() const
-{
-    std::vector<Question> questions;
-    for (const Object& object : objects_)
-        if (object.has(NM_DBUS_INTERFACE_SETTINGS_CONNECTION))
-            questions.push_back({{NETWORK_MANAGER.name, object.path().c_str(),
-                                  NM_DBUS_INTERFACE_SETTINGS_CONNECTION, NETWORK_MANAGER.start},
-                                 "GetSettings",
-                                 nullptr,
-                                 "(a{sa{sv}})"});
-    return questions;
-}
-
-Result<std::vector<CellularConnection>>
-NetworkView::cellularConnections(const std::vector<Result<Reply>>& replies) const
-{
-    const std::vector<std::string> paths = connectionPaths();
     std::vector<CellularConnection> found;
-    for (std::size_t i = 0; i < replies.size(); ++i) {
-        if (!replies[i])
+    bool isAnyKnown = false;
+    bool isAnyThere = false;
+    for (const auto& [path, interfaces] : *objects_) {
+        const Object settings(path, interfaces);
+        if (!settings.has(NM_DBUS_INTERFACE_SETTINGS_CONNECTION))
             continue;
-        const Object settings(paths[i],
-                              share(g_variant_get_child_value(replies[i].value().body.get(), 0)));
-        const auto connection = cellularConnection(settings, isActive(paths[i]));
+        isAnyThere = true;
+        if (!settings.has(settingsName("connection").c_str()))
+            continue;
+        isAnyKnown = true;
+        const auto connection = cellularConnection(settings, isActive(path));
         if (!connection)
             return fromNetworkManager(connection.error());
         if (connection.value())
             found.push_back(*connection.value());
     }
-    const bool nobodyAnswered =
-        std::none_of(replies.begin(), replies.end(), [](const auto& reply) { return bool(reply); });
-    if (!replies.empty() && nobodyAnswered)
-        return replies.front().error();
+    if (isAnyThere && !isAnyKnown)
+        return notAvailable("NetworkManager tells the settings of no connection");
     return found;
 }
 
@@ -257,12 +225,6 @@ std::optional<std::string> NetworkView::primaryModem() const
         return std::nullopt;
     const auto connection = at(primary.value(), NM_DBUS_INTERFACE_ACTIVE_CONNECTION);
     return connection ? deviceBelow(connection.value()) : std::nullopt;
-}
-
-std::optional<std::string> primaryModemIn(const Reply& reply)
-{
-    const Result<NetworkView> view = NetworkView::from(reply);
-    return view ? view.value().primaryModem() : std::nullopt;
 }
 
 } // namespace port::linux_backend

@@ -17,8 +17,16 @@ namespace port::linux_backend {
 constexpr BusObject NETWORK_MANAGER = {NM_DBUS_SERVICE, NM_DBUS_PATH, NM_DBUS_INTERFACE,
                                        Start::Never};
 
-/// Asks for all objects of NetworkManager.
-Question networkObjects();
+constexpr Names NETWORK_INTERFACES = {NM_DBUS_INTERFACE, NM_DBUS_INTERFACE_DEVICE,
+                                      NM_DBUS_INTERFACE_ACTIVE_CONNECTION,
+                                      NM_DBUS_INTERFACE_SETTINGS_CONNECTION};
+// The object manager stands above the service's main object.
+constexpr ObjectService NETWORKS = {NETWORK_MANAGER,
+                                    "/org/freedesktop",
+                                    "WirelessEnabled",
+                                    NETWORK_INTERFACES,
+                                    NM_DBUS_INTERFACE_SETTINGS_CONNECTION,
+                                    "Updated"};
 
 enum class Radio { Wifi, Cellular };
 
@@ -33,8 +41,8 @@ struct CellularConnection {
 // NetworkManager as it was when it told of itself.
 class NetworkView {
 public:
-    /// From the reply to networkObjects().
-    static Result<NetworkView> from(const Result<Reply>& reply);
+    /// From the objects of NETWORKS.
+    static Result<NetworkView> from(const Result<Objects>& objects);
 
     /// Whether networking as a whole is switched on.
     Result<bool> isOn() const;
@@ -48,32 +56,24 @@ public:
     /// Whether a cellular connection is up, or coming up.
     bool hasActiveCellularConnection() const;
 
-    /// Asks for the settings of every connection, which are not among the objects.
-    std::vector<Question> connectionSettings() const;
-    /// The cellular ones, from the replies to those questions. Connections that went away in
-    /// between are left out.
-    Result<std::vector<CellularConnection>>
-    cellularConnections(const std::vector<Result<Reply>>& replies) const;
+    /// Those whose settings may be read.
+    Result<std::vector<CellularConnection>> cellularConnections() const;
 
     /// The ModemManager object of the modem over which this machine's traffic goes; nothing when it
     /// goes elsewhere.
     std::optional<std::string> primaryModem() const;
 
 private:
-    explicit NetworkView(std::vector<Object> objects) : objects_(std::move(objects)) {}
+    explicit NetworkView(Objects objects) : objects_(std::move(objects)) {}
 
     Result<Properties> manager() const;
     Result<bool> managerFlag(const char* name) const;
     Result<Properties> at(const std::string& path, const char* interface) const;
-    std::vector<std::string> connectionPaths() const;
     bool isActive(const std::string& connection) const;
     std::optional<std::string> deviceBelow(const Properties& connection) const;
 
-    std::vector<Object> objects_;
+    Objects objects_;
 };
-
-/// The same from the reply to networkObjects().
-std::optional<std::string> primaryModemIn(const Reply& reply);
 
 } // namespace port::linux_backend
 

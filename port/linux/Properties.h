@@ -5,20 +5,41 @@
 #define PORT_LINUX_PROPERTIES_H
 
 #include <cstdint>
+#include <map>
+#include <memory>
 #include <string>
 #include <utility>
+#include <variant>
 #include <vector>
 
 #include "../backend/Result.h"
-#include "../common/GLibTypes.h"
 
 namespace port::linux_backend {
+
+struct ObjectPath {
+    std::string text;
+};
+inline bool operator==(const ObjectPath& a, const ObjectPath& b)
+{
+    return a.text == b.text;
+}
+
+// The value of a property; of the types that no question needs only that it is there is kept.
+struct OtherValue {};
+inline bool operator==(const OtherValue&, const OtherValue&)
+{
+    return true;
+}
+using Value =
+    std::variant<OtherValue, bool, std::int32_t, std::uint32_t, std::string, ObjectPath,
+                 std::vector<std::string>, std::vector<ObjectPath>,
+                 std::map<std::uint32_t, std::uint32_t>, std::uint8_t, std::vector<std::uint8_t>>;
+using PropertyMap = std::map<std::string, Value>;
 
 // The properties of one interface of an object.
 class Properties {
 public:
-    /// `values` is an a{sv}.
-    explicit Properties(Variant values) : values_(std::move(values)) {}
+    explicit Properties(std::shared_ptr<const PropertyMap> values) : values_(std::move(values)) {}
 
     bool has(const char* name) const;
     Result<bool> flag(const char* name) const;
@@ -33,21 +54,22 @@ public:
     Result<std::uint32_t> numberOf(const char* name, std::uint32_t key) const;
 
 private:
-    Result<Variant> value(const char* name, const char* type, const char* noun) const;
-    Result<std::vector<std::string>> list(const char* name, const char* type,
-                                          const char* noun) const;
+    template <typename T>
+    Result<const T*> value(const char* name, const char* noun) const;
 
-    Variant values_;
+    std::shared_ptr<const PropertyMap> values_;
 };
 
-/// The properties in the reply of GetAll, (a{sv}).
-Properties propertiesIn(const Variant& reply);
+// The interfaces of an object, and all objects of a service by their paths. What was handed out
+// never changes: a change makes another map.
+using Interfaces = std::map<std::string, std::shared_ptr<const PropertyMap>>;
+using Tree = std::map<std::string, Interfaces>;
+using Objects = std::shared_ptr<const Tree>;
 
 // An object and those of its interfaces that it has at the moment.
 class Object {
 public:
-    /// `interfaces` is an a{sa{sv}}.
-    Object(std::string path, Variant interfaces)
+    Object(std::string path, Interfaces interfaces)
         : path_(std::move(path)), interfaces_(std::move(interfaces))
     {
     }
@@ -61,14 +83,8 @@ public:
 
 private:
     std::string path_;
-    Variant interfaces_;
+    Interfaces interfaces_;
 };
-
-/// More objects than this are not believed.
-constexpr std::size_t MOST_OBJECTS = 1000;
-
-/// The objects in the reply of GetManagedObjects, (a{oa{sa{sv}}}).
-Result<std::vector<Object>> objectsIn(const Variant& reply);
 
 } // namespace port::linux_backend
 

@@ -42,9 +42,6 @@ private:
 
 namespace {
 
-// When a second question follows the first: connecting and both last two seconds at most.
-constexpr int SECOND_CALL_TIMEOUT_MS = 500;
-
 // What is known about a card, and what to tell whoever wants to read it.
 struct Finding {
     CardStatus status;
@@ -291,21 +288,35 @@ Result<Sourced<T>> sourced(const SlotName& name, const Result<T>& answer)
     return Sourced<T>{answer.value(), sourceOf(name)};
 }
 
-// A SIM is no part of the tree of modems: its object is asked itself.
-Question aboutSim(const std::string& path)
+// The SIM's object, which is among the others when it was asked for.
+Result<Imsi> imsiOf(const Objects& objects, const std::string& path)
 {
-    return propertiesOf(
-        {MODEM_MANAGER.name, path.c_str(), MM_DBUS_INTERFACE_SIM, MODEM_MANAGER.start});
+    const auto found = objects->find(path);
+    const auto sim = found != objects->end()
+                         ? Object(path, found->second).properties(MM_DBUS_INTERFACE_SIM)
+                         : notAvailable("the SIM card is gone");
+    return sim ? imsiIn(sim.value()) : sim.error();
 }
 
-// A service that was started again gives its old paths to other SIMs.
-Result<Imsi> imsiOf(const Result<Reply>& sim, const std::string& owner)
+Result<std::vector<Slot>> slotsIn(const Result<Objects>& objects)
 {
-    if (!sim)
-        return sim.error();
-    if (sim.value().sender != owner)
-        return notAvailable(std::string(MODEM_MANAGER.name) + " was started again meanwhile");
-    return imsiIn(propertiesIn(sim.value().body));
+    const auto modems = modemsIn(objects);
+    return modems ? Result<std::vector<Slot>>(slotsOf(modems.value())) : modems.error();
+}
+
+// One property of a slot's modem; of its SIM all.
+std::function<std::vector<Deciding>(const Tree&)>
+decidingOf(const SlotName& name, const char* interface, const char* property)
+{
+    return [=](const Tree& tree) -> std::vector<Deciding> {
+        const auto slot = find(slotsIn(std::make_shared<const Tree>(tree)), name);
+        if (!slot)
+            return {};
+        const bool isSim = *property == '\0';
+        if (isSim && obstacleOf(slot.value()))
+            return {};
+        return {{isSim ? slot.value().sim() : slot.value().modem().path(), interface, property}};
+    };
 }
 
 std::optional<int> slotOfModem(const std::vector<Slot>& slots, const std::string& modem)
@@ -318,48 +329,18 @@ std::optional<int> slotOfModem(const std::vector<Slot>& slots, const std::string
 
 } // namespace
 
-std::string LinuxTelephony::lastSim(const SlotName& name)
-{
-    const std::lock_guard<std::mutex> lock(mutex_);
-    const auto found = sims_.find(name);
-    return found != sims_.end() ? found->second : "";
-}
-
-void LinuxTelephony::remember(const std::vector<Slot>& slots)
-{
-    const std::lock_guard<std::mutex> lock(mutex_);
-    sims_.clear();
-    for (const Slot& slot : slots)
-        sims_[slot.name()] = slot.sim();
-}
-
-Result<std::vector<Slot>> LinuxTelephony::slotsIn(const Result<Reply>& modems)
-{
-    if (!modems)
-        return modems.error();
-    const Result<std::vector<Modem>> known = modemsIn(modems.value());
-    if (!known)
-        return known.error();
-    std::vector<Slot> slots = slotsOf(known.value());
-    remember(slots);
-    return slots;
-}
-
-Result<std::vector<Slot>> LinuxTelephony::slotsNow()
-{
-    return slotsIn(bus_.ask(objectsBelow(MODEM_MANAGER)));
-}
-
 template <typename T>
-Result<Sourced<T>> LinuxTelephony::about(const SlotName& name, Result<T> (*read)(const Slot&))
+Result<Sourced<T>> LinuxTelephony::about(const SlotName& name, const char* interface,
+                                         const char* property, Result<T> (*read)(const Slot&))
 {
-    const Result<Slot> slot = find(slotsNow(), name);
+    const auto slots = slotsIn(bus_.look({MODEMS, decidingOf(name, interface, property)}));
+    const Result<Slot> slot = find(slots, name);
     return slot ? sourced(name, read(slot.value())) : slot.error();
 }
 
 Result<Sourced<std::vector<SlotName>>> LinuxTelephony::slots()
 {
-    const Result<std::vector<Slot>> slots = slotsNow();
+    const auto slots = slotsIn(bus_.look(modems()));
     if (!slots)
         return slots.error();
     Sourced<std::vector<SlotName>> names{{}, MODEM_MANAGER.name};
@@ -370,65 +351,54 @@ Result<Sourced<std::vector<SlotName>>> LinuxTelephony::slots()
 
 Result<Sourced<Card>> LinuxTelephony::card(const SlotName& name)
 {
-    return about(name, cardOf);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, cardOf);
 }
 
 Result<Sourced<Imsi>> LinuxTelephony::imsi(const SlotName& name)
 {
-    // Where the SIM was is most likely where it still is, so that it is asked in the same round
-    // trip; what it says counts only when it is.
-    const std::string lastPath = lastSim(name);
-    std::vector<Question> questions = {objectsBelow(MODEM_MANAGER)};
-    if (!lastPath.empty())
-        questions.push_back(aboutSim(lastPath));
-    const std::vector<Result<Reply>> replies = bus_.ask(questions);
-    const Result<Slot> slot = find(slotsIn(replies.front()), name);
+    const auto objects = bus_.look({MODEMS, decidingOf(name, MM_DBUS_INTERFACE_SIM, "")});
+    const Result<Slot> slot = find(slotsIn(objects), name);
     if (!slot)
         return slot.error();
     if (const auto obstacle = obstacleOf(slot.value()))
         return *obstacle;
-    const std::string& path = slot.value().sim();
-    const Result<Reply> sim = path == lastPath
-                                  ? replies.back()
-                                  : bus_.ask({aboutSim(path)}, SECOND_CALL_TIMEOUT_MS).front();
-    return sourced(name, imsiOf(sim, replies.front().value().sender));
+    return sourced(name, imsiOf(objects.value(), slot.value().sim()));
 }
 
 Result<Sourced<std::optional<std::string>>> LinuxTelephony::number(const SlotName& name)
 {
-    return about(name, numberOf);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_OWNNUMBERS, numberOf);
 }
 
 Result<Fact> LinuxTelephony::imei(const SlotName& name)
 {
-    return about(name, imeiOf);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_EQUIPMENTIDENTIFIER, imeiOf);
 }
 
 Result<Sourced<Service>> LinuxTelephony::service(const SlotName& name)
 {
-    return about(name, serviceOf);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, serviceOf);
 }
 
 Result<Sourced<bool>> LinuxTelephony::roaming(const SlotName& name)
 {
-    return about(name, isRoaming);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, isRoaming);
 }
 
 Result<Sourced<bool>> LinuxTelephony::smsReady(const SlotName& name)
 {
-    return about(name, isSmsReady);
+    return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, isSmsReady);
 }
 
 Result<Sourced<Subscriptions>> LinuxTelephony::subscriptions()
 {
-    const std::vector<Result<Reply>> replies =
-        bus_.ask({objectsBelow(MODEM_MANAGER), networkObjects()});
-    const Result<std::vector<Slot>> slots = slotsIn(replies.front());
+    const auto replies = bus_.look({modems(), {NETWORKS, nullptr}});
+    const auto slots = slotsIn(replies.front());
     if (!slots)
         return slots.error();
     Sourced<Subscriptions> subscriptions{{}, MODEM_MANAGER.name};
-    const std::optional<std::string> modem =
-        replies.back() ? primaryModemIn(replies.back().value()) : std::nullopt;
+    const Result<NetworkView> view = NetworkView::from(replies.back());
+    const auto modem = view ? view.value().primaryModem() : std::nullopt;
     if (modem)
         subscriptions.value.data = slotOfModem(slots.value(), *modem);
     if (subscriptions.value.data)

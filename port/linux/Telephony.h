@@ -1,13 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // SIM slots, cards and modems from ModemManager.
 //
-// Each question reads the whole tree of modems anew, in one round trip, so that an answer is never
-// older than its question and never mixes two modems.
+// Each question asks for the property that decides it, in one round trip, and takes the rest from
+// the picture of the modems that was true then: an answer never mixes two modems.
 #ifndef PORT_LINUX_TELEPHONY_H
 #define PORT_LINUX_TELEPHONY_H
-
-#include <map>
-#include <mutex>
 
 #include "../backend/Telephony.h"
 #include "Bus.h"
@@ -32,15 +29,10 @@ public:
 
 private:
     template <typename T>
-    Result<Sourced<T>> about(const SlotName& name, Result<T> (*read)(const Slot&));
-    Result<std::vector<Slot>> slotsIn(const Result<Reply>& modems);
-    Result<std::vector<Slot>> slotsNow();
-    std::string lastSim(const SlotName& name);
-    void remember(const std::vector<Slot>& slots);
+    Result<Sourced<T>> about(const SlotName& name, const char* interface, const char* property,
+                             Result<T> (*read)(const Slot&));
 
     Bus& bus_;
-    std::mutex mutex_;
-    std::map<SlotName, std::string> sims_; // the objects of the SIMs, as last seen
 };
 
 } // namespace port::linux_backend

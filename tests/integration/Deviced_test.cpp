@@ -35,8 +35,8 @@ constexpr int PATIENCE_MS = 10000;
 class Client {
 public:
     explicit Client(const std::string& address)
-        : connection_(g_dbus_connection_new_for_address_sync(
-              address.c_str(), port::linux_backend::BUS_CLIENT, nullptr, nullptr, nullptr))
+        : connection_(g_dbus_connection_new_for_address_sync(address.c_str(), BUS_CLIENT, nullptr,
+                                                             nullptr, nullptr))
     {
     }
 

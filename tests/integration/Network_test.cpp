@@ -6,6 +6,7 @@
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
+#include <numeric>
 #include <optional>
 #include <thread>
 
@@ -149,9 +150,12 @@ protected:
     void serve(const Networks& networks)
     {
         serve(networkManager, NM, objectsOf(networks));
-        for (std::size_t i = 0; i < networks.connections.size(); ++i)
+        for (std::size_t i = 0; i < networks.connections.size(); ++i) {
             networkManager->answerTo("GetSettings", "({" + networks.connections[i] + "},)",
                                      connectionPath(i));
+            networkManager->emit(connectionPath(i), std::string(NM) + ".Settings.Connection",
+                                 "Updated", "()");
+        }
     }
     // One modem for each text of properties; "|" begins those of Modem3gpp.
     void serveModems(const std::vector<std::string>& modems)
@@ -547,7 +551,7 @@ TEST_F(NetworkTest, ServiceThatKeepsSilentIsNotWaitedForLong)
     networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
     serve(networkManager, NM, objectsOf(networks)).whenAsked([] {}, "GetSettings");
     EXPECT_LT(millisecondsOf([this] {
-                  EXPECT_EQ("error: org.freedesktop.NetworkManager did not answer in time",
+                  EXPECT_EQ("error: NetworkManager tells the settings of no connection",
                             show(network.dataRoaming()));
               }),
               2000);
@@ -580,8 +584,11 @@ TEST_F(NetworkTest, SilentServicesAreNotWaitedForLong)
     serveAdapters({});
     for (const auto* const service : {&networkManager, &modemManager, &bluez})
         (*service)->whenAsked([] {}, "GetManagedObjects");
-    EXPECT_THAT(timesOfAllQuestions(network),
-                testing::Each(AllOf(testing::Ge(500), testing::Lt(2000))));
+    const std::vector<int> times = timesOfAllQuestions(network);
+    EXPECT_THAT(times, testing::Each(testing::Lt(2000)));
+    // Each of them was waited for once.
+    EXPECT_LT(std::accumulate(times.begin(), times.end(), 0), 4000);
+    EXPECT_GE(times.front(), 500);
 }
 
 // Counts calls, and lets a test wait for one.
@@ -633,36 +640,41 @@ protected:
 
 TEST_F(WatchTest, EveryKindOfChangeIsTold)
 {
-    serve(Networks());
-    serveModems({});
-    serveAdapters({});
+    Networks networks;
+    networks.devices = {{WIFI, 30}};
+    networks.connections = {"'connection': {'type': <'vpn'>}", "'connection': {'type': <'gsm'>}"};
+    networks.active = 1;
+    serve(networks);
+    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
+    serveAdapters({"'Powered': <true>"});
     begin();
     const struct {
         std::unique_ptr<ScriptedService>& service;
+        const char* path;
         const char* interface;
     } rows[] = {
-        {networkManager, "org.freedesktop.NetworkManager"},
-        {networkManager, "org.freedesktop.NetworkManager.Device"},
-        {networkManager, "org.freedesktop.NetworkManager.Connection.Active"},
-        {networkManager, "org.freedesktop.NetworkManager.Settings"},
-        {modemManager, "org.freedesktop.ModemManager1.Modem"},
-        {modemManager, "org.freedesktop.ModemManager1.Modem.Modem3gpp"},
-        {bluez, "org.bluez.Adapter1"},
+        {networkManager, NM_PATH, "org.freedesktop.NetworkManager"},
+        {networkManager, "/org/freedesktop/NetworkManager/Devices/0",
+         "org.freedesktop.NetworkManager.Device"},
+        {networkManager, "/org/freedesktop/NetworkManager/ActiveConnection/1",
+         "org.freedesktop.NetworkManager.Connection.Active"},
+        {modemManager, "/org/freedesktop/ModemManager1/Modem/0",
+         "org.freedesktop.ModemManager1.Modem"},
+        {modemManager, "/org/freedesktop/ModemManager1/Modem/0",
+         "org.freedesktop.ModemManager1.Modem.Modem3gpp"},
+        {bluez, "/org/bluez/hci0", "org.bluez.Adapter1"},
     };
     for (const auto& row : rows)
         EXPECT_TRUE(isTold([&row] {
-            row.service->emit("/any", "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                              std::string("('") + row.interface + "', {'X': <1>}, @as [])");
+            row.service->emit(row.path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                              std::string("('") + row.interface + "', {'X': <uint32 1>}, @as [])");
         })) << row.interface;
     EXPECT_TRUE(isTold([this] {
         networkManager->emit(connectionPath(1), std::string(NM) + ".Settings.Connection", "Updated",
                              "()");
     }));
-    for (const auto* const service : {&modemManager, &bluez})
-        EXPECT_TRUE(isTold([service] {
-            (*service)->emit("/", "org.freedesktop.DBus.ObjectManager", "InterfacesRemoved",
-                             "(@o '/x', ['y'])");
-        }));
+    EXPECT_TRUE(isTold([this] { serveModems({}); }));
+    EXPECT_TRUE(isTold([this] { serveAdapters({}); }));
 }
 
 TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)
@@ -673,7 +685,7 @@ TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)
     EXPECT_TRUE(isTold([this] { serve(Networks()); }));
     EXPECT_TRUE(isTold([this] {
         networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+                             "('org.freedesktop.NetworkManager', {'X': <uint32 1>}, @as [])");
     }));
 }
 
@@ -690,10 +702,8 @@ TEST_F(WatchTest, BusThatGoesAndComesIsTold)
 TEST_F(WatchTest, BusThatIsNotThereYetIsFound)
 {
     daemon.kill();
-    watch = network.watch([this] { calls.note(); });
-    EXPECT_EQ(0, calls.count());
-    daemon.start();
-    EXPECT_TRUE(calls.waitFor(1));
+    begin(); // what the kernel knows is told without a bus
+    EXPECT_TRUE(isTold([this] { daemon.start(); }));
 }
 
 TEST_F(WatchTest, BurstIsToldInFewCalls)
@@ -761,7 +771,6 @@ TEST_F(WatchTest, EndOfAWatchThatNeverReachedTheBusIsQuick)
     watch = network.watch([this] { calls.note(); });
     EXPECT_LT(millisecondsOf([this] { watch.reset(); }), 1000);
     daemon.thaw();
-    EXPECT_EQ(0, calls.count());
 }
 
 } // namespace

@@ -536,7 +536,8 @@ TEST_F(ScriptedModemsTest, MoreObjectsThanCanBeAreNotBelieved)
     while (objects.size() <= MOST_OBJECTS)
         objects.push_back("objectpath '/o" + std::to_string(objects.size()) + "': @a{sa{sv}} {}");
     service->answerTo(TREE, treeOf(objects));
-    EXPECT_EQ("org.freedesktop.ModemManager1 told of 1001 objects", reasonOf(telephony.slots()));
+    EXPECT_EQ("org.freedesktop.ModemManager1 told of more than 1000 objects",
+              reasonOf(telephony.slots()));
     objects.pop_back();
     service->answerTo(TREE, treeOf(objects));
     EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
@@ -623,8 +624,10 @@ TEST_F(ScriptedModemsTest, CardOfAServiceThatTookOverIsNotMistaken)
         return ScriptedService::reply(question, treeOf({FakeModem().text()}));
     });
     service->answer(simOf("<'999990123456789'>", "<'99999'>"));
-    EXPECT_EQ("error: org.freedesktop.ModemManager1 was started again meanwhile",
-              show(telephony.imsi(HOME)));
+    // All of it is one service's, or there is none.
+    EXPECT_THAT(show(telephony.imsi(HOME)),
+                testing::AnyOf("999 99 0123456789",
+                               "error: org.freedesktop.ModemManager1 was started again meanwhile"));
 }
 
 TEST_F(ScriptedModemsTest, CardThatMovedToAnotherObjectIsFollowed)
@@ -639,12 +642,9 @@ TEST_F(ScriptedModemsTest, EveryQuestionIsOneRoundTrip)
 {
     telephony.slots();
     for (const auto& question : telephonyQuestions()) {
-        const bool hasTwoParts = std::string(question.name) == "imsi";
         const int before = service->timesAsked();
-        // Both parts of a question are on their way before either is answered.
-        service->answerOnlyTogether(hasTwoParts ? 2 : 1);
         EXPECT_EQ(std::nullopt, question.ask(telephony, HOME)) << question.name;
-        EXPECT_EQ(hasTwoParts ? 2 : 1, service->timesAsked() - before) << question.name;
+        EXPECT_EQ(1, service->timesAsked() - before) << question.name;
     }
 }
 

@@ -39,10 +39,8 @@ GDBusConnection* connectTo(const std::string& address)
 std::string settledModem(const std::string& device)
 {
     Bus bus;
-    const auto reply = bus.ask(port::linux_backend::objectsBelow(MODEM_MANAGER));
-    if (!reply)
-        return "";
-    const auto modems = port::linux_backend::modemsIn(reply.value());
+    const auto modems =
+        port::linux_backend::modemsIn(bus.look({port::linux_backend::MODEMS, nullptr}));
     if (!modems)
         return "";
     for (const Modem& modem : modems.value()) {

@@ -13,8 +13,8 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include "linux/Bus.h"
 #include "support/Child.h"
+#include "support/PrivateBus.h"
 #include "support/Wait.h"
 
 namespace {
@@ -53,7 +53,7 @@ bool enterEmptyNetwork()
 GDBusConnection* connectTo(const std::string& address)
 {
     GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
-        address.c_str(), port::linux_backend::BUS_CLIENT, nullptr, nullptr, nullptr);
+        address.c_str(), BUS_CLIENT, nullptr, nullptr, nullptr);
     if (connection == nullptr)
         throw std::runtime_error("no bus at " + address);
     return connection;

@@ -6,9 +6,14 @@
 #include <string>
 #include <vector>
 
+#include <gio/gio.h>
 #include <sys/types.h>
 
 #include "support/TemporaryTree.h"
+
+// Of a connection to a bus.
+constexpr auto BUS_CLIENT = static_cast<GDBusConnectionFlags>(
+    G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
 
 /// A dbus-daemon of type system on a private socket. It is ready when start() returns. While it
 /// lives, DBUS_SYSTEM_BUS_ADDRESS of this process names it. At the end it is stopped, and so is

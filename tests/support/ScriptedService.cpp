@@ -2,6 +2,7 @@
 #include "support/ScriptedService.h"
 
 #include <stdexcept>
+#include <utility>
 
 namespace {
 
@@ -40,6 +41,8 @@ void ownName(GDBusConnection* connection, const std::string& name)
 }
 
 const char GET_ALL[] = "GetAll";
+const char OBJECTS[] = "GetManagedObjects";
+const char OBJECT_MANAGER[] = "org.freedesktop.DBus.ObjectManager";
 
 // GLib hands the state to the connection's thread through a lock that the thread sanitizer does not
 // see, and telling that apart would cost the time of the one who asks. This one it sees.
@@ -60,6 +63,32 @@ std::shared_ptr<GVariant> parsed(const std::string& body)
     if (value == nullptr)
         throw std::runtime_error("no GVariant text: " + body);
     return std::shared_ptr<GVariant>(g_variant_ref_sink(value), g_variant_unref);
+}
+
+std::shared_ptr<GVariant> share(GVariant* value)
+{
+    return value != nullptr ? std::shared_ptr<GVariant>(value, g_variant_unref) : nullptr;
+}
+
+std::shared_ptr<GVariant> lookUp(const std::shared_ptr<GVariant>& table, const char* key)
+{
+    return table != nullptr ? share(g_variant_lookup_value(table.get(), key, nullptr)) : nullptr;
+}
+
+// By path, the interfaces; of the last where one stands there twice.
+std::map<std::string, std::shared_ptr<GVariant>> objectsIn(const std::shared_ptr<GVariant>& body)
+{
+    std::map<std::string, std::shared_ptr<GVariant>> objects;
+    if (body == nullptr || !g_variant_is_of_type(body.get(), G_VARIANT_TYPE("(a{oa{sa{sv}}})")))
+        return objects;
+    const auto all = share(g_variant_get_child_value(body.get(), 0));
+    for (std::size_t i = 0; i < g_variant_n_children(all.get()); ++i) {
+        const auto entry = share(g_variant_get_child_value(all.get(), i));
+        const auto path = share(g_variant_get_child_value(entry.get(), 0));
+        objects[g_variant_get_string(path.get(), nullptr)] =
+            share(g_variant_get_child_value(entry.get(), 1));
+    }
+    return objects;
 }
 
 GDBusMessage* replyWith(GDBusMessage* question, GVariant* body)
@@ -102,14 +131,34 @@ bool ScriptedService::State::answer(GDBusMessage* question, std::vector<GDBusMes
     auto script = scripts.find(keyOf(method, g_dbus_message_get_path(question)));
     if (script == scripts.end())
         script = scripts.find(method);
-    if (script == scripts.end())
+    const bool isGet = script == scripts.end() && method == "Get" && scripts.count(OBJECTS) != 0;
+    if (script == scripts.end() && !isGet)
         return false;
     ++timesAsked;
-    if (GDBusMessage* const answer = script->second(question))
+    if (GDBusMessage* const answer = isGet ? get(question) : script->second(question))
         heldBack.push_back(answer);
     if (heldBack.size() >= together)
         due.swap(heldBack);
     return true;
+}
+
+// A property of what the service has; where it has no objects, what it answers to whoever asks for
+// them.
+GDBusMessage* ScriptedService::State::get(GDBusMessage* question)
+{
+    if (objects == nullptr)
+        return scripts[OBJECTS](question);
+    const char* interface = nullptr;
+    const char* property = nullptr;
+    g_variant_get(g_dbus_message_get_body(question), "(&s&s)", &interface, &property);
+    const auto all = objectsIn(objects);
+    const auto object = all.find(g_dbus_message_get_path(question));
+    const auto value =
+        object != all.end() ? lookUp(lookUp(object->second, interface), property) : nullptr;
+    if (value == nullptr)
+        return g_dbus_message_new_method_error_literal(
+            question, "org.freedesktop.DBus.Error.UnknownObject", "no such object");
+    return replyWith(question, g_variant_new("(v)", value.get()));
 }
 
 // Runs on the connection's own thread, so a test may block in a call meanwhile.
@@ -150,8 +199,68 @@ void ScriptedService::releaseState(gpointer state)
 
 void ScriptedService::follow(const std::string& method, Script script, const std::string& path)
 {
-    const std::lock_guard<std::mutex> lock(state_->mutex);
-    state_->scripts[keyOf(method, path)] = std::move(script);
+    bool isOther = false;
+    {
+        const std::lock_guard<std::mutex> lock(state_->mutex);
+        state_->scripts[keyOf(method, path)] = std::move(script);
+        if (method == OBJECTS)
+            isOther = std::exchange(state_->objects, nullptr) != nullptr;
+    }
+    if (isOther)
+        startAgain();
+}
+
+// Whoever knew what it had before learns that this is over.
+void ScriptedService::startAgain()
+{
+    GVariant* const released =
+        g_dbus_connection_call_sync(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
+                                    g_variant_new("(s)", name_.c_str()), nullptr,
+                                    G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
+    if (released != nullptr)
+        g_variant_unref(released);
+    ownName(connection_, name_);
+}
+
+void ScriptedService::send(const std::string& path, const char* interface, const char* signal,
+                           GVariant* body)
+{
+    g_dbus_connection_emit_signal(connection_, nullptr, path.c_str(), interface, signal, body,
+                                  nullptr);
+}
+
+// As object managers do: changed properties by themselves where only these changed.
+void ScriptedService::tellChange(const std::shared_ptr<GVariant>& before,
+                                 const std::shared_ptr<GVariant>& now)
+{
+    const auto was = objectsIn(before);
+    const auto is = objectsIn(now);
+    for (const auto& [path, interfaces] : was) {
+        const auto there = is.find(path);
+        GVariantBuilder gone;
+        g_variant_builder_init(&gone, G_VARIANT_TYPE("as"));
+        for (std::size_t i = 0; i < g_variant_n_children(interfaces.get()); ++i) {
+            const auto entry = share(g_variant_get_child_value(interfaces.get(), i));
+            const auto name = share(g_variant_get_child_value(entry.get(), 0));
+            const char* const text = g_variant_get_string(name.get(), nullptr);
+            const auto old = share(g_variant_get_child_value(entry.get(), 1));
+            const auto fresh = there != is.end() ? lookUp(there->second, text) : nullptr;
+            if (fresh == nullptr)
+                g_variant_builder_add(&gone, "s", text);
+            else if (!g_variant_equal(old.get(), fresh.get()) &&
+                     g_variant_n_children(old.get()) == g_variant_n_children(fresh.get()))
+                send(path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                     g_variant_new("(s@a{sv}@as)", text, fresh.get(),
+                                   g_variant_new_strv(nullptr, 0)));
+        }
+        send(path, OBJECT_MANAGER, "InterfacesRemoved",
+             g_variant_new("(o@as)", path.c_str(), g_variant_builder_end(&gone)));
+    }
+    for (const auto& [path, interfaces] : is)
+        if (was.count(path) == 0 || !g_variant_equal(was.at(path).get(), interfaces.get()))
+            send(path, OBJECT_MANAGER, "InterfacesAdded",
+                 g_variant_new("(o@a{sa{sv}})", path.c_str(), interfaces.get()));
+    g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
 }
 
 GDBusMessage* ScriptedService::reply(GDBusMessage* question, const std::string& body)
@@ -186,8 +295,20 @@ void ScriptedService::answer(const std::string& body)
 void ScriptedService::answerTo(const std::string& method, const std::string& body,
                                const std::string& path)
 {
-    follow(
-        method, [body](GDBusMessage* question) { return reply(question, body); }, path);
+    const Script script = [body](GDBusMessage* question) { return reply(question, body); };
+    const auto now = method == OBJECTS && path.empty() ? parsed(body) : nullptr;
+    if (now == nullptr || !g_variant_is_of_type(now.get(), G_VARIANT_TYPE("(a{oa{sa{sv}}})")))
+        return follow(method, script, path);
+    std::shared_ptr<GVariant> before;
+    {
+        const std::lock_guard<std::mutex> lock(state_->mutex);
+        before = std::exchange(state_->objects, now);
+        state_->scripts[OBJECTS] = script;
+    }
+    if (before != nullptr)
+        tellChange(before, now);
+    else
+        startAgain();
 }
 
 void ScriptedService::emit(const std::string& path, const std::string& interface,

@@ -27,7 +27,8 @@ public:
 
     /// The whole body of the reply in GVariant text form: "({'Hostname': <'box'>},)". Any type.
     void answer(const std::string& body);
-    /// The same for any method; `path` narrows it to one object.
+    /// The same for any method; `path` narrows it to one object. The answer to GetManagedObjects is
+    /// what the service has: it answers Get from it, and tells of each change of it by signals.
     void answerTo(const std::string& method, const std::string& body, const std::string& path = "");
     /// Sends a signal; `body` as in answer().
     void emit(const std::string& path, const std::string& interface, const std::string& signal,
@@ -61,11 +62,16 @@ private:
         int timesAsked = 0;
         std::size_t together = 1;
         std::vector<GDBusMessage*> heldBack;
+        std::shared_ptr<GVariant> objects; // of the last answer to GetManagedObjects
 
         /// Whether there is a script for it; fills the answers that are due.
         bool answer(GDBusMessage* question, std::vector<GDBusMessage*>& due);
+        GDBusMessage* get(GDBusMessage* question);
     };
 
+    void tellChange(const std::shared_ptr<GVariant>& before, const std::shared_ptr<GVariant>& now);
+    void send(const std::string& path, const char* interface, const char* signal, GVariant* body);
+    void startAgain();
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
                                    gpointer state);
     static gpointer handedOn(const std::shared_ptr<State>& state);

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the kernel tells of changes of interfaces (rtnetlink(7)) and of switches of radios
+// (/dev/rfkill). Where one of them is not there, nothing is told of it.
+#ifndef PORT_LINUX_KERNEL_EVENTS_H
+#define PORT_LINUX_KERNEL_EVENTS_H
+
+#include <vector>
+
+#include "../common/Descriptor.h"
+
+namespace port::linux_backend {
+
+class KernelEvents {
+public:
+    void open();
+    void close();
+
+    /// Of those that are open: what arrives is read by read().
+    std::vector<int> sockets() const;
+
+    /// Takes all that waits at one of the sockets; whether it may tell of a change.
+    static bool read(int socket);
+
+private:
+    std::vector<Descriptor> sockets_;
+};
+
+} // namespace port::linux_backend
+
+#endif
