@@ -667,7 +667,7 @@ Result<std::shared_ptr<const Device>> DeviceFile::read()
     const Result<std::string> text = readDeviceText(path_);
     if (!text)
         return notAvailable(text.error().reason + elsewhere_);
-    const std::lock_guard<std::mutex> lock(mutex_);
+    const std::lock_guard<ForkMutex> lock(mutex_);
     if (!hasParsed_ || parsedText_ != text.value()) {
         Result<Device> fresh = parseDevice(text.value(), path_);
         parsed_ = fresh ? std::make_shared<const Device>(std::move(fresh.value())) : nullptr;
@@ -683,7 +683,7 @@ Result<std::shared_ptr<const Device>> DeviceFile::read()
 void DeviceFile::report(const std::string& problem)
 {
     {
-        const std::lock_guard<std::mutex> lock(mutex_);
+        const std::lock_guard<ForkMutex> lock(mutex_);
         if (problem == reported_)
             return;
         reported_ = problem;

@@ -5,12 +5,12 @@
 
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <vector>
 
 #include "../port/backend/Result.h"
 #include "Device.h"
+#include "ForkMutex.h"
 
 namespace port::devicefile {
 
@@ -88,7 +88,7 @@ private:
     const std::string path_;
     const std::function<void(const std::string&)> onProblem_;
     const std::string elsewhere_;
-    std::mutex mutex_;
+    ForkMutex mutex_;
     std::string parsedText_;
     std::shared_ptr<const Device> parsed_; // null when the text is no device,
     std::string problem_;                  // for this reason

@@ -4,7 +4,9 @@
 #define PORT_COMMON_DESCRIPTOR_H
 
 #include <utility>
+#include <vector>
 
+#include <sys/eventfd.h>
 #include <unistd.h>
 
 namespace port {
@@ -34,6 +36,17 @@ public:
 private:
     int number_ = -1;
 };
+
+/// Whether that many more can be had. GLib ends the process when it lacks one; whoever needs it
+/// asks before.
+inline bool areDescriptorsLeft(std::size_t count)
+{
+    std::vector<Descriptor> taken;
+    do
+        taken.emplace_back(eventfd(0, EFD_CLOEXEC));
+    while (taken.back().number() >= 0 && taken.size() < count);
+    return taken.back().number() >= 0;
+}
 
 } // namespace port
 

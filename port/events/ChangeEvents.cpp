@@ -2,9 +2,13 @@
 #include "ChangeEvents.h"
 
 #include <algorithm>
+#include <atomic>
 #include <utility>
 
+#include <unistd.h>
+
 #include "../backend/Backend.h"
+#include "../common/Descriptor.h"
 #include "Registration.h"
 
 namespace port {
@@ -64,6 +68,8 @@ bool ChangeEvents::isIdle() const
 
 bool ChangeEvents::set(Change change, Callback callback)
 {
+    if (!areDescriptorsLeft(1)) // GLib's main context wants one
+        return false;
     auto registration = std::make_shared<Registration>(std::move(callback));
     {
         const std::lock_guard<std::mutex> lifecycle(lifecycle_);
@@ -113,8 +119,18 @@ void ChangeEvents::tell()
 ChangeEvents& changeEvents()
 {
     // Never destroyed: the watch may still call while the process ends.
-    static ChangeEvents& only = *new ChangeEvents(backend().network());
-    return only;
+    struct Owned {
+        const pid_t process = getpid();
+        ChangeEvents events{backend().network()};
+    };
+    static std::atomic<Owned*> all{nullptr};
+    Owned* now = all;
+    while (now == nullptr || now->process != getpid()) {
+        auto fresh = std::make_unique<Owned>();
+        if (all.compare_exchange_strong(now, fresh.get()))
+            now = fresh.release();
+    }
+    return now->events;
 }
 
 } // namespace port

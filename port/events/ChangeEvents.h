@@ -57,7 +57,8 @@ private:
     std::array<Slot, 6> slots_;
 };
 
-/// The events of this process's backend.
+/// The events of this process's backend. A forked child begins with no callback: the threads and
+/// whoever held a lock are its parent's.
 ChangeEvents& changeEvents();
 
 } // namespace port

@@ -118,6 +118,13 @@ std::vector<std::string> pathsWithoutSettings(const ObjectService& service, cons
     return paths;
 }
 
+// Also those whose section is no longer told of.
+void dropSettings(Interfaces& object)
+{
+    for (auto each = object.begin(); each != object.end();)
+        each = each->first.rfind(SETTINGS_MARK, 0) == 0 ? object.erase(each) : std::next(each);
+}
+
 } // namespace
 
 std::string settingsName(const std::string& section)
@@ -293,6 +300,8 @@ void Bus::Core::await(Lock& lock, const std::vector<AwaitedReply>& replies)
             call.awaited->error = silent(call.peer->name);
             call.awaited->isDone = true;
             call.awaited.reset();
+            if (call.kind == Kind::Settings) // what they were is not what they are
+                setSettings(*call.peer, call.path, {}, false);
         }
 }
 
@@ -451,6 +460,7 @@ std::vector<AwaitedReply> Bus::Core::askNext(Search& search, BusTime end)
     const bool isFirst = !search.isBegun;
     search.isBegun = true;
     if (peer.tree == nullptr || (isFirst && peer.isDeaf)) {
+        search.asked.clear(); // of another picture
         if (++search.readings > 3)
             search.error = notAvailable(peer.name + " was started again meanwhile");
         else
@@ -490,7 +500,6 @@ void Bus::Core::judge(Search& search)
             return;
         }
         dropPicture(search.peer);
-        search.asked.clear();
     }
 }
 
@@ -630,10 +639,12 @@ std::vector<Result<std::string>> Bus::Core::statesOf(const std::vector<BusObject
 
 int Bus::Core::onMessage(sd_bus_message* message, void* core, sd_bus_error*)
 {
-    // What this throws for want of memory must not pass through a C library.
+    // What this throws for want of memory must not pass through a C library. A message is lost
+    // then: the pictures begin anew with another connection.
     try {
         return static_cast<Core*>(core)->take(message) ? 1 : 0;
     } catch (...) {
+        static_cast<Core*>(core)->isBroken_ = true;
         return 0;
     }
 }
@@ -700,8 +711,8 @@ void Bus::Core::finish(const Call& call, sd_bus_message* message)
         call.peer->problem = reply.error;
     if (call.kind == Kind::Match && reply.error)
         call.peer->isDeaf = true; // never to be relied on
-    if (call.kind == Kind::Settings && reply.error && call.peer->tree != nullptr)
-        setProperties(*call.peer, call.path, SETTINGS_MARK, {}, true);
+    if (call.kind == Kind::Settings && reply.error)
+        setSettings(*call.peer, call.path, {}, true);
 }
 
 Error Bus::Core::errorOf(const Peer& peer, sd_bus_message* message, bool& isGone) const
@@ -789,9 +800,7 @@ void Bus::Core::readReply(const Call& call, sd_bus_message* message, Awaited& re
             break;
         if (!reader.interfaces(sections, {"connection", "gsm", "cdma"}))
             return tooMuch();
-        for (const auto& [name, properties] : sections)
-            setProperties(peer, call.path, settingsName(name), *properties, true);
-        setProperties(peer, call.path, SETTINGS_MARK, {}, true);
+        setSettings(peer, call.path, sections, true);
         break;
     }
     case Kind::Managed: {
@@ -893,6 +902,23 @@ void Bus::Core::setProperties(Peer& peer, const std::string& path, const std::st
     noteChange();
 }
 
+// Of an object that is still there; unknown ones are asked again.
+void Bus::Core::setSettings(Peer& peer, const std::string& path, const Interfaces& sections,
+                            bool areKnown)
+{
+    if (peer.tree == nullptr || peer.tree->count(path) == 0)
+        return;
+    auto tree = std::make_shared<Tree>(*peer.tree);
+    Interfaces& object = (*tree)[path];
+    dropSettings(object);
+    for (const auto& [name, properties] : sections)
+        object[settingsName(name)] = properties;
+    if (areKnown)
+        object[SETTINGS_MARK] = std::make_shared<const PropertyMap>();
+    peer.tree = std::move(tree);
+    noteChange();
+}
+
 void Bus::Core::takeProperties(Peer& peer, sd_bus_message* message)
 {
     MessageReader reader(message);
@@ -925,7 +951,9 @@ void Bus::Core::takeInterfaces(Peer& peer, sd_bus_message* message, bool areTher
         object[name] = properties;
     for (const std::string& name : removed)
         object.erase(name);
-    if (object.empty() || (object.size() == 1 && object.count(SETTINGS_MARK) != 0))
+    if (peer.objects->settings != nullptr && object.count(peer.objects->settings) == 0)
+        dropSettings(object);
+    if (object.empty())
         tree->erase(path);
     peer.tree = std::move(tree);
     noteChange();

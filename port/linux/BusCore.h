@@ -122,6 +122,8 @@ private:
     void takeInterfaces(Peer& peer, sd_bus_message* message, bool areThere);
     void setProperties(Peer& peer, const std::string& path, const std::string& interface,
                        PropertyMap changes, bool areAll);
+    void setSettings(Peer& peer, const std::string& path, const Interfaces& sections,
+                     bool areKnown);
     void dropPicture(Peer& peer);
     void noteChange();
     Result<Objects> known(const ObjectService& service);

@@ -70,7 +70,7 @@ std::optional<CallFault> SimulatedFaults::meet(const char* call)
 
 bool SimulatedFaults::isTheCall(const std::string& call, const Fault& rule)
 {
-    const std::lock_guard<std::mutex> lock(mutex_);
+    const std::lock_guard<devicefile::ForkMutex> lock(mutex_);
     Count& count = counts_[call];
     if (!isSame(count.rule, rule))
         count = {rule, 0};
@@ -80,7 +80,7 @@ bool SimulatedFaults::isTheCall(const std::string& call, const Fault& rule)
 
 void SimulatedFaults::forget(const std::string& call)
 {
-    const std::lock_guard<std::mutex> lock(mutex_);
+    const std::lock_guard<devicefile::ForkMutex> lock(mutex_);
     counts_.erase(call);
 }
 

@@ -4,10 +4,10 @@
 #define PORT_SIMULATOR_FAULTS_H
 
 #include <map>
-#include <mutex>
 #include <string>
 
 #include "../../devicefile/DeviceFile.h"
+#include "../../devicefile/ForkMutex.h"
 #include "../backend/Faults.h"
 
 namespace port::simulator {
@@ -29,7 +29,7 @@ private:
     void forget(const std::string& call);
 
     devicefile::DeviceFile& file_;
-    std::mutex mutex_;
+    devicefile::ForkMutex mutex_;
     std::map<std::string, Count> counts_;
 };
 

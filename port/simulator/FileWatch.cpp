@@ -6,11 +6,17 @@
 #include <utility>
 #include <vector>
 
+#include <unistd.h>
+
+#include "../common/Descriptor.h"
 #include "../common/GLibTypes.h"
 #include "../events/ContextThread.h"
 
 namespace port::simulator {
 namespace {
+
+// Two main contexts, what the kernel tells of files, and what is opened in between.
+constexpr std::size_t GLIB_DESCRIPTORS = 8;
 
 // The file itself, and where it is linked from.
 std::vector<std::string> namesOf(const std::string& path)
@@ -73,8 +79,16 @@ private:
 
 std::unique_ptr<Watch> watchFile(const std::string& path, std::function<void()> changed)
 {
-    auto watch = std::make_unique<FileWatch>(std::move(changed));
-    return watch->start(path) ? std::move(watch) : nullptr;
+    // GLib's own thread, which reads what the kernel tells of files, is not in a forked child.
+    static const pid_t process = getpid();
+    if (process != getpid() || !areDescriptorsLeft(GLIB_DESCRIPTORS))
+        return nullptr;
+    try {
+        auto watch = std::make_unique<FileWatch>(std::move(changed));
+        return watch->start(path) ? std::move(watch) : nullptr;
+    } catch (const std::system_error&) {
+        return nullptr; // there are as many threads as may be
+    }
 }
 
 } // namespace port::simulator

@@ -4,7 +4,6 @@
 // threads.
 #include <atomic>
 #include <chrono>
-#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -15,14 +14,13 @@
 #include <random>
 #include <thread>
 
-#include <fcntl.h>
 #include <gmock/gmock.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <CoreSystem.h>
 
 #include "coresystem_port.h"
+#include "support/HostileBus.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/TemporaryTree.h"
@@ -222,44 +220,6 @@ TEST_F(SoakTest, DeviceFileThatChangesAllTheTime)
     });
     soak.check(before, std::chrono::seconds(5 * TIME_FACTOR));
 }
-
-// A bus that misbehaves in the place of another, as long as it lives.
-class HostileBus {
-public:
-    HostileBus(const std::string& socket, const char* script)
-    {
-        unlink(socket.c_str());
-        int answers[2];
-        if (pipe2(life_, O_CLOEXEC) != 0 || pipe2(answers, O_CLOEXEC) != 0)
-            throw std::runtime_error("no pipe");
-        process_ = fork();
-        if (process_ == 0) {
-            dup2(life_[0], STDIN_FILENO);
-            dup2(answers[1], STDOUT_FILENO);
-            execl(HOSTILE_BUS, HOSTILE_BUS, socket.c_str(), script, static_cast<char*>(nullptr));
-            _exit(127);
-        }
-        close(answers[1]);
-        char byte = 0;
-        const bool isReady = read(answers[0], &byte, 1) == 1;
-        close(answers[0]);
-        if (!isReady)
-            throw std::runtime_error(std::string(HOSTILE_BUS) + " does not start");
-    }
-    ~HostileBus()
-    {
-        kill(process_, SIGKILL);
-        waitpid(process_, nullptr, 0);
-        close(life_[0]);
-        close(life_[1]);
-    }
-    HostileBus(const HostileBus&) = delete;
-    HostileBus& operator=(const HostileBus&) = delete;
-
-private:
-    int life_[2] = {-1, -1};
-    pid_t process_ = 0;
-};
 
 // Services that answer anything, on a bus that dies, and hostile buses in its place.
 TEST_F(SoakTest, BusAndServicesThatChangeAllTheTime)

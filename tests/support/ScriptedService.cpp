@@ -2,6 +2,7 @@
 #include "support/ScriptedService.h"
 
 #include <stdexcept>
+#include <thread>
 #include <utility>
 
 namespace {
@@ -91,6 +92,20 @@ std::map<std::string, std::shared_ptr<GVariant>> objectsIn(const std::shared_ptr
     return objects;
 }
 
+void sendAndRelease(GDBusConnection* connection, GDBusMessage* answer)
+{
+    g_dbus_connection_send_message(connection, answer, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                   nullptr);
+    g_object_unref(answer);
+}
+
+void sendLate(GDBusConnection* connection, GDBusMessage* answer, std::chrono::milliseconds delay)
+{
+    std::this_thread::sleep_for(delay);
+    sendAndRelease(connection, answer);
+    g_object_unref(connection);
+}
+
 GDBusMessage* replyWith(GDBusMessage* question, GVariant* body)
 {
     GDBusMessage* const message = g_dbus_message_new_method_reply(question);
@@ -168,13 +183,15 @@ GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessa
     if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
     std::vector<GDBusMessage*> due;
-    if (!takenFrom(state)->answer(message, due))
+    const auto taken = takenFrom(state);
+    if (!taken->answer(message, due))
         return message;
-    for (GDBusMessage* const answer : due) {
-        g_dbus_connection_send_message(connection, answer, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                       nullptr);
-        g_object_unref(answer);
-    }
+    const auto delay = taken->timeToAnswer();
+    for (GDBusMessage* const answer : due)
+        if (delay > delay.zero())
+            std::thread(sendLate, g_object_ref(connection), answer, delay).detach();
+        else
+            sendAndRelease(connection, answer);
     g_object_unref(message);
     return nullptr;
 }
@@ -279,6 +296,18 @@ void ScriptedService::releaseName()
     g_dbus_connection_call(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
                            g_variant_new("(s)", name_.c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE,
                            PATIENCE_MS, nullptr, nullptr, nullptr);
+}
+
+void ScriptedService::answerLate(std::chrono::milliseconds delay)
+{
+    const std::lock_guard<std::mutex> lock(state_->mutex);
+    state_->delay = delay;
+}
+
+std::chrono::milliseconds ScriptedService::State::timeToAnswer()
+{
+    const std::lock_guard<std::mutex> lock(mutex);
+    return delay;
 }
 
 int ScriptedService::timesAsked() const

@@ -3,6 +3,7 @@
 #ifndef TESTS_SUPPORT_SCRIPTED_SERVICE_H
 #define TESTS_SUPPORT_SCRIPTED_SERVICE_H
 
+#include <chrono>
 #include <functional>
 #include <map>
 #include <memory>
@@ -51,6 +52,8 @@ public:
 
     /// Holds the answers back until there are so many, then gives them all.
     void answerOnlyTogether(std::size_t count);
+    /// Gives each answer only after a time, which no other answer waits for.
+    void answerLate(std::chrono::milliseconds delay);
     /// How many questions it had a script for.
     int timesAsked() const;
 
@@ -61,12 +64,14 @@ private:
         std::map<std::string, Script> scripts; // by method, or method and path
         int timesAsked = 0;
         std::size_t together = 1;
+        std::chrono::milliseconds delay{0};
         std::vector<GDBusMessage*> heldBack;
         std::shared_ptr<GVariant> objects; // of the last answer to GetManagedObjects
 
         /// Whether there is a script for it; fills the answers that are due.
         bool answer(GDBusMessage* question, std::vector<GDBusMessage*>& due);
         GDBusMessage* get(GDBusMessage* question);
+        std::chrono::milliseconds timeToAnswer();
     };
 
     void tellChange(const std::shared_ptr<GVariant>& before, const std::shared_ptr<GVariant>& now);

@@ -19,9 +19,11 @@ import socket
 import sys
 import threading
 
+WELCOME = b"OK 0123456789abcdef0123456789abcdef\r\n"
+
 
 def authenticate(client):
-    """As far as a client needs it that asks for EXTERNAL; False when it left."""
+    """As far as a client needs it that asks for EXTERNAL, with its identity or without; False when it left."""
     line = b""
     while True:
         byte = client.recv(1)
@@ -30,12 +32,15 @@ def authenticate(client):
         line += byte
         if not line.endswith(b"\r\n"):
             continue
-        word = line.lstrip(b"\0").split()[0]
+        words = line.lstrip(b"\0").split()
         line = b""
-        if word == b"BEGIN":
+        if words[0] == b"BEGIN":
             return True
-        client.sendall({b"AUTH": b"OK 0123456789abcdef0123456789abcdef\r\n",
-                        b"NEGOTIATE_UNIX_FD": b"AGREE_UNIX_FD\r\n"}.get(word, b"ERROR\r\n"))
+        if words == [b"AUTH", b"EXTERNAL"]:
+            client.sendall(b"DATA\r\n")
+            continue
+        client.sendall({b"AUTH": WELCOME, b"DATA": WELCOME,
+                        b"NEGOTIATE_UNIX_FD": b"AGREE_UNIX_FD\r\n"}.get(words[0], b"ERROR\r\n"))
 
 
 def hold(client):

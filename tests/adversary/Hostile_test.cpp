@@ -1,0 +1,363 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a question costs at worst: services and buses that misbehave, descriptors that run out, and
+// processes that fork.
+#include <atomic>
+#include <chrono>
+#include <cstdlib>
+#include <filesystem>
+#include <functional>
+#include <iostream>
+#include <iterator>
+#include <memory>
+#include <thread>
+
+#include <gmock/gmock.h>
+#include <sys/resource.h>
+#include <unistd.h>
+
+#include "backend/Backend.h"
+#include "coresystem_port.h"
+#include "events/ChangeEvents.h"
+#include "support/Child.h"
+#include "support/HostileBus.h"
+#include "support/PrivateBus.h"
+#include "support/ScriptedModems.h"
+#include "support/ScriptedService.h"
+#include "support/Together.h"
+
+using port::Backend;
+using testing::HasSubstr;
+
+namespace {
+
+constexpr int CONNECTING_MS = 500;
+constexpr int QUESTION_MS = 2000;
+constexpr int SLACK_MS = 400 * TIME_FACTOR; // of a busy machine
+constexpr char MODEM_MANAGER[] = "org.freedesktop.ModemManager1";
+constexpr char TREE[] = "GetManagedObjects";
+
+template <typename T>
+std::string reasonOf(const port::Result<T>& answer)
+{
+    return answer ? "" : answer.error().reason;
+}
+
+// Each gives why there was no answer.
+struct Question {
+    const char* name;
+    std::function<std::string(Backend&)> ask;
+};
+
+const std::vector<Question>& questions()
+{
+    static const std::vector<Question> all = {
+        {"language", [](Backend& from) { return reasonOf(from.settings().language()); }},
+        {"model", [](Backend& from) { return reasonOf(from.deviceInfo().modelName()); }},
+        {"slots", [](Backend& from) { return reasonOf(from.telephony().slots()); }},
+        {"identity", // as the library asks for it
+         [](Backend& from) {
+             const auto slots = from.telephony().slots();
+             if (!slots || slots.value().value.empty())
+                 return reasonOf(slots) + "no slot";
+             const auto& slot = slots.value().value.front();
+             const auto card = from.telephony().card(slot);
+             return card ? reasonOf(from.telephony().imsi(slot)) : reasonOf(card);
+         }},
+        {"subscriptions", [](Backend& from) { return reasonOf(from.telephony().subscriptions()); }},
+        {"cellular", [](Backend& from) { return reasonOf(from.network().cellular()); }},
+        {"wifi", [](Backend& from) { return reasonOf(from.network().wifi()); }},
+        {"bluetooth", [](Backend& from) { return reasonOf(from.network().bluetooth()); }},
+        {"mobileData", [](Backend& from) { return reasonOf(from.network().mobileData()); }},
+        {"dataRoaming", [](Backend& from) { return reasonOf(from.network().dataRoaming()); }},
+        {"services", [](Backend& from) { return from.findServices().empty() ? "none" : ""; }},
+        {"listener",
+         [](Backend& from) {
+             port::ChangeEvents events(from.network());
+             const bool isSet = events.set(port::Change::FlightMode, [](int) {});
+             events.unset(port::Change::FlightMode);
+             return std::string(isSet ? "" : "not set");
+         }},
+    };
+    return all;
+}
+
+// On a thread of its own, which has asked nothing before.
+int millisecondsOf(const std::function<void()>& work)
+{
+    const auto begin = std::chrono::steady_clock::now();
+    std::thread(work).join();
+    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(
+                                std::chrono::steady_clock::now() - begin)
+                                .count());
+}
+
+long descriptors()
+{
+    return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
+}
+
+class HostileTest : public testing::Test {
+protected:
+    HostileTest()
+    {
+        coresystem_port::setLogSink(coresystem_port::LogSink::None);
+        unsetenv("CORESYSTEM_DEVICE");
+    }
+
+    void expectEachWithin(int milliseconds, const std::string& situation)
+    {
+        int worst = 0;
+        for (const Question& question : questions()) {
+            const auto fresh = port::makeLinuxBackend();
+            const int time = millisecondsOf([&] { question.ask(*fresh); });
+            EXPECT_LT(time, milliseconds + SLACK_MS) << situation << ": " << question.name;
+            worst = std::max(worst, time);
+        }
+        std::cout << situation << ": worst " << worst << " ms" << std::endl;
+    }
+
+    PrivateBus bus;
+};
+
+// Instead of a bus, one of tests/support/hostile_bus.py.
+class HostileBusTest : public HostileTest {
+protected:
+    HostileBusTest()
+    {
+        setenv("DBUS_SYSTEM_BUS_ADDRESS", ("unix:path=" + socket).c_str(), 1);
+    }
+    ~HostileBusTest() override
+    {
+        unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+    }
+
+    const TemporaryTree tree;
+    const std::string socket = tree.path("/bus");
+};
+
+TEST_F(HostileBusTest, NoBusIsWaitedForLongerThanConnectingMayTake)
+{
+    for (const char* const script : {"mute", "silent", "endless", "garbage", "vanish"}) {
+        const HostileBus hostile(socket, script);
+        expectEachWithin(CONNECTING_MS, script);
+    }
+}
+
+TEST_F(HostileBusTest, NoThreadWaitsForTheOthers)
+{
+    const HostileBus mute(socket, "mute");
+    const auto backend = port::makeLinuxBackend();
+    std::atomic<int> worst{0};
+    together(16, [&](int) {
+        for (const Question& question : questions()) {
+            const int time = millisecondsOf([&] { question.ask(*backend); });
+            for (int before = worst; time > before && !worst.compare_exchange_weak(before, time);)
+                continue;
+        }
+    });
+    std::cout << "16 threads: worst " << worst << " ms" << std::endl;
+    EXPECT_LT(worst, QUESTION_MS);
+}
+
+TEST_F(HostileTest, ServicesThatAreLateAreOneQuestionsWait)
+{
+    bus.start();
+    std::vector<std::unique_ptr<ScriptedService>> services;
+    for (const char* const name : {"org.freedesktop.hostname1", "org.freedesktop.locale1",
+                                   MODEM_MANAGER, "org.freedesktop.NetworkManager", "org.bluez"}) {
+        services.push_back(std::make_unique<ScriptedService>(bus.address(), name));
+        services.back()->answerTo(TREE, treeOf({FakeModem().text()}));
+        services.back()->answer(simOf("<'001010123456789'>", "<'00101'>"));
+        services.back()->answerLate(std::chrono::milliseconds(900));
+    }
+    expectEachWithin(QUESTION_MS - SLACK_MS, "late");
+}
+
+TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
+{
+    bus.start();
+    ScriptedService modems(bus.address(), MODEM_MANAGER);
+    const auto list = [](int count, const std::function<std::string(int)>& entry) {
+        std::string text;
+        for (int i = 0; i < count; ++i)
+            text += (i == 0 ? "" : ", ") + entry(i);
+        return text;
+    };
+    const auto withModem = [](const char* property, const std::string& value) {
+        FakeModem modem;
+        modem.modem[property] = value;
+        return modem.text();
+    };
+    const std::string many =
+        list(200000, [](int i) { return "'p" + std::to_string(i) + "': <0>"; });
+    const struct {
+        const char* what;
+        std::string body;
+        const char* reason;
+    } rows[] = {
+        {"one path 1,001 times",
+         "(@a{oa{sa{sv}}} {" + list(1001, [](int) { return FakeModem().text(); }) + "},)",
+         "told of more than 1000 objects"},
+        {"modems",
+         "(@a{oa{sa{sv}}} {" +
+             list(17,
+                  [](int i) {
+                      FakeModem modem;
+                      modem.path += std::to_string(i);
+                      return modem.text();
+                  }) +
+             "},)",
+         "told of more than 16 modems"},
+        {"properties",
+         "(@a{oa{sa{sv}}} {'/a': {'org.freedesktop.ModemManager1.Modem': @a{sv} {" + many + "}}},)",
+         "told of more than 500 properties"},
+        {"bytes", treeOf({withModem("Model", "<'" + std::string(5000000, 'x') + "'>")}),
+         "told of more than 4194304 bytes"},
+        {"960 SIM slots",
+         treeOf({withModem(
+             "SimSlots",
+             "<[" + list(960, [](int i) { return "objectpath '/SIM/" + std::to_string(i) + "'"; }) +
+                 "]>")}),
+         ""},
+    };
+    for (const auto& row : rows) {
+        const std::shared_ptr<GVariant> body(
+            g_variant_ref_sink(
+                g_variant_parse(nullptr, row.body.c_str(), nullptr, nullptr, nullptr)),
+            g_variant_unref);
+        modems.follow(TREE, [body](GDBusMessage* question) {
+            GDBusMessage* const reply = g_dbus_message_new_method_reply(question);
+            g_dbus_message_set_body(reply, body.get());
+            return reply;
+        });
+        const auto backend = port::makeLinuxBackend();
+        std::string reason;
+        const int time = millisecondsOf([&] { reason = reasonOf(backend->telephony().slots()); });
+        std::cout << row.what << ": " << time << " ms, " << reason << std::endl;
+        EXPECT_THAT(reason, HasSubstr(row.reason)) << row.what;
+        EXPECT_LT(time, QUESTION_MS) << row.what;
+    }
+}
+
+TEST_F(HostileTest, BusThatIsStartedAgainLeavesNothingBehind)
+{
+    const char* const wanted = std::getenv("CORESYSTEM_BUS_RESTARTS");
+    const int restarts = wanted != nullptr ? std::atoi(wanted) : 200;
+    const auto backend = port::makeLinuxBackend();
+    long before = 0;
+    for (int i = 0; i < restarts; ++i) {
+        bus.start();
+        EXPECT_EQ(std::string(MODEM_MANAGER) + " is not on the system bus",
+                  reasonOf(backend->telephony().slots()));
+        bus.kill();
+        if (i == 0)
+            before = descriptors();
+    }
+    EXPECT_THAT(reasonOf(backend->telephony().slots()), HasSubstr("no system bus"));
+    std::cout << restarts << " restarts: descriptors " << before << " to " << descriptors()
+              << std::endl;
+    EXPECT_LE(descriptors(), before);
+}
+
+// Leaves no descriptor more than there are.
+class NoMoreDescriptors {
+public:
+    NoMoreDescriptors()
+    {
+        getrlimit(RLIMIT_NOFILE, &before_);
+        const int next = dup(STDERR_FILENO); // the lowest that is free
+        close(next);
+        const rlimit none = {static_cast<rlim_t>(next), before_.rlim_max};
+        setrlimit(RLIMIT_NOFILE, &none);
+    }
+    ~NoMoreDescriptors()
+    {
+        setrlimit(RLIMIT_NOFILE, &before_);
+    }
+    NoMoreDescriptors(const NoMoreDescriptors&) = delete;
+    NoMoreDescriptors& operator=(const NoMoreDescriptors&) = delete;
+
+private:
+    rlimit before_ = {};
+};
+
+TEST_F(HostileTest, ProcessWithoutDescriptorsLives)
+{
+    bus.start();
+    // In processes that have a connection already, and that have none.
+    for (const bool hasAsked : {false, true})
+        EXPECT_EQ("lives", inChild([&]() -> std::string {
+                      const auto backend = port::makeLinuxBackend();
+                      if (hasAsked)
+                          backend->telephony().slots();
+                      {
+                          const NoMoreDescriptors none;
+                          for (const Question& question : questions())
+                              question.ask(*backend);
+                          const std::string reason = reasonOf(backend->telephony().slots());
+                          if (reason.find("on the system bus") == std::string::npos &&
+                              reason.find("no system bus") != 0)
+                              return reason;
+                          port::ChangeEvents events(backend->network());
+                          if (events.set(port::Change::FlightMode, [](int) {}))
+                              return "a listener was set";
+                      }
+                      const std::string reason = reasonOf(backend->telephony().slots());
+                      return reason == std::string(MODEM_MANAGER) + " is not on the system bus"
+                                 ? "lives"
+                                 : reason;
+                  }))
+            << hasAsked;
+}
+
+// A process with a listener whose threads ask all the time forks; the child asks everything, sets
+// and unsets a listener. What the child's questions gave, and how long they took at most.
+std::string askedByChildrenOfABusyProcess(int children)
+{
+    const auto listen = [] {
+        const bool isSet = port::changeEvents().set(port::Change::FlightMode, [](int) {});
+        port::changeEvents().unset(port::Change::FlightMode);
+        return isSet;
+    };
+    port::changeEvents().set(port::Change::FlightMode, [](int) {});
+    std::atomic<bool> done{false};
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 4; ++i)
+        threads.emplace_back([&done] {
+            while (!done) {
+                port::backend().network().flightMode();
+                port::backend().telephony().slots();
+            }
+        });
+    std::string told;
+    for (int i = 0; i < children && told.find("late") == std::string::npos; ++i)
+        told = inChild([&]() -> std::string {
+            alarm(20); // ends a child that hangs
+            const auto begin = std::chrono::steady_clock::now();
+            const std::string slots = reasonOf(port::backend().telephony().slots());
+            const bool isSet = listen();
+            port::changeEvents().unset(port::Change::WifiDevice);
+            if (std::chrono::steady_clock::now() - begin > std::chrono::milliseconds(SLACK_MS))
+                return "late";
+            return slots + (isSet ? ", set" : ", not set");
+        });
+    done = true;
+    for (std::thread& thread : threads)
+        thread.join();
+    return told;
+}
+
+TEST_F(HostileTest, ForkedChildIsAnsweredAtOnce)
+{
+    bus.start();
+    const ScriptedService modems(bus.address(), MODEM_MANAGER);
+    EXPECT_EQ("the process was forked after it had asked the system bus, not set",
+              inChild([] { return askedByChildrenOfABusyProcess(20); }));
+    const TemporaryTree tree;
+    setenv("CORESYSTEM_DEVICE",
+           tree.write("/d.toml", "schema = 1\n[[slot]]\nsim = 'ready'\n").c_str(), 1);
+    EXPECT_EQ(", not set", inChild([] { return askedByChildrenOfABusyProcess(20); }));
+    unsetenv("CORESYSTEM_DEVICE");
+}
+
+} // namespace
