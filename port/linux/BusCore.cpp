@@ -223,8 +223,13 @@ void Bus::Core::becomeReady()
 std::optional<Error> Bus::Core::connect(Lock& lock, BusTime end)
 {
     const BusTime begin = BusClock::now();
-    const unsigned failuresBefore = failures_;
+    unsigned failuresBefore = failures_;
+    bool isFormers = bus_ != nullptr; // begun before: that it fails says nothing of the bus now
     while (!isReady_) {
+        if (isFormers && failures_ != failuresBefore) {
+            isFormers = false;
+            failuresBefore = failures_;
+        }
         // Whoever waited while another one tried in vain does not wait again.
         if (failures_ != failuresBefore || isEnding_)
             return problem_;

@@ -355,7 +355,7 @@ TEST_F(HostileTest, ForkedChildIsAnsweredAtOnce)
               inChild([] { return askedByChildrenOfABusyProcess(20); }));
     const TemporaryTree tree;
     setenv("CORESYSTEM_DEVICE",
-           tree.write("/d.toml", "schema = 1\n[[slot]]\nsim = 'ready'\n").c_str(), 1);
+           tree.write("/d.toml", "schema = 1\n[[slot]]\nsim = 'available'\n").c_str(), 1);
     EXPECT_EQ(", not set", inChild([] { return askedByChildrenOfABusyProcess(20); }));
     unsetenv("CORESYSTEM_DEVICE");
 }
