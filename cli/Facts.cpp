@@ -17,6 +17,7 @@
 #include <coresystem_port.h>
 #include <gio/gio.h>
 
+#include "CountryData.h"
 #include "Serial.h"
 #include "Sims.h"
 
@@ -104,11 +105,21 @@ std::optional<std::string> readLanguage(bool asIso639, int& code)
     return taken(slot);
 }
 
-std::string reasonOfNoIso639Code()
+Fact noIso639Code(const std::string& language)
 {
-    int code = 0;
-    return "the language table has no ISO 639-2 code for \"" +
-           readLanguage(false, code).value_or("") + "\"";
+    return noAnswer("the language table has no ISO 639-2 code for \"" + language + "\"");
+}
+
+// The answer beside what is true of the language today.
+Fact withErrata(Fact fact, const std::string& language)
+{
+    const auto errata = cli::errataOf(language);
+    if (!errata.empty()) {
+        fact.today = cli::jsonOf(errata);
+        fact.reason = fact.reason.empty() ? cli::sentenceOf(errata.front())
+                                          : fact.reason + " (" + cli::wordOf(errata.front()) + ")";
+    }
+    return fact;
 }
 
 // English when the platform does not say, which is not the device's language.
@@ -119,9 +130,10 @@ std::function<Fact()> language(bool asIso639)
         const auto value = readLanguage(asIso639, code);
         if (code != 0 || !lastOrigin(Question::Language).available)
             return noAnswer(butTold(reasonOf(Question::Language, code), value.value_or("nothing")));
-        if (value)
-            return answer(Question::Language, *value);
-        return noAnswer(asIso639 ? reasonOfNoIso639Code() : "out of memory");
+        if (!asIso639)
+            return value ? answer(Question::Language, *value) : noAnswer("out of memory");
+        const std::string own = readLanguage(false, code).value_or("");
+        return withErrata(value ? answer(Question::Language, *value) : noIso639Code(own), own);
     };
 }
 
