@@ -305,8 +305,9 @@ public:
         states_.resize(names.size(), State::Waiting);
     }
 
-    bool areThere(bool ofDaemon) const
+    bool areThere(bool ofDaemon)
     {
+        const std::lock_guard<std::mutex> lock(mutex_);
         return std::any_of(facts_.begin(), facts_.end(),
                            [&](const Fact& fact) { return isDaemons(fact) == ofDaemon; });
     }
