@@ -358,18 +358,24 @@ public:
         if (failure_)
             std::rethrow_exception(failure_);
         std::vector<Fact> facts = facts_;
-        const std::string time = " within " + std::to_string(PATIENCE.count()) + " seconds";
         for (std::size_t i = 0; i < facts.size(); ++i)
             if (states_[i] != State::Answered)
-                facts[i].reason = isDaemons(facts[i]) ? DAEMON + " does not answer" + time
-                                  : states_[i] == State::Asked
-                                      ? "what tells " + facts[i].name + " does not answer" + time
-                                      : "not asked: what comes before it is not answered" + time;
+                facts[i].reason = whyNoAnswer(facts[i], states_[i]);
         return facts;
     }
 
 private:
     enum class State { Waiting, Asked, Answered };
+
+    static std::string whyNoAnswer(const Fact& fact, State state)
+    {
+        std::string reason = "not asked: what comes before it is not answered";
+        if (isDaemons(fact))
+            reason = DAEMON + " does not answer";
+        else if (state == State::Asked)
+            reason = "what tells " + fact.name + " does not answer";
+        return reason.append(" within ").append(std::to_string(PATIENCE.count())) + " seconds";
+    }
 
     static bool isDaemons(const Fact& fact)
     {
