@@ -87,7 +87,7 @@ Words deviceAssignments(const std::string& begun, const std::string& device)
             words.push_back(known + "=");
     else if (const auto* const type = typeAt(path))
         for (const std::string& value : valuesOf(*type))
-            words.push_back(path + "=" + value);
+            words.push_back(std::string(path).append("=").append(value));
     return words;
 }
 

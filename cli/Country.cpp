@@ -4,6 +4,7 @@
 
 #include "Commands.h"
 #include "CountryAtlas.h"
+#include "CountryData.h"
 #include "CountryHint.h"
 #include "Session.h"
 #include "Terminal.h"
@@ -154,6 +155,24 @@ std::string severalCountriesText(const Reading& reading)
            " all lead to it.\n";
 }
 
+std::string fieldTitle(std::string field)
+{
+    if (field == "mcc_also")
+        return "also the MCC of";
+    std::replace(field.begin(), field.end(), '_', ' ');
+    return field.rfind("alpha", 0) == 0 ? field.insert(5, "-") : field;
+}
+
+std::string errataText(const std::vector<Erratum>& errata)
+{
+    if (errata.empty())
+        return "";
+    Rows rows;
+    for (const Erratum& each : errata)
+        rows.push_back({fieldTitle(each.field), sentenceOf(each)});
+    return "\nToday it is otherwise (checked on " + errata.front().date + "):\n" + aligned(rows);
+}
+
 std::string readingText(const Reading& reading)
 {
     std::string text = quoted(reading.key) + " is " + reading.kind->article + reading.kind->name +
@@ -162,12 +181,12 @@ std::string readingText(const Reading& reading)
         text += othersText(reading);
     if (reading.severalCountries())
         text += severalCountriesText(reading);
-    return text;
+    return text + errataText(errataOf(reading.country.mcc));
 }
 
-std::string countryText(const std::vector<Reading>& readings)
+std::string countryText(const std::vector<Reading>& readings, const std::string& readAs)
 {
-    std::string text = backendLine() + "\n";
+    std::string text = backendLine() + "\n" + (readAs.empty() ? "" : "\n" + readAs + "\n");
     if (readings.size() > 1)
         text += "\n" + quoted(readings.front().key) + " can be read in " +
                 std::to_string(readings.size()) + " ways.\n";
@@ -201,6 +220,7 @@ Json readingJson(const Reading& reading)
                  {"other_mccs", others},
                  {"alpha2_codes_of_mcc", reading.alpha2Codes},
                  {"calling_codes_of_mcc", reading.callingCodes}};
+    json["today"] = jsonOf(errataOf(country.mcc));
     if (reading.kind->cell == &Country::callingCode) {
         json["name_of_calling_code"] = orNull(reading.nameOfCallingCode);
         json["alpha2_of_calling_code"] = orNull(reading.alpha2OfCallingCode);
@@ -208,9 +228,10 @@ Json readingJson(const Reading& reading)
     return json;
 }
 
-std::string countryJson(const std::vector<Reading>& readings)
+std::string countryJson(const std::vector<Reading>& readings, const std::string& readAs)
 {
     Json json = jsonAnswer();
+    json["read_as"] = readAs.empty() ? Json() : Json(readAs);
     json["key"] = readings.front().key;
     json["ambiguous"] = readings.size() > 1 || readings.front().ambiguous();
     for (const Reading& reading : readings)
@@ -221,12 +242,72 @@ std::string countryJson(const std::vector<Reading>& readings)
 ExitCode runCountry(const Invocation& invocation, const std::string& key)
 {
     const CountryAtlas atlas = askForAllCountries();
-    const std::vector<Reading> readings = readAll(key, atlas);
+    std::vector<Reading> readings = readAll(key, atlas);
+    std::string readAs;
+    if (readings.empty()) {
+        const std::string mcc = mccOfOtherKey(atlas, key);
+        readings = readAll(mcc, atlas);
+        readAs =
+            quoted(key) + " is no key of the library; this command reads it as MCC " + mcc + ".";
+    }
     if (readings.empty()) {
         complain(unknownCountryHint(atlas, key));
         return UNKNOWN_COUNTRY;
     }
-    writeOut(invocation.json ? countryJson(readings) : countryText(readings));
+    writeOut(invocation.json ? countryJson(readings, readAs) : countryText(readings, readAs));
+    return SUCCESS;
+}
+
+const std::vector<std::string> COLUMNS = {"mcc",          "alpha2",         "alpha3",
+                                          "calling_code", "service_locale", "name"};
+
+std::vector<std::string> rowOf(const Country& country, const std::string& none)
+{
+    return {country.mcc,
+            country.alpha2.value_or(none),
+            country.alpha3.value_or(none),
+            country.callingCode.value_or(none),
+            country.serviceLocale.value_or(none),
+            country.name.value_or(none)};
+}
+
+// No cell holds a quotation mark; the names hold commas.
+std::string csvText(const Rows& rows)
+{
+    std::string text;
+    for (const auto& row : rows) {
+        for (std::size_t i = 0; i < row.size(); ++i)
+            text += (i == 0 ? "" : ",") +
+                    (row[i].find(',') != std::string::npos ? '"' + row[i] + '"' : row[i]);
+        text += "\r\n"; // RFC 4180
+    }
+    return text;
+}
+
+std::string allJson(const CountryAtlas& atlas)
+{
+    Json json = jsonAnswer();
+    json["countries"] = Json::array();
+    for (const Country& country : atlas.countries)
+        json["countries"].push_back({{"mcc", country.mcc},
+                                     {"alpha2", orNull(country.alpha2)},
+                                     {"alpha3", orNull(country.alpha3)},
+                                     {"calling_code", orNull(country.callingCode)},
+                                     {"service_locale", orNull(country.serviceLocale)},
+                                     {"name", orNull(country.name)},
+                                     {"today", jsonOf(errataOf(country.mcc))}});
+    return jsonText(json);
+}
+
+ExitCode runAll(const Invocation& invocation, bool csv)
+{
+    const CountryAtlas atlas = askForAllCountries();
+    Rows rows = {COLUMNS};
+    for (const Country& country : atlas.countries)
+        rows.push_back(rowOf(country, csv ? "" : "-"));
+    writeOut(invocation.json ? allJson(atlas)
+             : csv           ? csvText(rows)
+                             : backendLine() + "\n\n" + aligned(rows, ""));
     return SUCCESS;
 }
 
@@ -237,18 +318,27 @@ void cli::addCountryCommand(const Command& app, Invocation& invocation)
 {
     const Command country = app.add("country", "Convert country codes");
     const auto key = std::make_shared<std::string>();
-    country
-        .option("KEY", *key,
-                "An MCC, an alpha-2 code, a calling code or a service locale, exactly as the "
-                "library writes it")
-        .required();
+    const auto all = std::make_shared<bool>(false);
+    const auto csv = std::make_shared<bool>(false);
+    const Argument named = country.option(
+        "KEY", *key,
+        "An MCC, an alpha-2 code, a calling code or a service locale, exactly as the "
+        "library writes it; or an alpha-3 code, a name or a calling code with its "
+        "area digits");
+    country.flag("--all", *all, "Show every country");
+    country.flag("--csv", *csv, "Print every country as CSV");
     country.flag("--json", invocation.json, "Print JSON");
     country.setFooter("Examples: coresystem country 450\n"
                       "          coresystem country kr\n"
                       "          coresystem country 82\n"
                       "          coresystem country ko_KR\n"
+                      "          coresystem country --all --csv\n"
                       "Exit code 5: no such key.");
-    country.onUse([&invocation, key] {
-        invocation.command = [&invocation, key] { return runCountry(invocation, *key); };
+    country.onUse([&invocation, key, named, all, csv] {
+        if (named.isGiven() == *all || (*csv && (invocation.json || !*all)))
+            throw UsageError("country needs KEY or --all; --csv is for --all, without --json");
+        invocation.command = [&invocation, key, all, csv] {
+            return *all ? runAll(invocation, *csv) : runCountry(invocation, *key);
+        };
     });
 }

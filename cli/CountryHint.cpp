@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "CountryData.h"
 #include "Text.h"
 
 namespace cli {
@@ -58,12 +59,25 @@ std::string rightForm(const CountryAtlas& atlas, const std::string& key)
     return "";
 }
 
-std::string countryWithAlpha3(const CountryAtlas& atlas, const std::string& key)
+// "+1 876" and "1876" as "1-876".
+std::string areaForm(const std::string& key)
 {
-    for (const Country& country : atlas.countries)
-        if (country.alpha3 && lowerCase(*country.alpha3) == lowerCase(trimmed(key)))
-            return "MCC " + country.mcc + (country.name ? ", " + *country.name : "");
-    return "";
+    std::string digits;
+    for (const char character : plainForm(key))
+        if (character >= '0' && character <= '9')
+            digits += character;
+        else if (character != ' ' && character != '_')
+            return "";
+    return digits.size() < 2 ? "" : digits.insert(1, "-");
+}
+
+// What the country-data files say of a country that the library has no row of.
+std::string outsideTheTables(const std::string& key)
+{
+    std::vector<std::string> known;
+    for (const Erratum& each : errataOf(lowerCase(key)))
+        known.push_back(each.field + " " + each.today);
+    return known.empty() ? "" : listed(known);
 }
 
 std::vector<std::string> countriesNamed(const CountryAtlas& atlas, const std::string& key)
@@ -80,15 +94,29 @@ std::vector<std::string> countriesNamed(const CountryAtlas& atlas, const std::st
 
 } // namespace
 
+std::string mccOfOtherKey(const CountryAtlas& atlas, const std::string& key)
+{
+    const std::string wanted = lowerCase(trimmed(key));
+    if (wanted.empty())
+        return "";
+    const std::string alpha2 = alpha2OfAreaCode(areaForm(key));
+    for (const Country& country : atlas.countries)
+        if (lowerCase(country.alpha3.value_or("")) == wanted ||
+            lowerCase(country.name.value_or("")) == wanted ||
+            (!alpha2.empty() && country.alpha2 == alpha2))
+            return country.mcc;
+    return "";
+}
+
 std::string unknownCountryHint(const CountryAtlas& atlas, const std::string& key)
 {
     const std::string unknown = quoted(key) + " is no country key";
     if (const std::string known = rightForm(atlas, key); !known.empty())
         return unknown + "; did you mean \"" + known + "\"?";
-    if (const std::string place = countryWithAlpha3(atlas, key); !place.empty())
-        return unknown + ": alpha-3 codes are answers only; it belongs to " + place;
+    if (const std::string known = outsideTheTables(key); !known.empty())
+        return unknown + ": the library has no row of it; today " + known;
     if (const auto found = countriesNamed(atlas, key); !found.empty())
-        return unknown + ": names are answers only; such a name has MCC " + listed(found);
+        return unknown + ": such a name has MCC " + listed(found);
     return unknown + ": a key is an MCC (\"450\"), an alpha-2 code (\"kr\"), a calling code "
                      "(\"82\") or a service locale (\"ko_KR\") that the library knows";
 }

@@ -9,6 +9,10 @@
 
 namespace cli {
 
+/// The MCC of a key that only the command reads: an alpha-3 code, a whole name, or a calling code
+/// with its area digits ("1-876", "+1 876"); empty when it is none, or several countries'.
+std::string mccOfOtherKey(const CountryAtlas& atlas, const std::string& key);
+
 /// One line that says why the key is none, and the right form where it can be guessed.
 std::string unknownCountryHint(const CountryAtlas& atlas, const std::string& key);
 

@@ -17,6 +17,7 @@
 #include <coresystem_port.h>
 #include <gio/gio.h>
 
+#include "CountryData.h"
 #include "Serial.h"
 #include "Sims.h"
 
@@ -104,11 +105,21 @@ std::optional<std::string> readLanguage(bool asIso639, int& code)
     return taken(slot);
 }
 
-std::string reasonOfNoIso639Code()
+Fact noIso639Code(const std::string& language)
 {
-    int code = 0;
-    return "the language table has no ISO 639-2 code for \"" +
-           readLanguage(false, code).value_or("") + "\"";
+    return noAnswer("the language table has no ISO 639-2 code for \"" + language + "\"");
+}
+
+// The answer beside what is true of the language today.
+Fact withErrata(Fact fact, const std::string& language)
+{
+    const auto errata = cli::errataOf(language);
+    if (!errata.empty()) {
+        fact.today = cli::jsonOf(errata);
+        fact.reason = fact.reason.empty() ? cli::sentenceOf(errata.front())
+                                          : fact.reason + " (" + cli::wordOf(errata.front()) + ")";
+    }
+    return fact;
 }
 
 // English when the platform does not say, which is not the device's language.
@@ -119,9 +130,10 @@ std::function<Fact()> language(bool asIso639)
         const auto value = readLanguage(asIso639, code);
         if (code != 0 || !lastOrigin(Question::Language).available)
             return noAnswer(butTold(reasonOf(Question::Language, code), value.value_or("nothing")));
-        if (value)
-            return answer(Question::Language, *value);
-        return noAnswer(asIso639 ? reasonOfNoIso639Code() : "out of memory");
+        if (!asIso639)
+            return value ? answer(Question::Language, *value) : noAnswer("out of memory");
+        const std::string own = readLanguage(false, code).value_or("");
+        return withErrata(value ? answer(Question::Language, *value) : noIso639Code(own), own);
     };
 }
 
@@ -293,8 +305,9 @@ public:
         states_.resize(names.size(), State::Waiting);
     }
 
-    bool areThere(bool ofDaemon) const
+    bool areThere(bool ofDaemon)
     {
+        const std::lock_guard<std::mutex> lock(mutex_);
         return std::any_of(facts_.begin(), facts_.end(),
                            [&](const Fact& fact) { return isDaemons(fact) == ofDaemon; });
     }
@@ -345,18 +358,24 @@ public:
         if (failure_)
             std::rethrow_exception(failure_);
         std::vector<Fact> facts = facts_;
-        const std::string time = " within " + std::to_string(PATIENCE.count()) + " seconds";
         for (std::size_t i = 0; i < facts.size(); ++i)
             if (states_[i] != State::Answered)
-                facts[i].reason = isDaemons(facts[i]) ? DAEMON + " does not answer" + time
-                                  : states_[i] == State::Asked
-                                      ? "what tells " + facts[i].name + " does not answer" + time
-                                      : "not asked: what comes before it is not answered" + time;
+                facts[i].reason = whyNoAnswer(facts[i], states_[i]);
         return facts;
     }
 
 private:
     enum class State { Waiting, Asked, Answered };
+
+    static std::string whyNoAnswer(const Fact& fact, State state)
+    {
+        std::string reason = "not asked: what comes before it is not answered";
+        if (isDaemons(fact))
+            reason = DAEMON + " does not answer";
+        else if (state == State::Asked)
+            reason = "what tells " + fact.name + " does not answer";
+        return reason.append(" within ").append(std::to_string(PATIENCE.count())) + " seconds";
+    }
 
     static bool isDaemons(const Fact& fact)
     {

@@ -16,6 +16,7 @@ struct Fact {
     std::string source;      // who served the value
     std::string reason;      // why there is no value
     bool isIdentity = false; // of a person or a device: masked where it was not asked for by name
+    Json today = nullptr;    // what is true today, where the library's tables say something else
 };
 
 /// The names of all facts, in the order in which they are shown.

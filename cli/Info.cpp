@@ -126,12 +126,17 @@ std::string infoJson(const std::vector<Fact>& facts)
     Json json = jsonAnswer();
     Json sources = Json::object();
     Json reasons = Json::object();
+    Json today = Json::object();
     for (const Fact& fact : facts) {
         json[fact.name] = fact.value;
         fact.value.is_null() ? reasons[fact.name] = fact.reason : sources[fact.name] = fact.source;
+        if (!fact.today.is_null())
+            today[fact.name] = fact.today;
     }
     json["sources"] = sources;
     json["reasons"] = reasons;
+    if (!today.empty())
+        json["today"] = today;
     return jsonText(json);
 }
 
@@ -202,6 +207,8 @@ ExitCode runGet(const Invocation& invocation, const Wanted& wanted)
     for (const Fact& fact : facts) {
         if (!invocation.json)
             writeOut(valueLine(fact, wanted));
+        if (!fact.value.is_null() && !fact.today.is_null())
+            complain(fact.name + ": " + fact.reason);
         if (fact.value.is_null() && code != BAD_DEVICE_FILE)
             code = reportMissing(fact);
     }

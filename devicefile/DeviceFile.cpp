@@ -10,6 +10,7 @@
 #include <tuple>
 
 #include <gio/gio.h>
+#include <unistd.h>
 
 #include "../port/backend/Telephony.h"
 #include "../port/common/RegularFile.h"
@@ -655,6 +656,41 @@ Result<std::string> readDeviceText(const std::string& path)
     return text;
 }
 
+class DeviceFile::Version {
+public:
+    explicit Version(std::string text) : text_(std::move(text)) {}
+
+    const std::string& text() const
+    {
+        return text_;
+    }
+
+    pid_t process() const
+    {
+        return process_;
+    }
+
+    // Whoever asks first parses it, and whoever asks meanwhile waits for that.
+    Result<std::shared_ptr<const Device>> device(const std::string& path)
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        if (!device_) {
+            const Result<Device> parsed = parseDevice(text_, path);
+            if (parsed)
+                device_ = std::make_shared<const Device>(parsed.value());
+            else
+                device_ = parsed.error();
+        }
+        return *device_;
+    }
+
+private:
+    const std::string text_;
+    const pid_t process_ = getpid();
+    std::mutex mutex_;
+    std::optional<Result<std::shared_ptr<const Device>>> device_;
+};
+
 Result<std::shared_ptr<const Device>> DeviceFile::device()
 {
     const Result<std::shared_ptr<const Device>> now = read();
@@ -667,17 +703,25 @@ Result<std::shared_ptr<const Device>> DeviceFile::read()
     const Result<std::string> text = readDeviceText(path_);
     if (!text)
         return notAvailable(text.error().reason + elsewhere_);
+    return versionOf(text.value())->device(path_);
+}
+
+// A text that a thread is at stays, so that there are at most as many more as there are threads. A
+// forked child reads its own: the thread that was at one may be its parent's.
+std::shared_ptr<DeviceFile::Version> DeviceFile::versionOf(const std::string& text)
+{
     const std::lock_guard<ForkMutex> lock(mutex_);
-    if (!hasParsed_ || parsedText_ != text.value()) {
-        Result<Device> fresh = parseDevice(text.value(), path_);
-        parsed_ = fresh ? std::make_shared<const Device>(std::move(fresh.value())) : nullptr;
-        problem_ = fresh ? std::string() : fresh.error().reason;
-        parsedText_ = text.value();
-        hasParsed_ = true;
-    }
-    if (parsed_ == nullptr)
-        return notAvailable(problem_);
-    return parsed_;
+    auto found =
+        std::find_if(versions_.begin(), versions_.end(), [&text](const auto& version) {
+            return version->process() == getpid() && version->text() == text;
+        });
+    if (found == versions_.end())
+        found = versions_.insert(versions_.end(), std::make_shared<Version>(text));
+    std::rotate(versions_.begin(), found, found + 1);
+    for (std::size_t at = versions_.size(); at-- > VERSIONS_KEPT;)
+        if (versions_[at].use_count() == 1)
+            versions_.erase(versions_.begin() + static_cast<std::ptrdiff_t>(at));
+    return versions_.front();
 }
 
 void DeviceFile::report(const std::string& problem)

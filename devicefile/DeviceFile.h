@@ -17,6 +17,7 @@ namespace port::devicefile {
 constexpr std::size_t SIZE_LIMIT = 1024 * 1024; // of a file, in bytes
 constexpr std::size_t LINE_LIMIT = 1024;        // of one line
 constexpr std::size_t STEP_LIMIT = 10000;       // changes of all steps together
+constexpr std::size_t VERSIONS_KEPT = 8;        // texts that a file held, and what they say
 
 /// A mistake in a device file; lines and columns (of characters) are counted from 1.
 struct Problem {
@@ -60,8 +61,8 @@ public:
         return path_;
     }
 
-    /// The device as the file describes it now; the file is parsed again only when its text
-    /// changed.
+    /// The device as the file describes it now. The last texts that it held are known, so that each
+    /// is parsed once, whichever threads meet which of them; nobody waits for another's text.
     Result<std::shared_ptr<const Device>> device();
 
     /// What a function of the device tells.
@@ -82,17 +83,17 @@ public:
     }
 
 private:
+    class Version; // a text that the file held, with what it says
+
     Result<std::shared_ptr<const Device>> read();
+    std::shared_ptr<Version> versionOf(const std::string& text);
     void report(const std::string& problem);
 
     const std::string path_;
     const std::function<void(const std::string&)> onProblem_;
     const std::string elsewhere_;
-    ForkMutex mutex_;
-    std::string parsedText_;
-    std::shared_ptr<const Device> parsed_; // null when the text is no device,
-    std::string problem_;                  // for this reason
-    bool hasParsed_ = false;
+    ForkMutex mutex_;                                // never held while a text is parsed
+    std::vector<std::shared_ptr<Version>> versions_; // the last ones, the one met last first
     std::string reported_; // the problem that was told last; empty when there is none
 };
 

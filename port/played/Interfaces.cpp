@@ -28,7 +28,7 @@ std::string inner(const std::string& text)
 // Reads the members of one interface.
 class Description {
 public:
-    explicit Description(std::string name) : xml_("<node><interface name='" + name + "'>") {}
+    explicit Description(const std::string& name) : xml_("<node><interface name='" + name + "'>") {}
 
     void add(const std::string& line)
     {

@@ -38,7 +38,8 @@ std::vector<std::string> serviceNames()
     return names;
 }
 
-Player::Player(std::string file, std::string address, const std::vector<std::string>& services,
+Player::Player(std::string file, const std::string& address,
+               const std::vector<std::string>& services,
                std::function<void(const std::string&)> onProblem)
     : file_(std::move(file), std::move(onProblem)), context_(g_main_context_ref_thread_default()),
       change_(makeBell())

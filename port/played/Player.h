@@ -19,7 +19,7 @@ class Player {
 public:
     /// `file` is a path. `onProblem` is told of a mistake in it, once. The services begin when
     /// start() is called, in the thread whose default context runs them and destroys this.
-    Player(std::string file, std::string address, const std::vector<std::string>& services,
+    Player(std::string file, const std::string& address, const std::vector<std::string>& services,
            std::function<void(const std::string&)> onProblem);
     ~Player();
     Player(const Player&) = delete;

@@ -124,7 +124,7 @@ void Stage::misbehave(const Behaviour& behaviour)
     behaviour_ = behaviour;
     calls_ = 0;
     comeback_.reset();
-    isSilent_ = behaviour.kind == Behaviour::Kind::Silent;
+    *isSilent_ = behaviour.kind == Behaviour::Kind::Silent;
     isGone_ = false;
     if (behaviour.kind == Behaviour::Kind::Crashing && behaviour.call == 0)
         crash();
@@ -140,7 +140,8 @@ void Stage::enter()
                                                       Out(error)));
     if (bus_ == nullptr)
         fail("no bus", error);
-    g_dbus_connection_add_filter(bus_.get(), &Stage::onMessage, this, nullptr);
+    g_dbus_connection_add_filter(bus_.get(), &Stage::onMessage, new Silence(isSilent_),
+                                 &Stage::releaseSilence);
     if (service_.manager != nullptr)
         add(service_.manager, OBJECT_MANAGER, objectManager());
     for (const Object& object : world_)
@@ -329,13 +330,18 @@ void Stage::tellLists(const std::string& path, const Face& before, const Face& a
 
 // On the thread that receives: whoever is silent does not even introduce himself.
 GDBusMessage* Stage::onMessage(GDBusConnection*, GDBusMessage* message, gboolean isIncoming,
-                               gpointer self)
+                               gpointer silence)
 {
-    if (isIncoming == FALSE || !static_cast<Stage*>(self)->isSilent_ ||
+    if (isIncoming == FALSE || !**static_cast<Silence*>(silence) ||
         g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
     g_object_unref(message);
     return nullptr;
+}
+
+void Stage::releaseSilence(gpointer silence)
+{
+    delete static_cast<Silence*>(silence);
 }
 
 // Whether the service lives on after it.

@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <functional>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -58,7 +59,8 @@ private:
                        const char* interface, const char* member, GVariant* arguments,
                        GDBusMethodInvocation* call, gpointer self);
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean isIncoming,
-                                   gpointer self);
+                                   gpointer silence);
+    static void releaseSilence(gpointer silence);
     static gboolean onDelayEnd(gpointer late);
     static gboolean onReturn(gpointer self);
     void handle(GDBusMethodInvocation* call);
@@ -80,7 +82,9 @@ private:
     Behaviour behaviour_;
     bool isGone_ = false; // it crashed, and did not come back yet
     int calls_ = 0;
-    std::atomic<bool> isSilent_{false}; // read by the thread that receives messages
+    // Read by the thread that receives messages, which may do so for a while after we have left.
+    using Silence = std::shared_ptr<std::atomic<bool>>;
+    const Silence isSilent_ = std::make_shared<std::atomic<bool>>(false);
     Owned<GSource> comeback_;
     std::vector<Late*> late_;
 };

@@ -204,8 +204,8 @@ TEST_F(ChangeFileTest, WriterThatStandsStillIsNotWaitedForForEver)
 
 TEST_F(ChangeFileTest, ManyWritersLoseNothing)
 {
-    constexpr int WRITERS = 12;
-    constexpr int LINES = 20;
+    constexpr int WRITERS = 6;
+    constexpr int LINES = 10;
     std::vector<pid_t> children;
     for (int writer = 0; writer < WRITERS; ++writer) {
         const pid_t child = fork();

@@ -1,7 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
+#include <algorithm>
 #include <cerrno>
 #include <filesystem>
 #include <fstream>
+#include <memory>
+#include <mutex>
+#include <set>
+#include <vector>
 
 #include <gmock/gmock.h>
 #include <sys/stat.h>
@@ -268,6 +273,42 @@ TEST_F(SimulatorTest, FileMovedOverItIsSeen)
     EXPECT_EQ("one", model());
     fs::rename(tree.write("/next.toml", "schema = 1\n[device]\nmodel_name = 'two'\n"), path);
     EXPECT_EQ("two", model());
+}
+
+// A parse makes a device: as many are met as were parsed, while none is let go.
+TEST_F(SimulatorTest, TextsThatTakeTurnsAreParsedOnceEachWhicheverThreadsMeetThem)
+{
+    constexpr std::size_t TEXTS = port::devicefile::VERSIONS_KEPT;
+    port::devicefile::DeviceFile file(path);
+    std::mutex mutex;
+    std::set<std::shared_ptr<const port::devicefile::Device>> parsed;
+    together(8, [&](int thread) {
+        for (std::size_t turn = 0; turn < 20 * TEXTS; ++turn) {
+            if (thread == 0) {
+                tree.write("/next", "schema = 1\ndevice.model_name = 'm" +
+                                        std::to_string(turn % TEXTS) + "'\n");
+                fs::rename(tree.path("/next"), path);
+            }
+            const auto device = file.device();
+            const std::lock_guard<std::mutex> lock(mutex);
+            if (device)
+                parsed.insert(device.value());
+        }
+    });
+    EXPECT_EQ(TEXTS, parsed.size());
+}
+
+TEST_F(SimulatorTest, TextsOfLongAgoAreLetGo)
+{
+    port::devicefile::DeviceFile file(path);
+    std::vector<std::weak_ptr<const port::devicefile::Device>> parsed;
+    for (std::size_t turn = 0; turn < 3 * port::devicefile::VERSIONS_KEPT; ++turn) {
+        describe("schema = 1\ndevice.model_name = '" + std::to_string(turn) + "'\n");
+        parsed.push_back(file.device().value());
+    }
+    const auto isKept = [](const auto& device) { return !device.expired(); };
+    EXPECT_EQ(port::devicefile::VERSIONS_KEPT,
+              static_cast<std::size_t>(std::count_if(parsed.begin(), parsed.end(), isKept)));
 }
 
 TEST_F(SimulatorTest, DeletedFileIsNoLongerAnswered)
