@@ -711,10 +711,9 @@ Result<std::shared_ptr<const Device>> DeviceFile::read()
 std::shared_ptr<DeviceFile::Version> DeviceFile::versionOf(const std::string& text)
 {
     const std::lock_guard<ForkMutex> lock(mutex_);
-    auto found =
-        std::find_if(versions_.begin(), versions_.end(), [&text](const auto& version) {
-            return version->process() == getpid() && version->text() == text;
-        });
+    auto found = std::find_if(versions_.begin(), versions_.end(), [&text](const auto& version) {
+        return version->process() == getpid() && version->text() == text;
+    });
     if (found == versions_.end())
         found = versions_.insert(versions_.end(), std::make_shared<Version>(text));
     std::rotate(versions_.begin(), found, found + 1);

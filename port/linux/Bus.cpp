@@ -26,7 +26,12 @@ std::string shortName(const BusObject& object)
 
 Bus::Bus(std::initializer_list<const char*> services) : core_(std::make_unique<Core>(services)) {}
 
-Bus::~Bus() = default;
+// In a forked process the thread of the one before is not there to be waited for.
+Bus::~Bus()
+{
+    if (!isOfThisProcess())
+        static_cast<void>(core_.release());
+}
 
 bool Bus::isOfThisProcess()
 {

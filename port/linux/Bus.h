@@ -110,7 +110,7 @@ private:
 
     class Core;
     std::atomic<pid_t> owner_{0}; // the process that asked first
-    const std::unique_ptr<Core> core_;
+    std::unique_ptr<Core> core_;
 };
 
 } // namespace port::linux_backend

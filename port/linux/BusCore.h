@@ -18,12 +18,22 @@
 
 #include "../common/Descriptor.h"
 #include "Bus.h"
+#include "BusPatience.h"
 #include "KernelEvents.h"
 
 namespace port::linux_backend {
 
-using BusClock = std::chrono::steady_clock;
-using BusTime = BusClock::time_point;
+constexpr BusObject BUS_ITSELF = {"org.freedesktop.DBus", "/org/freedesktop/DBus",
+                                  "org.freedesktop.DBus", Start::Never};
+constexpr char PROPERTIES[] = "org.freedesktop.DBus.Properties";
+constexpr char OBJECT_MANAGER[] = "org.freedesktop.DBus.ObjectManager";
+
+int millisecondsUntil(BusTime end);
+Error silent(const std::string& name);
+Error absent(const std::string& name);
+
+// The objects that have settings which were not read since they changed.
+std::vector<std::string> pathsWithoutSettings(const ObjectService& service, const Tree& tree);
 
 // A reply that somebody waits for.
 struct Awaited {
@@ -81,6 +91,8 @@ private:
     };
     // What there was to be seen at a change.
     using Moment = std::map<const ObjectService*, Result<Objects>>;
+    // Of the thread that tells of changes: what was so at the change that it tells of now.
+    static thread_local const Moment* presentMoment;
     struct Watcher;
     class WatchHandle;
     struct Search;
@@ -98,7 +110,14 @@ private:
     void attach(Peer& peer);
     void attachObjects(Peer& peer, const ObjectService& service);
     void addMatch(Peer& peer, const std::string& rule);
+    // Answered by the bus, whichever service it is about.
+    static bool isForBus(Kind kind)
+    {
+        return kind == Kind::Owner || kind == Kind::Match;
+    }
     bool isOverdue(const Peer& peer, BusTime now) const;
+    void forgetUnheard(const Peer& peer, BusTime until);
+    void keepFewUnheard(const Peer& peer);
     BusTime deadlineOf(const Peer& peer, BusTime now, BusTime end) const;
 
     AwaitedReply send(Kind kind, Peer& peer, const BusObject& object, const char* method,
@@ -135,7 +154,7 @@ private:
     void tell(Lock& lock);
     void kick() const;
 
-    const std::initializer_list<const char*> services_;
+    const std::vector<const char*> services_;
     std::mutex mutex_;
     std::condition_variable changed_;
     sd_bus* bus_ = nullptr;

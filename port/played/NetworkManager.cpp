@@ -588,6 +588,7 @@ const Role& networkManager()
          {WIRELESS, "AccessPoints", "AccessPointAdded", "AccessPointRemoved"}},
         refuse,
         false,
+        {{NM_DBUS_INTERFACE_SETTINGS_CONNECTION, "GetSettings", "Updated"}},
     };
     return service;
 }

@@ -105,6 +105,13 @@ struct ListTale {
     const char* removed;
 };
 
+/// A signal that tells that a method, one without arguments, answers otherwise than before.
+struct AnswerTale {
+    const char* interface;
+    const char* method;
+    const char* signal;
+};
+
 struct Role {
     const char* name; // in the device file
     const char* busName;
@@ -117,6 +124,7 @@ struct Role {
     std::vector<ListTale> lists;
     Outcome (*refuse)(const Request&); // what a client may not, or the device file cannot hold
     bool removesFirst;                 // tells of what goes before what comes, else at the end
+    std::vector<AnswerTale> answers = {};
 };
 
 const Role& modemManager();

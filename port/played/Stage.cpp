@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <stdexcept>
+#include <utility>
 
 namespace port::played {
 namespace {
@@ -113,10 +114,11 @@ void Stage::show(const Scene& scene)
         return leave();
     World before = std::move(world_);
     world_ = service_.worldOf(scene);
+    const Answers answersBefore = std::exchange(answers_, answers());
     if (bus_ == nullptr)
-        enter();
-    else
-        tell(before);
+        return enter();
+    tell(before);
+    tellAnswers(answersBefore);
 }
 
 void Stage::misbehave(const Behaviour& behaviour)
@@ -254,6 +256,37 @@ void Stage::tell(const World& before)
             tellChanged(*old, object);
     if (!service_.removesFirst)
         tellRemoved(before);
+}
+
+const Act* Stage::find(const std::vector<Act>& table, const std::string& interface,
+                       const std::string& member)
+{
+    const auto row = std::find_if(table.begin(), table.end(), [&](const Act& each) {
+        return interface == each.interface && member == each.member;
+    });
+    return row != table.end() ? &*row : nullptr;
+}
+
+Stage::Answers Stage::answers() const
+{
+    Answers all;
+    for (const AnswerTale& tale : service_.answers)
+        for (const Object& object : world_)
+            if (object.find(tale.interface) != nullptr)
+                all[{object.path, &tale}] =
+                    find(service_.methods, tale.interface, tale.method)
+                        ->act({*scene_, world_, object.path, tale.interface, tale.method, nullptr})
+                        .reply;
+    return all;
+}
+
+void Stage::tellAnswers(const Answers& before)
+{
+    for (const auto& [which, answer] : answers_) {
+        const auto old = before.find(which);
+        if (old != before.end() && g_variant_equal(old->second.get(), answer.get()) == FALSE)
+            emit(which.first, which.second->interface, which.second->signal, nullptr);
+    }
 }
 
 void Stage::tellAdded(const World& before)
@@ -441,10 +474,8 @@ void Stage::act(GDBusMethodInvocation* call, const std::vector<Act>& table, cons
     if (find(request.path, request.interface) == nullptr)
         return g_dbus_method_invocation_return_dbus_error(call, UNKNOWN_OBJECT,
                                                           request.path.c_str());
-    const auto row = std::find_if(table.begin(), table.end(), [&](const Act& each) {
-        return request.interface == each.interface && request.member == each.member;
-    });
-    const Outcome outcome = row != table.end() ? row->act(request) : service_.refuse(request);
+    const Act* const row = find(table, request.interface, request.member);
+    const Outcome outcome = row != nullptr ? row->act(request) : service_.refuse(request);
     const std::string problem =
         outcome.changes.empty() ? std::string() : director_(outcome.changes);
     if (!problem.empty())

@@ -5,8 +5,10 @@
 
 #include <atomic>
 #include <functional>
+#include <map>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "Service.h"
@@ -40,7 +42,10 @@ private:
     void enter();
     void leave();
     void crash();
+    using Answers = std::map<std::pair<std::string, const AnswerTale*>, Variant>;
+    Answers answers() const;
     void tell(const World& before);
+    void tellAnswers(const Answers& before);
     void tellAdded(const World& before);
     void tellRemoved(const World& before);
     void tellChanged(const Object& before, const Object& after);
@@ -68,6 +73,8 @@ private:
                         GVariant* arguments);
     void answerObjects(GDBusMethodInvocation* call) const;
     void act(GDBusMethodInvocation* call, const std::vector<Act>& table, const Request& request);
+    static const Act* find(const std::vector<Act>& table, const std::string& interface,
+                           const std::string& member);
     const Face* find(const std::string& path, const std::string& interface) const;
     bool countCall();
 
@@ -78,6 +85,7 @@ private:
     Owned<GDBusConnection> bus_;
     std::vector<Shown> shown_;
     World world_;
+    Answers answers_; // to what the service tells changes of
     const Scene* scene_ = nullptr;
     Behaviour behaviour_;
     bool isGone_ = false; // it crashed, and did not come back yet
