@@ -18,6 +18,7 @@
 #include <gio/gio.h>
 
 #include "Sims.h"
+#include "port/facts/Facts.h"
 
 namespace {
 
@@ -249,8 +250,55 @@ Fact askSerial()
 struct FactRow {
     const char* name;
     std::function<Fact()> ask;
-    bool isIdentity = false;
 };
+
+// The facts of facts.def, by their places in a device file, that a name of the command stands for.
+struct Place {
+    const char* name;
+    std::string_view section;
+    std::string_view key;
+};
+constexpr Place PLACES[] = {
+    {"device_name", "settings", "device_name"},
+    {"tizen_id", "device", "platform_id"},
+    {"platform_name", "device", "platform_name"},
+    {"sw_version", "device", "platform_version"},
+    {"model_name", "device", "model_name"},
+    {"language_code", "settings", "language"},
+    {"sim_mcc", "slot", "mcc"},
+    {"sim_mnc", "slot", "mnc"},
+    {"phone_number", "slot", "number"},
+    {"imei", "slot", "imei"},
+    {"roaming", "slot", "roaming"},
+    {"flight_mode", "settings", "flight_mode"},
+    {"data_roaming", "settings", "data_roaming"},
+    {"mobile_data", "settings", "mobile_data"},
+    {"sales_code", "settings", "sales_code"},
+    {"device_serial", "device", "serial"},
+    // No public question of the library's is about these alone.
+    {"", "settings", "font_size"},
+    {"", "settings", "packet_data"},
+};
+
+constexpr bool hasPlace(const port::FactRow& row)
+{
+    for (const Place& place : PLACES)
+        if (place.section == row.section && place.key == row.key)
+            return true;
+    return false;
+}
+#define FACT(number, question, ...)                                   \
+    static_assert(hasPlace(port::PlainFact<Question::question>::row), \
+                  "the command shows every plain fact, or says that it does not");
+#include "port/facts/facts.def"
+
+bool isIdentity(const std::string& name)
+{
+    for (const Place& place : PLACES)
+        if (place.name == name)
+            return port::isPrivate(place.section, place.key);
+    return false;
+}
 
 const std::vector<FactRow>& facts()
 {
@@ -266,8 +314,8 @@ const std::vector<FactRow>& facts()
         {"sim_mcc", ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)},
         {"sim_mnc", ofSim(Question::SimIdentity, &CoreSystem::GetMNCFromSim)},
         {"sim_country", askSimCountry},
-        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim), true},
-        {"imei", askImei, true},
+        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim)},
+        {"imei", askImei},
         {"roaming", askRoamingOfFirstSlot},
         {"flight_mode", yesOrNo({Question::FlightMode}, [] { return library().IsFlightMode(); })},
         {"data_roaming",
@@ -280,7 +328,7 @@ const std::vector<FactRow>& facts()
         {"sales_code", askSalesCode},
         {"storage_available",
          yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
-        {"device_serial", askSerial, true},
+        {"device_serial", askSerial},
     };
     return all;
 } // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
@@ -412,7 +460,7 @@ std::vector<cli::Fact> cli::askFacts(const std::vector<std::string>& names)
             std::thread([=] { askOneByOne(*answers, ofDaemon); }).detach();
     std::vector<Fact> facts = answers->await();
     for (Fact& fact : facts)
-        fact.isIdentity = rowOf(fact.name).isIdentity;
+        fact.isIdentity = isIdentity(fact.name);
     return facts;
 }
 

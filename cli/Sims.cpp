@@ -3,6 +3,8 @@
 
 #include <cstdlib>
 
+#include "port/facts/Privacy.h"
+
 namespace cli {
 namespace {
 
@@ -233,9 +235,5 @@ cli::Answer cli::askRoaming(int slot)
 
 cli::Json cli::masked(const Json& value)
 {
-    if (!value.is_string())
-        return value;
-    auto text = value.get<std::string>();
-    const std::size_t hidden = text.size() > 4 ? text.size() - 2 : text.size();
-    return text.replace(0, hidden, hidden, '*');
+    return value.is_string() ? Json(port::masked(value.get<std::string>())) : value;
 }

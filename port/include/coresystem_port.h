@@ -44,6 +44,7 @@ enum class Question {
     Roaming,
     SmsReadiness,
     Subscriptions,
+    DeviceSerial,
 };
 
 /// Where an answer came from, or why there was none.

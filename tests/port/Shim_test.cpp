@@ -11,7 +11,7 @@
 #include <system_settings.h>
 
 #include "coresystem_port.h"
-#include "shim/HandOut.h"
+#include "shim/Call.h"
 #include "support/CapturedStandardError.h"
 #include "support/TemporaryTree.h"
 #include "support/Together.h"
@@ -259,8 +259,8 @@ TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
 {
     const auto code = [](const port::Error& error, const port::Codes& codes) {
         return failure([&](char** answer) {
-            return port::handOut(Question::Language, port::Result<port::Fact>(error), answer,
-                                 codes);
+            return port::Call("none", codes)
+                .handOut(Question::Language, port::Result<port::Fact>(error), answer);
         });
     };
     EXPECT_EQ(-1, code(port::notAvailable("why"), {-1, -2}));
@@ -274,10 +274,13 @@ TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
 
 TEST_F(ShimTest, NoExceptionLeavesAShim)
 {
-    EXPECT_EQ(-12, port::guarded([]() -> int { throw std::bad_alloc(); }));
-    EXPECT_EQ(-5, port::guarded([]() -> int { throw 1; }));
-    EXPECT_EQ(-6, port::guarded([]() -> int { throw 1; }, -6));
-    EXPECT_EQ(3, port::guarded([]() -> int { return 3; }));
+    const port::Codes codes{-6, -1};
+    const port::Call call("none", codes);
+    EXPECT_EQ(-12, call.run([]() -> int { throw std::bad_alloc(); }));
+    EXPECT_EQ(-6, call.run([]() -> int { throw 1; }));
+    EXPECT_EQ(-6, call.release([]() -> int { throw 1; }));
+    EXPECT_EQ(nullptr, call.pointer([]() -> char* { throw 1; }));
+    EXPECT_EQ(3, call.run([]() -> int { return 3; }));
 }
 
 TEST_F(ShimTest, MissingMemoryIsNamed)

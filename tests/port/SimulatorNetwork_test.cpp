@@ -32,11 +32,11 @@ TEST_F(SimulatorNetworkTest, SwitchesAnswerWithTheirLines)
 {
     describe("[settings]\nflight_mode = false\npacket_data = true\nmobile_data = false\n"
              "data_roaming = true\nfont_size = 'huge'\n");
-    expectAnswer(false, line(3), network.flightMode());
-    expectAnswer(true, line(4), network.packetData());
-    expectAnswer(false, line(5), network.mobileData());
-    expectAnswer(true, line(6), network.dataRoaming());
-    expectAnswer(FontSize::Huge, line(7), backend->settings().fontSize());
+    expectAnswer(false, line(3), backend->get<port::Question::FlightMode>());
+    expectAnswer(true, line(4), backend->get<port::Question::PacketData>());
+    expectAnswer(false, line(5), backend->get<port::Question::MobileData>());
+    expectAnswer(true, line(6), backend->get<port::Question::DataRoaming>());
+    expectAnswer(FontSize::Huge, line(7), backend->get<port::Question::FontSize>());
 }
 
 TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
@@ -46,12 +46,14 @@ TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
     expectError(Kind::NotAvailable, line(2) + ": [network] has no wifi", network.wifi());
     expectError(Kind::NotAvailable, line(2) + ": [network] has no wifi", network.wifiConnection());
     expectError(Kind::NotAvailable, line(2) + ": [network] has no bluetooth", network.bluetooth());
-    expectError(Kind::NotAvailable, path + ": [settings] has no flight_mode", network.flightMode());
-    expectError(Kind::NotAvailable, path + ": [settings] has no packet_data", network.packetData());
+    expectError(Kind::NotAvailable, path + ": [settings] has no flight_mode",
+                backend->get<port::Question::FlightMode>());
+    expectError(Kind::NotAvailable, path + ": [settings] has no packet_data",
+                backend->get<port::Question::PacketData>());
     expectError(Kind::NotAvailable, path + ": [settings] has no font_size",
-                backend->settings().fontSize());
+                backend->get<port::Question::FontSize>());
     expectError(Kind::NotAvailable, path + ": [device] has no serial",
-                backend->deviceInfo().serial());
+                backend->get<port::Question::DeviceSerial>());
 }
 
 TEST_F(SimulatorNetworkTest, RadioMayBeMissingFromTheDevice)
@@ -106,7 +108,7 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
     expectError(Kind::NotAvailable, problem, network.cellular());
     expectError(Kind::NotAvailable, problem, network.wifi());
     expectError(Kind::NotAvailable, problem, network.wifiConnection());
-    expectError(Kind::NotAvailable, problem, network.flightMode());
+    expectError(Kind::NotAvailable, problem, backend->get<port::Question::FlightMode>());
     expectError(Kind::NotAvailable, problem, backend->storage().internal());
     expectError(Kind::NotAvailable, problem, backend->packages().version("a"));
     expectError(Kind::NotAvailable, problem, backend->clock().now());
@@ -115,7 +117,7 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
 TEST_F(SimulatorNetworkTest, SerialNumberIsAnswered)
 {
     describe("[device]\nserial = 'R38N50'\n");
-    expectAnswer("R38N50", line(3), backend->deviceInfo().serial());
+    expectAnswer("R38N50", line(3), backend->get<port::Question::DeviceSerial>());
 }
 
 class SimulatorStorageTest : public DeviceFileTest {};
@@ -174,9 +176,9 @@ class SimulatorConfigurationTest : public DeviceFileTest {};
 TEST_F(SimulatorConfigurationTest, SalesCodeIsTheOneKey)
 {
     describe("[settings]\nsales_code = 'KOO'\n");
-    expectAnswer("KOO", line(3), backend->configuration().text("db/csc/salescode"));
+    expectAnswer("KOO", line(3), backend->configuration("db/csc/salescode"));
     expectError(Kind::NotAvailable, path + ": no configuration key db/csc/other",
-                backend->configuration().text("db/csc/other"));
+                backend->configuration("db/csc/other"));
 }
 
 class SimulatorClockTest : public DeviceFileTest {};
