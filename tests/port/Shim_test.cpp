@@ -4,6 +4,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <thread>
 
 #include <dlog.h>
 #include <gmock/gmock.h>
@@ -281,6 +282,22 @@ TEST_F(ShimTest, NoExceptionLeavesAShim)
     EXPECT_EQ(-6, call.release([]() -> int { throw 1; }));
     EXPECT_EQ(nullptr, call.pointer([]() -> char* { throw 1; }));
     EXPECT_EQ(3, call.run([]() -> int { return 3; }));
+}
+
+TEST_F(ShimTest, OriginsBelongToTheScopeAndTheThread)
+{
+    const coresystem_port::Origins outer;
+    port::recordOrigin(Question::Language, {true, "first", ""});
+    {
+        const coresystem_port::Origins inner;
+        port::recordOrigin(Question::Wifi, {false, "", "no radio"});
+        std::thread([] { port::recordOrigin(Question::Wifi, {true, "elsewhere", ""}); }).join();
+        EXPECT_EQ("no radio", inner.of(Question::Wifi).reason);
+        EXPECT_EQ("", inner.of(Question::Language).source);
+    }
+    EXPECT_EQ("no radio", outer.of(Question::Wifi).reason);
+    EXPECT_EQ("first", outer.of(Question::Language).source);
+    EXPECT_EQ("elsewhere", lastOrigin(Question::Wifi).source);
 }
 
 TEST_F(ShimTest, MissingMemoryIsNamed)

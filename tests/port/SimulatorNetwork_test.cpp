@@ -109,9 +109,9 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
     expectError(Kind::NotAvailable, problem, network.wifi());
     expectError(Kind::NotAvailable, problem, network.wifiConnection());
     expectError(Kind::NotAvailable, problem, backend->get<port::Question::FlightMode>());
-    expectError(Kind::NotAvailable, problem, backend->storage().internal());
-    expectError(Kind::NotAvailable, problem, backend->packages().version("a"));
-    expectError(Kind::NotAvailable, problem, backend->clock().now());
+    expectError(Kind::NotAvailable, problem, backend->internalStorage());
+    expectError(Kind::NotAvailable, problem, backend->packageVersion("a"));
+    expectError(Kind::NotAvailable, problem, backend->now());
 }
 
 TEST_F(SimulatorNetworkTest, SerialNumberIsAnswered)
@@ -126,7 +126,7 @@ TEST_F(SimulatorStorageTest, VolumeIsAnsweredWhole)
 {
     describe("[storage]\nblock_size = 4096\nfragment_size = 512\nblocks = 6442450944\n"
              "available_blocks = 7\n");
-    const auto answer = backend->storage().internal();
+    const auto answer = backend->internalStorage();
     ASSERT_TRUE(answer) << answer.error().reason;
     EXPECT_EQ(4096U, answer.value().value.blockSize);
     EXPECT_EQ(512U, answer.value().value.fragmentSize);
@@ -144,7 +144,7 @@ TEST_F(SimulatorStorageTest, VolumeOfWhichAKeyIsMissingIsNotAvailable)
             text += key == missing ? "" : key + " = 1\n";
         describe(text);
         expectError(Kind::NotAvailable, line(2) + ": [storage] has no " + missing,
-                    backend->storage().internal());
+                    backend->internalStorage());
     }
 }
 
@@ -153,22 +153,21 @@ class SimulatorPackagesTest : public DeviceFileTest {};
 TEST_F(SimulatorPackagesTest, VersionsAreAnsweredByExactName)
 {
     describe("[packages]\n'org.example.clock' = '1.2.3'\n' odd\\name' = ''\n");
-    expectAnswer(std::string("1.2.3"), line(3), backend->packages().version("org.example.clock"));
-    expectAnswer(std::string(), line(4), backend->packages().version(" odd\\name"));
+    expectAnswer(std::string("1.2.3"), line(3), backend->packageVersion("org.example.clock"));
+    expectAnswer(std::string(), line(4), backend->packageVersion(" odd\\name"));
 }
 
 TEST_F(SimulatorPackagesTest, OtherNamesAreNotInstalled)
 {
     describe("[packages]\n'org.example.clock' = '1.2.3'\n");
     for (const char* const name : {"", "org.example", "ORG.EXAMPLE.CLOCK", "org.example.clock "})
-        expectAnswer(std::nullopt, line(2), backend->packages().version(name));
+        expectAnswer(std::nullopt, line(2), backend->packageVersion(name));
 }
 
 TEST_F(SimulatorPackagesTest, FileThatNamesNoPackagesTellsOfNone)
 {
     describe("");
-    expectError(Kind::NotAvailable, path + ": no section [packages]",
-                backend->packages().version("a"));
+    expectError(Kind::NotAvailable, path + ": no section [packages]", backend->packageVersion("a"));
 }
 
 class SimulatorConfigurationTest : public DeviceFileTest {};
@@ -212,7 +211,7 @@ TEST_F(SimulatorClockTest, ClockIsTheMachines)
 {
     describe("[settings]\nutc_offset = -12600\n");
     const std::time_t before = std::time(nullptr);
-    const auto answer = backend->clock().now();
+    const auto answer = backend->now();
     const std::time_t after = std::time(nullptr);
     ASSERT_TRUE(answer) << answer.error().reason;
     std::tm local = answer.value().value;
@@ -226,8 +225,7 @@ TEST_F(SimulatorClockTest, ClockIsTheMachines)
 TEST_F(SimulatorClockTest, TimeWithoutAnOffsetIsNotAvailable)
 {
     describe("");
-    expectError(Kind::NotAvailable, path + ": [settings] has no utc_offset",
-                backend->clock().now());
+    expectError(Kind::NotAvailable, path + ": [settings] has no utc_offset", backend->now());
 }
 
 } // namespace
