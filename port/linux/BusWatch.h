@@ -7,8 +7,8 @@
 #include <vector>
 
 #include "../backend/Network.h"
+#include "../common/ContextThread.h"
 #include "../common/GLibTypes.h"
-#include "../events/ContextThread.h"
 
 namespace port::linux_backend {
 

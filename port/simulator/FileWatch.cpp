@@ -6,8 +6,8 @@
 #include <utility>
 #include <vector>
 
+#include "../common/ContextThread.h"
 #include "../common/GLibTypes.h"
-#include "../events/ContextThread.h"
 
 namespace port::simulator {
 namespace {
