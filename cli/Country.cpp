@@ -54,7 +54,7 @@ struct Reading {
     Country country;                       // of the MCC that the library answers
     Text nameOfCallingCode;                // answered for a calling code directly,
     Text alpha2OfCallingCode;              // which can differ from the MCC's own
-    std::vector<Country> others;           // further MCCs with the same key
+    std::vector<Country> others;           // further MCCs with the same key, by row
     std::vector<std::string> alpha2Codes;  // all that lead to the MCC; more than one when
     std::vector<std::string> callingCodes; // it stands for several countries
 
@@ -85,6 +85,9 @@ std::vector<Country> othersWith(const Kind& kind, const std::string& key, const 
     for (const Country& country : atlas.countries)
         if (kind.cell != nullptr && country.*kind.cell == key && country.mcc != mcc)
             others.push_back(country);
+    std::stable_sort(others.begin(), others.end(), [&](const Country& one, const Country& other) {
+        return placeInTable(kind.jsonName, one.mcc) < placeInTable(kind.jsonName, other.mcc);
+    });
     return others;
 }
 

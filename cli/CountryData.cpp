@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "CountryData.h"
 
+#include <algorithm>
 #include <sstream>
+#include <string_view>
 
 #include "CountryDataFiles.h"
 
@@ -29,6 +31,14 @@ std::string orNone(const std::string& text)
 }
 
 } // namespace
+
+std::size_t cli::placeInTable(const std::string& field, const std::string& mcc)
+{
+    const std::string_view order = field == "calling_code" ? CALLING_CODE_ORDER
+                                   : field == "alpha2"     ? MCC_COUNTRY_ORDER
+                                                           : SERVICE_COUNTRY_ORDER;
+    return std::min(order.find(mcc), order.size()); // every MCC has three digits
+}
 
 std::vector<cli::Erratum> cli::errataOf(const std::string& key)
 {

@@ -22,6 +22,10 @@ struct Erratum {
     std::string date;
 };
 
+/// Where an MCC stands in the library's table of that field ("alpha2", "calling_code" or
+/// "service_locale"); one behind the last for none.
+std::size_t placeInTable(const std::string& field, const std::string& mcc);
+
 /// The errata of a key, in the order of the file.
 std::vector<Erratum> errataOf(const std::string& key);
 

@@ -2,27 +2,32 @@
 // `coresystem device show`: the values of a device file, each with its line.
 #include <algorithm>
 #include <iterator>
+#include <string>
 
 #include "DeviceCommands.h"
 #include "Session.h"
 #include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
+#include "devicefile/DevicePath.h"
 #include "devicefile/DeviceText.h"
+#include "port/facts/Facts.h"
 
 namespace cli {
 namespace {
 
 using port::devicefile::Entry;
 
-// What is of a person or of one device only.
+// A step says what it sets as a path of its own.
 bool isIdentity(const Entry& entry)
 {
-    const char* const names[] = {"msin", "number", "imei", "serial"};
-    const std::string name = entry.key.substr(entry.key.rfind('.') + 1);
-    return std::any_of(std::begin(names), std::end(names), [&](const std::string& identity) {
-        return name == identity || name == identity + '"';
-    });
+    const bool isOfStep = entry.section.compare(0, 4, "step") == 0;
+    std::string text = isOfStep ? entry.key.substr(entry.key.find('.') + 1) : entry.path();
+    if (isOfStep) // in quotes or not, slot.0.sim and slot[0].sim alike
+        text.erase(std::remove(text.begin(), text.end(), '"'), text.end());
+    const auto path = port::devicefile::parsePath(text);
+    return path && path.value().size() > 1 &&
+           port::isPrivate(path.value().front(), path.value().back());
 }
 
 Json valueOf(const Entry& entry, bool reveal)

@@ -20,14 +20,18 @@
 #include "CountryData.h"
 #include "Serial.h"
 #include "Sims.h"
+#include "port/facts/Facts.h"
 
 namespace {
 
 using cli::Fact;
 using cli::Json;
 using cli::library;
-using coresystem_port::lastOrigin;
+using coresystem_port::Origins;
 using coresystem_port::Question;
+
+// Asks the library; the origins are those of what it asks.
+using Ask = std::function<Fact(const Origins&)>;
 
 // A text that the library handed out, which is released; nothing for null.
 std::optional<std::string> taken(char* slot)
@@ -37,9 +41,9 @@ std::optional<std::string> taken(char* slot)
     return text;
 }
 
-Fact answer(Question question, Json value)
+Fact answer(const Origins& origins, Question question, Json value)
 {
-    return {"", std::move(value), lastOrigin(question).source, ""};
+    return {"", std::move(value), origins.of(question).source, ""};
 }
 
 // What stands between the semicolons of several texts, each once.
@@ -71,30 +75,31 @@ std::string butTold(const std::string& reason, const std::string& told)
     return reason + "; applications are told " + told;
 }
 
-std::string reasonOf(Question question, int code)
+std::string reasonOf(const Origins& origins, Question question, int code)
 {
-    const std::string reason = lastOrigin(question).reason;
+    const std::string reason = origins.of(question).reason;
     return reason.empty() ? "the platform answered with error " + std::to_string(code) : reason;
 }
 
 // Of a question that succeeds and hands out null.
-std::string reasonOfNull(Question question)
+std::string reasonOfNull(const Origins& origins, Question question)
 {
-    const std::string reason = lastOrigin(question).reason;
+    const std::string reason = origins.of(question).reason;
     return reason.empty() ? "out of memory" : reason;
 }
 
 // A question that fails with a code of the platform.
-std::function<Fact()> text(Question question, int (CoreSystem::*read)(char**))
+Ask text(Question question, int (CoreSystem::*read)(char**))
 {
-    return [=] {
+    return [=](const Origins& origins) {
         char* slot = nullptr;
         const int code = (library().*read)(&slot);
         const auto value = taken(slot);
         // After a failed read the slot holds nothing that the device said.
         if (code != 0)
-            return noAnswer(reasonOf(question, code));
-        return value ? answer(question, *value) : noAnswer(reasonOfNull(question));
+            return noAnswer(reasonOf(origins, question, code));
+        return value ? answer(origins, question, *value)
+                     : noAnswer(reasonOfNull(origins, question));
     };
 }
 
@@ -123,25 +128,27 @@ Fact withErrata(Fact fact, const std::string& language)
 }
 
 // English when the platform does not say, which is not the device's language.
-std::function<Fact()> language(bool asIso639)
+Ask language(bool asIso639)
 {
-    return [=] {
+    return [=](const Origins& origins) {
         int code = 0;
         const auto value = readLanguage(asIso639, code);
-        if (code != 0 || !lastOrigin(Question::Language).available)
-            return noAnswer(butTold(reasonOf(Question::Language, code), value.value_or("nothing")));
+        if (code != 0 || !origins.of(Question::Language).available)
+            return noAnswer(
+                butTold(reasonOf(origins, Question::Language, code), value.value_or("nothing")));
         if (!asIso639)
-            return value ? answer(Question::Language, *value) : noAnswer("out of memory");
+            return value ? answer(origins, Question::Language, *value) : noAnswer("out of memory");
         const std::string own = readLanguage(false, code).value_or("");
-        return withErrata(value ? answer(Question::Language, *value) : noIso639Code(own), own);
+        return withErrata(value ? answer(origins, Question::Language, *value) : noIso639Code(own),
+                          own);
     };
 }
 
-Fact askSimAvailable()
+Fact askSimAvailable(const Origins& origins)
 {
     const bool isAvailable = library().IsSimAvailable();
-    const auto slots = lastOrigin(Question::SimSlots);
-    const auto card = lastOrigin(Question::SimCard);
+    const auto slots = origins.of(Question::SimSlots);
+    const auto card = origins.of(Question::SimCard);
     for (const auto& origin :
          {slots, card}) // a card that cannot be asked may be there all the same
         if (!isAvailable && !origin.reason.empty())
@@ -150,21 +157,21 @@ Fact askSimAvailable()
 }
 
 // The first slot's that has one.
-std::function<Fact()> ofSim(Question question, int (CoreSystem::*read)(char**))
+Ask ofSim(Question question, int (CoreSystem::*read)(char**))
 {
-    return [=] {
+    return [=](const Origins& origins) {
         char* slot = nullptr;
         const int code = (library().*read)(&slot);
         const auto value = taken(slot); // success without telephony leaves it empty
-        return code == 0 && value ? answer(question, *value)
-                                  : noAnswer(cli::whyNoSlotAnswers(question));
+        return code == 0 && value ? answer(origins, question, *value)
+                                  : noAnswer(cli::whyNoSlotAnswers(origins, question));
     };
 }
 
 // The country that issued the SIM, not the one where it is.
-Fact askSimCountry()
+Fact askSimCountry(const Origins& origins)
 {
-    const Fact mcc = ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)();
+    const Fact mcc = ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)(origins);
     if (mcc.value.is_null())
         return mcc;
     const cli::Answer country = cli::askCountryOf(mcc.value.get<std::string>());
@@ -172,32 +179,32 @@ Fact askSimCountry()
 }
 
 // Never fails: without a modem that tells one, it is made of the time zone.
-Fact askImei()
+Fact askImei(const Origins& origins)
 {
     char* slot = nullptr;
     library().GetIMEI(&slot);
     const std::string imei = taken(slot).value_or("");
-    if (lastOrigin(Question::Imei).available)
-        return answer(Question::Imei, imei);
-    return noAnswer(butTold(cli::whyNoImei(), imei));
+    if (origins.of(Question::Imei).available)
+        return answer(origins, Question::Imei, imei);
+    return noAnswer(butTold(cli::whyNoImei(origins), imei));
 }
 
-Fact askRoamingOfFirstSlot()
+Fact askRoamingOfFirstSlot(const Origins& origins)
 {
     const cli::Answer roaming = cli::askRoaming(0);
     return roaming.value.is_null() ? noAnswer(roaming.reason)
-                                   : answer(Question::Roaming, roaming.value);
+                                   : answer(origins, Question::Roaming, roaming.value);
 }
 
 // A switch that cannot be read is told to applications as off.
-std::function<Fact()> yesOrNo(std::vector<Question> questions, std::function<bool()> read)
+Ask yesOrNo(std::vector<Question> questions, std::function<bool()> read)
 {
-    return [questions = std::move(questions), read = std::move(read)] {
+    return [questions = std::move(questions), read = std::move(read)](const Origins& origins) {
         const bool isOn = read();
         std::vector<std::string> sources;
         std::vector<std::string> reasons;
         for (const Question question : questions) {
-            const auto origin = lastOrigin(question);
+            const auto origin = origins.of(question);
             (origin.available ? sources : reasons)
                 .push_back(origin.available ? origin.source : origin.reason);
         }
@@ -207,7 +214,7 @@ std::function<Fact()> yesOrNo(std::vector<Question> questions, std::function<boo
     };
 }
 
-std::function<Fact()> connected(bool overWifi, bool overBluetooth)
+Ask connected(bool overWifi, bool overBluetooth)
 {
     std::vector<Question> counted = {Question::Cellular};
     if (overWifi)
@@ -217,11 +224,11 @@ std::function<Fact()> connected(bool overWifi, bool overBluetooth)
     return yesOrNo(counted, [=] { return library().IsNetworkConnected(overWifi, overBluetooth); });
 }
 
-Fact askSalesCode()
+Fact askSalesCode(const Origins& origins)
 {
     const auto code = taken(library().GetCSC());
-    return code ? answer(Question::SalesCode, *code)
-                : noAnswer(lastOrigin(Question::SalesCode).reason);
+    return code ? answer(origins, Question::SalesCode, *code)
+                : noAnswer(origins.of(Question::SalesCode).reason);
 }
 
 const std::string DAEMON = "device daemon (org.tizen.system.deviced)";
@@ -238,7 +245,7 @@ void outliveTheBus()
 }
 
 // The daemon has a backend of its own.
-Fact askSerial()
+Fact askSerial(const Origins&)
 {
     outliveTheBus();
     const char* slot = nullptr;
@@ -249,9 +256,56 @@ Fact askSerial()
 
 struct FactRow {
     const char* name;
-    std::function<Fact()> ask;
-    bool isIdentity = false;
+    Ask ask;
 };
+
+// The facts of facts.def, by their places in a device file, that a name of the command stands for.
+struct Place {
+    const char* name;
+    std::string_view section;
+    std::string_view key;
+};
+constexpr Place PLACES[] = {
+    {"device_name", "settings", "device_name"},
+    {"tizen_id", "device", "platform_id"},
+    {"platform_name", "device", "platform_name"},
+    {"sw_version", "device", "platform_version"},
+    {"model_name", "device", "model_name"},
+    {"language_code", "settings", "language"},
+    {"sim_mcc", "slot", "mcc"},
+    {"sim_mnc", "slot", "mnc"},
+    {"phone_number", "slot", "number"},
+    {"imei", "slot", "imei"},
+    {"roaming", "slot", "roaming"},
+    {"flight_mode", "settings", "flight_mode"},
+    {"data_roaming", "settings", "data_roaming"},
+    {"mobile_data", "settings", "mobile_data"},
+    {"sales_code", "settings", "sales_code"},
+    {"device_serial", "device", "serial"},
+    // No public question of the library's is about these alone.
+    {"", "settings", "font_size"},
+    {"", "settings", "packet_data"},
+};
+
+constexpr bool hasPlace(const port::FactRow& row)
+{
+    for (const Place& place : PLACES)
+        if (place.section == row.section && place.key == row.key)
+            return true;
+    return false;
+}
+#define FACT(number, question, ...)                                   \
+    static_assert(hasPlace(port::PlainFact<Question::question>::row), \
+                  "the command shows every plain fact, or says that it does not");
+#include "port/facts/facts.def"
+
+bool isIdentity(const std::string& name)
+{
+    for (const Place& place : PLACES)
+        if (place.name == name)
+            return port::isPrivate(place.section, place.key);
+    return false;
+}
 
 const std::vector<FactRow>& facts()
 {
@@ -267,8 +321,8 @@ const std::vector<FactRow>& facts()
         {"sim_mcc", ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)},
         {"sim_mnc", ofSim(Question::SimIdentity, &CoreSystem::GetMNCFromSim)},
         {"sim_country", askSimCountry},
-        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim), true},
-        {"imei", askImei, true},
+        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim)},
+        {"imei", askImei},
         {"roaming", askRoamingOfFirstSlot},
         {"flight_mode", yesOrNo({Question::FlightMode}, [] { return library().IsFlightMode(); })},
         {"data_roaming",
@@ -281,7 +335,7 @@ const std::vector<FactRow>& facts()
         {"sales_code", askSalesCode},
         {"storage_available",
          yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
-        {"device_serial", askSerial, true},
+        {"device_serial", askSerial},
     };
     return all;
 } // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
@@ -389,12 +443,18 @@ private:
     std::exception_ptr failure_;
 };
 
+Fact ask(const FactRow& row)
+{
+    const Origins origins;
+    return row.ask(origins);
+}
+
 void askOneByOne(Answers& answers, bool ofDaemon)
 {
     ++askingThreads;
     try {
         for (std::size_t i = answers.take(ofDaemon); answers.isIn(i); i = answers.take(ofDaemon))
-            answers.give(i, rowOf(answers.name(i)).ask());
+            answers.give(i, ask(rowOf(answers.name(i))));
     } catch (...) {
         answers.fail(std::current_exception());
     }
@@ -420,7 +480,7 @@ std::vector<cli::Fact> cli::askFacts(const std::vector<std::string>& names)
             std::thread([=] { askOneByOne(*answers, ofDaemon); }).detach();
     std::vector<Fact> facts = answers->await();
     for (Fact& fact : facts)
-        fact.isIdentity = rowOf(fact.name).isIdentity;
+        fact.isIdentity = isIdentity(fact.name);
     return facts;
 }
 

@@ -273,7 +273,7 @@ void cli::addInfoCommands(const Command& app, Invocation& invocation)
 {
     const Command info = app.add("info", "Show every fact, with its source");
     const auto reveal = std::make_shared<bool>(false);
-    info.flag("--reveal", *reveal, "Show phone number, IMEI and serial number in full");
+    info.flag("--reveal", *reveal, "Show what identifies the device and its user in full");
     info.flag("--json", invocation.json, "Print JSON");
     info.setFooter("Examples: coresystem info\n"
                    "          coresystem info --json --device phone");

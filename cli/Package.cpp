@@ -13,7 +13,6 @@
 namespace cli {
 namespace {
 
-using coresystem_port::lastOrigin;
 using coresystem_port::Question;
 
 struct Package {
@@ -25,11 +24,12 @@ struct Package {
 
 Package ask(const std::string& name)
 {
+    const coresystem_port::Origins origins;
     char* slot = nullptr;
     const int code = library().GetPackageVersion(name.c_str(), &slot);
     const Json version = slot != nullptr ? Json(slot) : Json();
     std::free(slot);
-    const auto origin = lastOrigin(Question::PackageVersion);
+    const auto origin = origins.of(Question::PackageVersion);
     return {name, version, code == PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE,
             version.is_null() ? origin.reason : origin.source};
 }

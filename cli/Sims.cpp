@@ -3,10 +3,12 @@
 
 #include <cstdlib>
 
+#include "port/facts/Privacy.h"
+
 namespace cli {
 namespace {
 
-using coresystem_port::lastOrigin;
+using coresystem_port::Origins;
 using coresystem_port::Question;
 
 // A number that no status has: what stays when none was read.
@@ -68,17 +70,18 @@ std::string wordOf(const Word<Number> (&words)[count], Number number)
 }
 
 // The reason of a question that failed; it has none when the modem went away before it was asked.
-Answer unanswered(Question question)
+Answer unanswered(const Origins& origins, Question question)
 {
-    const std::string& reason = lastOrigin(question).reason;
+    const std::string reason = origins.of(question).reason;
     return {nullptr, reason.empty() ? "the platform gave no answer" : reason};
 }
 
 Answer askStatus(int slot)
 {
+    const Origins origins;
     TelSimCardStatus_t status = NOT_READ;
     library().IsAvaliableState(slot, &status);
-    return status == NOT_READ ? unanswered(Question::SimCard)
+    return status == NOT_READ ? unanswered(origins, Question::SimCard)
                               : Answer{wordOf(STATUSES, status), ""};
 }
 
@@ -91,24 +94,26 @@ struct Identity {
 
 Identity askIdentity(const char* modem)
 {
+    const Origins origins;
     std::string mcc;
     std::string mnc;
     std::string msin;
     if (library().GetSimInfo(modem, &mcc, &mnc, &msin))
         return {{mcc, ""}, {mnc, ""}, {msin, ""}, askCountryOf(mcc)};
-    const Answer none = unanswered(Question::SimIdentity);
+    const Answer none = unanswered(origins, Question::SimIdentity);
     return {none, none, none, none};
 }
 
 // The platform fails, or succeeds with nothing, when the card holds no number.
 Answer askPhoneNumber(telephony_h& handle)
 {
+    const Origins origins;
     char* number = nullptr;
     const bool wasRead = library().GetPhoneNumber(&handle, &number);
-    Answer answer = unanswered(Question::PhoneNumber);
+    Answer answer = unanswered(origins, Question::PhoneNumber);
     if (wasRead && number != nullptr)
         answer = {number, ""};
-    else if (lastOrigin(Question::PhoneNumber).available)
+    else if (origins.of(Question::PhoneNumber).available)
         answer = {nullptr, "the SIM card holds no number"};
     std::free(number);
     return answer;
@@ -116,9 +121,10 @@ Answer askPhoneNumber(telephony_h& handle)
 
 Answer askSms(char* modem)
 {
+    const Origins origins;
     int ready = 0;
     return library().CheckSmsEnabled(modem, &ready) ? Answer{ready != 0, ""}
-                                                    : unanswered(Question::SmsReadiness);
+                                                    : unanswered(origins, Question::SmsReadiness);
 }
 
 SimSlot askSlot(int number, char* modem, telephony_h& handle)
@@ -141,9 +147,10 @@ template <typename Number, std::size_t count>
 Answer askSubscription(char* modem, bool (CoreSystem::*ask)(char*, Number*),
                        const Word<Number> (&words)[count])
 {
+    const Origins origins;
     auto slot = words[0].number;
     return (library().*ask)(modem, &slot) ? Answer{wordOf(words, slot), ""}
-                                          : unanswered(Question::Subscriptions);
+                                          : unanswered(origins, Question::Subscriptions);
 }
 
 std::vector<DefaultSlot> askDefaults(char* modem)
@@ -156,9 +163,9 @@ std::vector<DefaultSlot> askDefaults(char* modem)
 }
 
 // Why there are no slots.
-std::string whyNoSlots()
+std::string whyNoSlots(const Origins& origins)
 {
-    const coresystem_port::Origin slots = lastOrigin(Question::SimSlots);
+    const coresystem_port::Origin slots = origins.of(Question::SimSlots);
     return slots.available ? "the telephony service knows no modem" : slots.reason;
 }
 
@@ -167,6 +174,7 @@ std::string whyNoSlots()
 
 cli::Sims cli::askSims()
 {
+    const Origins origins;
     Sims sims;
     telephony_handle_list_s list = {0, nullptr};
     char** const modems = library().InitHandleList(&list) ? library().GetCpNameList() : nullptr;
@@ -174,28 +182,29 @@ cli::Sims cli::askSims()
     for (unsigned int i = 0; modems != nullptr && i < list.count && modems[i] != nullptr; ++i)
         sims.slots.push_back(askSlot(static_cast<int>(i), modems[i], list.handle[i]));
     if (sims.slots.empty())
-        sims.reason = whyNoSlots();
+        sims.reason = whyNoSlots(origins);
     else
         sims.defaults = askDefaults(sims.slots.front().modem.data());
     library().DeinitHandleList(&list);
     return sims;
 }
 
-std::string cli::whyNoSlotAnswers(Question question)
+std::string cli::whyNoSlotAnswers(const Origins& origins, Question question)
 {
+    const coresystem_port::Origin asked = origins.of(question);
+    if (!origins.of(Question::SimSlots).available)
+        return whyNoSlots(origins);
+    if (asked.available || !asked.reason.empty())
+        return asked.available ? "the SIM card holds none" : asked.reason;
+    // No card was good enough to be asked; the states say why.
     char** const modems = library().GetCpNameList();
-    if (modems == nullptr || modems[0] == nullptr)
-        return whyNoSlots();
     std::string states;
-    for (int slot = 0; modems[slot] != nullptr; ++slot) {
+    for (int slot = 0; modems != nullptr && modems[slot] != nullptr; ++slot) {
         const Answer status = askStatus(slot);
-        if (status.value == "ready")
-            return lastOrigin(question).available ? "the SIM card holds none"
-                                                  : unanswered(question).reason;
         states += (states.empty() ? "slot " : "; slot ") + std::to_string(slot) + ": " +
                   (status.value.is_null() ? status.reason : status.value.get<std::string>());
     }
-    return "no usable SIM card: " + states;
+    return states.empty() ? whyNoSlots(origins) : "no usable SIM card: " + states;
 }
 
 cli::Answer cli::askCountryOf(const std::string& mcc)
@@ -209,33 +218,30 @@ cli::Answer cli::askCountryOf(const std::string& mcc)
     return answer;
 }
 
-std::string cli::whyNoImei()
+std::string cli::whyNoImei(const Origins& origins)
 {
-    const std::string reason = lastOrigin(Question::Imei).reason;
-    return reason.empty() ? whyNoSlots() : reason;
+    const std::string reason = origins.of(Question::Imei).reason;
+    return reason.empty() ? whyNoSlots(origins) : reason;
 }
 
 cli::Answer cli::askRoaming(int slot)
 {
+    const Origins origins;
     bool roaming = false;
     if (library().GetRoamingStatus(slot, &roaming))
         return {roaming, ""};
-    if (!lastOrigin(Question::SimSlots).available)
-        return {nullptr, whyNoSlots()};
-    const coresystem_port::Origin service = lastOrigin(Question::NetworkService);
+    if (!origins.of(Question::SimSlots).available)
+        return {nullptr, whyNoSlots(origins)};
+    const coresystem_port::Origin service = origins.of(Question::NetworkService);
     if (service.available)
-        return lastOrigin(Question::Roaming).reason.empty()
+        return origins.of(Question::Roaming).reason.empty()
                    ? Answer{nullptr, "the slot is not in service"}
-                   : unanswered(Question::Roaming);
-    return service.reason.empty() ? Answer{nullptr, whyNoSlots()}
-                                  : unanswered(Question::NetworkService);
+                   : unanswered(origins, Question::Roaming);
+    return service.reason.empty() ? Answer{nullptr, whyNoSlots(origins)}
+                                  : unanswered(origins, Question::NetworkService);
 }
 
 cli::Json cli::masked(const Json& value)
 {
-    if (!value.is_string())
-        return value;
-    auto text = value.get<std::string>();
-    const std::size_t hidden = text.size() > 4 ? text.size() - 2 : text.size();
-    return text.replace(0, hidden, hidden, '*');
+    return value.is_string() ? Json(port::masked(value.get<std::string>())) : value;
 }

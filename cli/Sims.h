@@ -45,11 +45,13 @@ struct Sims {
 
 Sims askSims();
 
-/// Why no slot answers a question: no telephony, no usable card, or the question's own reason.
-std::string whyNoSlotAnswers(coresystem_port::Question question);
+/// Why no slot answered a question whose origins are these: no telephony, no usable card, or the
+/// question's own reason.
+std::string whyNoSlotAnswers(const coresystem_port::Origins& origins,
+                             coresystem_port::Question question);
 
 /// Why no modem tells its IMEI.
-std::string whyNoImei();
+std::string whyNoImei(const coresystem_port::Origins& origins);
 
 /// The English name of an MCC's country.
 Answer askCountryOf(const std::string& mcc);

@@ -51,8 +51,9 @@ std::string problemOf(const std::string& text)
 
 ExitCode runStorage(const Invocation& invocation, double megabytes)
 {
+    const coresystem_port::Origins origins;
     const bool isFree = library().IsSystemMemoryAvailable(megabytes);
-    const auto origin = coresystem_port::lastOrigin(coresystem_port::Question::Storage);
+    const auto origin = origins.of(coresystem_port::Question::Storage);
     if (reportDeviceFileProblem())
         return BAD_DEVICE_FILE;
     if (!origin.available) {

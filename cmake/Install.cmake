@@ -1,9 +1,10 @@
 # What is installed: the libraries, the public headers, and what lets others find them, by
 # find_package(coresystem) and by pkg-config.
-include(CMakePackageConfigHelpers)
-include(${CMAKE_CURRENT_LIST_DIR}/InstallPkgConfig.cmake)
+include(${CMAKE_CURRENT_LIST_DIR}/InstallPackage.cmake)
 
 set_target_properties(platform PROPERTIES EXPORT_NAME port)
+target_include_directories(coresystem PUBLIC
+                           $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}/coresystem-platform>)
 
 install(TARGETS coresystem platform coreutil EXPORT coresystem)
 
@@ -50,12 +51,8 @@ install(FILES ${deviced_build_dir}/org.tizen.system.deviced.service
 install(FILES ${deviced_build_dir}/coresystem-deviced.service DESTINATION lib/systemd/system)
 install(FILES ${deviced_dir}/coresystem-deviced.sysusers RENAME coresystem-deviced.conf DESTINATION lib/sysusers.d)
 
-set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/coresystem)
 install(EXPORT coresystem NAMESPACE coresystem:: FILE coresystemConfig.cmake
         DESTINATION ${package_dir})
-write_basic_package_version_file(${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake
-                                 COMPATIBILITY SameMajorVersion)
-install(FILES ${PROJECT_BINARY_DIR}/coresystemConfigVersion.cmake DESTINATION ${package_dir})
 
 coresystem_install_pkg_config(coresystem coresystem "${PROJECT_DESCRIPTION}"
   CFLAGS "-I\${includedir}/coresystem-platform")

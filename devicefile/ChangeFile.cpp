@@ -14,8 +14,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "../port/common/Descriptor.h"
 #include "../port/common/RegularFile.h"
+#include "Descriptor.h"
 
 namespace port::devicefile {
 namespace {

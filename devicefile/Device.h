@@ -11,6 +11,7 @@
 #include <variant>
 #include <vector>
 
+#include "../port/backend/FactAnswer.h"
 #include "../port/backend/Result.h"
 #include "DeviceText.h"
 #include "Schema.h"
@@ -53,6 +54,17 @@ public:
     {
         const auto found = values_.find(key);
         return found != values_.end() ? &found->second : nullptr;
+    }
+
+    /// The value of a plain fact's key.
+    FactAnswer fact(const std::string& key) const
+    {
+        const Value* const value = find(key);
+        if (value != nullptr && std::holds_alternative<std::string>(value->content))
+            return factAnswer(get<std::string>(key));
+        if (value != nullptr && std::holds_alternative<bool>(value->content))
+            return factAnswer(get<bool>(key));
+        return factAnswer(get<std::int64_t>(key));
     }
 
     /// A value of the type that the schema gives the key: std::string, bool, Fault,

@@ -5,8 +5,8 @@
 #include <iterator>
 
 #include "../port/backend/Network.h"
-#include "../port/backend/Settings.h"
 #include "../port/backend/Telephony.h"
+#include "../port/facts/Facts.h"
 #include "ErrorNames.h"
 
 namespace port::devicefile {
@@ -166,58 +166,9 @@ struct KeyRow {
 };
 
 constexpr KeyRow KEYS[] = {
-    {"device", "platform_id", TEXT},
-    {"device", "platform_name", TEXT},
-    {"device", "platform_version", TEXT},
-    {"device", "model_name", TEXT},
-    {"device", "serial", TEXT},
-    {"device", "telephony", SWITCH},
-
-    {"settings", "device_name", TEXT},
-    {"settings", "host_name", TEXT},
-    {"settings", "language", TEXT},
-    {"settings", "sales_code", TEXT},
-    {"settings", "font_size", oneOf(FONT_SIZES, 5, std::numeric_limits<int>::max())},
-    {"settings", "flight_mode", SWITCH},
-    {"settings", "data_roaming", SWITCH},
-    {"settings", "mobile_data", SWITCH},
-    {"settings", "packet_data", SWITCH},
-    {"settings", "utc_offset", whole(-86399, 86399)}, // seconds east of UTC
-
-    {"slot", "sim", oneOf(CARDS)},
-    {"slot", "init_status", oneOf(CARD_STATUSES)},
-    {"slot", "card_changed", SWITCH},
-    {"slot", "mcc", digits(3, 3)},
-    {"slot", "mnc", digits(2, 3)},
-    {"slot", "msin", digits(1, 10)},
-    {"slot", "number", NUMBER},
-    {"slot", "imei", digits(14, 16)},
-    {"slot", "service", oneOf(SERVICES)},
-    {"slot", "roaming", SWITCH},
-    {"slot", "sms", SWITCH},
-    {"slot", "cp_name", SOME_TEXT},
-    {"slot", "denied", SWITCH},
-    {"slot", "enabled", SWITCH},
-    {"slot", "pin", digits(4, 8)},
-    {"slot", "pin_retries", whole(1, 3)},
-    {"slot", "puk", digits(8, 8)},
-    {"slot", "puk_retries", whole(1, 10)},
-
-    {"subscriptions", "network", oneOf(UNKNOWN_SLOT, 0, 1)},
-    {"subscriptions", "data", oneOf(UNKNOWN_SLOT, 0, 1)},
-    {"subscriptions", "voice", oneOf(VOICES)},
-
-    {"network", "cellular", oneOf(CELLULAR_STATES)},
-    {"network", "wifi", oneOf(LINK_STATES)},
-    {"network", "wifi_connection", oneOf(WIFI_CONNECTIONS)},
-    {"network", "bluetooth", oneOf(LINK_STATES)},
-
-    {"storage", "block_size", whole(0, ANY)},
-    {"storage", "fragment_size", whole(0, ANY)},
-    {"storage", "blocks", whole(0, ANY)},
-    {"storage", "available_blocks", whole(0, ANY)},
-
-    {"packages", "", TEXT},
+#define FACT(number, question, section, key, value, type, privacy, words) {section, key, type},
+#define KEY(section, key, type, privacy, words) {section, key, type},
+#include "../port/facts/facts.def"
 
     // How the services misbehave that are played for a program that is run on the device.
     {"service", "ModemManager", fault(SERVICE_FAULTS)},

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Backend.h"
 
+#include <atomic>
 #include <cstdlib>
 
 namespace {
@@ -13,13 +14,22 @@ std::unique_ptr<port::Backend> chooseBackend()
     return port::makeLinuxBackend();
 }
 
+std::atomic<port::Backend*> substitute{nullptr};
+
 } // namespace
 
 port::Backend& port::backend()
 {
+    if (Backend* const other = substitute)
+        return *other;
     // Never destroyed: a thread may still ask while the process ends.
     static Backend& chosen = *chooseBackend().release();
     return chosen;
+}
+
+port::Backend* port::substituteBackend(Backend* other)
+{
+    return substitute.exchange(other);
 }
 
 std::string coresystem_port::backendName()

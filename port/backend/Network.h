@@ -53,30 +53,11 @@ public:
     {
         return notSupported("no Bluetooth");
     }
-    /// Whether all radios are switched off together.
-    virtual Result<Sourced<bool>> flightMode()
-    {
-        return notSupported("no flight mode");
-    }
-    /// Whether data over the cellular network is switched on, as the device's status tells it.
-    virtual Result<Sourced<bool>> packetData()
-    {
-        return notSupported("no cellular radio");
-    }
-    /// The same as the user's setting tells it.
-    virtual Result<Sourced<bool>> mobileData()
-    {
-        return notSupported("no cellular radio");
-    }
-    /// Whether data over the cellular network is allowed abroad.
-    virtual Result<Sourced<bool>> dataRoaming()
-    {
-        return notSupported("no cellular radio");
-    }
 
-    /// Calls `changed` whenever one of the answers may have changed, on a thread of the watch's
-    /// own, one call at a time, until the watch is destroyed; destroying it waits for a call that
-    /// runs. Null when changes cannot be watched.
+    /// Calls `changed` whenever one of the answers, or a switch of the cellular network or of
+    /// flight mode, may have changed, on a thread of the watch's own, one call at a time, until the
+    /// watch is destroyed; destroying it waits for a call that runs. Null when changes cannot be
+    /// watched.
     // NOLINTNEXTLINE(performance-unnecessary-value-param): whoever watches keeps it
     virtual std::unique_ptr<Watch> watch(std::function<void()>)
     {

@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Remembers where the last answer to each question came from.
+// Notes where each answer came from: see coresystem_port::Origins and lastOrigin().
 #ifndef PORT_BACKEND_ORIGIN_H
 #define PORT_BACKEND_ORIGIN_H
-
-#include <utility>
 
 #include <coresystem_port.h>
 
@@ -11,7 +9,7 @@
 
 namespace port {
 
-void recordOrigin(coresystem_port::Question question, coresystem_port::Origin origin);
+void recordOrigin(coresystem_port::Question question, const coresystem_port::Origin& origin);
 
 template <typename T>
 void recordOrigin(coresystem_port::Question question, const Result<Sourced<T>>& answer)
@@ -20,7 +18,7 @@ void recordOrigin(coresystem_port::Question question, const Result<Sourced<T>>& 
     origin.available = static_cast<bool>(answer);
     (answer ? origin.source : origin.reason) =
         answer ? answer.value().source : answer.error().reason;
-    recordOrigin(question, std::move(origin));
+    recordOrigin(question, origin);
 }
 
 } // namespace port

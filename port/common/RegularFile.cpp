@@ -8,7 +8,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "Descriptor.h"
+#include "../../devicefile/Descriptor.h"
 
 namespace {
 

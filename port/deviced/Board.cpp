@@ -16,9 +16,9 @@ constexpr char DESCRIPTION[] = R"(<node>
   </interface>
 </node>)";
 
-Result<std::string> serialOf(DeviceInfo& deviceInfo)
+Result<std::string> serialOf(Backend& backend)
 {
-    const Result<Fact> serial = deviceInfo.serial();
+    const Result<Fact> serial = backend.get<Question::DeviceSerial>();
     if (!serial)
         return serial.error();
     if (g_utf8_validate(serial.value().value.c_str(), -1, nullptr) == FALSE)
@@ -118,7 +118,7 @@ void Board::onCall(GDBusConnection*, const char*, const char*, const char*, cons
 
 void Board::meetSerial(GDBusMethodInvocation* call)
 {
-    const CallFault fault = faults_.meet("GetSerial").value_or(CallFault());
+    const CallFault fault = backend_.faults().meet("GetSerial").value_or(CallFault());
     if (fault.delay.count() == 0)
         answerSerial(call, fault);
     else // the other callers are answered meanwhile
@@ -150,7 +150,7 @@ void Board::answerSerial(GDBusMethodInvocation* call, const CallFault& fault)
 
 void Board::tellSerial(GDBusMethodInvocation* call)
 {
-    const Result<std::string> serial = serialOf(deviceInfo_);
+    const Result<std::string> serial = serialOf(backend_);
     if (serial)
         g_dbus_method_invocation_return_value(call, g_variant_new("(s)", serial.value().c_str()));
     else

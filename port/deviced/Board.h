@@ -7,8 +7,7 @@
 #include <mutex>
 #include <string>
 
-#include "../backend/DeviceInfo.h"
-#include "../backend/Faults.h"
+#include "../backend/Backend.h"
 #include "../common/GLibTypes.h"
 
 namespace port::deviced {
@@ -38,7 +37,7 @@ private:
 
 class Board {
 public:
-    Board(DeviceInfo& deviceInfo, Faults& faults) : deviceInfo_(deviceInfo), faults_(faults) {}
+    explicit Board(Backend& backend) : backend_(backend) {}
 
     /// Shows the object to a connection, which must not outlive this. False when it has one
     /// already.
@@ -52,8 +51,7 @@ private:
     void answerSerial(GDBusMethodInvocation* call, const CallFault& fault);
     void tellSerial(GDBusMethodInvocation* call);
 
-    DeviceInfo& deviceInfo_;
-    Faults& faults_;
+    Backend& backend_;
     CallLimit limit_;
 };
 

@@ -67,7 +67,7 @@ private:
         g_main_loop_quit(loop_);
     }
 
-    port::deviced::Board board_{port::backend().deviceInfo(), port::backend().faults()};
+    port::deviced::Board board_{port::backend()};
     GMainLoop* const loop_ = g_main_loop_new(nullptr, FALSE);
     bool hadBus_ = false;
     int status_ = 0;

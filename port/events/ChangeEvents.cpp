@@ -7,8 +7,7 @@
 
 #include <unistd.h>
 
-#include "../backend/Backend.h"
-#include "../common/Descriptor.h"
+#include "../../devicefile/Descriptor.h"
 #include "Registration.h"
 
 namespace port {
@@ -16,29 +15,40 @@ namespace {
 
 using Value = std::optional<int>;
 
-template <auto read>
-Value value(Network& network)
+template <typename T>
+Value valueOf(const Result<Sourced<T>>& answer)
 {
-    const auto answer = (network.*read)();
     return answer ? Value(static_cast<int>(answer.value().value)) : std::nullopt;
 }
 
-Value wifiDevice(Network& network)
+Value wifiDevice(Backend& backend)
 {
-    const auto state = network.wifi();
+    const auto state = backend.network().wifi();
     return state ? Value(state.value().value != LinkState::Deactivated) : std::nullopt;
+}
+
+template <auto read>
+Value radio(Backend& backend)
+{
+    return valueOf((backend.network().*read)());
+}
+
+template <Question question>
+Value fact(Backend& backend)
+{
+    return valueOf(backend.get<question>());
 }
 
 constexpr struct {
     Change change;
-    Value (*read)(Network&);
-} FACTS[] = {
+    Value (*read)(Backend&);
+} CHANGES[] = {
     {Change::WifiDevice, wifiDevice},
-    {Change::WifiConnection, value<&Network::wifiConnection>},
-    {Change::WifiStatus, value<&Network::wifi>},
-    {Change::PacketData, value<&Network::packetData>},
-    {Change::FlightMode, value<&Network::flightMode>},
-    {Change::DataRoaming, value<&Network::dataRoaming>},
+    {Change::WifiConnection, radio<&Network::wifiConnection>},
+    {Change::WifiStatus, radio<&Network::wifi>},
+    {Change::PacketData, fact<Question::PacketData>},
+    {Change::FlightMode, fact<Question::FlightMode>},
+    {Change::DataRoaming, fact<Question::DataRoaming>},
 };
 
 std::size_t indexOf(Change change)
@@ -56,7 +66,7 @@ ChangeEvents::Slot& ChangeEvents::slotOf(Change change)
 bool ChangeEvents::isWatched()
 {
     if (watch_ == nullptr)
-        watch_ = network_.watch([this] { tell(); });
+        watch_ = backend_.network().watch([this] { tell(); });
     return watch_ != nullptr;
 }
 
@@ -77,7 +87,7 @@ bool ChangeEvents::set(Change change, Callback callback)
             return false;
         const std::lock_guard<std::mutex> reading(reading_);
         Slot& slot = slotOf(change);
-        if (const Value now = FACTS[indexOf(change)].read(network_))
+        if (const Value now = CHANGES[indexOf(change)].read(backend_))
             slot.value = now;
         std::swap(slot.registration, registration);
     }
@@ -104,11 +114,11 @@ void ChangeEvents::unset(Change change)
 void ChangeEvents::tell()
 {
     const std::lock_guard<std::mutex> reading(reading_);
-    for (const auto& fact : FACTS) {
-        Slot& slot = slotOf(fact.change);
+    for (const auto& row : CHANGES) {
+        Slot& slot = slotOf(row.change);
         if (slot.registration == nullptr)
             continue;
-        const Value now = fact.read(network_);
+        const Value now = row.read(backend_);
         if (!now || now == slot.value)
             continue;
         slot.value = now;
@@ -121,7 +131,7 @@ ChangeEvents& changeEvents()
     // Never destroyed: the watch may still call while the process ends.
     struct Owned {
         const pid_t process = getpid();
-        ChangeEvents events{backend().network()};
+        ChangeEvents events{backend()};
     };
     static std::atomic<Owned*> all{nullptr};
     Owned* now = all;

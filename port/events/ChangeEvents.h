@@ -9,7 +9,7 @@
 #include <mutex>
 #include <optional>
 
-#include "../backend/Network.h"
+#include "../backend/Backend.h"
 
 namespace port {
 
@@ -28,7 +28,7 @@ public:
     /// WifiConnection, of WifiStatus a LinkState.
     using Callback = std::function<void(int value)>;
 
-    explicit ChangeEvents(Network& network) : network_(network) {}
+    explicit ChangeEvents(Backend& backend) : backend_(backend) {}
 
     /// Sets the callback of a change, in place of the one before. It is called on the GLib main
     /// context that is the thread's default now, whenever the value differs from the one that could
@@ -50,7 +50,7 @@ private:
     bool isIdle() const;
     void tell();
 
-    Network& network_;
+    Backend& backend_;
     std::mutex lifecycle_; // of the watch; never held while waiting for a callback
     std::unique_ptr<Watch> watch_;
     std::mutex reading_; // of values, so that an older one never comes after a newer one

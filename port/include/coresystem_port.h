@@ -8,6 +8,7 @@
 #ifndef CORESYSTEM_PORT_H
 #define CORESYSTEM_PORT_H
 
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -44,6 +45,7 @@ enum class Question {
     Roaming,
     SmsReadiness,
     Subscriptions,
+    DeviceSerial,
 };
 
 /// Where an answer came from, or why there was none.
@@ -56,6 +58,26 @@ struct Origin {
 /// The origin of the last answer to a question in this process; neither source nor reason when it
 /// was not asked yet.
 CORESYSTEM_PORT_API Origin lastOrigin(Question question);
+
+/// Collects where answers come from: of those that are given on this thread while it lives, so that
+/// a call and its origins belong together whatever other threads ask. One inside another is told
+/// too. It must end on the thread that made it, the inner one first.
+class CORESYSTEM_PORT_API Origins {
+public:
+    Origins();
+    ~Origins();
+    Origins(const Origins&) = delete;
+    Origins& operator=(const Origins&) = delete;
+
+    /// The origin of the last answer to a question since; neither source nor reason when it was not
+    /// asked.
+    Origin of(Question question) const;
+
+private:
+    friend struct OriginsAccess;
+    struct Collected;
+    std::unique_ptr<Collected> collected_;
+};
 
 /// The backend that answers: "linux" (this machine's services) or "simulator" (a device file).
 CORESYSTEM_PORT_API std::string backendName();

@@ -16,7 +16,7 @@
 #include <optional>
 #include <thread>
 
-#include "../common/Descriptor.h"
+#include "../../devicefile/Descriptor.h"
 #include "Bus.h"
 #include "BusPatience.h"
 #include "KernelEvents.h"

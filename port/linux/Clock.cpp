@@ -12,9 +12,4 @@ Result<Sourced<std::tm>> localTime(std::time_t moment)
     return Sourced<std::tm>{local, "system clock"};
 }
 
-Result<Sourced<std::tm>> LinuxClock::now()
-{
-    return localTime(std::time(nullptr));
-}
-
 } // namespace port::linux_backend

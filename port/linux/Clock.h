@@ -3,14 +3,11 @@
 #ifndef PORT_LINUX_CLOCK_H
 #define PORT_LINUX_CLOCK_H
 
-#include "../backend/Clock.h"
+#include <ctime>
+
+#include "../backend/Result.h"
 
 namespace port::linux_backend {
-
-class LinuxClock : public Clock {
-public:
-    Result<Sourced<std::tm>> now() override;
-};
 
 /// A moment broken down in the local time zone as it is set now.
 Result<Sourced<std::tm>> localTime(std::time_t moment);

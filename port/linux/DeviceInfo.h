@@ -3,21 +3,20 @@
 #ifndef PORT_LINUX_DEVICE_INFO_H
 #define PORT_LINUX_DEVICE_INFO_H
 
-#include "../backend/DeviceInfo.h"
 #include "Bus.h"
 
 namespace port::linux_backend {
 
-class LinuxDeviceInfo : public DeviceInfo {
+class LinuxDeviceInfo {
 public:
     /// `root` stands before every path that is read; "" for this machine.
     LinuxDeviceInfo(Bus& bus, std::string root) : bus_(bus), root_(std::move(root)) {}
 
-    Result<Fact> platformId() override;
-    Result<Fact> platformName() override;
-    Result<Fact> platformVersion() override;
-    Result<Fact> modelName() override;
-    Result<Fact> serial() override;
+    Result<Fact> platformId();
+    Result<Fact> platformName();
+    Result<Fact> platformVersion();
+    Result<Fact> modelName();
+    Result<Fact> serial();
 
 private:
     Result<Fact> osRelease(const char* variable);

@@ -6,7 +6,7 @@
 
 #include <vector>
 
-#include "../common/Descriptor.h"
+#include "../../devicefile/Descriptor.h"
 
 namespace port::linux_backend {
 

@@ -30,14 +30,19 @@ public:
     {
         return "linux";
     }
-    DeviceInfo& deviceInfo() override
+
+    FactAnswer read(port::Question fact) override
     {
-        return deviceInfo_;
+        switch (fact) {
+#define FACT(number, question, ...) \
+    case port::Question::question:  \
+        return factAnswer(ask(PlainFact<port::Question::question>()));
+#include "../facts/facts.def"
+        default:
+            return notSupported("no plain fact");
+        }
     }
-    Settings& settings() override
-    {
-        return settings_;
-    }
+
     Telephony& telephony() override
     {
         return telephony_;
@@ -46,21 +51,21 @@ public:
     {
         return network_;
     }
-    Storage& storage() override
+    Result<Sourced<VolumeSize>> internalStorage() override
     {
-        return storage_;
+        return storage_.internal();
     }
-    Packages& packages() override
+    Result<Sourced<std::optional<std::string>>> packageVersion(const std::string& name) override
     {
-        return packages_;
+        return packages_.version(name);
     }
-    Configuration& configuration() override
+    Result<Fact> configuration(const std::string& key) override
     {
-        return configuration_;
+        return configuration_.text(key);
     }
-    Clock& clock() override
+    Result<Sourced<std::tm>> now() override
     {
-        return clock_;
+        return localTime(std::time(nullptr));
     }
 
     std::vector<Service> findServices() override
@@ -88,6 +93,60 @@ public:
     }
 
 private:
+    // The source of each plain fact.
+    Result<Fact> ask(PlainFact<port::Question::PlatformId>)
+    {
+        return deviceInfo_.platformId();
+    }
+    Result<Fact> ask(PlainFact<port::Question::PlatformName>)
+    {
+        return deviceInfo_.platformName();
+    }
+    Result<Fact> ask(PlainFact<port::Question::PlatformVersion>)
+    {
+        return deviceInfo_.platformVersion();
+    }
+    Result<Fact> ask(PlainFact<port::Question::ModelName>)
+    {
+        return deviceInfo_.modelName();
+    }
+    Result<Fact> ask(PlainFact<port::Question::DeviceSerial>)
+    {
+        return deviceInfo_.serial();
+    }
+    Result<Fact> ask(PlainFact<port::Question::DeviceName>)
+    {
+        return settings_.deviceName();
+    }
+    Result<Fact> ask(PlainFact<port::Question::Language>)
+    {
+        return settings_.language();
+    }
+    Result<Fact> ask(PlainFact<port::Question::SalesCode>)
+    {
+        return configuration_.text(SALES_CODE);
+    }
+    Result<Sourced<FontSize>> ask(PlainFact<port::Question::FontSize>)
+    {
+        return settings_.fontSize();
+    }
+    Result<Sourced<bool>> ask(PlainFact<port::Question::FlightMode>)
+    {
+        return network_.flightMode();
+    }
+    Result<Sourced<bool>> ask(PlainFact<port::Question::DataRoaming>)
+    {
+        return network_.dataRoaming();
+    }
+    Result<Sourced<bool>> ask(PlainFact<port::Question::MobileData>)
+    {
+        return network_.mobileData();
+    }
+    Result<Sourced<bool>> ask(PlainFact<port::Question::PacketData>)
+    {
+        return network_.packetData();
+    }
+
     struct BusService {
         BusObject object;
         const char* serves;
@@ -117,7 +176,7 @@ private:
         return {*places.begin(), false, read.error().reason, serves, consequence};
     }
 
-    // Of something that can only be told by asking.
+    // Something that only an answer tells of.
     template <typename T>
     static Service probe(const char* name, const Result<T>& answer, const char* serves,
                          const char* consequence)
@@ -134,7 +193,6 @@ private:
     LinuxStorage storage_{dataFolder()};
     LinuxPackages packages_{""};
     LinuxConfiguration configuration_{configurationFiles()};
-    LinuxClock clock_;
 };
 
 } // namespace

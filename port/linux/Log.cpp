@@ -23,7 +23,7 @@
 #include <sys/un.h>
 #include <unistd.h>
 
-#include "../common/Descriptor.h"
+#include "../../devicefile/Descriptor.h"
 
 namespace port::linux_backend {
 namespace {

@@ -20,10 +20,10 @@ public:
     Result<Sourced<LinkState>> wifi() override;
     Result<Sourced<WifiConnection>> wifiConnection() override;
     Result<Sourced<LinkState>> bluetooth() override;
-    Result<Sourced<bool>> flightMode() override;
-    Result<Sourced<bool>> packetData() override;
-    Result<Sourced<bool>> mobileData() override;
-    Result<Sourced<bool>> dataRoaming() override;
+    Result<Sourced<bool>> flightMode();
+    Result<Sourced<bool>> packetData();
+    Result<Sourced<bool>> mobileData();
+    Result<Sourced<bool>> dataRoaming();
     std::unique_ptr<Watch> watch(std::function<void()> changed) override;
 
 private:

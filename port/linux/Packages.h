@@ -3,19 +3,20 @@
 #ifndef PORT_LINUX_PACKAGES_H
 #define PORT_LINUX_PACKAGES_H
 
+#include <optional>
 #include <string>
 #include <utility>
 
-#include "../backend/Packages.h"
+#include "../backend/Result.h"
 
 namespace port::linux_backend {
 
-class LinuxPackages : public Packages {
+class LinuxPackages {
 public:
     /// `root` stands before every path that is read; "" for this machine.
     explicit LinuxPackages(std::string root) : root_(std::move(root)) {}
 
-    Result<Sourced<std::optional<std::string>>> version(const std::string& name) override;
+    Result<Sourced<std::optional<std::string>>> version(const std::string& name);
 
 private:
     const std::string root_;

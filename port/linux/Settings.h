@@ -3,18 +3,18 @@
 #ifndef PORT_LINUX_SETTINGS_H
 #define PORT_LINUX_SETTINGS_H
 
-#include "../backend/Settings.h"
+#include "../facts/Facts.h"
 #include "Bus.h"
 
 namespace port::linux_backend {
 
-class LinuxSettings : public Settings {
+class LinuxSettings {
 public:
     explicit LinuxSettings(Bus& bus) : bus_(bus) {}
 
-    Result<Fact> deviceName() override;
-    Result<Fact> language() override;
-    Result<Sourced<FontSize>> fontSize() override;
+    Result<Fact> deviceName();
+    Result<Fact> language();
+    Result<Sourced<FontSize>> fontSize();
 
 private:
     Bus& bus_;

@@ -6,18 +6,19 @@
 #include <string>
 #include <utility>
 
-#include "../backend/Storage.h"
+#include "../backend/Result.h"
+#include "../backend/VolumeSize.h"
 
 struct statvfs64;
 
 namespace port::linux_backend {
 
-class LinuxStorage : public Storage {
+class LinuxStorage {
 public:
     /// `folder` is where the user's data lies or will lie: it need not be there yet.
     explicit LinuxStorage(std::string folder) : folder_(std::move(folder)) {}
 
-    Result<Sourced<VolumeSize>> internal() override;
+    Result<Sourced<VolumeSize>> internal();
 
 private:
     const std::string folder_;

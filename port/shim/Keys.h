@@ -6,7 +6,7 @@
 #include <cstddef>
 #include <cstring>
 
-#include "Refusal.h"
+#include "Call.h"
 
 namespace port {
 
@@ -14,9 +14,16 @@ namespace port {
 template <typename T>
 struct KeyRow {
     int key;
-    coresystem_port::Question question{};
+    Question question{};
     Result<Sourced<T>> (*read)() = nullptr;
 };
+
+// The row of a plain fact.
+template <Question question>
+constexpr KeyRow<typename PlainFact<question>::Value> fact(int key)
+{
+    return {key, question, [] { return backend().get<question>(); }};
+}
 
 // A caller may pass a number that the enumeration lacks: it is looked at as the int it is.
 template <typename Enumeration>
@@ -37,23 +44,22 @@ const Row* findKey(const Row (&rows)[Size], int key)
     return nullptr;
 }
 
-// Of a call that asks for the key of a row; null when there is no such key.
-template <typename Row>
-Refusal refusalOf(const char* call, const Row* row)
+// Reads the key of a row of its type; null, one of another type, is as wrong as an unknown one.
+template <typename T, typename Slot>
+int readKey(const char* call, const KeyRow<T>* row, Slot* slot, const Codes& codes)
 {
-    return row != nullptr && row->read != nullptr ? Refusal{call, {row->question}} : Refusal{call};
-}
-
-// Reads a key of the type that the rows have; one of another type is as wrong as an unknown one.
-template <typename Enumeration, typename Row, std::size_t Size, typename Slot>
-int readKey(const Row (&rows)[Size], const Enumeration& key, Slot* slot, const Codes& codes)
-{
-    const Row* const row = findKey(rows, numberOf(key));
-    if (row == nullptr || slot == nullptr)
-        return TIZEN_ERROR_INVALID_PARAMETER;
-    if (row->read == nullptr)
-        return codes.notSupported;
-    return guarded([&] { return handOut(row->question, row->read(), slot, codes); }, codes.failed);
+    const auto read = [&](const Call& entry) {
+        return entry.run(slot, [&]() -> int {
+            if (row == nullptr || slot == nullptr)
+                return codes.invalid;
+            if (row->read == nullptr)
+                return codes.notSupported;
+            return entry.handOut(row->question, row->read(), slot);
+        });
+    };
+    if (row == nullptr || row->read == nullptr)
+        return read(Call(call, codes));
+    return read(Call(call, codes, {row->question}));
 }
 
 } // namespace port

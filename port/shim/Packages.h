@@ -5,8 +5,7 @@
 
 #include <package_info.h>
 
-#include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Call.h"
 
 namespace port {
 
@@ -16,20 +15,18 @@ constexpr Codes PACKAGE_CODES{PACKAGE_MANAGER_ERROR_IO_ERROR, PACKAGE_MANAGER_ER
 
 // Hands an installed package's version to a function, whose result is the result.
 template <typename Use>
-int withInstalledPackage(const char* name, Use use)
+int withInstalledPackage(const Call& call, const char* name, Use use)
 {
-    return guarded([&]() -> int {
-        const auto answer = backend().packages().version(name);
-        if (answer && !answer.value().value)
-            recordOrigin(coresystem_port::Question::PackageVersion,
-                         Result<Fact>(notAvailable(answer.value().source + ": not installed")));
-        else
-            recordOrigin(coresystem_port::Question::PackageVersion, answer);
-        if (!answer)
-            return codeOf(answer.error().kind, PACKAGE_CODES);
-        return answer.value().value ? use(*answer.value().value)
-                                    : PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE;
-    });
+    using Version = std::optional<std::string>;
+    const auto answer = backend().packageVersion(name);
+    const int result =
+        call.pass(Question::PackageVersion, answer, [&](const Version& version) -> int {
+            return version ? use(*version) : PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE;
+        });
+    if (answer && !answer.value().value)
+        recordOrigin(Question::PackageVersion,
+                     {false, "", answer.value().source + ": not installed"});
+    return result;
 }
 
 } // namespace port

@@ -5,10 +5,8 @@
 
 #include <telephony.h>
 
-#include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Call.h"
 #include "Handles.h"
-#include "Refusal.h"
 
 namespace port {
 
@@ -50,20 +48,25 @@ inline Result<Sourced<std::vector<SlotName>>> slotsOfBackend()
     return slots;
 }
 
-/// Asks the slot that a handle stands for; `take` puts the value into *out and gives the result.
+/// Asks the slot that a handle stands for, in the body of a call; `take` puts the value into *out
+/// and gives the result.
 template <typename Handle, typename T, typename Out, typename Take>
-int askSlot(const Codes& codes, Handle handle, coresystem_port::Question question,
+int askSlot(const Call& call, Handle handle, Question question,
             Result<Sourced<T>> (Telephony::*ask)(const SlotName&), Out* out, Take take)
 {
-    return guarded(
-        [&]() -> int {
-            const auto slot = Handles<Handle, SlotName>::find(handle);
-            if (!slot || out == nullptr)
-                return codes.invalid;
-            return pass(question, (backend().telephony().*ask)(*slot), codes,
-                        [&](const T& value) { return take(value, *out); });
-        },
-        codes.failed, codes.noMemory);
+    const auto slot = Handles<Handle, SlotName>::find(handle);
+    if (!slot || out == nullptr)
+        return call.codes().invalid;
+    return call.pass(question, (backend().telephony().*ask)(*slot),
+                     [&](const T& value) { return take(value, *out); });
+}
+
+/// The same as a call of its own, which may be told to hand out nothing.
+template <typename Handle, typename T, typename Out, typename Take>
+int callSlot(const Call& call, Handle handle, Question question,
+             Result<Sourced<T>> (Telephony::*ask)(const SlotName&), Out* out, Take take)
+{
+    return call.run(out, [&] { return askSlot(call, handle, question, ask, out, take); });
 }
 
 /// Lists of telephony_init() that were not released yet.

@@ -6,9 +6,11 @@
 #include <string>
 
 #include "../backend/Log.h"
-#include "Refusal.h"
+#include "Call.h"
 
 namespace {
+
+constexpr port::Codes CODES{TIZEN_ERROR_IO_ERROR, TIZEN_ERROR_IO_ERROR};
 
 // The formatted text; empty and false when the format is no good. Most lines are short and are
 // formatted once.
@@ -34,15 +36,13 @@ bool format(std::string& text, const char* fmt, va_list arguments)
 
 int __dlog_print(log_id_t, int prio, const char* tag, const char* fmt, ...)
 {
-    if (const port::Refusal refusal{__func__})
-        return refusal.code();
-    if (fmt == nullptr)
-        return DLOG_ERROR_INVALID_PARAMETER;
-    if (!port::processLog().isOn())
-        return 0; // the length of what was written
     va_list arguments;
     va_start(arguments, fmt);
-    const int result = port::guarded([&]() -> int {
+    const int result = port::Call(__func__, CODES).run([&]() -> int {
+        if (fmt == nullptr)
+            return DLOG_ERROR_INVALID_PARAMETER;
+        if (!port::processLog().isOn())
+            return 0; // the length of what was written
         std::string text;
         if (!format(text, fmt, arguments))
             return DLOG_ERROR_INVALID_PARAMETER;

@@ -1,18 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <net_connection.h>
 
-#include "../backend/Backend.h"
-#include "HandOut.h"
+#include "Call.h"
 #include "HandleKinds.h"
-#include "Refusal.h"
 
 namespace {
 
-using coresystem_port::Question;
 using port::CellularState;
 using port::Connections;
 using port::LinkState;
 using port::Network;
+using port::Question;
 
 constexpr port::Codes CODES{CONNECTION_ERROR_OPERATION_FAILED, CONNECTION_ERROR_NOT_SUPPORTED,
                             CONNECTION_ERROR_PERMISSION_DENIED};
@@ -28,57 +26,50 @@ static_assert(static_cast<int>(LinkState::Deactivated) == CONNECTION_WIFI_STATE_
               "all count the states alike");
 
 template <typename T, typename State>
-int readState(connection_h connection, State* state, Question question,
+int readState(const char* name, connection_h connection, State* state, Question question,
               port::Result<port::Sourced<T>> (Network::*read)())
 {
-    if (!Connections::find(connection) || state == nullptr)
-        return CONNECTION_ERROR_INVALID_PARAMETER;
-    return port::guarded(
-        [&] { return port::handOut(question, (port::backend().network().*read)(), state, CODES); },
-        CODES.failed);
+    const port::Call call(name, CODES, {question});
+    return call.run([&]() -> int {
+        if (!Connections::find(connection) || state == nullptr)
+            return CONNECTION_ERROR_INVALID_PARAMETER;
+        return call.handOut(question, (port::backend().network().*read)(), state);
+    });
 }
 
 } // namespace
 
 int connection_create(connection_h* connection)
 {
-    if (const port::Refusal refusal{__func__,
-                                    {Question::Cellular, Question::Wifi, Question::Bluetooth}})
-        return refusal.code();
-    if (connection == nullptr)
-        return CONNECTION_ERROR_INVALID_PARAMETER;
-    return port::guarded(
-        [connection] {
-            *connection = Connections::open({});
-            return CONNECTION_ERROR_NONE;
-        },
-        CODES.failed);
+    const port::Call call(__func__, CODES,
+                          {Question::Cellular, Question::Wifi, Question::Bluetooth});
+    return call.run([&]() -> int {
+        if (connection == nullptr)
+            return CONNECTION_ERROR_INVALID_PARAMETER;
+        *connection = Connections::open({});
+        return CONNECTION_ERROR_NONE;
+    });
 }
 
 int connection_destroy(connection_h connection)
 {
-    const port::Refusal refusal{__func__};
-    return refusal.after(Connections::close(connection) ? CONNECTION_ERROR_NONE
-                                                        : CONNECTION_ERROR_INVALID_PARAMETER);
+    return port::Call(__func__, CODES).release([&]() -> int {
+        return Connections::close(connection) ? CONNECTION_ERROR_NONE
+                                              : CONNECTION_ERROR_INVALID_PARAMETER;
+    });
 }
 
 int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state)
 {
-    if (const port::Refusal refusal{__func__, {Question::Cellular}})
-        return refusal.code();
-    return readState(connection, state, Question::Cellular, &Network::cellular);
+    return readState(__func__, connection, state, Question::Cellular, &Network::cellular);
 }
 
 int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state)
 {
-    if (const port::Refusal refusal{__func__, {Question::Wifi}})
-        return refusal.code();
-    return readState(connection, state, Question::Wifi, &Network::wifi);
+    return readState(__func__, connection, state, Question::Wifi, &Network::wifi);
 }
 
 int connection_get_bt_state(connection_h connection, connection_bt_state_e* state)
 {
-    if (const port::Refusal refusal{__func__, {Question::Bluetooth}})
-        return refusal.code();
-    return readState(connection, state, Question::Bluetooth, &Network::bluetooth);
+    return readState(__func__, connection, state, Question::Bluetooth, &Network::bluetooth);
 }

@@ -1,17 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <runtime_info.h>
 
-#include "../backend/Backend.h"
 #include "../events/ChangeEvents.h"
 #include "Keys.h"
 
 namespace {
 
-using coresystem_port::Question;
 using port::backend;
 using port::Change;
+using port::fact;
 using port::KeyRow;
 using port::LinkState;
+using port::Question;
 
 constexpr port::Codes CODES{RUNTIME_INFO_ERROR_IO_ERROR, RUNTIME_INFO_ERROR_NOT_SUPPORTED,
                             RUNTIME_INFO_ERROR_PERMISSION_DENIED};
@@ -22,12 +22,9 @@ static_assert(static_cast<int>(LinkState::Deactivated) == RUNTIME_INFO_WIFI_STAT
 
 // Every key that is a switch or a number, by type; the others are texts.
 constexpr KeyRow<bool> BOOL_KEYS[] = {
-    {RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED, Question::FlightMode,
-     [] { return backend().network().flightMode(); }},
-    {RUNTIME_INFO_KEY_PACKET_DATA_ENABLED, Question::PacketData,
-     [] { return backend().network().packetData(); }},
-    {RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED, Question::DataRoaming,
-     [] { return backend().network().dataRoaming(); }},
+    fact<Question::FlightMode>(RUNTIME_INFO_KEY_FLIGHT_MODE_ENABLED),
+    fact<Question::PacketData>(RUNTIME_INFO_KEY_PACKET_DATA_ENABLED),
+    fact<Question::DataRoaming>(RUNTIME_INFO_KEY_DATA_ROAMING_ENABLED),
     {RUNTIME_INFO_KEY_BLUETOOTH_ENABLED},
     {RUNTIME_INFO_KEY_WIFI_HOTSPOT_ENABLED},
     {RUNTIME_INFO_KEY_BLUETOOTH_TETHERING_ENABLED},
@@ -76,45 +73,35 @@ bool isKey(int key)
 
 int runtime_info_get_value_bool(runtime_info_key_e key, bool* value)
 {
-    if (const auto refusal =
-            port::refusalOf(__func__, port::findKey(BOOL_KEYS, port::numberOf(key))))
-        return refusal.code();
-    return port::readKey(BOOL_KEYS, key, value, CODES);
+    return port::readKey(__func__, port::findKey(BOOL_KEYS, port::numberOf(key)), value, CODES);
 }
 
 int runtime_info_get_value_int(runtime_info_key_e key, int* value)
 {
-    if (const auto refusal =
-            port::refusalOf(__func__, port::findKey(INT_KEYS, port::numberOf(key))))
-        return refusal.code();
-    return port::readKey(INT_KEYS, key, value, CODES);
+    return port::readKey(__func__, port::findKey(INT_KEYS, port::numberOf(key)), value, CODES);
 }
 
 int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback,
                                 void* user_data)
 {
-    if (const port::Refusal refusal{__func__})
-        return refusal.code();
-    const auto* const row = port::findKey(CHANGES, port::numberOf(key));
-    if (!isKey(port::numberOf(key)) || callback == nullptr)
-        return RUNTIME_INFO_ERROR_INVALID_PARAMETER;
-    if (row == nullptr)
-        return RUNTIME_INFO_ERROR_NOT_SUPPORTED;
-    return port::guarded([&] {
-        const bool told = port::changeEvents().set(
-            row->change, [key, callback, user_data](int) { callback(key, user_data); });
-        return told ? RUNTIME_INFO_ERROR_NONE : RUNTIME_INFO_ERROR_NOT_SUPPORTED;
+    return port::Call(__func__, CODES).run([&]() -> int {
+        const auto* const row = port::findKey(CHANGES, port::numberOf(key));
+        if (!isKey(port::numberOf(key)) || callback == nullptr)
+            return RUNTIME_INFO_ERROR_INVALID_PARAMETER;
+        const auto tell = [key, callback, user_data](int) { callback(key, user_data); };
+        return row != nullptr && port::changeEvents().set(row->change, tell)
+                   ? RUNTIME_INFO_ERROR_NONE
+                   : RUNTIME_INFO_ERROR_NOT_SUPPORTED;
     });
 }
 
 int runtime_info_unset_changed_cb(runtime_info_key_e key)
 {
-    const port::Refusal refusal{__func__};
-    if (!isKey(port::numberOf(key)))
-        return refusal.after(RUNTIME_INFO_ERROR_INVALID_PARAMETER);
-    return refusal.after(port::guarded([&] {
+    return port::Call(__func__, CODES).release([&]() -> int {
+        if (!isKey(port::numberOf(key)))
+            return RUNTIME_INFO_ERROR_INVALID_PARAMETER;
         if (const auto* const row = port::findKey(CHANGES, port::numberOf(key)))
             port::changeEvents().unset(row->change);
         return RUNTIME_INFO_ERROR_NONE;
-    }));
+    });
 }

@@ -2,8 +2,7 @@
 // Serves applications that were built with 32-bit file offsets and those built with 64-bit ones.
 #include <storage.h>
 
-#include "../backend/Backend.h"
-#include "Refusal.h"
+#include "Call.h"
 
 #ifdef __USE_FILE_OFFSET64
 #error "the two structures are the same one here, and so are the names of the functions"
@@ -12,6 +11,8 @@
 extern "C" int storage_get_internal_memory_size64(struct statvfs64* buf);
 
 namespace {
+
+using port::Question;
 
 constexpr port::Codes CODES{STORAGE_ERROR_OPERATION_FAILED, STORAGE_ERROR_NOT_SUPPORTED,
                             STORAGE_ERROR_OPERATION_FAILED};
@@ -34,11 +35,7 @@ bool fits(const port::VolumeSize& size, Structure& structure)
 template <typename Structure>
 int internalSize(Structure* buf)
 {
-    if (const port::Refusal refusal{"storage_get_internal_memory_size",
-                                    {coresystem_port::Question::Storage}})
-        return refusal.code();
-    if (buf == nullptr)
-        return STORAGE_ERROR_INVALID_PARAMETER;
+    const port::Call call("storage_get_internal_memory_size", CODES, {Question::Storage});
     const auto store = [buf](const port::VolumeSize& size) -> int {
         Structure structure = {};
         if (!fits(size, structure))
@@ -46,12 +43,11 @@ int internalSize(Structure* buf)
         *buf = structure;
         return STORAGE_ERROR_NONE;
     };
-    return port::guarded(
-        [&] {
-            return port::pass(coresystem_port::Question::Storage,
-                              port::backend().storage().internal(), CODES, store);
-        },
-        CODES.failed);
+    return call.run([&]() -> int {
+        if (buf == nullptr)
+            return STORAGE_ERROR_INVALID_PARAMETER;
+        return call.pass(Question::Storage, port::backend().internalStorage(), store);
+    });
 }
 
 } // namespace

@@ -3,36 +3,34 @@
 
 #include <string_view>
 
-#include "../backend/Backend.h"
 #include "Keys.h"
 
 namespace {
 
-using coresystem_port::Question;
-using port::DeviceInfo;
+using port::fact;
+using port::Question;
 
 // This interface has no code for "not supported".
 constexpr port::Codes CODES{SYSTEM_INFO_ERROR_IO_ERROR, SYSTEM_INFO_ERROR_IO_ERROR,
                             SYSTEM_INFO_ERROR_PERMISSION_DENIED};
 
-struct KeyRow {
-    std::string_view key;
-    Question question;
-    port::Result<port::Fact> (DeviceInfo::*read)();
+struct Key {
+    std::string_view name;
+    port::KeyRow<std::string> row;
 };
 
-constexpr KeyRow KEYS[] = {
-    {"tizen.org/system/tizenid", Question::PlatformId, &DeviceInfo::platformId},
-    {"tizen.org/system/platform.name", Question::PlatformName, &DeviceInfo::platformName},
-    {"tizen.org/feature/platform.version", Question::PlatformVersion, &DeviceInfo::platformVersion},
-    {"tizen.org/system/model_name", Question::ModelName, &DeviceInfo::modelName},
+constexpr Key KEYS[] = {
+    {"tizen.org/system/tizenid", fact<Question::PlatformId>(0)},
+    {"tizen.org/system/platform.name", fact<Question::PlatformName>(0)},
+    {"tizen.org/feature/platform.version", fact<Question::PlatformVersion>(0)},
+    {"tizen.org/system/model_name", fact<Question::ModelName>(0)},
 };
 
-const KeyRow* findRow(const char* key)
+const port::KeyRow<std::string>* findRow(const char* name)
 {
-    for (const KeyRow& row : KEYS)
-        if (key != nullptr && row.key == key)
-            return &row;
+    for (const Key& key : KEYS)
+        if (name != nullptr && key.name == name)
+            return &key.row;
     return nullptr;
 }
 
@@ -40,13 +38,5 @@ const KeyRow* findRow(const char* key)
 
 int system_info_get_platform_string(const char* key, char** value)
 {
-    const KeyRow* const row = findRow(key);
-    if (const auto refusal = port::refusalOf(__func__, row))
-        return refusal.code(value);
-    if (row == nullptr || value == nullptr)
-        return SYSTEM_INFO_ERROR_INVALID_PARAMETER;
-    return port::guarded([&]() -> int {
-        return port::handOut(row->question, (port::backend().deviceInfo().*row->read)(), value,
-                             CODES);
-    });
+    return port::readKey(__func__, findRow(key), value, CODES);
 }

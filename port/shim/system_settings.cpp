@@ -1,15 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <system_settings.h>
 
-#include "../backend/Backend.h"
 #include "Keys.h"
 
 namespace {
 
-using coresystem_port::Question;
-using port::backend;
+using port::fact;
 using port::FontSize;
 using port::KeyRow;
+using port::Question;
 
 constexpr port::Codes CODES{SYSTEM_SETTINGS_ERROR_IO_ERROR, SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED,
                             SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED};
@@ -20,10 +19,8 @@ static_assert(static_cast<int>(FontSize::Small) == SYSTEM_SETTINGS_FONT_SIZE_SMA
 
 // Every setting, by type.
 constexpr KeyRow<std::string> STRING_KEYS[] = {
-    {SYSTEM_SETTINGS_KEY_DEVICE_NAME, Question::DeviceName,
-     [] { return backend().settings().deviceName(); }},
-    {SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, Question::Language,
-     [] { return backend().settings().language(); }},
+    fact<Question::DeviceName>(SYSTEM_SETTINGS_KEY_DEVICE_NAME),
+    fact<Question::Language>(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE),
     {SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE},
     {SYSTEM_SETTINGS_KEY_WALLPAPER_HOME_SCREEN},
     {SYSTEM_SETTINGS_KEY_WALLPAPER_LOCK_SCREEN},
@@ -37,8 +34,7 @@ constexpr KeyRow<std::string> STRING_KEYS[] = {
 };
 
 constexpr KeyRow<bool> BOOL_KEYS[] = {
-    {SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED, Question::MobileData,
-     [] { return backend().network().mobileData(); }},
+    fact<Question::MobileData>(SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED),
     {SYSTEM_SETTINGS_KEY_MOTION_ACTIVATION},
     {SYSTEM_SETTINGS_KEY_USB_DEBUGGING_ENABLED},
     {SYSTEM_SETTINGS_KEY_LOCALE_TIMEFORMAT_24HOUR},
@@ -52,8 +48,7 @@ constexpr KeyRow<bool> BOOL_KEYS[] = {
 };
 
 constexpr KeyRow<FontSize> INT_KEYS[] = {
-    {SYSTEM_SETTINGS_KEY_FONT_SIZE, Question::FontSize,
-     [] { return backend().settings().fontSize(); }},
+    fact<Question::FontSize>(SYSTEM_SETTINGS_KEY_FONT_SIZE),
     {SYSTEM_SETTINGS_KEY_TAP_AND_HOLD_DELAY},
     {SYSTEM_SETTINGS_KEY_TIME_CHANGED},
     {SYSTEM_SETTINGS_KEY_SCREEN_BACKLIGHT_TIME},
@@ -65,24 +60,15 @@ constexpr KeyRow<FontSize> INT_KEYS[] = {
 
 int system_settings_get_value_string(system_settings_key_e key, char** value)
 {
-    if (const auto refusal =
-            port::refusalOf(__func__, port::findKey(STRING_KEYS, port::numberOf(key))))
-        return refusal.code(value);
-    return port::readKey(STRING_KEYS, key, value, CODES);
+    return port::readKey(__func__, port::findKey(STRING_KEYS, port::numberOf(key)), value, CODES);
 }
 
 int system_settings_get_value_bool(system_settings_key_e key, bool* value)
 {
-    if (const auto refusal =
-            port::refusalOf(__func__, port::findKey(BOOL_KEYS, port::numberOf(key))))
-        return refusal.code();
-    return port::readKey(BOOL_KEYS, key, value, CODES);
+    return port::readKey(__func__, port::findKey(BOOL_KEYS, port::numberOf(key)), value, CODES);
 }
 
 int system_settings_get_value_int(system_settings_key_e key, int* value)
 {
-    if (const auto refusal =
-            port::refusalOf(__func__, port::findKey(INT_KEYS, port::numberOf(key))))
-        return refusal.code();
-    return port::readKey(INT_KEYS, key, value, CODES);
+    return port::readKey(__func__, port::findKey(INT_KEYS, port::numberOf(key)), value, CODES);
 }

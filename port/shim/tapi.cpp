@@ -13,9 +13,10 @@
 
 namespace {
 
-using coresystem_port::Question;
+using port::Call;
 using port::CardStatus;
 using port::Codes;
+using port::Question;
 using port::Subscriptions;
 using port::Telephony;
 
@@ -187,19 +188,19 @@ TelCallPreferredVoiceSubs_t voiceSubscription(const Subscriptions& all)
 }
 
 template <typename Subs>
-int askSubscription(TapiHandle* handle, Subs (*choose)(const Subscriptions&), Subs* subs)
+int askSubscription(const char* name, TapiHandle* handle, Subs (*choose)(const Subscriptions&),
+                    Subs* subs)
 {
-    return port::guarded(
-        [&]() -> int {
-            if (!ModemHandles::find(handle) || subs == nullptr)
-                return TAPI_API_INVALID_PTR;
-            return port::pass(Question::Subscriptions, port::backend().telephony().subscriptions(),
-                              CODES, [&](const Subscriptions& all) {
-                                  *subs = choose(all);
-                                  return TAPI_API_SUCCESS;
-                              });
-        },
-        CODES.failed, CODES.noMemory);
+    const Call call(name, CODES, {Question::Subscriptions});
+    return call.run([&]() -> int {
+        if (!ModemHandles::find(handle) || subs == nullptr)
+            return TAPI_API_INVALID_PTR;
+        return call.pass(Question::Subscriptions, port::backend().telephony().subscriptions(),
+                         [&](const Subscriptions& all) {
+                             *subs = choose(all);
+                             return TAPI_API_SUCCESS;
+                         });
+    });
 }
 
 // What is asked of a modem by its name.
@@ -210,10 +211,10 @@ constexpr std::initializer_list<Question> LIST_QUESTIONS = {
     Question::Subscriptions};
 
 // The reason why a handle's card cannot be read, by asking for its status.
-int askWhyUnreadable(TapiHandle* handle)
+int askWhyUnreadable(const Call& call, TapiHandle* handle)
 {
     int code = TAPI_API_SIM_NOT_INITIALIZED;
-    const int failure = port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, &code,
+    const int failure = port::askSlot(call, handle, Question::SimCard, &Telephony::card, &code,
                                       [](const port::Card& card, int& slot) {
                                           slot = unreadable(card.status);
                                           return TAPI_API_SUCCESS;
@@ -225,94 +226,75 @@ int askWhyUnreadable(TapiHandle* handle)
 
 char** tel_get_cp_name_list(void)
 {
-    if (port::Refusal{__func__, LIST_QUESTIONS})
-        return nullptr;
-    char** list = nullptr;
-    port::guarded([&]() -> int {
-        if (const auto slots = askSlots())
-            list = keep(slots.value().value);
-        return TAPI_API_SUCCESS;
+    return Call(__func__, CODES, LIST_QUESTIONS).pointer([]() -> char** {
+        const auto slots = askSlots();
+        return slots ? keep(slots.value().value) : nullptr;
     });
-    return list;
 }
 
 TapiHandle* tel_init(const char* cp_name)
 {
-    if (port::Refusal{__func__, MODEM_QUESTIONS})
-        return nullptr;
-    TapiHandle* handle = nullptr;
-    port::guarded([&]() -> int {
+    return Call(__func__, CODES, MODEM_QUESTIONS).pointer([&]() -> TapiHandle* {
         const auto slots = askSlots();
         const port::SlotName* const name =
             slots ? findModem(slots.value().value, cp_name) : nullptr;
-        if (name != nullptr)
-            handle = ModemHandles::open(*name);
-        return TAPI_API_SUCCESS;
+        return name != nullptr ? ModemHandles::open(*name) : nullptr;
     });
-    return handle;
 }
 
 int tel_deinit(TapiHandle* handle)
 {
-    const port::Refusal refusal{__func__};
-    return refusal.after(port::guarded(
-        [&]() -> int {
-            return ModemHandles::close(handle) ? TAPI_API_SUCCESS : TAPI_API_INVALID_PTR;
-        },
-        CODES.failed, CODES.noMemory));
+    return Call(__func__, CODES).release([&]() -> int {
+        return ModemHandles::close(handle) ? TAPI_API_SUCCESS : TAPI_API_INVALID_PTR;
+    });
 }
 
 int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
 {
-    if (const port::Refusal refusal{__func__, {Question::SimIdentity}})
-        return refusal.code();
-    const int result =
-        port::askSlot(CODES, handle, Question::SimIdentity, &Telephony::imsi, imsi, handOutImsi);
-    return result == CODES.noSim ? askWhyUnreadable(handle) : result;
+    const Call call(__func__, CODES, {Question::SimIdentity});
+    return call.run([&]() -> int {
+        const int result =
+            port::askSlot(call, handle, Question::SimIdentity, &Telephony::imsi, imsi, handOutImsi);
+        return result == CODES.noSim ? askWhyUnreadable(call, handle) : result;
+    });
 }
 
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed)
 {
-    if (const port::Refusal refusal{__func__, {Question::SimCard}})
-        return refusal.code();
-    if (card_changed == nullptr)
-        return TAPI_API_INVALID_PTR;
-    return port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, status,
-                         [&](const port::Card& card, TelSimCardStatus_t& slot) {
-                             slot = cardStatus(card.status);
-                             *card_changed = card.changed ? 1 : 0;
-                             return TAPI_API_SUCCESS;
-                         });
+    const Call call(__func__, CODES, {Question::SimCard});
+    return call.run([&]() -> int {
+        if (card_changed == nullptr)
+            return TAPI_API_INVALID_PTR;
+        return port::askSlot(call, handle, Question::SimCard, &Telephony::card, status,
+                             [&](const port::Card& card, TelSimCardStatus_t& slot) {
+                                 slot = cardStatus(card.status);
+                                 *card_changed = card.changed ? 1 : 0;
+                                 return TAPI_API_SUCCESS;
+                             });
+    });
 }
 
 int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subs)
 {
-    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
-        return refusal.code();
-    return askSubscription(handle, networkSubscription, subs);
+    return askSubscription(__func__, handle, networkSubscription, subs);
 }
 
 int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subs)
 {
-    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
-        return refusal.code();
-    return askSubscription(handle, dataSubscription, subs);
+    return askSubscription(__func__, handle, dataSubscription, subs);
 }
 
 int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subs)
 {
-    if (const port::Refusal refusal{__func__, {Question::Subscriptions}})
-        return refusal.code();
-    return askSubscription(handle, voiceSubscription, subs);
+    return askSubscription(__func__, handle, voiceSubscription, subs);
 }
 
 int tel_check_sms_device_status(TapiHandle* handle, int* ready)
 {
-    if (const port::Refusal refusal{__func__, {Question::SmsReadiness}})
-        return refusal.code();
-    return port::askSlot(CODES, handle, Question::SmsReadiness, &Telephony::smsReady, ready,
-                         [](bool isReady, int& slot) {
-                             slot = isReady ? 1 : 0;
-                             return TAPI_API_SUCCESS;
-                         });
+    return port::callSlot(Call(__func__, CODES, {Question::SmsReadiness}), handle,
+                          Question::SmsReadiness, &Telephony::smsReady, ready,
+                          [](bool isReady, int& slot) {
+                              slot = isReady ? 1 : 0;
+                              return TAPI_API_SUCCESS;
+                          });
 }

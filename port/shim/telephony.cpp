@@ -7,8 +7,9 @@
 
 namespace {
 
-using coresystem_port::Question;
+using port::Call;
 using port::Codes;
+using port::Question;
 using port::Telephony;
 
 using SlotHandles = port::Handles<telephony_h, port::SlotName>;
@@ -124,69 +125,57 @@ std::size_t port::liveTelephonyLists()
 
 int telephony_init(telephony_handle_list_s* list)
 {
-    if (const port::Refusal refusal{__func__, LIST_QUESTIONS})
-        return refusal.code(list);
-    if (list == nullptr)
-        return TELEPHONY_ERROR_INVALID_PARAMETER;
-    return port::guarded(
-        [&]() -> int {
-            return port::pass(
-                Question::SimSlots, port::slotsOfBackend(), CODES,
-                [&](const std::vector<port::SlotName>& slots) { return fill(*list, slots); });
-        },
-        CODES.failed, CODES.noMemory);
+    const Call call(__func__, CODES, LIST_QUESTIONS);
+    return call.run(list, [&]() -> int {
+        if (list == nullptr)
+            return TELEPHONY_ERROR_INVALID_PARAMETER;
+        return call.pass(
+            Question::SimSlots, port::slotsOfBackend(),
+            [&](const std::vector<port::SlotName>& slots) { return fill(*list, slots); });
+    });
 }
 
 int telephony_deinit(telephony_handle_list_s* list)
 {
-    const port::Refusal refusal{__func__};
-    if (list == nullptr)
-        return refusal.after(TELEPHONY_ERROR_INVALID_PARAMETER);
-    return refusal.after(port::guarded([&]() -> int { return release(*list); }, CODES.failed));
+    return Call(__func__, CODES).release([&]() -> int {
+        return list != nullptr ? release(*list) : TELEPHONY_ERROR_INVALID_PARAMETER;
+    });
 }
 
 int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
 {
-    if (const port::Refusal refusal{__func__, STATE_QUESTIONS})
-        return refusal.code();
-    return port::askSlot(CODES, handle, Question::SimCard, &Telephony::card, state,
-                         [](const port::Card& card, telephony_sim_state_e& slot) {
-                             return store(port::simState(card.status), slot);
-                         });
+    return port::callSlot(Call(__func__, CODES, STATE_QUESTIONS), handle, Question::SimCard,
+                          &Telephony::card, state,
+                          [](const port::Card& card, telephony_sim_state_e& slot) {
+                              return store(port::simState(card.status), slot);
+                          });
 }
 
 int telephony_sim_get_subscriber_number(telephony_h handle, char** number)
 {
-    if (const port::Refusal refusal{__func__, {Question::PhoneNumber}})
-        return refusal.code(number);
-    return port::askSlot(CODES, handle, Question::PhoneNumber, &Telephony::number, number,
-                         handOutNumber);
+    return port::callSlot(Call(__func__, CODES, {Question::PhoneNumber}), handle,
+                          Question::PhoneNumber, &Telephony::number, number, handOutNumber);
 }
 
 int telephony_modem_get_imei(telephony_h handle, char** imei)
 {
-    if (const port::Refusal refusal{__func__, {Question::Imei}})
-        return refusal.code(imei);
-    return port::askSlot(
-        CODES, handle, Question::Imei, &Telephony::imei, imei,
+    return port::callSlot(
+        Call(__func__, CODES, {Question::Imei}), handle, Question::Imei, &Telephony::imei, imei,
         [](const std::string& text, char*& slot) { return port::handOutCopy(text, &slot); });
 }
 
 int telephony_network_get_service_state(telephony_h handle,
                                         telephony_network_service_state_e* state)
 {
-    if (const port::Refusal refusal{__func__, {Question::NetworkService}})
-        return refusal.code();
-    return port::askSlot(CODES, handle, Question::NetworkService, &Telephony::service, state,
-                         [](port::Service service, telephony_network_service_state_e& slot) {
-                             return store(serviceState(service), slot);
-                         });
+    return port::callSlot(Call(__func__, CODES, {Question::NetworkService}), handle,
+                          Question::NetworkService, &Telephony::service, state,
+                          [](port::Service service, telephony_network_service_state_e& slot) {
+                              return store(serviceState(service), slot);
+                          });
 }
 
 int telephony_network_get_roaming_status(telephony_h handle, bool* roaming)
 {
-    if (const port::Refusal refusal{__func__, {Question::Roaming}})
-        return refusal.code();
-    return port::askSlot(CODES, handle, Question::Roaming, &Telephony::roaming, roaming,
-                         store<bool>);
+    return port::callSlot(Call(__func__, CODES, {Question::Roaming}), handle, Question::Roaming,
+                          &Telephony::roaming, roaming, store<bool>);
 }

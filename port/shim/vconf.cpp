@@ -2,14 +2,16 @@
 #include <vconf.h>
 
 #include <algorithm>
+#include <cstring>
 #include <string_view>
 
-#include "../backend/Backend.h"
-#include "Refusal.h"
+#include "Call.h"
 
 namespace {
 
-using coresystem_port::Question;
+using port::Question;
+
+constexpr port::Codes CODES{TIZEN_ERROR_IO_ERROR, TIZEN_ERROR_IO_ERROR};
 
 // The prefix of a key names the store that holds it.
 constexpr std::string_view STORES[] = {"db/", "file/", "memory/"};
@@ -21,22 +23,16 @@ bool isInAStore(std::string_view key)
     });
 }
 
-int read(const std::string& key, char** slot)
-{
-    const auto answer = port::backend().configuration().text(key);
-    if (key == VCONFKEY_CSC_SALESCODE)
-        port::recordOrigin(Question::SalesCode, answer);
-    return answer ? port::handOutCopy(answer.value().value, slot) : TIZEN_ERROR_IO_ERROR;
-}
-
 } // namespace
 
 char* vconf_get_str(const char* key)
 {
-    if (port::Refusal{__func__, {Question::SalesCode}})
-        return nullptr;
-    char* text = nullptr;
-    if (key != nullptr && isInAStore(key))
-        port::guarded([&] { return read(key, &text); });
-    return text;
+    return port::Call(__func__, CODES, {Question::SalesCode}).pointer([&]() -> char* {
+        if (key == nullptr || !isInAStore(key))
+            return nullptr;
+        const auto answer = port::backend().configuration(key);
+        if (std::string_view(key) == VCONFKEY_CSC_SALESCODE)
+            port::recordOrigin(Question::SalesCode, answer);
+        return answer ? strdup(answer.value().value.c_str()) : nullptr;
+    });
 }

@@ -4,15 +4,16 @@
 #include <atomic>
 #include <utility>
 
-#include "../backend/Backend.h"
 #include "../events/ChangeEvents.h"
-#include "Refusal.h"
+#include "Call.h"
 
 namespace {
 
 using port::Change;
 using port::ChangeEvents;
 using port::WifiConnection;
+
+constexpr port::Codes CODES{WIFI_ERROR_OPERATION_FAILED, WIFI_ERROR_NOT_SUPPORTED};
 
 constexpr wifi_connection_state_e stateOf(int connection)
 {
@@ -33,78 +34,59 @@ bool hasWifi()
     return state || state.error().kind != port::Error::Kind::NotSupported;
 }
 
-int set(Change change, bool hasCallback, ChangeEvents::Callback callback)
+int set(const char* name, Change change, bool hasCallback, ChangeEvents::Callback callback)
 {
-    if (readiness != WIFI_ERROR_NONE)
-        return readiness;
-    if (!hasCallback)
-        return WIFI_ERROR_INVALID_PARAMETER;
-    return port::changeEvents().set(change, std::move(callback)) ? WIFI_ERROR_NONE
-                                                                 : WIFI_ERROR_OPERATION_FAILED;
+    return port::Call(name, CODES).run([&]() -> int {
+        if (readiness != WIFI_ERROR_NONE)
+            return readiness;
+        if (!hasCallback)
+            return WIFI_ERROR_INVALID_PARAMETER;
+        return port::changeEvents().set(change, std::move(callback)) ? WIFI_ERROR_NONE
+                                                                     : WIFI_ERROR_OPERATION_FAILED;
+    });
 }
 
-int unset(Change change)
+int unset(const char* name, Change change)
 {
-    return port::guarded(
-        [change]() -> int {
-            if (readiness == WIFI_ERROR_NONE)
-                port::changeEvents().unset(change);
-            return readiness;
-        },
-        WIFI_ERROR_OPERATION_FAILED);
+    return port::Call(name, CODES).release([change]() -> int {
+        if (readiness == WIFI_ERROR_NONE)
+            port::changeEvents().unset(change);
+        return readiness;
+    });
 }
 
 } // namespace
 
 int wifi_initialize(void)
 {
-    if (const port::Refusal refusal{__func__})
-        return refusal.code();
-    return port::guarded(
-        []() -> int {
-            const int next = hasWifi() ? WIFI_ERROR_NONE : WIFI_ERROR_NOT_SUPPORTED;
-            int expected = readiness;
-            while (expected != WIFI_ERROR_NONE)
-                if (readiness.compare_exchange_weak(expected, next))
-                    return next;
-            return WIFI_ERROR_INVALID_OPERATION;
-        },
-        WIFI_ERROR_OPERATION_FAILED);
+    return port::Call(__func__, CODES).run([]() -> int {
+        const int next = hasWifi() ? WIFI_ERROR_NONE : WIFI_ERROR_NOT_SUPPORTED;
+        int expected = readiness;
+        while (expected != WIFI_ERROR_NONE)
+            if (readiness.compare_exchange_weak(expected, next))
+                return next;
+        return WIFI_ERROR_INVALID_OPERATION;
+    });
 }
 
 int wifi_set_device_state_changed_cb(wifi_device_state_changed_cb callback, void* user_data)
 {
-    if (const port::Refusal refusal{__func__})
-        return refusal.code();
-    return port::guarded(
-        [=] {
-            return set(Change::WifiDevice, callback != nullptr, [=](int state) {
-                callback(static_cast<wifi_device_state_e>(state), user_data);
-            });
-        },
-        WIFI_ERROR_OPERATION_FAILED);
+    return set(__func__, Change::WifiDevice, callback != nullptr,
+               [=](int state) { callback(static_cast<wifi_device_state_e>(state), user_data); });
 }
 
 int wifi_set_connection_state_changed_cb(wifi_connection_state_changed_cb callback, void* user_data)
 {
-    if (const port::Refusal refusal{__func__})
-        return refusal.code();
-    return port::guarded(
-        [=] {
-            return set(Change::WifiConnection, callback != nullptr,
-                       [=](int state) { callback(stateOf(state), nullptr, user_data); });
-        },
-        WIFI_ERROR_OPERATION_FAILED);
+    return set(__func__, Change::WifiConnection, callback != nullptr,
+               [=](int state) { callback(stateOf(state), nullptr, user_data); });
 }
 
 int wifi_unset_device_state_changed_cb(void)
 {
-    const port::Refusal refusal{__func__};
-    return refusal.after(unset(Change::WifiDevice));
+    return unset(__func__, Change::WifiDevice);
 }
 
 int wifi_unset_connection_state_changed_cb(void)
 {
-    const port::Refusal refusal{__func__};
-    return refusal.after(unset(Change::WifiConnection));
+    return unset(__func__, Change::WifiConnection);
 }

@@ -9,6 +9,8 @@
 #include "../../devicefile/Schema.h"
 #include "../../devicefile/Toml.h"
 #include "../common/GLibTypes.h"
+#include "../facts/Facts.h"
+#include "../facts/Privacy.h"
 
 namespace port::simulator {
 namespace {
@@ -46,24 +48,12 @@ std::string inComment(const std::string& text)
     return " # " + line + "\n";
 }
 
-// As many characters, and nobody's.
-std::string masked(const std::string& text)
-{
-    std::string zeros;
-    for (const char byte : text) {
-        const auto code = static_cast<unsigned char>(byte);
-        if (code < 0x80)
-            zeros += std::isalnum(code) != 0 ? '0' : byte;
-        else if (code >= 0xC0) // else it goes on a character of UTF-8's
-            zeros += '0';
-    }
-    return zeros;
-}
-
 // One section of the file, as it grows.
 class Lines {
 public:
-    explicit Lines(const char* section, Form form = Form::Section) : section_(section)
+    /// What identifies the device or its user is masked unless it is to be revealed.
+    explicit Lines(const char* section, bool reveal, Form form = Form::Section)
+        : section_(section), reveal_(reveal)
     {
         const std::string name(section);
         text_ = form == Form::List ? "\n[[" + name + "]]\n" : "\n[" + name + "]\n";
@@ -92,27 +82,32 @@ public:
 
     // A fact under the name that the file has for its kind; absent when there is none.
     template <typename T>
-    void add(const char* key, const Result<Sourced<T>>& answer)
+    void add(const std::string& key, const Result<Sourced<T>>& answer)
     {
         if (!answer)
             addError(key, answer.error());
         else if (const auto text = textOf(key, answer.value().value))
-            put(key, *text, answer.value().source);
+            put(key, *text, answer.value().source + (isMasked(key) ? ", masked" : ""));
         else
             putAbsent(key, "a device file cannot say what " + answer.value().source + " tells");
     }
 
-    // A fact that tells who the device or its user is.
-    void addIdentity(const char* key, const Result<Fact>& answer, const CaptureOptions& options)
+    // All plain facts of the section.
+    void addPlain(Backend& backend)
     {
-        if (!answer || options.reveal)
-            add(key, answer);
-        else
-            put(key, inQuotes(masked(answer.value().value)), answer.value().source + ", masked");
+#define FACT(number, question, section, key, ...) \
+    if (section_ == (section))                    \
+        add(key, backend.get<Question::question>());
+#include "../facts/facts.def"
     }
 
 private:
-    void addError(const char* key, const Error& error)
+    bool isMasked(const std::string& key) const
+    {
+        return !reveal_ && isPrivate(section_, key);
+    }
+
+    void addError(const std::string& key, const Error& error)
     {
         if (error.kind == Error::Kind::NotSupported && findName(key, NOT_SUPPORTED) != nullptr)
             put(key, "\"not_supported\"", error.reason);
@@ -121,7 +116,7 @@ private:
     }
 
     // The last of several.
-    const Name* findName(const char* key, std::int64_t value) const
+    const Name* findName(const std::string& key, std::int64_t value) const
     {
         const Name* found = nullptr;
         for (const Name& row : findKey(*findSection(section_), key)->names)
@@ -131,10 +126,10 @@ private:
     }
 
     template <typename T>
-    std::optional<std::string> textOf(const char* key, const T& value) const
+    std::optional<std::string> textOf(const std::string& key, const T& value) const
     {
         if constexpr (std::is_same_v<T, std::string>) {
-            return inQuotes(value);
+            return inQuotes(isMasked(key) ? zeroed(value) : value);
         } else if constexpr (std::is_same_v<T, bool>) {
             return value ? "true" : "false";
         } else if constexpr (std::is_enum_v<T>) {
@@ -147,6 +142,7 @@ private:
     }
 
     std::string section_;
+    bool reveal_;
     std::string text_;
     bool isEmpty_ = true;
 };
@@ -180,29 +176,15 @@ public:
 private:
     std::string device()
     {
-        DeviceInfo& info = backend_.deviceInfo();
-        device_.addIdentity("platform_id", info.platformId(), options_);
-        device_.add("platform_name", info.platformName());
-        device_.add("platform_version", info.platformVersion());
-        device_.add("model_name", info.modelName());
-        device_.addIdentity("serial", info.serial(), options_);
+        device_.addPlain(backend_);
         return device_.text();
     }
 
     std::string settings()
     {
-        Lines lines("settings");
-        Network& network = backend_.network();
-        const auto name = backend_.settings().deviceName();
-        lines.addIdentity("device_name", name, options_);
-        lines.add("language", backend_.settings().language());
-        lines.add("sales_code", backend_.configuration().text("db/csc/salescode"));
-        lines.add("font_size", backend_.settings().fontSize());
-        lines.add("flight_mode", network.flightMode());
-        lines.add("data_roaming", network.dataRoaming());
-        lines.add("mobile_data", network.mobileData());
-        lines.add("packet_data", network.packetData());
-        lines.add("utc_offset", part(backend_.clock().now(), &std::tm::tm_gmtoff));
+        Lines lines("settings", options_.reveal);
+        lines.addPlain(backend_);
+        lines.add("utc_offset", part(backend_.now(), &std::tm::tm_gmtoff));
         return lines.text();
     }
 
@@ -236,7 +218,7 @@ private:
     std::string slot(const SlotName& name)
     {
         Telephony& telephony = backend_.telephony();
-        Lines lines("slot", Form::List);
+        Lines lines("slot", options_.reveal, Form::List);
         lines.put("cp_name", inQuotes(name), "the modem");
         const auto card = telephony.card(name);
         if (!card && card.error().kind == Error::Kind::Denied) {
@@ -246,7 +228,7 @@ private:
         addCard(lines, card);
         addIdentity(lines, telephony.imsi(name));
         addNumber(lines, telephony.number(name));
-        lines.addIdentity("imei", telephony.imei(name), options_);
+        lines.add("imei", telephony.imei(name));
         lines.add("service", telephony.service(name));
         lines.add("roaming", telephony.roaming(name));
         lines.add("sms", telephony.smsReady(name));
@@ -271,14 +253,14 @@ private:
         return false;
     }
 
-    void addIdentity(Lines& lines, const Result<Sourced<Imsi>>& imsi)
+    static void addIdentity(Lines& lines, const Result<Sourced<Imsi>>& imsi)
     {
         lines.add("mcc", part(imsi, &Imsi::mcc));
         lines.add("mnc", part(imsi, &Imsi::mnc));
-        lines.addIdentity("msin", part(imsi, &Imsi::msin), options_);
+        lines.add("msin", part(imsi, &Imsi::msin));
     }
 
-    void addNumber(Lines& lines, const Result<Sourced<std::optional<std::string>>>& number)
+    static void addNumber(Lines& lines, const Result<Sourced<std::optional<std::string>>>& number)
     {
         if (!number)
             lines.putAbsent("number", number.error().reason);
@@ -287,8 +269,7 @@ private:
         else if (number.value().value->empty())
             lines.put("number", "\"null\"", number.value().source);
         else
-            lines.addIdentity("number", Fact{*number.value().value, number.value().source},
-                              options_);
+            lines.add("number", Result<Fact>(Fact{*number.value().value, number.value().source}));
     }
 
     std::string subscriptions()
@@ -296,7 +277,7 @@ private:
         const auto all = backend_.telephony().subscriptions();
         if (!all)
             return "";
-        Lines lines("subscriptions");
+        Lines lines("subscriptions", options_.reveal);
         const Subscriptions& known = all.value().value;
         addDefault(lines, "network", known.network, all.value().source);
         addDefault(lines, "data", known.data, all.value().source);
@@ -317,7 +298,7 @@ private:
 
     std::string network()
     {
-        Lines lines("network");
+        Lines lines("network", options_.reveal);
         Network& network = backend_.network();
         addRadio(lines, "cellular", network.cellular(), "connection_get_cellular_state");
         addRadio(lines, "wifi", network.wifi(), "connection_get_wifi_state");
@@ -348,10 +329,10 @@ private:
 
     std::string storage()
     {
-        const auto size = backend_.storage().internal();
+        const auto size = backend_.internalStorage();
         if (!size)
             return absentSection("storage", size.error().reason);
-        Lines lines("storage");
+        Lines lines("storage", options_.reveal);
         lines.add("block_size", part(size, &VolumeSize::blockSize));
         lines.add("fragment_size", part(size, &VolumeSize::fragmentSize));
         lines.add("blocks", part(size, &VolumeSize::blocks));
@@ -363,9 +344,9 @@ private:
     {
         if (options_.packages.empty())
             return "";
-        Lines lines("packages");
+        Lines lines("packages", options_.reveal);
         for (const std::string& name : options_.packages) {
-            const auto version = backend_.packages().version(name);
+            const auto version = backend_.packageVersion(name);
             if (!version) // with the section, what it does not name were not installed
                 return absentSection("packages", version.error().reason);
             if (version.value().value)
@@ -378,8 +359,8 @@ private:
 
     Backend& backend_;
     const CaptureOptions& options_;
-    Lines device_{"device"};
-    Lines faults_{"fault"};
+    Lines device_{"device", options_.reveal};
+    Lines faults_{"fault", options_.reveal};
 };
 
 } // namespace

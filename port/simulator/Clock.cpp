@@ -30,9 +30,9 @@ std::tm timeAt(std::time_t moment, std::int64_t offset)
     return time;
 }
 
-Result<Sourced<std::tm>> SimulatedClock::now()
+Result<Sourced<std::tm>> now(devicefile::DeviceFile& file)
 {
-    const auto offset = file_.get<std::int64_t>("settings", "utc_offset");
+    const auto offset = file.get<std::int64_t>("settings", "utc_offset");
     if (!offset)
         return offset.error();
     return Sourced<std::tm>{timeAt(std::time(nullptr), offset.value().value),

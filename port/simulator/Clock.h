@@ -4,7 +4,7 @@
 #define PORT_SIMULATOR_CLOCK_H
 
 #include "../../devicefile/DeviceFile.h"
-#include "../backend/Clock.h"
+#include <ctime>
 
 namespace port::simulator {
 
@@ -12,15 +12,8 @@ namespace port::simulator {
 /// "+0530".
 std::tm timeAt(std::time_t moment, std::int64_t offset);
 
-class SimulatedClock : public Clock {
-public:
-    explicit SimulatedClock(devicefile::DeviceFile& file) : file_(file) {}
-
-    Result<Sourced<std::tm>> now() override;
-
-private:
-    devicefile::DeviceFile& file_;
-};
+/// See Backend::now().
+Result<Sourced<std::tm>> now(devicefile::DeviceFile& file);
 
 } // namespace port::simulator
 

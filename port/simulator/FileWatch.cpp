@@ -8,9 +8,9 @@
 
 #include <unistd.h>
 
-#include "../common/Descriptor.h"
+#include "../../devicefile/Descriptor.h"
+#include "../common/ContextThread.h"
 #include "../common/GLibTypes.h"
-#include "../events/ContextThread.h"
 
 namespace port::simulator {
 namespace {

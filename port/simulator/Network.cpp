@@ -64,26 +64,6 @@ Result<Sourced<LinkState>> SimulatedNetwork::bluetooth()
         [](const Device& device) { return radio(device, "bluetooth", LinkState::Deactivated); });
 }
 
-Result<Sourced<bool>> SimulatedNetwork::flightMode()
-{
-    return file_.get<bool>("settings", "flight_mode");
-}
-
-Result<Sourced<bool>> SimulatedNetwork::packetData()
-{
-    return file_.get<bool>("settings", "packet_data");
-}
-
-Result<Sourced<bool>> SimulatedNetwork::mobileData()
-{
-    return file_.get<bool>("settings", "mobile_data");
-}
-
-Result<Sourced<bool>> SimulatedNetwork::dataRoaming()
-{
-    return file_.get<bool>("settings", "data_roaming");
-}
-
 std::unique_ptr<Watch> SimulatedNetwork::watch(std::function<void()> changed)
 {
     return watchFile(file_.path(), std::move(changed));

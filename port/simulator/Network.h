@@ -18,11 +18,6 @@ public:
     Result<Sourced<LinkState>> wifi() override;
     Result<Sourced<WifiConnection>> wifiConnection() override;
     Result<Sourced<LinkState>> bluetooth() override;
-    Result<Sourced<bool>> flightMode() override;
-    Result<Sourced<bool>> packetData() override;
-    Result<Sourced<bool>> mobileData() override;
-    Result<Sourced<bool>> dataRoaming() override;
-
     std::unique_ptr<Watch> watch(std::function<void()> changed) override;
 
 private:

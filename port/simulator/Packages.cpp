@@ -6,12 +6,13 @@ namespace port::simulator {
 using devicefile::Device;
 using devicefile::Section;
 
-Result<Sourced<std::optional<std::string>>> SimulatedPackages::version(const std::string& name)
+Result<Sourced<std::optional<std::string>>> packageVersion(devicefile::DeviceFile& file,
+                                                           const std::string& name)
 {
     using Version = std::optional<std::string>;
-    return file_.ask<Version>([&](const Device& device) -> Result<Sourced<Version>> {
+    return file.ask<Version>([&](const Device& device) -> Result<Sourced<Version>> {
         const Section& packages = device.section("packages");
-        if (packages.source() == file_.path()) // and no line of it
+        if (packages.source() == file.path()) // and no line of it
             return notAvailable(packages.source() + ": no section [packages]");
         if (packages.find(name) == nullptr)
             return Sourced<Version>{std::nullopt, packages.source()};

@@ -4,19 +4,13 @@
 #define PORT_SIMULATOR_PACKAGES_H
 
 #include "../../devicefile/DeviceFile.h"
-#include "../backend/Packages.h"
+#include <optional>
 
 namespace port::simulator {
 
-class SimulatedPackages : public Packages {
-public:
-    explicit SimulatedPackages(devicefile::DeviceFile& file) : file_(file) {}
-
-    Result<Sourced<std::optional<std::string>>> version(const std::string& name) override;
-
-private:
-    devicefile::DeviceFile& file_;
-};
+/// See Backend::packageVersion().
+Result<Sourced<std::optional<std::string>>> packageVersion(devicefile::DeviceFile& file,
+                                                           const std::string& name);
 
 } // namespace port::simulator
 

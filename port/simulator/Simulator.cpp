@@ -7,12 +7,9 @@
 #include "../backend/Backend.h"
 #include "../backend/Log.h"
 #include "Clock.h"
-#include "Configuration.h"
-#include "DeviceInfo.h"
 #include "Faults.h"
 #include "Network.h"
 #include "Packages.h"
-#include "Settings.h"
 #include "Storage.h"
 #include "Telephony.h"
 
@@ -40,14 +37,15 @@ public:
     {
         return "simulator";
     }
-    DeviceInfo& deviceInfo() override
+
+    FactAnswer read(Question fact) override
     {
-        return deviceInfo_;
+        const FactRow& row = *rowOf(fact);
+        return file_.ask<FactValue>([&](const devicefile::Device& device) {
+            return device.section(std::string(row.section)).fact(std::string(row.key));
+        });
     }
-    Settings& settings() override
-    {
-        return settings_;
-    }
+
     Telephony& telephony() override
     {
         return telephony_;
@@ -56,21 +54,24 @@ public:
     {
         return network_;
     }
-    Storage& storage() override
+    Result<Sourced<VolumeSize>> internalStorage() override
     {
-        return storage_;
+        return simulator::internalStorage(file_);
     }
-    Packages& packages() override
+    Result<Sourced<std::optional<std::string>>> packageVersion(const std::string& name) override
     {
-        return packages_;
+        return simulator::packageVersion(file_, name);
     }
-    Configuration& configuration() override
+    // The sales code is all that the store of a device file holds.
+    Result<Fact> configuration(const std::string& key) override
     {
-        return configuration_;
+        if (key != SALES_CODE)
+            return notAvailable(file_.path() + ": no configuration key " + key);
+        return get<Question::SalesCode>();
     }
-    Clock& clock() override
+    Result<Sourced<std::tm>> now() override
     {
-        return clock_;
+        return simulator::now(file_);
     }
     Faults& faults() override
     {
@@ -96,14 +97,8 @@ public:
 
 private:
     DeviceFile file_;
-    SimulatedDeviceInfo deviceInfo_{file_};
-    SimulatedSettings settings_{file_};
     SimulatedTelephony telephony_{file_};
     SimulatedNetwork network_{file_};
-    SimulatedStorage storage_{file_};
-    SimulatedPackages packages_{file_};
-    SimulatedConfiguration configuration_{file_};
-    SimulatedClock clock_{file_};
     SimulatedFaults faults_{file_};
 };
 

@@ -19,9 +19,9 @@ constexpr struct {
 
 } // namespace
 
-Result<Sourced<VolumeSize>> SimulatedStorage::internal()
+Result<Sourced<VolumeSize>> internalStorage(devicefile::DeviceFile& file)
 {
-    return file_.ask<VolumeSize>([](const Device& device) -> Result<Sourced<VolumeSize>> {
+    return file.ask<VolumeSize>([](const Device& device) -> Result<Sourced<VolumeSize>> {
         const Section& storage = device.section("storage");
         VolumeSize volume;
         for (const auto& row : SIZES) {

@@ -4,19 +4,12 @@
 #define PORT_SIMULATOR_STORAGE_H
 
 #include "../../devicefile/DeviceFile.h"
-#include "../backend/Storage.h"
+#include "../backend/VolumeSize.h"
 
 namespace port::simulator {
 
-class SimulatedStorage : public Storage {
-public:
-    explicit SimulatedStorage(devicefile::DeviceFile& file) : file_(file) {}
-
-    Result<Sourced<VolumeSize>> internal() override;
-
-private:
-    devicefile::DeviceFile& file_;
-};
+/// See Backend::internalStorage().
+Result<Sourced<VolumeSize>> internalStorage(devicefile::DeviceFile& file);
 
 } // namespace port::simulator
 

@@ -110,7 +110,7 @@ def check_backends(tree):
 
 
 def check_device_files(tree):
-    allowed = ("devicefile/", "port/api/", "port/common/", "port/backend/")
+    allowed = ("devicefile/", "port/api/", "port/common/", "port/backend/", "port/facts/")
     for file in tree.files("devicefile"):
         for _, target in tree.includes(file):
             if target is not None and not target.startswith(allowed):
@@ -118,7 +118,8 @@ def check_device_files(tree):
 
 
 def check_command(tree):
-    allowed = ("cli/", "devicefile/", "include/", "port/api/", "port/coreutil/include/", "port/include/")
+    allowed = ("cli/", "devicefile/", "include/", "port/api/", "port/coreutil/include/", "port/facts/",
+               "port/include/")
     for file in tree.files("cli"):
         for _, target in tree.includes(file):
             if target is not None and not target.startswith(allowed):

@@ -77,6 +77,14 @@ def check_debian(library, symbols_file):
         yield f"{problem} ({symbols_file.name})"
 
 
+def refresh_debian(library, symbols_file, version):
+    """Adds what the library exports and the file lacks; a name that is gone is left to the check."""
+    lines = run("nm", "-D", "--defined-only", library).splitlines()
+    text = symbols_file.read_text()
+    new = sorted(name for name in {line.split()[2] for line in lines} if f"\n {name}@" not in text)
+    symbols_file.write_text(text + "".join(f" {name}@Base {version}\n" for name in new))
+
+
 def is_of_runtime(symbol, patterns):
     name = symbol.split("@")[0]
     return any(fnmatch.fnmatchcase(text, pattern) for text in (name, symbol)
@@ -157,6 +165,8 @@ def main():
     parser.add_argument("library")
     parser.add_argument("--exports", type=pathlib.Path, help="list of all exported names")
     parser.add_argument("--debian", type=pathlib.Path, help="the symbols file of its Debian package")
+    parser.add_argument("--refresh", metavar="VERSION",
+                        help="add to that file what it lacks, as new in VERSION")
     parser.add_argument("--imports", type=pathlib.Path, help="libraries and all imported names ...")
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
     parser.add_argument("--strings", choices=("new", "old"), default="new",
@@ -172,6 +182,8 @@ def main():
     problems = []
     if arguments.exports:
         problems += check_exports(library, read_list(arguments.exports), arguments.strings)
+    if arguments.refresh:
+        refresh_debian(library, arguments.debian, arguments.refresh)
     if arguments.debian:
         problems += check_debian(library, arguments.debian)
     if arguments.runtime:

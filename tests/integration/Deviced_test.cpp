@@ -166,7 +166,7 @@ TEST_F(DevicedTest, MachinesOwnSerialIsTheAnswerWithoutADeviceFile)
     bus.start();
     port::linux_backend::Bus own;
     const auto backend = port::makeLinuxBackend();
-    const auto expected = backend->deviceInfo().serial();
+    const auto expected = backend->get<port::Question::DeviceSerial>();
     if (expected)
         EXPECT_EQ("('" + expected.value().value + "',)", serial());
     else

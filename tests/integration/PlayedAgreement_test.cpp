@@ -91,6 +91,12 @@ struct Question {
         name, false,                                                                              \
             [](Backend& backend, const SlotName&) { return answerOf(backend.part().question()); } \
     }
+#define PLAIN_FACT(name, fact)                                               \
+    {                                                                        \
+        name, false, [](Backend& backend, const SlotName&) {                 \
+            return answerOf(backend.get<coresystem_port::Question::fact>()); \
+        }                                                                    \
+    }
 #define OF_SLOT(name, question)                                  \
     {                                                            \
         name, true, [](Backend& backend, const SlotName& slot) { \
@@ -99,19 +105,19 @@ struct Question {
     }
 
 const Question QUESTIONS[] = {
-    OF_DEVICE("device name", settings, deviceName),
-    OF_DEVICE("language", settings, language),
-    OF_DEVICE("model", deviceInfo, modelName),
+    PLAIN_FACT("device name", DeviceName),
+    PLAIN_FACT("language", Language),
+    PLAIN_FACT("model", ModelName),
     OF_DEVICE("slots", telephony, slots),
     OF_DEVICE("data slot", telephony, subscriptions),
     OF_DEVICE("cellular", network, cellular),
     OF_DEVICE("wifi", network, wifi),
     OF_DEVICE("wifi connection", network, wifiConnection),
     OF_DEVICE("bluetooth", network, bluetooth),
-    OF_DEVICE("flight mode", network, flightMode),
-    OF_DEVICE("packet data", network, packetData),
-    OF_DEVICE("mobile data", network, mobileData),
-    OF_DEVICE("data roaming", network, dataRoaming),
+    PLAIN_FACT("flight mode", FlightMode),
+    PLAIN_FACT("packet data", PacketData),
+    PLAIN_FACT("mobile data", MobileData),
+    PLAIN_FACT("data roaming", DataRoaming),
     OF_SLOT("card", card),
     OF_SLOT("imsi", imsi),
     OF_SLOT("number", number),

@@ -135,7 +135,7 @@ TEST_F(SystemdServicesTest, BackendFindsBothServices)
         }
     deviceName();
     EXPECT_EQ("running", backend->findServices().at(0).state);
-    EXPECT_EQ("static-name", backend->settings().deviceName().value().value);
+    EXPECT_EQ("static-name", backend->get<port::Question::DeviceName>().value().value);
 }
 
 TEST_F(SystemdServicesTest, ThreadsMayAskTheServiceThatStartsMeanwhile)

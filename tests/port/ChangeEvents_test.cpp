@@ -12,9 +12,9 @@
 
 #include <gmock/gmock.h>
 
+#include "common/ContextThread.h"
 #include "common/GLibTypes.h"
-#include "events/ContextThread.h"
-#include "support/FakeNetwork.h"
+#include "support/FakeBackend.h"
 #include "support/Together.h"
 
 using port::Change;
@@ -89,8 +89,9 @@ protected:
     }
 
     OwnContext context;
-    FakeNetwork network;
-    ChangeEvents events{network};
+    FakeBackend backend;
+    FakeNetwork& network = backend.fakeNetwork;
+    ChangeEvents events{backend};
     std::vector<std::string> told;
 };
 
@@ -400,8 +401,9 @@ TEST(ChangeEventsDeathTest, ProcessMayEndWhileChangesArrive)
 {
     EXPECT_EXIT(
         {
-            auto& network = *new FakeNetwork;
-            auto& events = *new ChangeEvents(network);
+            auto& backend = *new FakeBackend;
+            auto& network = backend.fakeNetwork;
+            auto& events = *new ChangeEvents(backend);
             auto& loop = *new port::ContextThread;
             std::promise<void> told;
             loop.run([&] {

@@ -14,7 +14,7 @@
 #include <unistd.h>
 
 #include "devicefile/ChangeFile.h"
-#include "port/common/Descriptor.h"
+#include "devicefile/Descriptor.h"
 #include "support/Child.h"
 #include "support/TemporaryTree.h"
 

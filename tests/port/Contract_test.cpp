@@ -7,20 +7,18 @@
 
 #include <gmock/gmock.h>
 
+#include "backend/Backend.h"
 #include "coresystem_port.h"
 #include "devicefile/Toml.h"
 #include "linux/DeviceInfo.h"
 #include "linux/Settings.h"
-#include "simulator/DeviceInfo.h"
-#include "simulator/Settings.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/Together.h"
 
-using port::DeviceInfo;
 using port::Fact;
+using port::Question;
 using port::Result;
-using port::Settings;
 using testing::IsEmpty;
 using testing::MatchesRegex;
 using testing::Not;
@@ -35,8 +33,7 @@ class Stage {
 public:
     virtual ~Stage() = default;
     virtual void show(const Facts& facts) = 0;
-    virtual DeviceInfo& deviceInfo() = 0;
-    virtual Settings& settings() = 0;
+    virtual Result<Fact> read(Question question) = 0;
 };
 
 std::string quoted(const std::string& value)
@@ -60,13 +57,9 @@ public:
         }
         tree_.write("/device.toml", text);
     }
-    DeviceInfo& deviceInfo() override
+    Result<Fact> read(Question question) override
     {
-        return deviceInfo_;
-    }
-    Settings& settings() override
-    {
-        return settings_;
+        return port::answerOf<std::string>(backend_->read(question));
     }
 
 private:
@@ -80,9 +73,8 @@ private:
     }
 
     TemporaryTree tree_;
-    port::devicefile::DeviceFile file_{tree_.path("/device.toml")};
-    port::simulator::SimulatedDeviceInfo deviceInfo_{file_};
-    port::simulator::SimulatedSettings settings_{file_};
+    const std::unique_ptr<port::Backend> backend_ =
+        port::makeSimulatorBackend(tree_.path("/device.toml"));
 };
 
 class LinuxStage : public Stage {
@@ -111,13 +103,22 @@ public:
         const auto machine = facts.find("machine");
         tree_.write("/etc/machine-id", machine != facts.end() ? machine->second : "");
     }
-    DeviceInfo& deviceInfo() override
+    Result<Fact> read(Question question) override
     {
-        return deviceInfo_;
-    }
-    Settings& settings() override
-    {
-        return settings_;
+        switch (question) {
+        case Question::PlatformId:
+            return deviceInfo_.platformId();
+        case Question::PlatformName:
+            return deviceInfo_.platformName();
+        case Question::PlatformVersion:
+            return deviceInfo_.platformVersion();
+        case Question::ModelName:
+            return deviceInfo_.modelName();
+        case Question::DeviceName:
+            return settings_.deviceName();
+        default:
+            return settings_.language();
+        }
     }
 
 private:
@@ -166,11 +167,11 @@ struct Asked {
 
 std::vector<Asked> askEverything(Stage& stage)
 {
-    return {{"platform_name", stage.deviceInfo().platformName()},
-            {"platform_version", stage.deviceInfo().platformVersion()},
-            {"model_name", stage.deviceInfo().modelName()},
-            {"device_name", stage.settings().deviceName()},
-            {"language", stage.settings().language()}};
+    return {{"platform_name", stage.read(Question::PlatformName)},
+            {"platform_version", stage.read(Question::PlatformVersion)},
+            {"model_name", stage.read(Question::ModelName)},
+            {"device_name", stage.read(Question::DeviceName)},
+            {"language", stage.read(Question::Language)}};
 }
 
 void expectAnswers(Stage& stage, const Facts& facts)
@@ -245,8 +246,8 @@ TYPED_TEST(ContractTest, IdentifierHasOneFormAndTellsDevicesApart)
     for (const char* const machine :
          {"4f2d9c0b6a714e8d95c3b17e20fd86aa", "5f2d9c0b6a714e8d95c3b17e20fd86aa"}) {
         this->stage.show({{"machine", machine}});
-        const Result<Fact> first = this->stage.deviceInfo().platformId();
-        const Result<Fact> second = this->stage.deviceInfo().platformId();
+        const Result<Fact> first = this->stage.read(Question::PlatformId);
+        const Result<Fact> second = this->stage.read(Question::PlatformId);
         ASSERT_TRUE(first && second);
         EXPECT_EQ(first.value().value, second.value().value);
         EXPECT_NE(last, first.value().value);
@@ -255,7 +256,7 @@ TYPED_TEST(ContractTest, IdentifierHasOneFormAndTellsDevicesApart)
         last = first.value().value;
     }
     this->stage.show({});
-    EXPECT_FALSE(this->stage.deviceInfo().platformId());
+    EXPECT_FALSE(this->stage.read(Question::PlatformId));
 }
 
 TYPED_TEST(ContractTest, ThreadsMayAskAtOnce)

@@ -17,7 +17,7 @@ using port::InstalledPackages;
 
 namespace {
 
-using Version = FakePackages::Version;
+using Version = FakeBackend::Version;
 
 class PackagesTest : public testing::Test {
 protected:
@@ -29,7 +29,7 @@ protected:
 
     void answer(const Answer<Version>& version_)
     {
-        backend.fakePackages.versionAnswer = [version_](const std::string&) { return version_; };
+        backend.versionAnswer = [version_](const std::string&) { return version_; };
     }
 
     // Both functions that take a name fail alike.
@@ -79,7 +79,7 @@ TEST_F(PackagesTest, NamesGoThroughUnchanged)
         std::string(10000000, 'x'),
     };
     std::vector<std::string> asked;
-    backend.fakePackages.versionAnswer = [&asked](const std::string& name) {
+    backend.versionAnswer = [&asked](const std::string& name) {
         asked.push_back(name);
         return answered(Version());
     };

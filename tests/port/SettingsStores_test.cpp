@@ -46,7 +46,7 @@ TEST_F(SettingsStoresTest, FontSizesHaveThePlatformsNumbers)
     const FontSize sizes[] = {FontSize::Small, FontSize::Normal, FontSize::Large,
                               FontSize::Huge,  FontSize::Giant,  static_cast<FontSize>(9)};
     for (const int number : {0, 1, 2, 3, 4, 9}) {
-        backend.fakeSettings.fontSizeAnswer = answered(sizes[std::min(number, 5)]);
+        backend.fontSizeAnswer = answered(sizes[std::min(number, 5)]);
         EXPECT_EQ(0, fontSize());
         EXPECT_EQ(number, size);
     }
@@ -60,7 +60,7 @@ TEST_F(SettingsStoresTest, FailuresHaveTheirCodesAndLeaveTheValueAlone)
         {port::denied("why"), SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED},
     };
     for (const auto& failure : failures) {
-        backend.fakeSettings.fontSizeAnswer = failure.first;
+        backend.fontSizeAnswer = failure.first;
         backend.fakeNetwork.change(
             [&](FakeNetwork::Answers& answers) { answers.mobileData = failure.first; });
         EXPECT_EQ(failure.second, mobileData());
@@ -97,7 +97,7 @@ TEST_F(SettingsStoresTest, ConfigurationKeyOutsideAStoreIsNull)
 
 TEST_F(SettingsStoresTest, MissingConfigurationIsNull)
 {
-    backend.fakeConfiguration.textAnswer = [](const std::string&) -> Answer<std::string> {
+    backend.textAnswer = [](const std::string&) -> Answer<std::string> {
         return port::notAvailable("no such key");
     };
     EXPECT_EQ(nullptr, vconf_get_str(VCONFKEY_CSC_SALESCODE));
@@ -111,7 +111,7 @@ TEST_F(SettingsStoresTest, TimeIsHandedOutWhole)
     now.tm_yday = 324;
     now.tm_gmtoff = 19800;
     now.tm_zone = "IST";
-    backend.fakeClock.nowAnswer = answered(now);
+    backend.nowAnswer = answered(now);
     std::tm date = {};
     ASSERT_EQ(0, alarm_get_current_time(&date));
     EXPECT_EQ(126, date.tm_year);
@@ -131,7 +131,7 @@ TEST_F(SettingsStoresTest, ClockThatCannotBeAskedLeavesTheTimeAlone)
     std::tm date = {};
     date.tm_mday = 77;
     for (const auto& failure : failures) {
-        backend.fakeClock.nowAnswer = failure.first;
+        backend.nowAnswer = failure.first;
         EXPECT_EQ(failure.second, alarm_get_current_time(&date));
         EXPECT_EQ(77, date.tm_mday);
     }

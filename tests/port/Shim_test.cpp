@@ -4,6 +4,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <thread>
 
 #include <dlog.h>
 #include <gmock/gmock.h>
@@ -11,7 +12,7 @@
 #include <system_settings.h>
 
 #include "coresystem_port.h"
-#include "shim/HandOut.h"
+#include "shim/Call.h"
 #include "support/CapturedStandardError.h"
 #include "support/TemporaryTree.h"
 #include "support/Together.h"
@@ -259,8 +260,8 @@ TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
 {
     const auto code = [](const port::Error& error, const port::Codes& codes) {
         return failure([&](char** answer) {
-            return port::handOut(Question::Language, port::Result<port::Fact>(error), answer,
-                                 codes);
+            return port::Call("none", codes)
+                .handOut(Question::Language, port::Result<port::Fact>(error), answer);
         });
     };
     EXPECT_EQ(-1, code(port::notAvailable("why"), {-1, -2}));
@@ -274,10 +275,29 @@ TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
 
 TEST_F(ShimTest, NoExceptionLeavesAShim)
 {
-    EXPECT_EQ(-12, port::guarded([]() -> int { throw std::bad_alloc(); }));
-    EXPECT_EQ(-5, port::guarded([]() -> int { throw 1; }));
-    EXPECT_EQ(-6, port::guarded([]() -> int { throw 1; }, -6));
-    EXPECT_EQ(3, port::guarded([]() -> int { return 3; }));
+    const port::Codes codes{-6, -1};
+    const port::Call call("none", codes);
+    EXPECT_EQ(-12, call.run([]() -> int { throw std::bad_alloc(); }));
+    EXPECT_EQ(-6, call.run([]() -> int { throw 1; }));
+    EXPECT_EQ(-6, call.release([]() -> int { throw 1; }));
+    EXPECT_EQ(nullptr, call.pointer([]() -> char* { throw 1; }));
+    EXPECT_EQ(3, call.run([]() -> int { return 3; }));
+}
+
+TEST_F(ShimTest, OriginsBelongToTheScopeAndTheThread)
+{
+    const coresystem_port::Origins outer;
+    port::recordOrigin(Question::Language, {true, "first", ""});
+    {
+        const coresystem_port::Origins inner;
+        port::recordOrigin(Question::Wifi, {false, "", "no radio"});
+        std::thread([] { port::recordOrigin(Question::Wifi, {true, "elsewhere", ""}); }).join();
+        EXPECT_EQ("no radio", inner.of(Question::Wifi).reason);
+        EXPECT_EQ("", inner.of(Question::Language).source);
+    }
+    EXPECT_EQ("no radio", outer.of(Question::Wifi).reason);
+    EXPECT_EQ("first", outer.of(Question::Language).source);
+    EXPECT_EQ("elsewhere", lastOrigin(Question::Wifi).source);
 }
 
 TEST_F(ShimTest, MissingMemoryIsNamed)

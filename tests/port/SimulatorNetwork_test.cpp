@@ -32,11 +32,11 @@ TEST_F(SimulatorNetworkTest, SwitchesAnswerWithTheirLines)
 {
     describe("[settings]\nflight_mode = false\npacket_data = true\nmobile_data = false\n"
              "data_roaming = true\nfont_size = 'huge'\n");
-    expectAnswer(false, line(3), network.flightMode());
-    expectAnswer(true, line(4), network.packetData());
-    expectAnswer(false, line(5), network.mobileData());
-    expectAnswer(true, line(6), network.dataRoaming());
-    expectAnswer(FontSize::Huge, line(7), backend->settings().fontSize());
+    expectAnswer(false, line(3), backend->get<port::Question::FlightMode>());
+    expectAnswer(true, line(4), backend->get<port::Question::PacketData>());
+    expectAnswer(false, line(5), backend->get<port::Question::MobileData>());
+    expectAnswer(true, line(6), backend->get<port::Question::DataRoaming>());
+    expectAnswer(FontSize::Huge, line(7), backend->get<port::Question::FontSize>());
 }
 
 TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
@@ -46,12 +46,14 @@ TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
     expectError(Kind::NotAvailable, line(2) + ": [network] has no wifi", network.wifi());
     expectError(Kind::NotAvailable, line(2) + ": [network] has no wifi", network.wifiConnection());
     expectError(Kind::NotAvailable, line(2) + ": [network] has no bluetooth", network.bluetooth());
-    expectError(Kind::NotAvailable, path + ": [settings] has no flight_mode", network.flightMode());
-    expectError(Kind::NotAvailable, path + ": [settings] has no packet_data", network.packetData());
+    expectError(Kind::NotAvailable, path + ": [settings] has no flight_mode",
+                backend->get<port::Question::FlightMode>());
+    expectError(Kind::NotAvailable, path + ": [settings] has no packet_data",
+                backend->get<port::Question::PacketData>());
     expectError(Kind::NotAvailable, path + ": [settings] has no font_size",
-                backend->settings().fontSize());
+                backend->get<port::Question::FontSize>());
     expectError(Kind::NotAvailable, path + ": [device] has no serial",
-                backend->deviceInfo().serial());
+                backend->get<port::Question::DeviceSerial>());
 }
 
 TEST_F(SimulatorNetworkTest, RadioMayBeMissingFromTheDevice)
@@ -106,16 +108,16 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
     expectError(Kind::NotAvailable, problem, network.cellular());
     expectError(Kind::NotAvailable, problem, network.wifi());
     expectError(Kind::NotAvailable, problem, network.wifiConnection());
-    expectError(Kind::NotAvailable, problem, network.flightMode());
-    expectError(Kind::NotAvailable, problem, backend->storage().internal());
-    expectError(Kind::NotAvailable, problem, backend->packages().version("a"));
-    expectError(Kind::NotAvailable, problem, backend->clock().now());
+    expectError(Kind::NotAvailable, problem, backend->get<port::Question::FlightMode>());
+    expectError(Kind::NotAvailable, problem, backend->internalStorage());
+    expectError(Kind::NotAvailable, problem, backend->packageVersion("a"));
+    expectError(Kind::NotAvailable, problem, backend->now());
 }
 
 TEST_F(SimulatorNetworkTest, SerialNumberIsAnswered)
 {
     describe("[device]\nserial = 'R38N50'\n");
-    expectAnswer("R38N50", line(3), backend->deviceInfo().serial());
+    expectAnswer("R38N50", line(3), backend->get<port::Question::DeviceSerial>());
 }
 
 class SimulatorStorageTest : public DeviceFileTest {};
@@ -124,7 +126,7 @@ TEST_F(SimulatorStorageTest, VolumeIsAnsweredWhole)
 {
     describe("[storage]\nblock_size = 4096\nfragment_size = 512\nblocks = 6442450944\n"
              "available_blocks = 7\n");
-    const auto answer = backend->storage().internal();
+    const auto answer = backend->internalStorage();
     ASSERT_TRUE(answer) << answer.error().reason;
     EXPECT_EQ(4096U, answer.value().value.blockSize);
     EXPECT_EQ(512U, answer.value().value.fragmentSize);
@@ -142,7 +144,7 @@ TEST_F(SimulatorStorageTest, VolumeOfWhichAKeyIsMissingIsNotAvailable)
             text += key == missing ? "" : key + " = 1\n";
         describe(text);
         expectError(Kind::NotAvailable, line(2) + ": [storage] has no " + missing,
-                    backend->storage().internal());
+                    backend->internalStorage());
     }
 }
 
@@ -151,22 +153,21 @@ class SimulatorPackagesTest : public DeviceFileTest {};
 TEST_F(SimulatorPackagesTest, VersionsAreAnsweredByExactName)
 {
     describe("[packages]\n'org.example.clock' = '1.2.3'\n' odd\\name' = ''\n");
-    expectAnswer(std::string("1.2.3"), line(3), backend->packages().version("org.example.clock"));
-    expectAnswer(std::string(), line(4), backend->packages().version(" odd\\name"));
+    expectAnswer(std::string("1.2.3"), line(3), backend->packageVersion("org.example.clock"));
+    expectAnswer(std::string(), line(4), backend->packageVersion(" odd\\name"));
 }
 
 TEST_F(SimulatorPackagesTest, OtherNamesAreNotInstalled)
 {
     describe("[packages]\n'org.example.clock' = '1.2.3'\n");
     for (const char* const name : {"", "org.example", "ORG.EXAMPLE.CLOCK", "org.example.clock "})
-        expectAnswer(std::nullopt, line(2), backend->packages().version(name));
+        expectAnswer(std::nullopt, line(2), backend->packageVersion(name));
 }
 
 TEST_F(SimulatorPackagesTest, FileThatNamesNoPackagesTellsOfNone)
 {
     describe("");
-    expectError(Kind::NotAvailable, path + ": no section [packages]",
-                backend->packages().version("a"));
+    expectError(Kind::NotAvailable, path + ": no section [packages]", backend->packageVersion("a"));
 }
 
 class SimulatorConfigurationTest : public DeviceFileTest {};
@@ -174,9 +175,9 @@ class SimulatorConfigurationTest : public DeviceFileTest {};
 TEST_F(SimulatorConfigurationTest, SalesCodeIsTheOneKey)
 {
     describe("[settings]\nsales_code = 'KOO'\n");
-    expectAnswer("KOO", line(3), backend->configuration().text("db/csc/salescode"));
+    expectAnswer("KOO", line(3), backend->configuration("db/csc/salescode"));
     expectError(Kind::NotAvailable, path + ": no configuration key db/csc/other",
-                backend->configuration().text("db/csc/other"));
+                backend->configuration("db/csc/other"));
 }
 
 class SimulatorClockTest : public DeviceFileTest {};
@@ -210,7 +211,7 @@ TEST_F(SimulatorClockTest, ClockIsTheMachines)
 {
     describe("[settings]\nutc_offset = -12600\n");
     const std::time_t before = std::time(nullptr);
-    const auto answer = backend->clock().now();
+    const auto answer = backend->now();
     const std::time_t after = std::time(nullptr);
     ASSERT_TRUE(answer) << answer.error().reason;
     std::tm local = answer.value().value;
@@ -224,8 +225,7 @@ TEST_F(SimulatorClockTest, ClockIsTheMachines)
 TEST_F(SimulatorClockTest, TimeWithoutAnOffsetIsNotAvailable)
 {
     describe("");
-    expectError(Kind::NotAvailable, path + ": [settings] has no utc_offset",
-                backend->clock().now());
+    expectError(Kind::NotAvailable, path + ": [settings] has no utc_offset", backend->now());
 }
 
 } // namespace

@@ -4,6 +4,8 @@
 #include <functional>
 
 #include "devicefile/DeviceFile.h"
+#include "port/facts/Facts.h"
+#include "port/facts/Privacy.h"
 #include "support/DeviceFileTest.h"
 
 using port::CardStatus;
@@ -364,6 +366,29 @@ TEST_F(SimulatorSchemaTest, NulIsRefusedInAnyText)
     EXPECT_EQ(":3:7: \"app\" must not hold a NUL", problemOf("[packages]\napp = \"1\\u0000\"\n"));
     EXPECT_EQ(":3:11: \"cp_name\" must not hold a NUL",
               problemOf("[[slot]]\ncp_name = \"a\\u0000\"\n"));
+}
+
+TEST(PrivacyTest, WhatIsPrivateIsMaskedByCharacters)
+{
+    constexpr struct {
+        const char* text;
+        const char* masked;
+        const char* zeroed;
+    } ROWS[] = {
+        {"", "", ""},
+        {"1234", "****", "0000"},
+        {"12345", "***45", "00000"},
+        {"+49 30-x", "******-x", "+00 00-0"},
+        {"\u00e9t\u00e9 \u0439\u0446", "****\u0439\u0446", "000 00"},
+    };
+    for (const auto& row : ROWS) {
+        EXPECT_EQ(row.masked, port::masked(row.text));
+        EXPECT_EQ(row.zeroed, port::zeroed(row.text));
+    }
+    EXPECT_TRUE(port::isPrivate("device", "platform_id"));
+    EXPECT_TRUE(port::isPrivate("slot", "msin"));
+    EXPECT_FALSE(port::isPrivate("slot", "mcc"));
+    EXPECT_FALSE(port::isPrivate("packages", "msin"));
 }
 
 } // namespace

@@ -118,7 +118,7 @@ protected:
         return "[settings]\nflight_mode = " + std::string(on ? "true" : "false") + "\n";
     }
 
-    port::ChangeEvents events{backend->network()};
+    port::ChangeEvents events{*backend};
     std::vector<std::string> told;
 };
 

@@ -44,7 +44,7 @@ protected:
     // What is wrong with the device file, without its own path; every answer must name it.
     std::string problem()
     {
-        const Result<Fact> answer = backend->deviceInfo().modelName();
+        const Result<Fact> answer = backend->get<port::Question::ModelName>();
         EXPECT_FALSE(answer);
         EXPECT_EQ(port::Error::Kind::NotAvailable, answer.error().kind);
         EXPECT_EQ(backend->deviceFileProblem(), answer.error().reason);
@@ -60,7 +60,7 @@ protected:
 
     std::string model()
     {
-        const Result<Fact> answer = backend->deviceInfo().modelName();
+        const Result<Fact> answer = backend->get<port::Question::ModelName>();
         return answer ? answer.value().value : "error: " + answer.error().reason;
     }
 
@@ -79,12 +79,12 @@ TEST_F(SimulatorTest, EveryKeyIsAnsweredWithItsLine)
         std::string value;
         int line;
     } answers[] = {
-        {backend->deviceInfo().platformId(), "a", 3},
-        {backend->deviceInfo().platformName(), "b", 4},
-        {backend->deviceInfo().platformVersion(), "c", 5},
-        {backend->deviceInfo().modelName(), "d", 6},
-        {backend->settings().deviceName(), "e", 8},
-        {backend->settings().language(), "f", 9},
+        {backend->get<port::Question::PlatformId>(), "a", 3},
+        {backend->get<port::Question::PlatformName>(), "b", 4},
+        {backend->get<port::Question::PlatformVersion>(), "c", 5},
+        {backend->get<port::Question::ModelName>(), "d", 6},
+        {backend->get<port::Question::DeviceName>(), "e", 8},
+        {backend->get<port::Question::Language>(), "f", 9},
     };
     for (const auto& row : answers) {
         ASSERT_TRUE(row.answer) << row.answer.error().reason;
@@ -98,7 +98,8 @@ TEST_F(SimulatorTest, AbsentKeyIsNotAvailableAndNoProblemOfTheFile)
 {
     describe("schema = 1\n");
     EXPECT_EQ("error: " + path + ": [device] has no model_name", model());
-    EXPECT_EQ(path + ": [settings] has no language", backend->settings().language().error().reason);
+    EXPECT_EQ(path + ": [settings] has no language",
+              backend->get<port::Question::Language>().error().reason);
     EXPECT_EQ("", backend->deviceFileProblem());
 }
 
@@ -349,7 +350,7 @@ TEST_F(SimulatorTest, ThreadsMeetingAProblemWriteOneLine)
     CapturedStandardError log;
     together(8, [this](int) {
         for (int i = 0; i < 20; ++i)
-            EXPECT_FALSE(backend->settings().language());
+            EXPECT_FALSE(backend->get<port::Question::Language>());
     });
     const std::string lines = log.take();
     EXPECT_EQ(1, std::count(lines.begin(), lines.end(), '\n')) << lines;

@@ -44,7 +44,7 @@ protected:
     // A read that leaves the structure alone.
     int failure(const Answer<port::VolumeSize>& answer)
     {
-        backend.fakeStorage.internalAnswer = answer;
+        backend.storageAnswer = answer;
         const int result = read();
         EXPECT_EQ(77U, size.f_bsize);
         EXPECT_EQ(78U, size.f_bavail);
@@ -71,7 +71,7 @@ TYPED_TEST(StorageTest, EveryFieldIsFilled)
 
 TYPED_TEST(StorageTest, EmptyVolumeIsAnAnswer)
 {
-    this->backend.fakeStorage.internalAnswer = answered(port::VolumeSize{});
+    this->backend.storageAnswer = answered(port::VolumeSize{});
     ASSERT_EQ(0, this->read());
     EXPECT_EQ(0U, this->size.f_blocks);
     EXPECT_EQ(0U, this->size.f_bavail);
@@ -98,7 +98,7 @@ TYPED_TEST(StorageTest, ThreeTebibytesFitOrFailAndAreNeverCut)
         EXPECT_EQ(STORAGE_ERROR_OPERATION_FAILED, this->failure(answer));
         return;
     }
-    this->backend.fakeStorage.internalAnswer = answer;
+    this->backend.storageAnswer = answer;
     ASSERT_EQ(0, this->read());
     EXPECT_EQ(BLOCKS, this->size.f_blocks);
     EXPECT_EQ(BLOCKS, this->size.f_bavail);

@@ -28,10 +28,10 @@ int main(int count, char** arguments)
     if (count < 2)
         return 0;
     if (arguments[1] == std::string("sources")) {
-        printSource("language", port::backend().settings().language());
-        printSource("font size", port::backend().settings().fontSize());
-        printSource("storage", port::backend().storage().internal());
-        printSource("sales code", port::backend().configuration().text("db/csc/salescode"));
+        printSource("language", port::backend().get<port::Question::Language>());
+        printSource("font size", port::backend().get<port::Question::FontSize>());
+        printSource("storage", port::backend().internalStorage());
+        printSource("sales code", port::backend().configuration("db/csc/salescode"));
         return 0;
     }
     AESCrypto& cipher = *AESCrypto::GetInstance();

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A backend that answers what a test says. A program that is linked with
-// -Wl,--wrap=_ZN4port7backendEv asks it in place of the machine or a device file.
+// A backend that answers what a test says.
 #ifndef TESTS_SUPPORT_FAKE_BACKEND_H
 #define TESTS_SUPPORT_FAKE_BACKEND_H
 
@@ -82,84 +81,44 @@ private:
     std::mutex mutex_;
 };
 
-// One answer for each of the other interfaces.
-class FakeStorage : public port::Storage {
-public:
-    Answer<port::VolumeSize> internalAnswer = answered(port::VolumeSize{4096, 1024, 40, 5});
-
-    Answer<port::VolumeSize> internal() override
-    {
-        return internalAnswer;
-    }
-};
-
-class FakePackages : public port::Packages {
+class FakeBackend : public port::Backend {
 public:
     using Version = std::optional<std::string>;
 
+    FakeTelephony fakeTelephony;
+    FakeNetwork fakeNetwork; // and its switches
+    Answer<port::FontSize> fontSizeAnswer = answered(port::FontSize::Normal);
+    Answer<port::VolumeSize> storageAnswer = answered(port::VolumeSize{4096, 1024, 40, 5});
     std::function<Answer<Version>(const std::string&)> versionAnswer = [](const std::string&) {
         return answered(Version("1.0"));
     };
-
-    Answer<Version> version(const std::string& name) override
-    {
-        return versionAnswer(name);
-    }
-};
-
-class FakeConfiguration : public port::Configuration {
-public:
     std::function<Answer<std::string>(const std::string&)> textAnswer = [](const std::string& key) {
         return answered("value of " + key);
     };
-
-    Answer<std::string> text(const std::string& key) override
-    {
-        return textAnswer(key);
-    }
-};
-
-class FakeClock : public port::Clock {
-public:
     Answer<std::tm> nowAnswer = answered(std::tm{});
-
-    Answer<std::tm> now() override
-    {
-        return nowAnswer;
-    }
-};
-
-class FakeSettings : public port::Settings {
-public:
-    Answer<port::FontSize> fontSizeAnswer = answered(port::FontSize::Normal);
-
-    Answer<port::FontSize> fontSize() override
-    {
-        return fontSizeAnswer;
-    }
-};
-
-class FakeBackend : public port::Backend {
-public:
-    FakeTelephony fakeTelephony;
-    FakeSettings fakeSettings;
-    FakeNetwork fakeNetwork;
-    FakeStorage fakeStorage;
-    FakePackages fakePackages;
-    FakeConfiguration fakeConfiguration;
-    FakeClock fakeClock;
 
     std::string name() const override
     {
         return "fake";
     }
-    port::DeviceInfo& deviceInfo() override
+    port::FactAnswer read(port::Question fact) override
     {
-        return deviceInfo_;
-    }
-    port::Settings& settings() override
-    {
-        return fakeSettings;
+        switch (fact) {
+        case port::Question::FontSize:
+            return port::factAnswer(fontSizeAnswer);
+        case port::Question::SalesCode:
+            return port::factAnswer(textAnswer(port::SALES_CODE));
+        case port::Question::FlightMode:
+            return port::factAnswer(fakeNetwork.get(&FakeNetwork::Answers::flightMode));
+        case port::Question::PacketData:
+            return port::factAnswer(fakeNetwork.get(&FakeNetwork::Answers::packetData));
+        case port::Question::MobileData:
+            return port::factAnswer(fakeNetwork.get(&FakeNetwork::Answers::mobileData));
+        case port::Question::DataRoaming:
+            return port::factAnswer(fakeNetwork.get(&FakeNetwork::Answers::dataRoaming));
+        default:
+            return port::notSupported("the fake has none");
+        }
     }
     port::Telephony& telephony() override
     {
@@ -169,36 +128,39 @@ public:
     {
         return fakeNetwork;
     }
-    port::Storage& storage() override
+    Answer<port::VolumeSize> internalStorage() override
     {
-        return fakeStorage;
+        return storageAnswer;
     }
-    port::Packages& packages() override
+    Answer<Version> packageVersion(const std::string& name) override
     {
-        return fakePackages;
+        return versionAnswer(name);
     }
-    port::Configuration& configuration() override
+    Answer<std::string> configuration(const std::string& key) override
     {
-        return fakeConfiguration;
+        return textAnswer(key);
     }
-    port::Clock& clock() override
+    Answer<std::tm> now() override
     {
-        return fakeClock;
+        return nowAnswer;
     }
     std::vector<coresystem_port::Service> findServices() override
     {
         return {};
     }
-
-private:
-    port::DeviceInfo deviceInfo_;
 };
 
 /// While it lives, this is the process's backend.
 class FakedBackend : public FakeBackend {
 public:
-    FakedBackend();
-    ~FakedBackend() override;
+    FakedBackend()
+    {
+        port::substituteBackend(this);
+    }
+    ~FakedBackend() override
+    {
+        port::substituteBackend(nullptr);
+    }
 };
 
 #endif

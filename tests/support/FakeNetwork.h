@@ -63,21 +63,11 @@ public:
     {
         return get(&Answers::bluetooth);
     }
-    Answer<bool> flightMode() override
+    template <typename T>
+    T get(T Answers::*answer)
     {
-        return get(&Answers::flightMode);
-    }
-    Answer<bool> packetData() override
-    {
-        return get(&Answers::packetData);
-    }
-    Answer<bool> mobileData() override
-    {
-        return get(&Answers::mobileData);
-    }
-    Answer<bool> dataRoaming() override
-    {
-        return get(&Answers::dataRoaming);
+        const std::lock_guard<std::mutex> lock(mutex_);
+        return answers_.*answer;
     }
 
     std::unique_ptr<port::Watch> watch(std::function<void()> changed) override
@@ -106,13 +96,6 @@ private:
     private:
         FakeNetwork& network_;
     };
-
-    template <typename T>
-    T get(T Answers::*answer)
-    {
-        const std::lock_guard<std::mutex> lock(mutex_);
-        return answers_.*answer;
-    }
 
     std::mutex mutex_;
     Answers answers_;

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "events/ContextThread.h"
+#include "common/ContextThread.h"
 #include "played/Player.h"
 #include "support/PrivateBus.h"
 #include "support/TemporaryTree.h"

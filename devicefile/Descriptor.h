@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // A file descriptor that is closed with its owner.
-#ifndef PORT_COMMON_DESCRIPTOR_H
-#define PORT_COMMON_DESCRIPTOR_H
+#ifndef DEVICEFILE_DESCRIPTOR_H
+#define DEVICEFILE_DESCRIPTOR_H
 
 #include <utility>
 #include <vector>

@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// The device's internal storage. Any thread.
-#ifndef PORT_BACKEND_STORAGE_H
-#define PORT_BACKEND_STORAGE_H
+// The size of a storage.
+#ifndef PORT_BACKEND_VOLUME_SIZE_H
+#define PORT_BACKEND_VOLUME_SIZE_H
 
 #include <cstdint>
-
-#include "Result.h"
 
 namespace port {
 
@@ -15,16 +13,6 @@ struct VolumeSize {
     std::uint64_t fragmentSize = 0;    // of all blocks
     std::uint64_t blocks = 0;          // in fragments
     std::uint64_t availableBlocks = 0; // for ordinary users
-};
-
-class Storage {
-public:
-    virtual ~Storage() = default;
-
-    virtual Result<Sourced<VolumeSize>> internal()
-    {
-        return notSupported("no internal storage");
-    }
 };
 
 } // namespace port

@@ -3,7 +3,7 @@
 
 #include <utility>
 
-#include "../common/BlockedSignals.h"
+#include "BlockedSignals.h"
 
 namespace port {
 ContextThread::ContextThread()

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // A thread that runs a GLib main context of its own.
-#ifndef PORT_EVENTS_CONTEXT_THREAD_H
-#define PORT_EVENTS_CONTEXT_THREAD_H
+#ifndef PORT_COMMON_CONTEXT_THREAD_H
+#define PORT_COMMON_CONTEXT_THREAD_H
 
 #include <deque>
 #include <functional>
@@ -9,7 +9,7 @@
 #include <mutex>
 #include <thread>
 
-#include "../common/GLibTypes.h"
+#include "GLibTypes.h"
 
 namespace port {
 

@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: Apache-2.0
+#ifndef TESTS_SUPPORT_USAGE_H
+#define TESTS_SUPPORT_USAGE_H
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+
+// What this process has now.
+struct Usage {
+    long memory = statusLine("VmRSS:"); // kB
+    long threads = statusLine("Threads:");
+    long descriptors = std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
+
+    static long statusLine(const std::string& name)
+    {
+        std::ifstream status("/proc/self/status");
+        for (std::string line; std::getline(status, line);)
+            if (line.rfind(name, 0) == 0)
+                return std::strtol(line.c_str() + name.size(), nullptr, 10);
+        return 0;
+    }
+};
+
+#endif
