@@ -144,7 +144,7 @@ ExitCode runSim(const Invocation& invocation, bool reveal)
     else if (!sims.slots.empty())
         writeOut(simText(sims, reveal));
     else if (!deviceFileBad)
-        complain("there is no SIM slot: " + printable(sims.reason));
+        complain("no SIM slot is known: " + printable(sims.reason));
     if (deviceFileBad)
         return BAD_DEVICE_FILE;
     return sims.slots.empty() ? NOT_AVAILABLE : SUCCESS;
@@ -161,7 +161,7 @@ void cli::addSimCommand(const Command& app, Invocation& invocation)
     sim.flag("--json", invocation.json, "Print JSON");
     sim.setFooter("Examples: coresystem sim\n"
                   "          coresystem sim --reveal --device phone\n"
-                  "Exit code 3: there is no SIM slot; the reason is on standard error.");
+                  "Exit code 3: no SIM slot is known; the reason is on standard error.");
     sim.onUse([&invocation, reveal] {
         invocation.command = [&invocation, reveal] { return runSim(invocation, *reveal); };
     });

@@ -33,6 +33,9 @@ port::Result<port::Sourced<std::vector<port::SlotName>>> askSlots()
     return slots;
 }
 
+// All lists of names together may take that much: hundreds of sets of modems.
+constexpr std::size_t MOST_NAME_BYTES = 1024 * 1024;
+
 // The names as the platform hands them out. An application never releases a list, so every one that
 // was handed out stays: one for each set of modems that the machine had.
 class NameList {
@@ -49,6 +52,14 @@ public:
         return pointers_.data();
     }
 
+    std::size_t bytes() const
+    {
+        std::size_t all = pointers_.size() * sizeof pointers_.front();
+        for (const port::SlotName& name : names_)
+            all += 2 * name.size(); // beside the text, the one it is found by
+        return all;
+    }
+
 private:
     std::vector<port::SlotName> names_;
     // As long as any list, and ended: applications look at the place of a slot that they counted
@@ -56,15 +67,21 @@ private:
     std::vector<char*> pointers_;
 };
 
+// Null when there were too many.
 char** keep(const std::vector<port::SlotName>& names)
 {
     static std::mutex mutex;
     static auto& kept = *new std::map<std::vector<port::SlotName>, std::unique_ptr<NameList>>;
+    static std::size_t bytes = 0;
     const std::lock_guard<std::mutex> lock(mutex);
-    std::unique_ptr<NameList>& list = kept[names];
-    if (list == nullptr)
-        list = std::make_unique<NameList>(names);
-    return list->pointers();
+    const auto known = kept.find(names);
+    if (known != kept.end())
+        return known->second->pointers();
+    auto list = std::make_unique<NameList>(names);
+    if (bytes + list->bytes() > MOST_NAME_BYTES)
+        return nullptr;
+    bytes += list->bytes();
+    return kept.emplace(names, std::move(list)).first->second->pointers();
 }
 
 // The name itself, or the first when none is asked for; null when there is no such modem.

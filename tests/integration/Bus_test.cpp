@@ -379,6 +379,8 @@ TEST_F(BusTest, StateOfAServiceIsTold)
     EXPECT_EQ("starts on demand", states[1].value());
     EXPECT_EQ("installed, but not running", states[2].error().reason);
     EXPECT_EQ("not on the system bus", states[3].error().reason);
+    service->keepSilent("Ping");
+    EXPECT_EQ("does not answer", bus.statesOf({HOSTNAME1})[0].error().reason);
 }
 
 TEST_F(BusTest, ConnectionIsNotTheSharedOne)

@@ -95,7 +95,7 @@ TEST_F(SimCommandTest, KilledDaemonIsNamedAndNothingIsMadeUp)
     addTwo();
     modems->kill();
     EXPECT_THAT(outputOfCommand("sim"),
-                testing::AllOf(HasSubstr("there is no SIM slot: org.freedesktop.ModemManager1"),
+                testing::AllOf(HasSubstr("no SIM slot is known: org.freedesktop.ModemManager1"),
                                HasSubstr("[3]"), Not(HasSubstr("450"))));
     EXPECT_THAT(outputOfCommand("get imei"),
                 HasSubstr("; applications are told 000000000000000\n[3]"));
