@@ -7,7 +7,13 @@
 namespace port::played {
 namespace {
 
+<<<<<<< HEAD
 using devicefile::Edit;
+=======
+const std::string VERSION = versionText(MM_MAJOR_VERSION, MM_MINOR_VERSION, MM_MICRO_VERSION);
+
+using devicefile::Change;
+>>>>>>> origin/main
 
 constexpr char ERROR[] = "org.freedesktop.ModemManager1.Error.";
 constexpr char FIRMWARE[] = MM_DBUS_INTERFACE_MODEM_FIRMWARE;
@@ -279,7 +285,9 @@ World worldOf(const Scene& scene)
     World world;
     for (std::size_t i = 0; i < scene.facts.slots.size(); ++i)
         Modem(scene, i).show(world);
-    world.push_back({MM_DBUS_PATH, {face(MM_DBUS_INTERFACE)}, false});
+    world.push_back({MM_DBUS_PATH,
+                     {face(MM_DBUS_INTERFACE, {{"Version", value("s", VERSION.c_str())}})},
+                     false});
     return world;
 }
 

@@ -9,7 +9,7 @@ ScanDevices ()
 SetLogging (s)
 ReportKernelEvent (a{sv})
 InhibitDevice (sb)
-Version s r = '1.20.4'
+Version s r = ''
 
 interface org.freedesktop.ModemManager1.Modem
 Enable (b)

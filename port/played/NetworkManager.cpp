@@ -2,6 +2,7 @@
 // NetworkManager: its switches, a device for each radio, a connection for each of these.
 #include <ModemManager/ModemManager.h>
 #include <nm-dbus-interface.h>
+#include <nm-version.h>
 
 #include "Service.h"
 
@@ -20,6 +21,8 @@ constexpr char WIFI_ADDRESS[] = "00:00:5E:00:53:01";
 constexpr char BLUETOOTH_ADDRESS[] = "00:00:5E:00:53:03";
 constexpr char NAME_OF_WIFI[] = "Wi-Fi";
 constexpr guint32 FLAG_DEVICE_NM_SUPPORTED = 1;
+const std::string VERSION = versionText(NM_MAJOR_VERSION, NM_MINOR_VERSION, NM_MICRO_VERSION);
+constexpr guint32 ENCODED = NM_ENCODE_VERSION(NM_MAJOR_VERSION, NM_MINOR_VERSION, NM_MICRO_VERSION);
 
 // The connections that the user has set up, one for each kind of radio.
 struct Kind {
@@ -297,7 +300,10 @@ private:
             state = NM_STATE_CONNECTING;
         return face(
             NM_DBUS_INTERFACE,
-            {{"Devices", texts(devices, "ao")},
+            {{"Version", value("s", VERSION.c_str())},
+             {"VersionInfo", value("@au", g_variant_new_fixed_array(G_VARIANT_TYPE_UINT32, &ENCODED,
+                                                                    1, sizeof ENCODED))},
+             {"Devices", texts(devices, "ao")},
              {"AllDevices", texts(devices, "ao")},
              {"ActiveConnections", texts(active, "ao")},
              {"WirelessEnabled", value("b", facts_.isWifiOn())},

@@ -130,6 +130,8 @@ const std::vector<const Role*>& allServices();
 Face face(const char* interface, Values known = {});
 Variant value(const char* format, ...);
 Variant texts(const std::vector<std::string>& all, const char* type = "as");
+/// "1.42.4": that of the headers, since nmcli warns of a service of another version than its own.
+std::string versionText(int major, int minor, int micro);
 devicefile::Edit set(const std::string& path, const char* value);
 devicefile::Edit unset(const std::string& path);
 std::string slotKey(std::size_t slot, const char* key);

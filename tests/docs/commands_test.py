@@ -34,6 +34,10 @@ class Document:
         self.path, self.program, self.folder = path, program, folder
         self.text = path.read_text("utf-8")
         self.share = str(program.parent.parent / "share/coresystem")
+        link = folder / ".installed"  # whose name needs no quotation marks
+        if not link.is_symlink():
+            link.symlink_to(self.share)
+        self.link = str(link)
         self.variables = run_transcript.environment(program, folder)
         self.exports = ""  # of the scripts so far
         self.problems, self.run_lines, self.exempt = [], 0, []
@@ -43,8 +47,8 @@ class Document:
         shown = []
         for command, expected in run_transcript.parse(text)[1]:
             self.run_lines += 1
-            actual = [line.replace(self.share, INSTALLED) for line in run_transcript.run(
-                command.replace(INSTALLED, self.share), self.folder, self.variables)]
+            actual = [line.replace(self.share, INSTALLED).replace(self.link, INSTALLED) for line in run_transcript.run(
+                command.replace(INSTALLED, self.link), self.folder, self.variables)]
             fits = run_transcript.matches(expected, [re.sub("^! ", "", line) for line in actual
                                                      if not re.fullmatch(r"\[\d+\]", line)])
             actual = [re.sub("^! ", "", line) for line in actual if not re.fullmatch(r"\[\d+\]", line)]
@@ -57,7 +61,7 @@ class Document:
         self.run_lines += len([line for line in text.splitlines() if line.strip() and line[0] != "#"])
         script = self.exports + text
         self.exports += "".join(re.findall(r"^export .*\n", text, re.MULTILINE))
-        done = subprocess.run(["bash", "-ec", script.replace(INSTALLED, self.share).replace(
+        done = subprocess.run(["bash", "-ec", script.replace(INSTALLED, self.link).replace(
             "PREFIX", str(self.prefix))], cwd=self.folder,
                               env=self.variables, stdin=subprocess.DEVNULL, capture_output=True,
                               text=True, timeout=100, check=False)
