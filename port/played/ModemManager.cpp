@@ -7,13 +7,9 @@
 namespace port::played {
 namespace {
 
-<<<<<<< HEAD
-using devicefile::Edit;
-=======
 const std::string VERSION = versionText(MM_MAJOR_VERSION, MM_MINOR_VERSION, MM_MICRO_VERSION);
 
-using devicefile::Change;
->>>>>>> origin/main
+using devicefile::Edit;
 
 constexpr char ERROR[] = "org.freedesktop.ModemManager1.Error.";
 constexpr char FIRMWARE[] = MM_DBUS_INTERFACE_MODEM_FIRMWARE;

@@ -72,16 +72,12 @@ Variant texts(const std::vector<std::string>& all, const char* type)
     return share(g_variant_ref_sink(g_variant_builder_end(&builder)));
 }
 
-<<<<<<< HEAD
-Edit set(const std::string& path, const char* value)
-=======
 std::string versionText(int major, int minor, int micro)
 {
     return std::to_string(major) + '.' + std::to_string(minor) + '.' + std::to_string(micro);
 }
 
-Change set(const std::string& path, const char* value)
->>>>>>> origin/main
+Edit set(const std::string& path, const char* value)
 {
     return {path, std::string(value)};
 }
