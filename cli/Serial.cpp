@@ -20,7 +20,8 @@ std::string faultOf(const char* call, const char* error)
     const auto text = port::devicefile::readDeviceText(file);
     const auto device = text ? port::devicefile::parseDevice(text.value(), file) : text.error();
     const auto* const fault = device ? device.value().section("fault").find(call) : nullptr;
-    return fault != nullptr ? " (" + fault->source + ": " + call + " fails with " + error + ")" : "";
+    return fault != nullptr ? " (" + fault->source + ": " + call + " fails with " + error + ")"
+                            : "";
 }
 
 // What the daemon answers in place of a serial number; empty when it answers nothing.
