@@ -6,109 +6,71 @@
 #include <cstdlib>
 #include <string>
 
-#include <CoreSystem.h>
+#include "support/Questions.h"
 
 namespace {
-
-CoreSystem& library()
-{
-    return *CoreSystem::GetInstance();
-}
 
 // Some questions keep a copy for good, as they should: few enough calls that memory stays small.
 constexpr std::size_t LEAKING_CALLS = 50000;
 
-template <class Call>
-void addQuestion(const char* name, Call call)
-{
-    bench::addCase(
-        std::string(name) + "/-", [call](std::size_t) { call(); }, LEAKING_CALLS);
-}
+// Adds each question as a case.
+struct Rows {
+    template <class Ask>
+    static void add(const std::string& name, Ask ask)
+    {
+        if (name != "GetDeviceUniqueID") // asks the bus, not the platform
+            bench::addCase(
+                name + "/-", [ask](std::size_t) { ask(); }, LEAKING_CALLS);
+    }
 
-// A question whose answer is a value.
-template <class Result, class... Parameters, class... Arguments>
-void addPlain(const char* name, Result (CoreSystem::*method)(Parameters...), Arguments... arguments)
-{
-    addQuestion(name, [=] { benchmark::DoNotOptimize((library().*method)(arguments...)); });
-}
+    static void release(char* text)
+    {
+        std::free(text);
+    }
+    template <class Answer>
+    static void release(const Answer&)
+    {
+    }
 
-// A question whose answer is a text that the caller frees.
-void addText(const char* name, int (CoreSystem::*method)(char**))
-{
-    addQuestion(name, [=] {
-        char* answer = nullptr;
-        (library().*method)(&answer);
-        benchmark::DoNotOptimize(answer);
-        std::free(answer);
-    });
-}
+    template <class Plain>
+    static void plain(const char* name, Plain ask)
+    {
+        add(name, [ask] {
+            auto answer = ask();
+            benchmark::DoNotOptimize(answer);
+            release(answer);
+        });
+    }
 
-char modem[] = "modem0";
+    template <class Text>
+    static void text(const char* name, Text ask)
+    {
+        add(name, [ask] {
+            char* answer = nullptr;
+            ask(&answer);
+            benchmark::DoNotOptimize(answer);
+            std::free(answer);
+        });
+    }
 
-// A question to a modem by its name.
-template <class Answer>
-void addOfModem(const char* name, bool (CoreSystem::*method)(char*, Answer*))
-{
-    addQuestion(name, [=] {
-        Answer answer = {};
-        benchmark::DoNotOptimize((library().*method)(modem, &answer));
-    });
-}
-
-void addSimQuestions()
-{
-    addPlain("IsSimAvailable", &CoreSystem::IsSimAvailable);
-    addPlain("IsSimExist", &CoreSystem::IsSimExist);
-    addText("GetMCCFromSim", &CoreSystem::GetMCCFromSim);
-    addText("GetMNCFromSim", &CoreSystem::GetMNCFromSim);
-    addText("GetPhoneNumberFromSim", &CoreSystem::GetPhoneNumberFromSim);
-    addText("GetIMEI", &CoreSystem::GetIMEI);
-    addQuestion("GetRoamingStatus", [] {
-        bool roaming = false;
-        benchmark::DoNotOptimize(library().GetRoamingStatus(0, &roaming));
-    });
-    addQuestion("InitHandleList and DeinitHandleList", [] {
-        telephony_handle_list_s list = {0, nullptr};
-        benchmark::DoNotOptimize(library().InitHandleList(&list));
-        benchmark::DoNotOptimize(library().DeinitHandleList(&list));
-    });
-    addPlain("GetCpNameList", &CoreSystem::GetCpNameList);
-    addQuestion("IsAvaliableState", [] {
-        TelSimCardStatus_t status = TAPI_SIM_STATUS_UNKNOWN;
-        benchmark::DoNotOptimize(library().IsAvaliableState(0, &status));
-    });
-    addOfModem("GetMainSimSubscription", &CoreSystem::GetMainSimSubscription);
-    addOfModem("GetDefaultDataSubscription", &CoreSystem::GetDefaultDataSubscription);
-    addOfModem("GetCallPreferredSubscription", &CoreSystem::GetCallPreferredSubscription);
-    addOfModem("CheckSmsEnabled", &CoreSystem::CheckSmsEnabled);
-    addQuestion("GetSimInfo", [] {
-        std::string mcc, mnc, msin;
-        benchmark::DoNotOptimize(library().GetSimInfo(modem, &mcc, &mnc, &msin));
-    });
-}
-
-void addOtherQuestions()
-{
-    addPlain("IsFlightMode", &CoreSystem::IsFlightMode);
-    addPlain("IsDataRoamingEnabled", &CoreSystem::IsDataRoamingEnabled);
-    addPlain("IsMobileData", &CoreSystem::IsMobileData);
-    addQuestion("GetCSC", [] { std::free(library().GetCSC()); });
-    addQuestion("GetPackageVersion", [] {
-        char* version = nullptr;
-        benchmark::DoNotOptimize(library().GetPackageVersion("a-package", &version));
-        std::free(version);
-    });
-    addPlain("IsSystemMemoryAvailable", &CoreSystem::IsSystemMemoryAvailable, 500.0);
-    addPlain("IsNetworkConnected", &CoreSystem::IsNetworkConnected, true, true);
-    addText("GetDeviceName", &CoreSystem::GetDeviceName);
-    addText("GetTizenIdN", &CoreSystem::GetTizenIdN);
-}
+    template <class Answer, class OfSlot>
+    static void ofSlot(const char* name, const Answer&, OfSlot ask)
+    {
+        add(name, [ask] {
+            static char modem[] = "modem0";
+            Answer answer = {};
+            ask({0, modem}, &answer);
+            benchmark::DoNotOptimize(answer);
+            release(answer);
+        });
+    }
+};
 
 } // namespace
 
 int main(int argc, char** argv)
 {
-    addSimQuestions();
-    addOtherQuestions();
+    Rows rows;
+    questions::listTo(rows);
     return bench::runCases(argc, argv);
 }

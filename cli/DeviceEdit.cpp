@@ -13,7 +13,7 @@
 namespace cli {
 namespace {
 
-using port::devicefile::Change;
+using port::devicefile::Edit;
 
 const char* const PATHS = "A path is settings.flight_mode, slot[0].sim, fault.telephony_init or "
                           "packages.org.example.app.";
@@ -37,7 +37,7 @@ ExitCode runGet(const std::string& path)
 }
 
 // PATH=VALUE; a path may hold a "=" in quotes.
-Change assignmentOf(const std::string& argument)
+Edit assignmentOf(const std::string& argument)
 {
     for (std::size_t at = 0; (at = argument.find('=', at)) != std::string::npos; ++at)
         if (const std::string path = argument.substr(0, at); port::devicefile::parsePath(path))
@@ -45,14 +45,14 @@ Change assignmentOf(const std::string& argument)
     throw UsageError(quoted(argument) + " is no PATH=VALUE. " + PATHS);
 }
 
-Change removalOf(const std::string& path)
+Edit removalOf(const std::string& path)
 {
     if (!port::devicefile::parsePath(path))
         throw UsageError(quoted(path) + " is no path. " + PATHS);
     return {path, std::nullopt};
 }
 
-ExitCode runChange(const std::vector<Change>& changes)
+ExitCode runChange(const std::vector<Edit>& changes)
 {
     const port::devicefile::FoundDevice device = port::devicefile::findDevice(chosenDevice());
     if (device.isShipped)
@@ -77,7 +77,7 @@ void addGet(const Command& device, Invocation& invocation)
 
 // A command that changes values, each of which an argument tells.
 void addChange(const Command& device, Invocation& invocation, const char* name,
-               const char* argument, const char* meaning, Change (*changeOf)(const std::string&),
+               const char* argument, const char* meaning, Edit (*changeOf)(const std::string&),
                const char* description, const char* remarks)
 {
     const Command command = device.add(name, description);
@@ -86,7 +86,7 @@ void addChange(const Command& device, Invocation& invocation, const char* name,
     command.setFooter(std::string(remarks) + PATHS +
                       "\nAll changes are made at once, or none. Exit code 1: none was.");
     command.onUse([&invocation, arguments, changeOf] {
-        std::vector<Change> changes;
+        std::vector<Edit> changes;
         for (const std::string& text : *arguments)
             changes.push_back(changeOf(text));
         invocation.command = [changes] { return runChange(changes); };

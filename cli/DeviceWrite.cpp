@@ -43,8 +43,7 @@ void cli::writeDevice(const std::string& path, const std::string& text, bool rep
     throwUnless(problem, problem.empty());
 }
 
-void cli::changeDevice(const std::string& path,
-                       const std::vector<port::devicefile::Change>& changes)
+void cli::changeDevice(const std::string& path, const std::vector<port::devicefile::Edit>& changes)
 {
     const std::string problem =
         port::devicefile::changeFile(path, port::devicefile::SIZE_LIMIT, [&](std::string& content) {

@@ -15,7 +15,7 @@ namespace cli {
 void writeDevice(const std::string& path, const std::string& text, bool replace);
 
 /// Some values of a file, all at once.
-void changeDevice(const std::string& path, const std::vector<port::devicefile::Change>& changes);
+void changeDevice(const std::string& path, const std::vector<port::devicefile::Edit>& changes);
 
 } // namespace cli
 

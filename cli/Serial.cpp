@@ -11,8 +11,8 @@ namespace {
 
 constexpr int MILLISECONDS = 1000;
 
-// The line of a fault in the device file that this process was started with; empty without one.
-std::string lineOfFault(const char* call)
+// The fault of a call, in the device file that this process was started with; empty without one.
+std::string faultOf(const char* call, const char* error)
 {
     const std::string file = coresystem_port::deviceFile();
     if (file.empty())
@@ -20,7 +20,8 @@ std::string lineOfFault(const char* call)
     const auto text = port::devicefile::readDeviceText(file);
     const auto device = text ? port::devicefile::parseDevice(text.value(), file) : text.error();
     const auto* const fault = device ? device.value().section("fault").find(call) : nullptr;
-    return fault != nullptr ? fault->source + ": " + call : "";
+    return fault != nullptr ? " (" + fault->source + ": " + call + " fails with " + error + ")"
+                            : "";
 }
 
 // What the daemon answers in place of a serial number; empty when it answers nothing.
@@ -50,16 +51,13 @@ std::string answerOfDaemon()
 
 std::string whyNoSerial(int code)
 {
-    if (code == 1) {
-        const std::string fault = lineOfFault("g_bus_get_sync");
-        return "no connection to the system bus" +
-               (fault.empty() ? "" : " (" + fault + " fails with no_bus)");
-    }
+    if (code == 1)
+        return "no connection to the system bus" + faultOf("g_bus_get_sync", "no_bus");
     if (code == 3)
         return "the system bus does not answer in time";
     const std::string answer = answerOfDaemon();
     return "the device daemon does not answer with a serial number" +
-           (answer.empty() ? "" : ": " + answer);
+           (answer.empty() ? faultOf("GetSerial", "not_a_string") : ": " + answer);
 }
 
 } // namespace cli

@@ -34,7 +34,7 @@ install(FILES ${PROJECT_SOURCE_DIR}/docs/device-file.schema.json
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/docs/schema DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem)
 
 # Simulated devices that --device and CORESYSTEM_DEVICE know by name.
-install(DIRECTORY ${PROJECT_SOURCE_DIR}/devices DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/samples/ DESTINATION ${CMAKE_INSTALL_DATADIR}/coresystem/devices
         FILES_MATCHING PATTERN "*.toml")
 
 # What plays the other services of a machine for `coresystem device run`.

@@ -20,14 +20,14 @@ namespace port::devicefile {
 
 // What a call is told to do in place of what it does.
 struct Fault {
-    std::string error;      // its name in the file; empty: none, the call is late only
-    std::int64_t value = 0; // the error's number, or one that stands for a word of the schema
+    std::string error; // its name in the file; empty: none, the call is late only
+    Meaning meaning;   // the error's
     std::int64_t delayMs = 0;
     std::int64_t call = 0; // counted from 1; 0: every one
 };
 
 struct Value {
-    std::variant<std::string, bool, std::int64_t, Fault> content;
+    std::variant<std::string, bool, Meaning, Fault> content;
     std::string source; // FILE:LINE
 };
 
@@ -79,10 +79,10 @@ public:
                       std::is_same_v<T, Fault>) {
             return Sourced<T>{std::get<T>(value->content), value->source};
         } else {
-            const auto number = std::get<std::int64_t>(value->content);
-            if (number == NOT_SUPPORTED)
+            const auto meaning = std::get<Meaning>(value->content);
+            if (meaning == Meaning::Kind::NotSupported)
                 return notSupported(value->source + ": this device has no " + key);
-            return Sourced<T>{static_cast<T>(number), value->source};
+            return Sourced<T>{static_cast<T>(meaning.number), value->source};
         }
     }
 
@@ -96,7 +96,7 @@ private:
 struct Step {
     std::int64_t afterMs = 0;
     std::string note;
-    std::vector<Change> changes;
+    std::vector<Edit> changes;
     std::string source; // FILE:LINE
 };
 

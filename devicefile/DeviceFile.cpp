@@ -147,21 +147,21 @@ std::string expected(const Type& type)
            (type.most < type.least ? "" : ", or a whole number " + rangeOf(type));
 }
 
-std::optional<std::int64_t> valueOf(const Names& names, std::string_view text)
+std::optional<Meaning> meaningOf(const Names& names, std::string_view text)
 {
     for (const Name& row : names)
         if (row.name == text)
-            return row.value;
+            return row.meaning;
     return std::nullopt;
 }
 
 // A fault that is written as its error alone.
 std::optional<Content> readFault(const Type& type, const std::string& text)
 {
-    const auto value = valueOf(type.names, text);
-    if (!value && !(type.kind == Type::Kind::BusFault && isBusErrorName(text)))
+    const auto meaning = meaningOf(type.names, text);
+    if (!meaning && !(type.kind == Type::Kind::BusFault && isBusErrorName(text)))
         return std::nullopt;
-    return Fault{text, value.value_or(BUS_ERROR)};
+    return Fault{text, meaning.value_or(Meaning::Kind::BusError)};
 }
 
 std::optional<Content> readText(const Type& type, const std::string& text)
@@ -176,7 +176,7 @@ std::optional<Content> readText(const Type& type, const std::string& text)
             return std::string();
         return isNumber(text) ? std::optional<Content>(text) : std::nullopt;
     case Type::Kind::Name:
-        return valueOf(type.names, text);
+        return meaningOf(type.names, text);
     case Type::Kind::Fault:
     case Type::Kind::BusFault:
         return readFault(type, text);
@@ -517,9 +517,9 @@ private:
             return;
         if (const auto* const read = std::get_if<Fault>(&*content)) {
             fault.error = read->error;
-            fault.value = read->value;
+            fault.meaning = read->meaning;
         } else {
-            (key == "call" ? fault.call : fault.delayMs) = std::get<std::int64_t>(*content);
+            (key == "call" ? fault.call : fault.delayMs) = std::get<Meaning>(*content).number;
         }
     }
 

@@ -166,9 +166,9 @@ std::string shownPath(const DevicePath& path)
 using Text = Result<std::string>;
 
 // One change in a text, with all that is known of it.
-class Edit {
+class Editing {
 public:
-    Edit(const std::string& text, DevicePath path, std::optional<std::string> value)
+    Editing(const std::string& text, DevicePath path, std::optional<std::string> value)
         : document_(text), path_(std::move(path)), value_(std::move(value)),
           walk_(follow(document_.root(), path_))
     {
@@ -310,27 +310,27 @@ std::string newMistake(const Mistakes& before, const Mistakes& after)
 Text setValue(const std::string& text, const std::string& file, const DevicePath& path,
               const std::string& value)
 {
-    const std::string old(Edit(text, path, value).old());
+    const std::string old(Editing(text, path, value).old());
     const std::string inQuotes = inQuotesLike(old, value);
     if (parseToml("v=" + inQuotes)["v"].value<std::string>() != value)
         return notAvailable("the value is no UTF-8");
-    Text best = Edit(text, path, inQuotes).make();
+    Text best = Editing(text, path, inQuotes).make();
     if (!best || !isValue(value))
         return best;
-    Text plain = Edit(text, path, value).make();
+    Text plain = Editing(text, path, value).make();
     const bool isBetter =
         plain && mistakesOf(plain.value(), file).size() < mistakesOf(best.value(), file).size();
     return isBetter ? plain : best;
 }
 
-Text applied(const std::string& text, const std::string& file, const Change& change)
+Text applied(const std::string& text, const std::string& file, const Edit& change)
 {
     const Result<DevicePath> path = parsePath(change.path);
     if (!path)
         return path.error();
     try {
         return change.value ? setValue(text, file, path.value(), *change.value)
-                            : Edit(text, path.value(), {}).make();
+                            : Editing(text, path.value(), {}).make();
     } catch (const TomlError& error) { // of a value that is no UTF-8, say
         return notAvailable(error.what());
     }
@@ -355,7 +355,7 @@ bool isKnown(const DevicePath& path)
     return section != nullptr && path.size() > key && findKey(*section, path[key]) != nullptr;
 }
 
-Error cannot(const Change& change, const std::string& why)
+Error cannot(const Edit& change, const std::string& why)
 {
     return notAvailable(change.path + " cannot be " + (change.value ? "set" : "removed") + ": " +
                         why);
@@ -468,12 +468,12 @@ Result<std::string> getValue(const std::string& text, const std::string& file,
 }
 
 Result<std::string> changeText(const std::string& text, const std::string& file,
-                               const std::vector<Change>& changes)
+                               const std::vector<Edit>& changes)
 {
     if (const std::string why = refusal(text, file); !why.empty())
         return notAvailable(why);
     std::string changed = text;
-    for (const Change& change : changes) {
+    for (const Edit& change : changes) {
         const Text next = applied(changed, file, change);
         if (!next)
             return cannot(change, next.error().reason);

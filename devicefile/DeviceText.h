@@ -39,7 +39,7 @@ Result<std::vector<Entry>> listEntries(const std::string& text, const std::strin
 Result<std::string> getValue(const std::string& text, const std::string& file,
                              const std::string& path);
 
-struct Change {
+struct Edit {
     std::string path;
     std::optional<std::string> value; // as getValue() tells it; none: the key is removed
 };
@@ -48,7 +48,7 @@ struct Change {
 /// its key wants: a text in quotes, a switch, a number; a fault may also be a table in braces. A
 /// file with mistakes may be changed when it is TOML: a change must not add one.
 Result<std::string> changeText(const std::string& text, const std::string& file,
-                               const std::vector<Change>& changes);
+                               const std::vector<Edit>& changes);
 
 } // namespace port::devicefile
 

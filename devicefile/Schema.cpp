@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <limits>
 
 #include "../port/backend/Network.h"
 #include "../port/backend/Telephony.h"
@@ -83,14 +84,14 @@ constexpr Name CELLULAR_STATES[] = {
     name("call_only_available", CellularState::CallOnlyAvailable),
     name("available", CellularState::Available),
     name("connected", CellularState::Connected),
-    {"not_supported", NOT_SUPPORTED},
+    {"not_supported", Meaning::Kind::NotSupported},
 };
 
 constexpr Name LINK_STATES[] = {
     name("deactivated", LinkState::Deactivated),
     name("disconnected", LinkState::Disconnected),
     name("connected", LinkState::Connected),
-    {"not_supported", NOT_SUPPORTED},
+    {"not_supported", Meaning::Kind::NotSupported},
 };
 
 constexpr Name WIFI_CONNECTIONS[] = {
@@ -99,12 +100,12 @@ constexpr Name WIFI_CONNECTIONS[] = {
     name("association", WifiConnection::Association),
     name("configuration", WifiConnection::Configuration),
     name("connected", WifiConnection::Connected),
-    {"not_supported", NOT_SUPPORTED},
+    {"not_supported", Meaning::Kind::NotSupported},
 };
 
 // A call that hands out a pointer or a list may also succeed without.
-constexpr Name OR_NULL[] = {{"null", NOTHING}};
-constexpr Name OR_EMPTY[] = {{"empty", NOTHING}};
+constexpr Name OR_NULL[] = {{"null", Meaning::Kind::Nothing}};
+constexpr Name OR_EMPTY[] = {{"empty", Meaning::Kind::Nothing}};
 
 constexpr auto PACKAGE_MANAGER_ERRORS_OR_NULL = joined(PACKAGE_MANAGER_ERRORS, OR_NULL);
 constexpr auto SYSTEM_INFO_ERRORS_OR_NULL = joined(SYSTEM_INFO_ERRORS, OR_NULL);
@@ -113,7 +114,7 @@ constexpr auto TAPI_SIM_ERRORS = joined(TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS);
 constexpr auto TELEPHONY_ERRORS_OR_EMPTY = joined(TELEPHONY_ERRORS, OR_EMPTY);
 constexpr auto TELEPHONY_ERRORS_OR_NULL = joined(TELEPHONY_ERRORS, OR_NULL);
 
-constexpr Name SERIAL_FAULTS[] = {{"not_a_string", NOT_A_STRING}};
+constexpr Name SERIAL_FAULTS[] = {{"not_a_string", Meaning::Kind::NotAString}};
 constexpr Name SERVICE_FAULTS[] = {
     name("absent", ServiceFault::Absent),
     name("silent", ServiceFault::Silent),

@@ -4,20 +4,32 @@
 #define DEVICEFILE_SCHEMA_H
 
 #include <cstdint>
-#include <limits>
 #include <string>
 #include <string_view>
 #include <vector>
 
 namespace port::devicefile {
 
-// The value of the name "not_supported": this device has no such thing.
-constexpr std::int64_t NOT_SUPPORTED = std::numeric_limits<std::int64_t>::min();
+// What a number or a name in quotes stands for.
+struct Meaning {
+    enum class Kind {
+        Number,       // `number`, which may be an enumerator's or an error's
+        NotSupported, // this device has no such thing
+        Nothing,      // a call succeeds with null or an empty list
+        NotAString,   // a reply over the bus has another type
+        BusError,     // an error of the bus, which has a name only
+    };
+    Kind kind;
+    std::int64_t number;
 
-// The values of a fault's error that is no number of an interface.
-constexpr std::int64_t NOTHING = std::numeric_limits<std::int64_t>::max(); // "null", "empty"
-constexpr std::int64_t NOT_A_STRING = NOTHING - 1;
-constexpr std::int64_t BUS_ERROR = NOTHING - 2; // has a name only
+    constexpr Meaning(std::int64_t itself = 0) : kind(Kind::Number), number(itself) {}
+    constexpr Meaning(Kind other) : kind(other), number(0) {}
+
+    constexpr bool operator==(const Meaning& other) const
+    {
+        return kind == other.kind && number == other.number;
+    }
+};
 
 // What is wrong with the bus of a program that is run on a device.
 enum class BusFault { NoBus };
@@ -25,10 +37,9 @@ enum class BusFault { NoBus };
 // How a service misbehaves.
 enum class ServiceFault { None, Absent, Silent, Slow, Crashing };
 
-// A name in quotes and the number that it is kept as, which is an enumerator's.
 struct Name {
-    std::string_view name;
-    std::int64_t value;
+    std::string_view name; // in quotes
+    Meaning meaning;
 };
 
 struct Names {

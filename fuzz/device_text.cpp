@@ -89,7 +89,7 @@ void checkSpan(const std::string& before, const std::string& after, std::size_t 
     require(sameAtTheBeginning(before, after) >= begin, "lines before the value stay", after);
 }
 
-void checkChange(const std::string& before, const std::string& after, const Change& change)
+void checkChange(const std::string& before, const std::string& after, const Edit& change)
 {
     const DevicePath path = parsePath(change.path).value();
     const auto was = getValue(before, FILE_NAME, change.path);
@@ -124,7 +124,7 @@ std::string takeLine(std::string& text)
 int LLVMFuzzerTestOneInput(const unsigned char* data, std::size_t size)
 {
     std::string text(reinterpret_cast<const char*>(data), size);
-    Change change{takeLine(text), std::nullopt};
+    Edit change{takeLine(text), std::nullopt};
     const std::string value = takeLine(text);
     if (value.rfind('=', 0) == 0)
         change.value = value.substr(1);

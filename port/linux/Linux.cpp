@@ -71,23 +71,26 @@ public:
     std::vector<Service> findServices() override
     {
         std::vector<Service> found = findOnBus({
-            {HOSTNAME1, "device name, hardware model",
+            {HOSTNAME1, "device name, model name",
              "the device name is the kernel's host name, the model DMI's or the device tree's"},
-            {LOCALE1, "display language", "the language is that of LC_ALL, LC_MESSAGES or LANG"},
+            {LOCALE1, "language", "the language is that of LC_ALL, LC_MESSAGES or LANG"},
             {MODEM_MANAGER, "SIM cards, IMEI, roaming, the cellular network", "no telephony"},
-            {NETWORK_MANAGER, "Wi-Fi, flight mode, cellular data, the SIM card for data",
+            {NETWORK_MANAGER,
+             "Wi-Fi, flight mode, mobile data, packet data, data roaming, the SIM card for data",
              "Wi-Fi and flight mode are the kernel's, nothing is known of cellular data"},
             {BLUEZ, "Bluetooth", "no Bluetooth"},
         });
         const std::vector<Service> onDisk = {
-            file(OS_RELEASE, "platform name and version", "no platform name and version"),
-            file(MACHINE_ID, "platform identifier", "no platform identifier"),
-            file(HARDWARE_MODEL, "hardware model", "the model is hostname1's only"),
+            file(OS_RELEASE, "platform name, platform version", "no platform name and version"),
+            file(MACHINE_ID, "platform id", "no platform id"),
+            file(HARDWARE_MODEL, "model name", "the model is hostname1's only"),
             probe(*SERIAL_NUMBER.begin(), deviceInfo_.serial(), "device serial",
                   "no device serial"),
             probe(DPKG_STATUS, packages_.version(""), "installed packages", "no package is known"),
         };
         found.insert(found.end(), onDisk.begin(), onDisk.end());
+        found.push_back(
+            probe("vconf.ini", configuration_.text(SALES_CODE), "sales code", "no sales code"));
         found.push_back(probe("GSettings", settings_.fontSize(), "font size", "no font size"));
         return found;
     }

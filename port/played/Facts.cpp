@@ -57,8 +57,8 @@ Behaviour behaviourOf(const Section& services, const char* name)
     if (!fault)
         return {};
     // Late without a name is slow.
-    const auto kind =
-        fault->error.empty() ? Behaviour::Kind::Slow : static_cast<Behaviour::Kind>(fault->value);
+    const auto kind = fault->error.empty() ? Behaviour::Kind::Slow
+                                           : static_cast<Behaviour::Kind>(fault->meaning.number);
     return {kind, static_cast<int>(fault->delayMs), static_cast<int>(fault->call)};
 }
 

@@ -9,7 +9,7 @@ namespace {
 
 const std::string VERSION = versionText(MM_MAJOR_VERSION, MM_MINOR_VERSION, MM_MICRO_VERSION);
 
-using devicefile::Change;
+using devicefile::Edit;
 
 constexpr char ERROR[] = "org.freedesktop.ModemManager1.Error.";
 constexpr char FIRMWARE[] = MM_DBUS_INTERFACE_MODEM_FIRMWARE;
@@ -333,7 +333,7 @@ Outcome enable(const Request& request)
                           (row.state == MM_MODEM_STATE_LOCKED ? "locked" : "not ready"));
     if ((row.state > MM_MODEM_STATE_DISABLED) == (on != FALSE))
         return {};
-    std::vector<Change> changes = {
+    std::vector<Edit> changes = {
         set(slotKey(index, "service"), on != FALSE ? "in_service" : "out_of_service"),
         on != FALSE ? unset(slotKey(index, "enabled")) : set(slotKey(index, "enabled"), "false")};
     if (facts.isCellularOn() && !isServedElsewhere(facts, index))
@@ -361,7 +361,7 @@ Outcome listBearers(const Request& request)
 }
 
 // The card is told of in one way: the newer word takes the place of the older interface's.
-std::vector<Change> cardBecomes(std::size_t slot, const char* card)
+std::vector<Edit> cardBecomes(std::size_t slot, const char* card)
 {
     return {set(slotKey(slot, "sim"), card), unset(slotKey(slot, "init_status"))};
 }
@@ -369,7 +369,7 @@ std::vector<Change> cardBecomes(std::size_t slot, const char* card)
 // One wrong code: `retries` goes down, and at its end the card is in another state.
 Outcome countDown(std::size_t slot, const char* key, int retries, const char* atEnd)
 {
-    std::vector<Change> changes = {set(slotKey(slot, key), std::to_string(retries - 1).c_str())};
+    std::vector<Edit> changes = {set(slotKey(slot, key), std::to_string(retries - 1).c_str())};
     if (retries <= 1)
         changes = cardBecomes(slot, atEnd);
     Outcome outcome = Outcome::refuse(std::string(ERROR) + "MobileEquipment.IncorrectPassword",
@@ -378,9 +378,9 @@ Outcome countDown(std::size_t slot, const char* key, int retries, const char* at
     return outcome;
 }
 
-Outcome unlock(std::size_t slot, std::vector<Change> more)
+Outcome unlock(std::size_t slot, std::vector<Edit> more)
 {
-    std::vector<Change> changes = cardBecomes(slot, "available");
+    std::vector<Edit> changes = cardBecomes(slot, "available");
     changes.push_back(unset(slotKey(slot, "pin_retries")));
     changes.insert(changes.end(), more.begin(), more.end());
     return Outcome::change(std::move(changes));

@@ -459,7 +459,7 @@ Outcome connectionByUuid(const Request& request)
                            "No connection with the UUID was found.");
 }
 
-std::vector<devicefile::Change> ended(const Kind& kind)
+std::vector<devicefile::Edit> ended(const Kind& kind)
 {
     if (&kind == &WIFI)
         return {set("network.wifi", "disconnected"), unset("network.wifi_connection")};

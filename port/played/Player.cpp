@@ -98,12 +98,12 @@ gboolean Player::onChanged(gpointer self)
 }
 
 // As `device set` does it; a device file that may not be written refuses.
-std::string Player::change(const std::vector<devicefile::Change>& changes)
+std::string Player::change(const std::vector<devicefile::Edit>& changes)
 {
     std::string problem =
         devicefile::changeFile(file_.path(), devicefile::SIZE_LIMIT, [&](std::string& content) {
             std::string text = content;
-            for (const devicefile::Change& change : changes) {
+            for (const devicefile::Edit& change : changes) {
                 if (!change.value && !devicefile::getValue(text, file_.path(), change.path))
                     continue; // what is not there need not go
                 const auto changed = devicefile::changeText(text, file_.path(), {change});

@@ -37,7 +37,7 @@ private:
         ModemNumbers modems;
         Scene scene{facts, modems};
     };
-    std::string change(const std::vector<devicefile::Change>& changes);
+    std::string change(const std::vector<devicefile::Edit>& changes);
     void show(std::shared_ptr<const devicefile::Device> device);
     static gboolean onChanged(gpointer self);
 

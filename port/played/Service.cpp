@@ -6,7 +6,7 @@
 
 namespace port::played {
 
-using devicefile::Change;
+using devicefile::Edit;
 
 const Face* Object::find(const std::string& interface) const
 {
@@ -77,12 +77,12 @@ std::string versionText(int major, int minor, int micro)
     return std::to_string(major) + '.' + std::to_string(minor) + '.' + std::to_string(micro);
 }
 
-Change set(const std::string& path, const char* value)
+Edit set(const std::string& path, const char* value)
 {
     return {path, std::string(value)};
 }
 
-Change unset(const std::string& path)
+Edit unset(const std::string& path)
 {
     return {path, std::nullopt};
 }
@@ -93,10 +93,10 @@ std::string slotKey(std::size_t slot, const char* key)
 }
 
 // One radio that is switched on in flight mode ends it; the others stay off, by their own keys.
-std::vector<Change> wifiSwitch(const Facts& facts, bool on)
+std::vector<Edit> wifiSwitch(const Facts& facts, bool on)
 {
-    std::vector<Change> changes = {set("network.wifi", on ? "disconnected" : "deactivated"),
-                                   unset("network.wifi_connection")};
+    std::vector<Edit> changes = {set("network.wifi", on ? "disconnected" : "deactivated"),
+                                 unset("network.wifi_connection")};
     if (on && facts.isFlying()) {
         changes.push_back(set("settings.flight_mode", "false"));
         if (facts.cellular)
@@ -107,9 +107,9 @@ std::vector<Change> wifiSwitch(const Facts& facts, bool on)
     return changes;
 }
 
-std::vector<Change> cellularSwitch(const Facts& facts, bool on)
+std::vector<Edit> cellularSwitch(const Facts& facts, bool on)
 {
-    std::vector<Change> changes = {set("network.cellular", on ? "available" : "flight_mode")};
+    std::vector<Edit> changes = {set("network.cellular", on ? "available" : "flight_mode")};
     for (std::size_t i = 0; i < facts.slots.size(); ++i)
         if (facts.slots[i].isReady())
             changes.push_back(set(slotKey(i, "service"), on ? "in_service" : "out_of_service"));

@@ -65,14 +65,14 @@ struct Request {
 struct Outcome {
     std::string error; // the error's name; empty: it is done
     std::string text;
-    std::vector<devicefile::Change> changes; // of the device file
-    Variant reply;                           // a tuple; null: empty
+    std::vector<devicefile::Edit> changes; // of the device file
+    Variant reply;                         // a tuple; null: empty
 
     static Outcome refuse(std::string name, std::string text)
     {
         return {std::move(name), std::move(text), {}, nullptr};
     }
-    static Outcome change(std::vector<devicefile::Change> changes)
+    static Outcome change(std::vector<devicefile::Edit> changes)
     {
         return {"", "", std::move(changes), nullptr};
     }
@@ -140,12 +140,12 @@ Variant value(const char* format, ...);
 Variant texts(const std::vector<std::string>& all, const char* type = "as");
 /// "1.42.4": that of the headers, since nmcli warns of a service of another version than its own.
 std::string versionText(int major, int minor, int micro);
-devicefile::Change set(const std::string& path, const char* value);
-devicefile::Change unset(const std::string& path);
+devicefile::Edit set(const std::string& path, const char* value);
+devicefile::Edit unset(const std::string& path);
 std::string slotKey(std::size_t slot, const char* key);
 /// The changes that switch the cellular radio.
-std::vector<devicefile::Change> cellularSwitch(const Facts& facts, bool on);
-std::vector<devicefile::Change> wifiSwitch(const Facts& facts, bool on);
+std::vector<devicefile::Edit> cellularSwitch(const Facts& facts, bool on);
+std::vector<devicefile::Edit> wifiSwitch(const Facts& facts, bool on);
 
 } // namespace port::played
 

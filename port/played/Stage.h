@@ -16,7 +16,7 @@
 namespace port::played {
 
 /// Makes changes in the device file and lets the stages show them; tells why not.
-using Director = std::function<std::string(const std::vector<devicefile::Change>& changes)>;
+using Director = std::function<std::string(const std::vector<devicefile::Edit>& changes)>;
 
 /// Used on the thread whose default context it was made in, and so is the director.
 class Stage {

@@ -19,8 +19,8 @@ using coresystem_port::CaptureOptions;
 using devicefile::findKey;
 using devicefile::findSection;
 using devicefile::Form;
+using devicefile::Meaning;
 using devicefile::Name;
-using devicefile::NOT_SUPPORTED;
 using devicefile::Type;
 
 std::string validUtf8(const std::string& text)
@@ -109,18 +109,19 @@ private:
 
     void addError(const std::string& key, const Error& error)
     {
-        if (error.kind == Error::Kind::NotSupported && findName(key, NOT_SUPPORTED) != nullptr)
+        if (error.kind == Error::Kind::NotSupported &&
+            findName(key, Meaning::Kind::NotSupported) != nullptr)
             put(key, "\"not_supported\"", error.reason);
         else
             putAbsent(key, error.reason);
     }
 
     // The last of several.
-    const Name* findName(const std::string& key, std::int64_t value) const
+    const Name* findName(const std::string& key, Meaning meaning) const
     {
         const Name* found = nullptr;
         for (const Name& row : findKey(*findSection(section_), key)->names)
-            if (row.value == value)
+            if (row.meaning == meaning)
                 found = &row;
         return found;
     }
@@ -248,7 +249,7 @@ private:
     static bool isAnyOf(const char* key, CardStatus status)
     {
         for (const Name& row : findKey(*findSection("slot"), key)->names)
-            if (row.value == static_cast<std::int64_t>(status))
+            if (row.meaning == static_cast<std::int64_t>(status))
                 return true;
         return false;
     }

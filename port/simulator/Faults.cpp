@@ -4,10 +4,8 @@
 namespace port::simulator {
 namespace {
 
-using devicefile::BUS_ERROR;
 using devicefile::Fault;
-using devicefile::NOT_A_STRING;
-using devicefile::NOTHING;
+using devicefile::Meaning;
 using devicefile::Value;
 
 bool isSame(const Fault& one, const Fault& other)
@@ -15,14 +13,14 @@ bool isSame(const Fault& one, const Fault& other)
     return one.error == other.error && one.delayMs == other.delayMs && one.call == other.call;
 }
 
-CallFault::Answer answerOf(std::int64_t value)
+CallFault::Answer answerOf(const Meaning& meaning)
 {
-    switch (value) {
-    case NOTHING:
+    switch (meaning.kind) {
+    case Meaning::Kind::Nothing:
         return CallFault::Answer::Nothing;
-    case NOT_A_STRING:
+    case Meaning::Kind::NotAString:
         return CallFault::Answer::NotAString;
-    case BUS_ERROR:
+    case Meaning::Kind::BusError:
         return CallFault::Answer::BusError;
     default:
         return CallFault::Answer::Code;
@@ -31,7 +29,7 @@ CallFault::Answer answerOf(std::int64_t value)
 
 std::string reasonOf(const std::string& call, const Fault& rule, const std::string& source)
 {
-    const bool succeeds = rule.value == NOTHING;
+    const bool succeeds = rule.meaning == Meaning::Kind::Nothing;
     return source + ": " + call + (succeeds ? " answers " : " fails with ") + rule.error;
 }
 
@@ -42,9 +40,9 @@ CallFault faultOf(const std::string& call, const Fault& rule, const std::string&
     if (rule.error.empty())
         return fault;
     fault.reason = reasonOf(call, rule, source);
-    fault.answer = answerOf(rule.value);
+    fault.answer = answerOf(rule.meaning);
     if (fault.answer == CallFault::Answer::Code)
-        fault.code = static_cast<int>(rule.value);
+        fault.code = static_cast<int>(rule.meaning.number);
     if (fault.answer == CallFault::Answer::BusError)
         fault.busError = rule.error;
     return fault;

@@ -19,7 +19,7 @@
 namespace coresystem_testing {
 namespace {
 
-using port::devicefile::Change;
+using port::devicefile::Edit;
 
 bool isTaken = false; // by a device that lives
 
@@ -78,7 +78,7 @@ void put(const std::string& file, const std::string& text)
     });
 }
 
-void make(const std::string& file, const std::vector<Change>& changes)
+void make(const std::string& file, const std::vector<Edit>& changes)
 {
     change(file, [&](std::string& content) {
         const auto changed = port::devicefile::changeText(content, file, changes);

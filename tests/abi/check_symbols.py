@@ -11,7 +11,7 @@ import pathlib
 import subprocess
 import sys
 
-sys.path.insert(0, str(pathlib.Path(__file__).resolve().parents[2] / "device"))
+sys.path.insert(0, str(pathlib.Path(__file__).resolve().parents[2] / "tizen"))
 from imports import read_libraries
 
 # Applications reach the class through GetInstance() only.

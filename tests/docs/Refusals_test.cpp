@@ -17,6 +17,7 @@
 #include <coresystem_port.h>
 
 #include "support/PrivateBus.h"
+#include "support/Questions.h"
 #include "support/ScriptedService.h"
 #include "support/TemporaryTree.h"
 
@@ -58,10 +59,10 @@ bluetooth = "disconnected"
 [storage]
 block_size = 4096
 fragment_size = 4096
-blocks = 4096
-available_blocks = 4096
+blocks = 409600
+available_blocks = 409600
 [packages]
-clock = "1.2.3"
+"org.example.clock" = "1.2.3"
 )";
 const char TIME_ZONE[] = "UTC-9"; // nine hours east
 const char MADE_UP_IMEI[] = "324000000000000";
@@ -82,11 +83,6 @@ std::ostream& operator<<(std::ostream& out, const Answer& answer)
     return out << answer.returned << " | " << answer.output;
 }
 
-CoreSystem& library()
-{
-    return *CoreSystem::GetInstance();
-}
-
 std::string shown(bool value)
 {
     return value ? "true" : "false";
@@ -97,8 +93,8 @@ std::string shown(int value)
     return std::to_string(value);
 }
 
-// Of a string that the library hands out, and frees it.
-std::string taken(char* text)
+// A text that the library hands out, which is freed.
+std::string shown(char* text)
 {
     if (text == nullptr)
         return "null";
@@ -107,103 +103,54 @@ std::string taken(char* text)
     return copy;
 }
 
-// A question whose answer is a string.
-Answer askText(const std::function<std::string(char** slot)>& question)
+std::string shown(char** names)
 {
-    static char untouched[] = "";
-    char* slot = untouched;
-    const std::string returned = question(&slot);
-    return {returned, slot == untouched ? "as it was" : taken(slot)};
+    return names == nullptr ? "null" : "names";
 }
 
-Answer askText(int (CoreSystem::*question)(char**))
-{
-    return askText([question](char** slot) { return shown((library().*question)(slot)); });
-}
+using Ask = std::function<Answer()>;
+using Questions = std::map<std::string, Ask>;
 
-// A question whose answer is a number, another one than that.
-template <typename T>
-Answer askNumber(T untouched, const std::function<bool(T* slot)>& question)
-{
-    T slot = untouched;
-    const std::string returned = shown(question(&slot));
-    return {returned, slot == untouched ? "as it was" : "written"};
-}
+// The questions in the words of the document.
+class Rows {
+public:
+    template <typename Plain>
+    void plain(const char* name, Plain ask)
+    {
+        all[name] = [ask]() -> Answer { return {shown(ask()), ""}; };
+    }
 
-template <typename T>
-Answer askModem(bool (CoreSystem::*question)(char*, T*), T untouched)
-{
-    return askNumber<T>(untouched,
-                        [question](T* slot) { return (library().*question)(nullptr, slot); });
-}
+    template <typename Text>
+    void text(const char* name, Text ask)
+    {
+        all[name] = [ask]() -> Answer {
+            char* slot = questions::UNTOUCHED;
+            const std::string code = shown(ask(&slot));
+            return {code, slot == questions::UNTOUCHED ? "as it was" : shown(slot)};
+        };
+    }
 
-Answer askImei()
-{
-    Answer answer = askText(&CoreSystem::GetIMEI);
-    if (answer.output == std::string("\"") + MADE_UP_IMEI + "\"")
-        answer.output = "made up";
-    return answer;
-}
+    template <typename T, typename OfSlot>
+    void ofSlot(const char* name, T other, OfSlot ask)
+    {
+        all[name] = [other, ask]() -> Answer {
+            T slot = other;
+            const std::string isAnswered = shown(ask({}, &slot));
+            bool isWritten = !(slot == other);
+            if constexpr (std::is_same_v<T, bool>) { // what is written may be `other` itself
+                bool opposite = !other;
+                ask({}, &opposite);
+                isWritten = isWritten || opposite == other;
+            }
+            if constexpr (std::is_same_v<T, char*>)
+                if (isWritten)
+                    std::free(slot);
+            return {isAnswered, isWritten ? "written" : "as it was"};
+        };
+    }
 
-Answer askRoaming()
-{
-    bool roaming = false;
-    const bool isFirst = library().GetRoamingStatus(0, &roaming);
-    bool other = true;
-    library().GetRoamingStatus(0, &other);
-    return {shown(isFirst), !roaming && other ? "as it was" : "written"};
-}
-
-// Keeps a list of handles while a question uses it.
-Answer withHandles(const std::function<Answer(telephony_handle_list_s& list, bool isFilled)>& use)
-{
-    telephony_handle_list_s list = {0, nullptr};
-    const bool isFilled = library().InitHandleList(&list);
-    const Answer answer = use(list, isFilled);
-    library().DeinitHandleList(&list);
-    return answer;
-}
-
-Answer askHandles()
-{
-    return withHandles([](telephony_handle_list_s& list, bool isFilled) -> Answer {
-        return {shown(isFilled), list.count == 1 && list.handle != nullptr ? "filled" : "empty"};
-    });
-}
-
-Answer askNumberOfHandle()
-{
-    return withHandles([](telephony_handle_list_s& list, bool) {
-        return askText([&list](char** slot) {
-            return list.count == 0 ? "no handle"
-                                   : shown(library().GetPhoneNumber(list.handle, slot));
-        });
-    });
-}
-
-Answer releaseHandles()
-{
-    telephony_handle_list_s list = {0, nullptr};
-    library().InitHandleList(&list);
-    return {shown(library().DeinitHandleList(&list)), ""};
-}
-
-Answer askSimInfo()
-{
-    std::string mcc = "?", mnc = "?", msin = "?";
-    const bool isRead = library().GetSimInfo(nullptr, &mcc, &mnc, &msin);
-    return {shown(isRead), mcc + mnc + msin == "???" ? "as it was" : "written"};
-}
-
-Answer askSerial()
-{
-    return askText([](char** slot) {
-        const char* serial = *slot;
-        const int code = library().GetDeviceUniqueID(&serial);
-        *slot = const_cast<char*>(serial);
-        return shown(code);
-    });
-}
+    Questions all;
+};
 
 // Knows of flight mode, and when Wi-Fi was told last.
 class Listener : public IConnectionStateListener {
@@ -290,92 +237,40 @@ void waitUntil(const std::function<bool()>& isDone)
 Answer listen()
 {
     Listener listener;
-    library().SetConnectionEventListener(&listener, nullptr);
+    questions::library().SetConnectionEventListener(&listener, nullptr);
     for (const bool wifi : {false, true, false}) {
         deviceFile().describeOutOfFlightMode(wifi);
         waitUntil([&] { return listener.wifi == (wifi ? 1 : 0); });
     }
-    library().SetConnectionEventListener(nullptr, nullptr);
+    questions::library().SetConnectionEventListener(nullptr, nullptr);
     return {"nothing", listener.wasToldOfFlightMode ? "told" : "never told of flight mode"};
 }
 
-const std::map<std::string, std::function<Answer()>>& questions()
+// Where the document has words of its own.
+void tellApart(Questions& all)
 {
-    using S = CoreSystem;
-    const auto truth = [](auto question) -> std::function<Answer()> {
-        return [question]() -> Answer { return {shown((library().*question)()), ""}; };
+    all["GetIMEI"] = [ask = all.at("GetIMEI")] {
+        Answer answer = ask();
+        if (answer.output == std::string("\"") + MADE_UP_IMEI + "\"")
+            answer.output = "made up";
+        return answer;
     };
-    const auto text = [](int (S::*question)(char**)) -> std::function<Answer()> {
-        return [question] { return askText(question); };
+    all["InitHandleList"] = [ask = all.at("InitHandleList")] {
+        Answer answer = ask();
+        answer.output = answer.output == "written" ? "filled" : "empty";
+        return answer;
     };
-    static const std::map<std::string, std::function<Answer()>> all = {
-        {"GetDeviceName", text(&S::GetDeviceName)},
-        {"GetTizenIdN", text(&S::GetTizenIdN)},
-        {"GetPlatformName", text(&S::GetPlatformName)},
-        {"GetSWVersion", text(&S::GetSWVersion)},
-        {"GetModelName", text(&S::GetModelName)},
-        {"GetDeviceUniqueID", askSerial},
-        {"GetDeviceLanguageCode",
-         [] {
-             return askText(
-                 [](char** slot) { return shown(library().GetDeviceLanguageCode(slot, false)); });
-         }},
-        {"IsFlightMode", truth(&S::IsFlightMode)},
-        {"IsDataRoamingEnabled", truth(&S::IsDataRoamingEnabled)},
-        {"IsMobileData", truth(&S::IsMobileData)},
-        {"GetCSC",
-         []() -> Answer {
-             return {taken(library().GetCSC()), ""};
-         }},
-        {"GetPackageVersion",
-         [] {
-             return askText(
-                 [](char** slot) { return shown(library().GetPackageVersion("clock", slot)); });
-         }},
-        {"IsSystemMemoryAvailable",
-         []() -> Answer {
-             return {shown(library().IsSystemMemoryAvailable(1)), ""};
-         }},
-        {"IsNetworkConnected",
-         []() -> Answer {
-             return {shown(library().IsNetworkConnected(true, true)), ""};
-         }},
-        {"SetConnectionEventListener", listen},
-        {"IsSimAvailable", truth(&S::IsSimAvailable)},
-        {"IsSimExist", truth(&S::IsSimExist)},
-        {"GetMCCFromSim", text(&S::GetMCCFromSim)},
-        {"GetMNCFromSim", text(&S::GetMNCFromSim)},
-        {"GetPhoneNumberFromSim", text(&S::GetPhoneNumberFromSim)},
-        {"GetIMEI", askImei},
-        {"GetRoamingStatus", askRoaming},
-        {"InitHandleList", askHandles},
-        {"DeinitHandleList", releaseHandles},
-        {"GetCpNameList",
-         []() -> Answer {
-             return {library().GetCpNameList() == nullptr ? "null" : "names", ""};
-         }},
-        {"IsAvaliableState",
-         [] {
-             return askNumber<TelSimCardStatus_t>(
-                 TAPI_SIM_STATUS_UNKNOWN,
-                 [](TelSimCardStatus_t* status) { return library().IsAvaliableState(0, status); });
-         }},
-        {"GetMainSimSubscription",
-         [] { return askModem(&S::GetMainSimSubscription, TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN); }},
-        {"GetDefaultDataSubscription",
-         [] {
-             return askModem(&S::GetDefaultDataSubscription,
-                             TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN);
-         }},
-        {"GetCallPreferredSubscription",
-         [] {
-             return askModem(&S::GetCallPreferredSubscription,
-                             TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN);
-         }},
-        {"CheckSmsEnabled", [] { return askModem(&S::CheckSmsEnabled, -1); }},
-        {"GetSimInfo", askSimInfo},
-        {"GetPhoneNumber", askNumberOfHandle},
-    };
+    all["SetConnectionEventListener"] = listen;
+}
+
+const Questions& allQuestions()
+{
+    static const Questions all = [] {
+        Rows rows;
+        questions::listTo(rows);
+        tellApart(rows.all);
+        return rows.all;
+    }();
     return all;
 }
 
@@ -449,7 +344,7 @@ protected:
         if (question == "GetDeviceUniqueID")
             return answerOverTheBus(refused);
         deviceFile().refuse(refused);
-        return questions().at(question)();
+        return allQuestions().at(question)();
     }
 
 private:
@@ -466,7 +361,7 @@ private:
         for (const auto& [call, error] : refused)
             if (call == "GetSerial")
                 daemon.fail(error, "refused", call);
-        return askSerial();
+        return allQuestions().at("GetDeviceUniqueID")();
     }
 };
 

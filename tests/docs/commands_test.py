@@ -105,9 +105,9 @@ def main():
         with tempfile.TemporaryDirectory() as folder:
             if "examples" in path.parts:
                 shutil.copytree(path.parent, folder, dirs_exist_ok=True)
-            for device in (TREE / "devices").glob("*.toml"):
+            for device in (TREE / "samples").glob("*.toml"):
                 shutil.copy(device, folder)
-            Path(folder, "devices").symlink_to(TREE / "devices")
+            Path(folder, "samples").symlink_to(TREE / "samples")
             document = Document(path, options.command.resolve(), Path(folder), options.prefix)
             text = document.check()
         left = "".join(f"; {count} not run: {why}" for count, why in document.exempt if count)

@@ -145,6 +145,13 @@ class TheLibrarysPage(unittest.TestCase):
         self.assertEqual(len(re.findall(r'^\.It Li "', listeners, re.MULTILINE)), 5)
 
 
+class ThePortsPage(unittest.TestCase):
+    def test_names_every_header_of_the_platform(self):
+        named = re.findall(r"`(?:api/)?([\w*]+\.h)`", (TREE / "port/README.md").read_text("utf-8"))
+        for header in (TREE / "port/api").glob("*.h"):
+            self.assertTrue(any(header.match(name) for name in named), header.name)
+
+
 class TheOverview(unittest.TestCase):
     def test_names_every_environment_variable_of_the_readme(self):
         table = (TREE / "README.md").read_text("utf-8").split("## Environment variables")[1]

@@ -412,7 +412,7 @@ std::map<const Difference*, int> PlayedAgreement::used_;
 
 TEST_F(PlayedAgreement, EveryDeviceFileAndEveryStepOfItsScenario)
 {
-    for (const char* const folder : {DEVICES "/devices", DEVICES "/tests/devices"})
+    for (const char* const folder : {DEVICES "/samples", DEVICES "/tests/devices"})
         for (const auto& entry : std::filesystem::directory_iterator(folder)) {
             std::string text = contentOf(entry.path());
             const auto device = port::devicefile::parseDevice(text, entry.path());

@@ -43,7 +43,7 @@ constexpr char LOCALE[] = "org.freedesktop.locale1";
 constexpr char ADAPTER[] = "/org/bluez/hci0";
 constexpr char PROPERTIES[] = "org.freedesktop.DBus.Properties";
 
-std::string with(const std::string& text, const std::vector<port::devicefile::Change>& changes)
+std::string with(const std::string& text, const std::vector<port::devicefile::Edit>& changes)
 {
     const auto changed = port::devicefile::changeText(text, "device", changes);
     return changed ? changed.value() : changed.error().reason;

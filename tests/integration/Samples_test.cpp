@@ -18,42 +18,54 @@
 #include <coresystem_port.h>
 
 #include "support/Child.h"
+#include "support/Questions.h"
 
 namespace {
 
 namespace fs = std::filesystem;
 
-CoreSystem& library()
-{
-    return *CoreSystem::GetInstance();
-}
+using questions::library;
 
-std::string taken(char* text)
-{
-    const std::string copy = text != nullptr ? text : "-";
-    std::free(text);
-    return copy;
-}
-
-std::string yesOrNo(bool is)
+std::string shown(bool is)
 {
     return is ? "yes" : "no";
 }
 
-using Text = int (CoreSystem::*)(char**);
-
-template <Text question>
-std::string text()
+std::string shown(char* text)
 {
-    char* answer = nullptr;
-    const int code = (library().*question)(&answer);
-    return taken(answer) + (code == 0 ? "" : " " + std::to_string(code));
+    const std::string copy = text != nullptr ? text : "-";
+    if (text != questions::UNTOUCHED)
+        std::free(text);
+    return copy;
 }
 
-template <bool (CoreSystem::*question)()>
-std::string flag()
+// Names that stay the library's.
+std::string shown(char** names)
 {
-    return yesOrNo((library().*question)());
+    std::string all;
+    for (; names != nullptr && *names != nullptr; ++names)
+        all += (all.empty() ? "" : ", ") + std::string(*names);
+    return all.empty() ? "no slot" : all;
+}
+
+std::string shown(const questions::Identity& identity)
+{
+    return identity.mcc + " " + identity.mnc + " " + identity.msin;
+}
+
+template <typename Number>
+std::string shown(Number number)
+{
+    return std::to_string(static_cast<int>(number));
+}
+
+// The code behind a text, unless it is 0.
+template <typename Text>
+std::string askText(Text ask)
+{
+    char* answer = nullptr;
+    const int code = ask(&answer);
+    return shown(answer) + (code == 0 ? "" : " " + std::to_string(code));
 }
 
 using Conversion = void (CoreSystem::*)(const char*, char**);
@@ -64,12 +76,12 @@ std::string converted(const std::string& key)
 {
     char* answer = nullptr;
     (library().*question)(key.c_str(), &answer);
-    return taken(answer);
+    return shown(answer);
 }
 
 std::string mcc()
 {
-    return text<&CoreSystem::GetMCCFromSim>();
+    return askText([](char** slot) { return library().GetMCCFromSim(slot); });
 }
 std::string callingCode()
 {
@@ -87,26 +99,6 @@ std::string ofCallingCode()
     return converted<question>(callingCode());
 }
 
-// What each slot answers.
-std::string ofSlots(const std::function<std::string(int slot, char* cpName)>& ask)
-{
-    char** const names = library().GetCpNameList();
-    std::string answers;
-    for (int slot = 0; names != nullptr && names[slot] != nullptr; ++slot)
-        answers += (slot == 0 ? "" : ", ") + ask(slot, names[slot]);
-    return answers.empty() ? "no slot" : answers;
-}
-
-template <typename Enumeration>
-std::string numbersOf(bool (CoreSystem::*question)(char*, Enumeration*))
-{
-    return ofSlots([question](int, char* cpName) {
-        Enumeration answer{};
-        return (library().*question)(cpName, &answer) ? std::to_string(static_cast<int>(answer))
-                                                      : std::string("-");
-    });
-}
-
 struct QuietListener : IConnectionStateListener {
     void OnWifiDeviceStateChanged(int, void*) override {}
     void OnWifiConnectionStateChanged(int, wifi_ap_h, void*) override {}
@@ -115,47 +107,58 @@ struct QuietListener : IConnectionStateListener {
     void OnWifiStatusChanged(bool, void*) override {}
 };
 
-// The slots' handles while it lives.
-struct Handles {
-    telephony_handle_list_s list = {};
-    const bool areThere = library().InitHandleList(&list);
+using Questions = std::map<std::string, std::function<std::string()>>;
+
+// The questions to the platform; those of a slot are asked of each.
+class Rows {
+public:
+    template <typename Plain>
+    void plain(const char* name, Plain ask)
+    {
+        all[name] = [ask] { return shown(ask()); };
+    }
+
+    template <typename Text>
+    void text(const char* name, Text ask)
+    {
+        all[name] = [ask] { return askText(ask); };
+    }
+
+    template <typename T, typename OfSlot>
+    void ofSlot(const char* name, T other, OfSlot ask)
+    {
+        all[name] = [other, ask] {
+            char** const modems = library().GetCpNameList();
+            std::string answers;
+            for (int slot = 0; modems != nullptr && modems[slot] != nullptr; ++slot) {
+                T answer = other;
+                const bool isAnswered = ask({slot, modems[slot]}, &answer);
+                answers += std::string(slot == 0 ? "" : ", ") + (isAnswered ? "" : "-");
+                if (isAnswered || !(answer == other))
+                    answers += (isAnswered ? "" : " ") + shown(answer);
+            }
+            return answers.empty() ? "no slot" : answers;
+        };
+    }
+
+    Questions all;
 };
 
-const std::map<std::string, std::function<std::string()>> QUESTIONS = {
-    {"GetDeviceName", text<&CoreSystem::GetDeviceName>},
-    {"GetTizenIdN", text<&CoreSystem::GetTizenIdN>},
-    {"GetPlatformName", text<&CoreSystem::GetPlatformName>},
-    {"GetSWVersion", text<&CoreSystem::GetSWVersion>},
-    {"GetModelName", text<&CoreSystem::GetModelName>},
-    {"GetDeviceUniqueID",
-     [] { // of the daemon on the bus, which has a device of its own
-         const char* id = nullptr;
-         return std::to_string(library().GetDeviceUniqueID(&id));
-     }},
+// Those that are asked in several ways, or whose answer is no device's.
+const Questions OTHERS = {
     {"GetDeviceLanguageCode",
      [] {
          char* code = nullptr;
          library().GetDeviceLanguageCode(&code, false);
          char* iso = nullptr;
          library().GetDeviceLanguageCode(&iso, true);
-         return taken(code) + " " + taken(iso);
+         return shown(code) + " " + shown(iso);
      }},
-    {"IsFlightMode", flag<&CoreSystem::IsFlightMode>},
-    {"IsDataRoamingEnabled", flag<&CoreSystem::IsDataRoamingEnabled>},
-    {"IsMobileData", flag<&CoreSystem::IsMobileData>},
-    {"GetCSC", [] { return taken(library().GetCSC()); }},
-    {"GetPackageVersion",
-     [] {
-         char* version = nullptr;
-         const int code = library().GetPackageVersion("org.example.clock", &version);
-         return taken(version) + (code == 0 ? "" : " " + std::to_string(code));
-     }},
-    {"IsSystemMemoryAvailable", [] { return yesOrNo(library().IsSystemMemoryAvailable(500)); }},
     {"IsNetworkConnected",
      [] {
-         return "cellular " + yesOrNo(library().IsNetworkConnected(false, false)) + ", Wi-Fi " +
-                yesOrNo(library().IsNetworkConnected(true, false)) + ", Bluetooth " +
-                yesOrNo(library().IsNetworkConnected(false, true));
+         return "cellular " + shown(library().IsNetworkConnected(false, false)) + ", Wi-Fi " +
+                shown(library().IsNetworkConnected(true, false)) + ", Bluetooth " +
+                shown(library().IsNetworkConnected(false, true));
      }},
     {"SetConnectionEventListener",
      [] {
@@ -164,82 +167,17 @@ const std::map<std::string, std::function<std::string()>> QUESTIONS = {
          library().SetConnectionEventListener(nullptr, nullptr);
          return std::string("set");
      }},
-    {"IsSimAvailable", flag<&CoreSystem::IsSimAvailable>},
-    {"IsSimExist", flag<&CoreSystem::IsSimExist>},
-    {"GetMCCFromSim", text<&CoreSystem::GetMCCFromSim>},
-    {"GetMNCFromSim", text<&CoreSystem::GetMNCFromSim>},
-    {"GetPhoneNumberFromSim", text<&CoreSystem::GetPhoneNumberFromSim>},
     {"GetIMEI",
      [] { // one that is made up is no answer of the device
          char* imei = nullptr;
          library().GetIMEI(&imei);
-         const std::string told = taken(imei);
+         const std::string told = shown(imei);
          return coresystem_port::lastOrigin(coresystem_port::Question::Imei).available
                     ? told
                     : std::string("made up");
      }},
-    {"GetRoamingStatus",
-     [] {
-         return ofSlots([](int slot, char*) {
-             bool roaming = false;
-             return library().GetRoamingStatus(slot, &roaming) ? yesOrNo(roaming)
-                                                               : std::string("-");
-         });
-     }},
-    {"InitHandleList",
-     [] {
-         Handles handles;
-         const std::string count = std::to_string(handles.list.count);
-         if (handles.areThere)
-             library().DeinitHandleList(&handles.list);
-         return handles.areThere ? count : std::string("-");
-     }},
-    {"DeinitHandleList",
-     [] {
-         Handles handles;
-         return handles.areThere ? yesOrNo(library().DeinitHandleList(&handles.list))
-                                 : std::string("-");
-     }},
-    {"GetPhoneNumber",
-     [] {
-         Handles handles;
-         std::string numbers = std::to_string(handles.list.count) + ":";
-         for (unsigned int slot = 0; handles.areThere && slot < handles.list.count; ++slot) {
-             char* number = nullptr;
-             library().GetPhoneNumber(&handles.list.handle[slot], &number);
-             numbers += " " + taken(number);
-         }
-         if (handles.areThere)
-             library().DeinitHandleList(&handles.list);
-         return numbers;
-     }},
-    {"GetCpNameList",
-     [] { return ofSlots([](int, char* cpName) { return std::string(cpName); }); }},
-    {"IsAvaliableState",
-     [] {
-         return ofSlots([](int slot, char*) {
-             TelSimCardStatus_t status{};
-             const bool is = library().IsAvaliableState(slot, &status);
-             return yesOrNo(is) + " " + std::to_string(static_cast<int>(status));
-         });
-     }},
-    {"GetMainSimSubscription", [] { return numbersOf(&CoreSystem::GetMainSimSubscription); }},
-    {"GetDefaultDataSubscription",
-     [] { return numbersOf(&CoreSystem::GetDefaultDataSubscription); }},
-    {"GetCallPreferredSubscription",
-     [] { return numbersOf(&CoreSystem::GetCallPreferredSubscription); }},
-    {"CheckSmsEnabled", [] { return numbersOf(&CoreSystem::CheckSmsEnabled); }},
-    {"GetSimInfo",
-     [] {
-         return ofSlots([](int, char* cpName) {
-             std::string parts[3];
-             return library().GetSimInfo(cpName, &parts[0], &parts[1], &parts[2])
-                        ? parts[0] + " " + parts[1] + " " + parts[2]
-                        : std::string("-");
-         });
-     }},
-    {"IsValidMcc", [] { return yesOrNo(library().IsValidMcc(mcc().c_str())); }},
-    {"IsMoSupportMcc", [] { return yesOrNo(library().IsMoSupportMcc(mcc().c_str())); }},
+    {"IsValidMcc", [] { return shown(library().IsValidMcc(mcc().c_str())); }},
+    {"IsMoSupportMcc", [] { return shown(library().IsMoSupportMcc(mcc().c_str())); }},
     {"GetCountryCodeFromMcc", ofMcc<&CoreSystem::GetCountryCodeFromMcc>},
     {"GetCountryNameFromMcc", ofMcc<&CoreSystem::GetCountryNameFromMcc>},
     {"GetServiceCountryCodeFromMcc", ofMcc<&CoreSystem::GetServiceCountryCodeFromMcc>},
@@ -265,6 +203,15 @@ const std::map<std::string, std::function<std::string()>> QUESTIONS = {
          return std::string(alpha2 != nullptr ? alpha2 : "-");
      }},
 };
+
+Questions allQuestions()
+{
+    Rows rows;
+    questions::listTo(rows);
+    for (const auto& [name, ask] : OTHERS)
+        rows.all[name] = ask;
+    return rows.all;
+}
 
 std::string contentOf(const std::string& path)
 {
@@ -303,7 +250,7 @@ std::string askAll(const std::string& sample)
     setenv("DBUS_SYSTEM_BUS_ADDRESS", "unix:path=/nonexistent", 1);
     coresystem_port::setLogSink(coresystem_port::LogSink::None);
     std::string answers = coresystem_port::deviceFileProblem();
-    for (const auto& [name, ask] : QUESTIONS)
+    for (const auto& [name, ask] : allQuestions())
         answers += name + ": " + ask() + "\n";
     return answers;
 }
@@ -327,7 +274,7 @@ TEST(SampleQuestionsTest, AreAllThatTheLibraryExports)
          ++found)
         exported.insert((*found)[1]);
     std::set<std::string> asked = {"GetInstance"};
-    for (const auto& [name, ask] : QUESTIONS)
+    for (const auto& [name, ask] : allQuestions())
         asked.insert(name);
     EXPECT_EQ(exported, asked);
 }

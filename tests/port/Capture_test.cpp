@@ -95,7 +95,10 @@ std::string shown(const Section& section, const std::string& key)
         return '"' + *text + '"';
     if (const auto* const flag = std::get_if<bool>(&value->content))
         return *flag ? "true" : "false";
-    return std::to_string(std::get<std::int64_t>(value->content));
+    const auto& meaning = std::get<port::devicefile::Meaning>(value->content);
+    return meaning == port::devicefile::Meaning::Kind::NotSupported
+               ? "not supported"
+               : std::to_string(meaning.number);
 }
 
 void expectSame(const port::devicefile::SectionRow& row, const Section& wanted, const Section& got)

@@ -19,7 +19,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr const char* SHIPPED = "tablet"; // one of those in devices/
+constexpr const char* SHIPPED = "tablet"; // one of those in samples/
 
 // A user's home, and the folder that the user is in.
 class DeviceSearchTest : public testing::Test {

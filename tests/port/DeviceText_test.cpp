@@ -5,9 +5,9 @@
 #include "devicefile/DevicePath.h"
 #include "devicefile/DeviceText.h"
 
-using port::devicefile::Change;
 using port::devicefile::changeText;
 using port::devicefile::DevicePath;
+using port::devicefile::Edit;
 using port::devicefile::getValue;
 using port::devicefile::parsePath;
 using testing::ElementsAre;
@@ -18,7 +18,7 @@ namespace {
 
 constexpr const char* FILE_NAME = "d.toml";
 
-std::string changed(const std::string& text, const std::vector<Change>& changes)
+std::string changed(const std::string& text, const std::vector<Edit>& changes)
 {
     const auto result = changeText(text, FILE_NAME, changes);
     return result ? result.value() : "refused: " + result.error().reason;

@@ -14,6 +14,7 @@ using port::FontSize;
 using port::LinkState;
 using port::devicefile::DeviceFile;
 using port::devicefile::Fault;
+using port::devicefile::Meaning;
 using testing::EndsWith;
 using testing::HasSubstr;
 
@@ -289,12 +290,12 @@ TEST_F(SimulatorSchemaTest, FaultIsAnErrorByItsName)
     ASSERT_TRUE(refused) << backend->deviceFileProblem();
     EXPECT_EQ(line(3), refused.value().source);
     EXPECT_EQ("TELEPHONY_ERROR_PERMISSION_DENIED", refused.value().value.error);
-    EXPECT_EQ(-13, refused.value().value.value);
+    EXPECT_EQ(-13, refused.value().value.meaning.number);
     EXPECT_EQ(0, refused.value().value.delayMs);
     EXPECT_EQ(0, refused.value().value.call);
-    EXPECT_EQ(1, file.get<Fault>("fault", "tel_get_sim_imsi").value().value.value);
-    EXPECT_EQ(port::devicefile::NOTHING,
-              file.get<Fault>("fault", "vconf_get_str").value().value.value);
+    EXPECT_EQ(1, file.get<Fault>("fault", "tel_get_sim_imsi").value().value.meaning.number);
+    EXPECT_TRUE(file.get<Fault>("fault", "vconf_get_str").value().value.meaning ==
+                Meaning::Kind::Nothing);
     EXPECT_FALSE(file.get<Fault>("fault", "wifi_initialize"));
 }
 
@@ -306,7 +307,7 @@ TEST_F(SimulatorSchemaTest, FaultMayBeLateAndOfOneCall)
     const auto state = file.get<Fault>("fault", "telephony_sim_get_state");
     ASSERT_TRUE(state) << backend->deviceFileProblem();
     EXPECT_EQ("TELEPHONY_ERROR_OPERATION_FAILED", state.value().value.error);
-    EXPECT_EQ(-39845887, state.value().value.value);
+    EXPECT_EQ(-39845887, state.value().value.meaning.number);
     EXPECT_EQ(200, state.value().value.delayMs);
     EXPECT_EQ(2, state.value().value.call);
     EXPECT_EQ("", file.get<Fault>("fault", "wifi_initialize").value().value.error);

@@ -108,7 +108,7 @@ def schema():
 
 
 def device_files():
-    for folder in "tests/devices", "devices", "examples":
+    for folder in "tests/devices", "samples", "examples":
         for path in sorted((TREE / folder).rglob("*.toml")):
             yield path
 
