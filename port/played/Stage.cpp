@@ -142,8 +142,8 @@ void Stage::enter()
                                                       Out(error)));
     if (bus_ == nullptr)
         fail("no bus", error);
-    g_dbus_connection_add_filter(bus_.get(), &Stage::onMessage, new Silence(isSilent_),
-                                 &Stage::releaseSilence);
+    filter_ = g_dbus_connection_add_filter(bus_.get(), &Stage::onMessage, new Silence(isSilent_),
+                                           &Stage::releaseSilence);
     if (service_.manager != nullptr)
         add(service_.manager, OBJECT_MANAGER, objectManager());
     for (const Object& object : world_)
@@ -173,6 +173,7 @@ void Stage::leave()
     for (const Shown& each : shown_)
         g_dbus_connection_unregister_object(bus_.get(), each.id);
     shown_.clear();
+    g_dbus_connection_remove_filter(bus_.get(), filter_); // here, where its release may run at once
     g_dbus_connection_close_sync(bus_.get(), nullptr, nullptr);
     bus_.reset();
     world_.clear();

@@ -83,6 +83,7 @@ private:
     const Director director_;
     Owned<GMainContext> context_;
     Owned<GDBusConnection> bus_;
+    guint filter_ = 0; // of the bus
     std::vector<Shown> shown_;
     World world_;
     Answers answers_; // to what the service tells changes of
