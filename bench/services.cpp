@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // bench_services   asks the machine's real services on a private system bus: a line a case, its
-// name,
-//                  the median of elapsed microseconds and the messages sent for one answer, with
-//                  tabs between.
+//                  name, the median of elapsed microseconds and the messages sent for one answer,
+//                  with tabs between.
 //
 // The question, the same through the service's own client library, and through its own command.
 #include <algorithm>

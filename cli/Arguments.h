@@ -23,7 +23,7 @@ public:
     Argument required() const;
     /// How the help names the value.
     Argument called(const std::string& name) const;
-    /// Of a list: each time that it is given adds a value.
+    /// Makes it a list: each time that it is given adds a value.
     Argument takesAll() const;
     /// What is wrong with a value; empty when nothing is.
     Argument checkedBy(std::string (*problemOf)(const std::string& value)) const;

@@ -11,6 +11,7 @@
 #include <memory>
 #include <mutex>
 #include <optional>
+#include <stdexcept>
 #include <thread>
 #include <utility>
 
@@ -81,7 +82,7 @@ std::string reasonOf(const Origins& origins, Question question, int code)
     return reason.empty() ? "the platform answered with error " + std::to_string(code) : reason;
 }
 
-// Of a question that succeeds and hands out null.
+// Says why a question succeeded and handed out null.
 std::string reasonOfNull(const Origins& origins, Question question)
 {
     const std::string reason = origins.of(question).reason;
@@ -307,9 +308,9 @@ bool isIdentity(const std::string& name)
     return false;
 }
 
-const std::vector<FactRow>& facts()
+std::vector<FactRow> allFacts()
 {
-    static const std::vector<FactRow> all = {
+    return {
         {"device_name", text(Question::DeviceName, &CoreSystem::GetDeviceName)},
         {"tizen_id", text(Question::PlatformId, &CoreSystem::GetTizenIdN)},
         {"platform_name", text(Question::PlatformName, &CoreSystem::GetPlatformName)},
@@ -337,6 +338,21 @@ const std::vector<FactRow>& facts()
          yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
         {"device_serial", askSerial},
     };
+}
+
+// Every place of a fact has a row: the first question tells of one that was forgotten.
+const std::vector<FactRow>& facts()
+{
+    static const std::vector<FactRow> all = [] {
+        std::vector<FactRow> rows = allFacts();
+        for (const Place& place : PLACES)
+            if (*place.name != '\0' &&
+                std::none_of(rows.begin(), rows.end(), [&](const FactRow& row) {
+                    return std::string(row.name) == place.name;
+                }))
+                throw std::logic_error(std::string("no row asks for ") + place.name);
+        return rows;
+    }();
     return all;
 } // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
 

@@ -93,14 +93,12 @@ public:
 
     /// The display language as a short code.
     /// \param[out] languageCode without conversion the language part of the setting in upper case
-    /// ("EN"
-    ///             for en_US.UTF-8; the whole value when it has no "_"); with conversion its ISO
-    ///             639-2 code in lower case ("eng"), or left as it was when the table has no such
-    ///             language.
+    ///             ("EN" for en_US.UTF-8; the whole value when it has no "_"); with conversion its
+    ///             ISO 639-2 code in lower case ("eng"), or left as it was when the table has no
+    ///             such language.
     /// \param convertToISO639 whether to convert to ISO 639-2.
     /// \return 0, or the system settings error of the read (see GetDeviceName()); after a failed
-    /// read
-    ///         `languageCode` is that of the default language, "EN" or "eng".
+    ///         read `languageCode` is that of the default language, "EN" or "eng".
     CORESYSTEM_API int GetDeviceLanguageCode(char** languageCode, bool convertToISO639);
 
     /// \}
@@ -183,8 +181,7 @@ public:
     /// The first available card's own phone number. It never reaches the log.
     /// \param[out] phoneNumber a copy; left as it was on failure, so set it to null before.
     /// \return 0, or -39841791 (SIM not available) when no card tells its number, which many do
-    /// not.
-    ///         Also 0, with `phoneNumber` left as it was, when there is no telephony service:
+    ///         not. Also 0, with `phoneNumber` left as it was, when there is no telephony service:
     ///         callers rely on it as it is.
     CORESYSTEM_API int GetPhoneNumberFromSim(char** phoneNumber);
 
@@ -194,9 +191,8 @@ public:
 
     /// The IMEI (3GPP TS 23.003) of the first modem that tells it.
     /// \param[out] imei the IMEI. When no modem tells one, a made-up text of 15 characters: the
-    /// local
-    ///             time zone's offset from UTC in seconds, "-" for west, filled up with "0" at the
-    ///             end ("324000000000000" for UTC+9).
+    ///             local time zone's offset from UTC in seconds, "-" for west, filled up with "0"
+    ///             at the end ("324000000000000" for UTC+9).
     /// \return always 0.
     CORESYSTEM_API int GetIMEI(char** imei);
 

@@ -723,7 +723,7 @@ bool CoreSystem::IsPackageInstalled(const char* packageName)
         ERROR_LINE("PackageName is empty. IsPackageInstalled finish.");
         return false;
     }
-    // Of the size only the result code counts: it tells whether there is such a package.
+    // Only the result code counts, not the size: it tells whether there is such a package.
     const int result = package_manager_get_package_size_info(packageName, nullptr, nullptr);
     if (result == PACKAGE_MANAGER_ERROR_NONE) {
         DEBUG_LINE("Package [%s] is installed", packageName);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// That a mutex excludes is seen by counting without an atomic: a lost count shows a hole, and the
-// thread sanitizer sees every unordered access.
+// Counts without an atomic, so that a mutex that does not exclude loses counts; the thread sanitizer
+// sees every unordered access.
 #include <atomic>
 #include <string>
 #include <thread>

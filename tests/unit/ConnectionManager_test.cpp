@@ -32,7 +32,7 @@ struct Network {
     {
         return state >= 0 && static_cast<std::size_t>(state) < states.size();
     }
-    // Of one read with a handle of its own.
+    // What one read does, with a handle of its own.
     Texts trace(int state, const std::string& handle = "connection") const
     {
         return Texts{"connection_create()", readCall(handle)} +

@@ -21,7 +21,7 @@ struct Converter {
     std::string entry;
     std::string success;
     std::string failure;
-    // Of the facade.
+    // The text of the facade.
     std::string result;
 };
 
