@@ -33,7 +33,7 @@ namespace {
 
 constexpr int CONNECTING_MS = 500;
 constexpr int QUESTION_MS = 2000;
-constexpr int SLACK_MS = 400 * TIME_FACTOR; // of a busy machine
+constexpr int SLACK_MS = 800 * TIME_FACTOR; // of a busy machine
 constexpr char MODEM_MANAGER[] = "org.freedesktop.ModemManager1";
 constexpr char TREE[] = "GetManagedObjects";
 
