@@ -133,6 +133,9 @@ TEST_F(NetworkManagerTest, CellularSwitchTakesTheModemOffTheNetwork)
     networks->setSwitch("WwanEnabled", false);
     EXPECT_TRUE(becomes(CellularState::FlightMode)); // its only radio
     EXPECT_FALSE(valueOf(network.packetData()));
+    // One that is still being switched off cannot be switched on.
+    EXPECT_TRUE(
+        modems->waitUntil([this] { return modems->stateOf("home") == MM_MODEM_STATE_DISABLED; }));
     networks->setSwitch("WwanEnabled", true);
     EXPECT_TRUE(becomes(CellularState::Available));
 }

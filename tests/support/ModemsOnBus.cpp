@@ -195,6 +195,19 @@ void ModemsOnBus::enable(const std::string& id) const
                          MM_DBUS_INTERFACE_MODEM, "Enable", g_variant_new("(b)", TRUE)));
 }
 
+int ModemsOnBus::stateOf(const std::string& id) const
+{
+    GVariant* const reply =
+        call(MODEM_MANAGER.name, settledModem("/virtual/" + id), "org.freedesktop.DBus.Properties",
+             "Get", g_variant_new("(ss)", MM_DBUS_INTERFACE_MODEM, "State"));
+    GVariant* value = nullptr;
+    g_variant_get(reply, "(v)", &value);
+    const int state = g_variant_get_int32(value);
+    g_variant_unref(value);
+    g_variant_unref(reply);
+    return state;
+}
+
 bool ModemsOnBus::waitUntil(const std::function<bool()>& condition) const
 {
     bool isOver = false;

@@ -34,6 +34,8 @@ public:
     void unplug(const std::string& id);
     /// Switches a modem's radio on; returns when it has looked for a network.
     void enable(const std::string& id) const;
+    /// As the daemon tells it now: an MMModemState.
+    int stateOf(const std::string& id) const;
 
     /// Kills the daemon without a farewell, starts it, stops it from running and lets it go on.
     void kill();
