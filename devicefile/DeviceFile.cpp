@@ -596,6 +596,11 @@ BareWord bareWordOf(const std::string& text, std::size_t lineNumber)
     return {begin + at, value.find_last_not_of(" \t\r") + 1, static_cast<std::size_t>(before) + 1};
 }
 
+std::string putInQuotes(const std::string& word)
+{
+    return "put " + word + " in quotes: \"" + word + "\"";
+}
+
 // Adds what was found on the way to the mistakes of a reading, unless its line has a better one.
 void addProblems(Reading& reading, const std::vector<Problem>& more)
 {
@@ -630,8 +635,7 @@ Reading readDevice(const std::string& text, const std::string& path)
                 break;
             }
             const std::string word = repaired.substr(bare.at, bare.size);
-            problems.push_back(
-                {error.line, bare.column, "put " + word + " in quotes: \"" + word + "\""});
+            problems.push_back({error.line, bare.column, putInQuotes(word)});
             repaired.replace(bare.at, bare.size, '"' + word + '"');
         }
     }

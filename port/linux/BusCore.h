@@ -134,13 +134,24 @@ private:
     void takeReply(sd_bus_message* message);
     void finish(const Call& call, sd_bus_message* message);
     Error errorOf(const Peer& peer, sd_bus_message* message, bool& isGone) const;
+    struct Shape {
+        const char* signature; // null when any will do
+        const char* method;
+    };
+    static Shape shapeOf(Kind kind);
     void readReply(const Call& call, sd_bus_message* message, Awaited& reply);
+    bool takeContent(MessageReader& reader, const Call& call, Awaited& reply);
+    static void takeFirstOwner(MessageReader& reader, Peer& peer);
+    bool takeAll(MessageReader& reader, const Call& call, Awaited& reply);
+    bool takeProperty(MessageReader& reader, const Call& call);
+    bool takeSettings(MessageReader& reader, const Call& call);
+    bool takeTree(MessageReader& reader, Peer& peer);
     void takeSignal(sd_bus_message* message);
     void takeOwner(Peer& peer, const std::string& owner);
     void takeProperties(Peer& peer, sd_bus_message* message);
     void takeInterfaces(Peer& peer, sd_bus_message* message, bool areThere);
     void setProperties(Peer& peer, const std::string& path, const std::string& interface,
-                       PropertyMap changes, bool areAll);
+                       PropertyMap&& changes, bool areAll);
     void setSettings(Peer& peer, const std::string& path, const Interfaces& sections,
                      bool areKnown);
     void dropPicture(Peer& peer);

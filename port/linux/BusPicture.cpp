@@ -136,92 +136,111 @@ Error Bus::Core::errorOf(const Peer& peer, sd_bus_message* message, bool& isGone
     return notAvailable(text);
 }
 
-namespace {
-
-// The method of a question, for people.
-const char* methodOf(const char* signature)
+// What a reply of each kind is made of, and the method that it answers, for people.
+Bus::Core::Shape Bus::Core::shapeOf(Kind kind)
 {
-    return std::strcmp(signature, "a{oa{sa{sv}}}") == 0 ? "GetManagedObjects"
-           : std::strcmp(signature, "a{sa{sv}}") == 0   ? "GetSettings"
-           : std::strcmp(signature, "v") == 0           ? "Get"
-                                                        : "GetAll";
+    switch (kind) {
+    case Kind::All:
+    case Kind::AllOfObject:
+        return {"a{sv}", "GetAll"};
+    case Kind::Property:
+        return {"v", "Get"};
+    case Kind::Settings:
+        return {"a{sa{sv}}", "GetSettings"};
+    case Kind::Managed:
+        return {"a{oa{sa{sv}}}", "GetManagedObjects"};
+    default:
+        return {nullptr, nullptr};
+    }
 }
-
-} // namespace
 
 void Bus::Core::readReply(const Call& call, sd_bus_message* message, Awaited& reply)
 {
-    MessageReader reader(message);
-    Peer& peer = *call.peer;
-    const auto isA = [&](const char* signature) {
-        const bool good = sd_bus_message_has_signature(message, signature) > 0;
-        if (!good)
-            reply.error = notAvailable(peer.name + ": the reply to " + methodOf(signature) +
-                                       " is of another type");
-        return good;
-    };
-    const auto tooMuch = [&] {
-        reply.error = notAvailable(
-            peer.name + " " +
-            (reader.problem().empty() ? "sent what cannot be read" : reader.problem()));
-    };
-    switch (call.kind) {
-    case Kind::Owner: {
-        std::string owner;
-        if (reader.text(owner))
-            peer.owner = owner;
-        break;
+    const std::string sender = call.kind == Kind::Texts ? "the system bus" : call.peer->name;
+    const Shape shape = shapeOf(call.kind);
+    if (shape.signature != nullptr && sd_bus_message_has_signature(message, shape.signature) <= 0) {
+        reply.error =
+            notAvailable(sender + ": the reply to " + shape.method + " is of another type");
+        return;
     }
+    MessageReader reader(message);
+    if (!takeContent(reader, call, reply))
+        reply.error = notAvailable(
+            sender + " " +
+            (reader.problem().empty() ? "sent what cannot be read" : reader.problem()));
+}
+
+// Whether all of it could be read.
+bool Bus::Core::takeContent(MessageReader& reader, const Call& call, Awaited& reply)
+{
+    switch (call.kind) {
+    case Kind::Owner:
+        takeFirstOwner(reader, *call.peer);
+        return true;
     case Kind::Match:
     case Kind::Ping:
-        break;
+        return true;
     case Kind::Texts:
-        if (!reader.texts(reply.texts))
-            reply.error = notAvailable("the system bus sent what cannot be read");
-        break;
+        return reader.texts(reply.texts);
     case Kind::All:
-    case Kind::AllOfObject: {
-        PropertyMap all;
-        if (!isA("a{sv}"))
-            break;
-        if (!reader.properties(all))
-            return tooMuch();
-        if (call.kind == Kind::AllOfObject)
-            setProperties(peer, call.path, call.interface, all, true);
-        reply.properties = std::make_shared<const PropertyMap>(std::move(all));
-        break;
+    case Kind::AllOfObject:
+        return takeAll(reader, call, reply);
+    case Kind::Property:
+        return takeProperty(reader, call);
+    case Kind::Settings:
+        return takeSettings(reader, call);
+    case Kind::Managed:
+        return takeTree(reader, *call.peer);
     }
-    case Kind::Property: {
-        PropertyMap one;
-        if (!isA("v"))
-            break;
-        if (!reader.value(one[call.property]))
-            return tooMuch();
-        setProperties(peer, call.path, call.interface, std::move(one), false);
-        break;
-    }
-    case Kind::Settings: {
-        Interfaces sections;
-        if (!isA("a{sa{sv}}"))
-            break;
-        if (!reader.interfaces(sections, {"connection", "gsm", "cdma"}))
-            return tooMuch();
-        setSettings(peer, call.path, sections, true);
-        break;
-    }
-    case Kind::Managed: {
-        auto tree = std::make_shared<Tree>();
-        if (!isA("a{oa{sa{sv}}}"))
-            break;
-        if (!reader.objects(*tree, peer.objects->interfaces))
-            return tooMuch();
-        const bool isNew = peer.tree == nullptr;
-        peer.tree = std::move(tree);
-        if (isNew)
-            noteChange();
-        break;
-    }
-    }
+    return false;
+}
+
+void Bus::Core::takeFirstOwner(MessageReader& reader, Peer& peer)
+{
+    std::string owner;
+    if (reader.text(owner))
+        peer.owner = owner;
+}
+
+bool Bus::Core::takeAll(MessageReader& reader, const Call& call, Awaited& reply)
+{
+    PropertyMap all;
+    if (!reader.properties(all))
+        return false;
+    if (call.kind == Kind::AllOfObject)
+        setProperties(*call.peer, call.path, call.interface, PropertyMap(all), true);
+    reply.properties = std::make_shared<const PropertyMap>(std::move(all));
+    return true;
+}
+
+bool Bus::Core::takeProperty(MessageReader& reader, const Call& call)
+{
+    PropertyMap one;
+    if (!reader.value(one[call.property]))
+        return false;
+    setProperties(*call.peer, call.path, call.interface, std::move(one), false);
+    return true;
+}
+
+bool Bus::Core::takeSettings(MessageReader& reader, const Call& call)
+{
+    Interfaces sections;
+    if (!reader.interfaces(sections, {"connection", "gsm", "cdma"}))
+        return false;
+    setSettings(*call.peer, call.path, sections, true);
+    return true;
+}
+
+bool Bus::Core::takeTree(MessageReader& reader, Peer& peer)
+{
+    auto tree = std::make_shared<Tree>();
+    if (!reader.objects(*tree, peer.objects->interfaces))
+        return false;
+    const bool isNew = peer.tree == nullptr;
+    peer.tree = std::move(tree);
+    if (isNew)
+        noteChange();
+    return true;
 }
 
 void Bus::Core::takeSignal(sd_bus_message* message)
@@ -281,7 +300,7 @@ void Bus::Core::dropPicture(Peer& peer)
 
 // Changes some properties of an interface, or all of them. What was handed out stays as it is.
 void Bus::Core::setProperties(Peer& peer, const std::string& path, const std::string& interface,
-                              PropertyMap changes, bool areAll)
+                              PropertyMap&& changes, bool areAll)
 {
     if (peer.tree == nullptr || peer.tree->size() > MOST_OBJECTS)
         return dropPicture(peer);

@@ -300,6 +300,7 @@ std::vector<Result<Objects>> Bus::Core::lookFor(Lock& lock, const std::vector<Lo
         if (isLost() && again && !isEnding_)
             continue;
         std::vector<Result<Objects>> found;
+        found.reserve(searches.size());
         for (const Search& search : searches)
             found.push_back(isLost()       ? Result<Objects>(problem_)
                             : search.error ? Result<Objects>(*search.error)
