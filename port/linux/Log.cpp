@@ -91,7 +91,8 @@ bool sendToJournal(const std::string& record)
 {
     const Descriptor end(socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
     const auto patience = journal.patience();
-    const timeval limit = {0, std::chrono::microseconds(patience).count()};
+    const timeval limit = {0,
+                           static_cast<suseconds_t>(std::chrono::microseconds(patience).count())};
     sockaddr_un address = {};
     address.sun_family = AF_UNIX;
     std::strcpy(address.sun_path, JOURNAL);
