@@ -144,18 +144,22 @@ std::string othersText(const Reading& reading)
     for (const Country& other : reading.others)
         rows.push_back({other.mcc, other.alpha2.value_or("-"),
                         other.name.value_or("(not in the library's MCC table)")});
-    return "\nAmbiguous: " + std::to_string(rows.size() + 1) + " MCCs have the " +
-           reading.kind->name + " " + reading.key + ". The library answers with " +
-           reading.country.mcc + ",\nthe first in its table, and leaves out:\n" + aligned(rows);
+    return "\n" +
+           wrapped("Ambiguous: " + std::to_string(rows.size() + 1) + " MCCs have the " +
+                       reading.kind->name + " " + reading.key + ". The library answers with " +
+                       reading.country.mcc + ",\nthe first in its table, and leaves out:",
+                   0) +
+           aligned(rows);
 }
 
 std::string severalCountriesText(const Reading& reading)
 {
-    return "\nAmbiguous: MCC " + reading.country.mcc +
-           " stands for several countries; what it converts to is the first's.\nThe alpha-2 "
-           "codes " +
-           listed(reading.alpha2Codes) + " and the calling codes " + listed(reading.callingCodes) +
-           " all lead to it.\n";
+    return "\n" + wrapped("Ambiguous: MCC " + reading.country.mcc +
+                              " stands for several countries; what it converts to is the first's.\n"
+                              "The alpha-2 codes " +
+                              listed(reading.alpha2Codes) + " and the calling codes " +
+                              listed(reading.callingCodes) + " all lead to it.",
+                          0);
 }
 
 std::string fieldTitle(std::string field)
