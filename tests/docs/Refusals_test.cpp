@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <functional>
 #include <map>
@@ -213,7 +214,10 @@ public:
 private:
     void write(const std::string& facts)
     {
-        tree_.write("/d.toml", facts + (faults_.empty() ? "" : "[fault]\n" + faults_));
+        // As a whole: who reads meanwhile finds the one before, never half of it.
+        const std::string next =
+            tree_.write("/next.toml", facts + (faults_.empty() ? "" : "[fault]\n" + faults_));
+        std::filesystem::rename(next, tree_.path("/d.toml"));
     }
 
     const TemporaryTree tree_;
