@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem device play`: the steps of a scenario, one after the other, onto another device file.
+#include <algorithm>
 #include <cerrno>
+#include <charconv>
 #include <chrono>
 #include <cstring>
 #include <filesystem>
@@ -34,6 +36,7 @@ struct Play {
     bool isFast = false;
     bool isByLine = false;
     bool force = false;
+    std::string limit = "60"; // seconds that a line is waited for
 };
 
 // Waits for the time of a step, a line of standard input, or a signal that ends it all.
@@ -57,13 +60,20 @@ public:
         pollfd either[] = {{signals_, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
         return poll(either, 2, milliseconds) == 0;
     }
-    bool awaitLine() const
+    bool awaitLine(const std::string& limit, const std::string& when) const
     {
+        using Clock = std::chrono::steady_clock;
+        const Clock::time_point end = Clock::now() + std::chrono::seconds(std::stoi(limit));
         char byte = 0;
         while (byte != '\n') {
+            const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - Clock::now());
             pollfd any[] = {
                 {signals_, POLLIN, 0}, {STDIN_FILENO, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
-            if (poll(any, 3, -1) < 0 || any[0].revents != 0 || any[2].revents != 0 ||
+            const int ready =
+                poll(any, 3, static_cast<int>(std::max<std::int64_t>(left.count(), 0)));
+            if (ready == 0)
+                throw std::runtime_error(when + ": no line came within " + limit + " s (--limit)");
+            if (ready < 0 || any[0].revents != 0 || any[2].revents != 0 ||
                 read(STDIN_FILENO, &byte, 1) != 1)
                 return false;
         }
@@ -105,7 +115,11 @@ public:
     {
         if (isTerminal_)
             writeOut("\r\033[K");
-        complain("stopped before step " + std::to_string(number) + " of " + std::to_string(steps_));
+        complain(stopText(number));
+    }
+    std::string stopText(std::size_t number) const
+    {
+        return "stopped before step " + std::to_string(number) + " of " + std::to_string(steps_);
     }
 
 private:
@@ -119,11 +133,21 @@ private:
     const bool isTerminal_ = isSmartTerminal();
 };
 
+std::string problemOfLimit(const std::string& text)
+{
+    int seconds = 0;
+    const char* const end = text.data() + text.size();
+    const auto read = std::from_chars(text.data(), end, seconds);
+    const bool isGood =
+        read.ec == std::errc() && read.ptr == end && seconds > 0 && seconds <= 86400;
+    return isGood ? "" : quoted(text) + " is no number of seconds from 1 to 86400";
+}
+
 bool awaitStep(const Play& play, const Pace& pace, const Progress& progress, std::size_t number,
                const Step& step)
 {
     if (play.isByLine)
-        return pace.awaitLine();
+        return pace.awaitLine(play.limit, progress.stopText(number));
     std::int64_t left = play.isFast ? 0 : step.afterMs;
     for (; left > 0; left -= 1000) {
         progress.countDown(number, step, left);
@@ -195,7 +219,7 @@ ExitCode playSteps(const Play& play, const std::string& stage, const DeviceText&
         progress.tell(i + 1, steps[i]);
     }
     if (play.isByLine)
-        pace.awaitLine();
+        pace.awaitLine(play.limit, "all steps are made");
     return SUCCESS;
 }
 
@@ -226,11 +250,18 @@ void cli::addDevicePlayCommand(const Command& device, Invocation& invocation)
     command.option("DEVICE", play->scenario, "Scenario: a device file with steps").required();
     command.flag("--fast", play->isFast, "Do not wait");
     command.flag("--by-line", play->isByLine, "Wait for a line of standard input before each step");
+    const Argument limit = command
+                               .option("--limit", play->limit,
+                                       "With --by-line: wait for a line this long at most (60)")
+                               .called("SECONDS")
+                               .checkedBy(problemOfLimit);
     command.flag("--force", play->force, "Replace a file that was not made by playing");
     command.setFooter("Examples: coresystem device play --device phone.toml travel\n"
                       "          ./application | coresystem device play --by-line travel.toml\n"
                       "The scenario's own file is never written. It stops between steps only.");
-    command.onUse([&invocation, play] {
+    command.onUse([&invocation, play, limit] {
+        if (limit.isGiven() && !play->isByLine)
+            throw UsageError("--limit is of --by-line");
         if (play->isFast && play->isByLine)
             throw UsageError("--fast and --by-line cannot go together");
         invocation.command = [play] { return runPlay(*play); };

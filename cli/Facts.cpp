@@ -18,9 +18,12 @@
 #include <coresystem_port.h>
 #include <gio/gio.h>
 
+#include "Commands.h"
 #include "CountryData.h"
 #include "Serial.h"
 #include "Sims.h"
+#include "Text.h"
+#include "devicefile/Closest.h"
 #include "port/facts/Facts.h"
 
 namespace {
@@ -362,6 +365,11 @@ const FactRow& rowOf(const std::string& name)
                          [&](const FactRow& each) { return each.name == name; });
 }
 
+bool isDaemons(const std::string& name)
+{
+    return name == "device_serial";
+}
+
 constexpr std::chrono::seconds PATIENCE(4);
 std::atomic<int> askingThreads{0};
 
@@ -379,7 +387,7 @@ public:
     {
         const std::lock_guard<std::mutex> lock(mutex_);
         return std::any_of(facts_.begin(), facts_.end(),
-                           [&](const Fact& fact) { return isDaemons(fact) == ofDaemon; });
+                           [&](const Fact& fact) { return isDaemons(fact.name) == ofDaemon; });
     }
 
     // The next one that nobody has asked for yet; past the last when there is none.
@@ -388,7 +396,7 @@ public:
         const std::lock_guard<std::mutex> lock(mutex_);
         std::size_t next = 0;
         while (next < facts_.size() &&
-               (states_[next] != State::Waiting || isDaemons(facts_[next]) != ofDaemon))
+               (states_[next] != State::Waiting || isDaemons(facts_[next].name) != ofDaemon))
             ++next;
         if (next < facts_.size())
             states_[next] = State::Asked;
@@ -440,16 +448,11 @@ private:
     static std::string whyNoAnswer(const Fact& fact, State state)
     {
         std::string reason = "not asked: what comes before it is not answered";
-        if (isDaemons(fact))
+        if (isDaemons(fact.name))
             reason = DAEMON + " does not answer";
         else if (state == State::Asked)
             reason = "what tells " + fact.name + " does not answer";
         return reason.append(" within ").append(std::to_string(PATIENCE.count())) + " seconds";
-    }
-
-    static bool isDaemons(const Fact& fact)
-    {
-        return fact.name == "device_serial";
     }
 
     std::mutex mutex_;
@@ -485,6 +488,31 @@ std::vector<std::string> cli::factNames()
     for (const FactRow& row : facts())
         names.emplace_back(row.name);
     return names;
+}
+
+void cli::checkFactName(const std::string& name, const std::vector<std::string>& names)
+{
+    if (std::find(names.begin(), names.end(), name) != names.end())
+        return;
+    const std::string meant = port::devicefile::similar(name, names);
+    throw UsageError("there is no fact " + quoted(name) +
+                     (meant.empty() ? "" : "; did you mean " + quoted(meant) + "?") +
+                     "\n\"coresystem get --list\" names them.");
+}
+
+std::vector<std::string> cli::watchableFactNames()
+{
+    std::vector<std::string> names = factNames();
+    names.erase(std::remove_if(names.begin(), names.end(), isDaemons), names.end());
+    return names;
+}
+
+cli::Fact cli::askFact(const std::string& name)
+{
+    Fact fact = ask(rowOf(name));
+    fact.name = name;
+    fact.isIdentity = isIdentity(name);
+    return fact;
 }
 
 std::vector<cli::Fact> cli::askFacts(const std::vector<std::string>& names)

@@ -22,9 +22,21 @@ struct Fact {
 /// The names of all facts, in the order in which they are shown.
 std::vector<std::string> factNames();
 
+/// Throws a UsageError about a name that is none of those, with the one that is meant.
+void checkFactName(const std::string& name, const std::vector<std::string>& names);
+
 /// Asks the library for facts of factNames(), in that order. Returns within seconds also when a
 /// source never answers: its fact has no value then, and a reason that says so.
 std::vector<Fact> askFacts(const std::vector<std::string>& names);
+
+/// The names of those that can be watched: all but the device daemon's, which tells of no change.
+std::vector<std::string> watchableFactNames();
+
+/// Asks for one of these on this thread, and waits for as long as its source takes.
+Fact askFact(const std::string& name);
+
+/// What is told of each SIM slot, "slot[1].roaming"; of the first one only what no fact tells.
+std::vector<Fact> askSlotFacts();
 
 /// Whether a question of askFacts() is still waiting for its answer. It cannot be called back: such
 /// a process must end without the destructors of its static objects.

@@ -11,7 +11,6 @@
 #include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
-#include "devicefile/Closest.h"
 
 namespace cli {
 namespace {
@@ -163,17 +162,6 @@ ExitCode runInfo(const Invocation& invocation, const std::vector<std::string>& n
     return deviceFileBad ? BAD_DEVICE_FILE : SUCCESS;
 }
 
-void checkFactName(const std::string& name)
-{
-    const std::vector<std::string> names = factNames();
-    if (std::find(names.begin(), names.end(), name) != names.end())
-        return;
-    const std::string meant = port::devicefile::similar(name, names);
-    throw UsageError("there is no fact " + quoted(name) +
-                     (meant.empty() ? "" : "; did you mean " + quoted(meant) + "?") +
-                     "\n\"coresystem get --list\" names them.");
-}
-
 ExitCode reportMissing(const Fact& fact)
 {
     if (reportDeviceFileProblem())
@@ -236,7 +224,7 @@ void addGet(const Command& app, Invocation& invocation)
         if (wanted->names.empty() != wanted->list)
             throw UsageError("get needs facts, or --list");
         for (const std::string& name : wanted->names)
-            checkFactName(name);
+            checkFactName(name, factNames());
         invocation.command = [&invocation, wanted] {
             return wanted->list ? listFacts() : runGet(invocation, *wanted);
         };

@@ -3,6 +3,7 @@
 #include <map>
 
 #include "Commands.h"
+#include "Facts.h"
 #include "Session.h"
 #include "Sims.h"
 #include "Terminal.h"
@@ -17,19 +18,20 @@ struct Column {
     const char* key; // in JSON
     Answer SimSlot::*answer;
     bool isIdentity;      // masked unless it is to be revealed
+    const char* fact;     // that tells it of the first slot, or empty
     const char* yes = ""; // the words for true and false
     const char* no = "";
 };
 
 constexpr Column COLUMNS[] = {
-    {"SIM", "status", &SimSlot::status, false},
-    {"MCC", "mcc", &SimSlot::mcc, false},
-    {"MNC", "mnc", &SimSlot::mnc, false},
-    {"MSIN", "msin", &SimSlot::msin, true},
-    {"number", "phone_number", &SimSlot::phoneNumber, true},
-    {"country", "country", &SimSlot::country, false},
-    {"network", "roaming", &SimSlot::roaming, false, "roaming", "home"},
-    {"SMS", "sms", &SimSlot::sms, false, "ready", "not ready"},
+    {"SIM", "status", &SimSlot::status, false, ""},
+    {"MCC", "mcc", &SimSlot::mcc, false, "sim_mcc"},
+    {"MNC", "mnc", &SimSlot::mnc, false, "sim_mnc"},
+    {"MSIN", "msin", &SimSlot::msin, true, ""},
+    {"number", "phone_number", &SimSlot::phoneNumber, true, "phone_number"},
+    {"country", "country", &SimSlot::country, false, "sim_country"},
+    {"network", "roaming", &SimSlot::roaming, false, "roaming", "roaming", "home"},
+    {"SMS", "sms", &SimSlot::sms, false, "", "ready", "not ready"},
 };
 
 Json shown(const Column& column, const SimSlot& slot, bool reveal)
@@ -151,6 +153,21 @@ ExitCode runSim(const Invocation& invocation, bool reveal)
 }
 
 } // namespace
+
+std::vector<Fact> askSlotFacts()
+{
+    std::vector<Fact> facts;
+    for (const SimSlot& slot : askSims().slots)
+        for (const Column& column : COLUMNS) {
+            const Answer& answer = slot.*column.answer;
+            if (slot.number == 0 && *column.fact != '\0')
+                continue;
+            facts.push_back({"slot[" + std::to_string(slot.number) + "]." + column.key,
+                             answer.value, "", answer.reason, column.isIdentity});
+        }
+    return facts;
+}
+
 } // namespace cli
 
 void cli::addSimCommand(const Command& app, Invocation& invocation)

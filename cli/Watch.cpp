@@ -1,20 +1,31 @@
 // SPDX-License-Identifier: Apache-2.0
-// `coresystem watch`: connection changes as a listener is told of them.
+// `coresystem watch`: what a listener is told of connection changes, and each fact that changes.
+#include <algorithm>
 #include <csignal>
 #include <exception>
+#include <map>
 #include <memory>
+#include <mutex>
+#include <optional>
+#include <stdexcept>
+#include <vector>
 
 #include <IConnectionStateListener.h>
+#include <coresystem_port.h>
 #include <glib-unix.h>
 #include <unistd.h>
 
 #include "Commands.h"
+#include "Facts.h"
 #include "Session.h"
+#include "Sims.h"
 #include "Terminal.h"
 #include "Text.h"
 
 namespace cli {
 namespace {
+
+constexpr char SLOTS[] = "slot"; // stands for the facts of the SIM slots
 
 const char* nameOfConnection(int state)
 {
@@ -73,10 +84,55 @@ private:
                                                            g_main_loop_unref};
 };
 
-// Prints one line for each event.
+// Now, to the millisecond: of the day, or all of it.
+std::string now(bool asJson)
+{
+    const std::unique_ptr<GDateTime, void (*)(GDateTime*)> time(g_date_time_new_now_local(),
+                                                                g_date_time_unref);
+    const auto text = [&](const char* format) {
+        const std::unique_ptr<char, void (*)(void*)> part(g_date_time_format(time.get(), format),
+                                                          g_free);
+        return std::string(part.get());
+    };
+    const std::string thousand =
+        std::to_string(1000 + g_date_time_get_microsecond(time.get()) / 1000);
+    return text(asJson ? "%FT%T." : "%T.") + thousand.substr(1) + (asJson ? text("%:z") : "");
+}
+
+struct FactChange {
+    Fact fact;
+    Json before;
+};
+
+struct WatchOptions {
+    std::vector<std::string> names; // of the facts; all without one
+    bool eventsOnly = false;
+    bool reveal = false;
+
+    bool areEventsWanted() const
+    {
+        return eventsOnly || names.empty();
+    }
+    bool isPicked(const std::string& name) const
+    {
+        return names.empty() || std::find(names.begin(), names.end(), name) != names.end();
+    }
+    Json shown(const Fact& fact, const Json& value) const
+    {
+        const bool isNamed = !names.empty() && isPicked(fact.name);
+        return fact.isIdentity && !reveal && !isNamed ? masked(value) : value;
+    }
+};
+
+// Prints one line for each event and each fact that changed.
 class Printer : public IConnectionStateListener {
 public:
-    Printer(Loop& loop, bool asJson) : loop_(loop), asJson_(asJson) {}
+    Printer(Loop& loop, bool asJson, const WatchOptions& options)
+        : loop_(loop), asJson_(asJson), options_(options)
+    {
+        for (const std::string& name : watchableFactNames())
+            width_ = std::max(width_, name.size());
+    }
 
     void OnWifiDeviceStateChanged(int state, void*) override
     {
@@ -99,7 +155,18 @@ public:
         print("wifi_status", connected ? "connected" : "not connected");
     }
 
-    // The line that tells that the listener is set.
+    void print(const FactChange& change)
+    {
+        const Json before = options_.shown(change.fact, change.before);
+        const Json after = options_.shown(change.fact, change.fact.value);
+        Json line = {{"fact", change.fact.name}, {"old", before}, {"new", after}};
+        if (after.is_null())
+            line["reason"] = change.fact.reason;
+        writeLine(std::move(line), change.fact.name,
+                  textOrNone(before) + " -> " + textOrNone(after));
+    }
+
+    // The line that tells that everything is watched.
     void begin()
     {
         Json first = {{"event", "watching"}};
@@ -119,12 +186,24 @@ private:
     {
         return escapedInJson(json.dump(-1, ' ', false, Json::error_handler_t::replace)) + "\n";
     }
+    static std::string textOrNone(const Json& value)
+    {
+        const std::string text = value.is_null() ? "not available" : textOf(value);
+        return text.empty() ? "\"\"" : printable(text);
+    }
 
-    // The platform calls from C: no exception may pass.
     void print(const char* event, const char* state)
+    {
+        writeLine({{"event", event}, {"state", state}}, std::string("event ") + event, state);
+    }
+
+    // Is called from C: no exception may pass.
+    void writeLine(Json json, std::string what, const std::string& how)
     try {
-        writeOut(asJson_ ? lineOf({{"event", event}, {"state", state}})
-                         : std::string(event) + " " + state + "\n");
+        const std::string time = now(asJson_);
+        json["time"] = time;
+        what.resize(std::max(what.size(), width_), ' ');
+        writeOut(asJson_ ? lineOf(json) : time + "  " + what + "  " + how + "\n");
     } catch (...) {
         failure_ = std::current_exception();
         loop_.quit();
@@ -132,7 +211,86 @@ private:
 
     Loop& loop_;
     const bool asJson_;
+    const WatchOptions& options_;
+    std::size_t width_ = 0; // of names
     std::exception_ptr failure_;
+};
+
+// Asks the facts anew after changes, and lets the main loop print those that
+// did, after the events of the change.
+class Follower {
+public:
+    Follower(const WatchOptions& options, Printer& printer)
+        : options_(options), printer_(printer), changes_([this] { look(); })
+    {
+        if (!changes_.areWatched())
+            throw std::runtime_error("changes cannot be watched here");
+        look();
+    }
+
+private:
+    void look()
+    try {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        if (!coresystem_port::deviceFileProblem().empty())
+            return; // the last good state stays
+        const Silence silence;
+        std::map<std::string, Fact> before;
+        before.swap(facts_);
+        for (const Fact& fact : askPicked()) {
+            compare(before[fact.name].value, fact);
+            before.erase(fact.name);
+            facts_[fact.name] = fact;
+        }
+        for (auto& [name, fact] : before) { // of a slot that is gone
+            const Json value = fact.value;
+            fact.value = nullptr;
+            fact.reason = "there is no such slot";
+            compare(value, fact);
+        }
+        isBegun_ = true;
+    } catch (const std::exception&) {
+        // Not enough memory for this time.
+    }
+
+    std::vector<Fact> askPicked() const
+    {
+        std::vector<Fact> facts;
+        for (const std::string& name : watchableFactNames())
+            if (options_.isPicked(name))
+                facts.push_back(askFact(name));
+        if (options_.isPicked(SLOTS))
+            for (Fact& fact : askSlotFacts())
+                facts.push_back(std::move(fact));
+        return facts;
+    }
+
+    void compare(const Json& before, const Fact& fact) const
+    {
+        if (isBegun_ && before != fact.value)
+            tell({fact, before});
+    }
+
+    struct Line {
+        Printer& printer;
+        FactChange change;
+    };
+    void tell(FactChange change) const
+    {
+        const auto print = [](gpointer line) -> gboolean {
+            static_cast<Line*>(line)->printer.print(static_cast<Line*>(line)->change);
+            return G_SOURCE_REMOVE;
+        };
+        g_idle_add_full(G_PRIORITY_DEFAULT, print, new Line{printer_, std::move(change)},
+                        [](gpointer line) { delete static_cast<Line*>(line); });
+    }
+
+    const WatchOptions& options_;
+    Printer& printer_;
+    std::mutex mutex_;
+    bool isBegun_ = false;
+    std::map<std::string, Fact> facts_;
+    const coresystem_port::Changes changes_; // ends first
 };
 
 // Is told of changes while it lives.
@@ -150,15 +308,20 @@ public:
     Listening& operator=(const Listening&) = delete;
 };
 
-ExitCode runWatch(const Invocation& invocation)
+ExitCode runWatch(const Invocation& invocation, const WatchOptions& options)
 {
     if (reportDeviceFileProblem())
         return BAD_DEVICE_FILE;
     Loop loop;
     ExitCode end = SUCCESS;
-    Printer printer(loop, invocation.json);
+    Printer printer(loop, invocation.json, options);
     {
-        const Listening listening(printer);
+        std::optional<Listening> listening;
+        if (options.areEventsWanted())
+            listening.emplace(printer);
+        std::optional<Follower> follower;
+        if (!options.eventsOnly)
+            follower.emplace(options, printer);
         printer.begin();
         end = loop.run();
     }
@@ -171,12 +334,26 @@ ExitCode runWatch(const Invocation& invocation)
 
 void cli::addWatchCommand(const Command& app, Invocation& invocation)
 {
-    const Command watch = app.add("watch", "Show connection changes as they happen");
+    const Command watch = app.add("watch", "Show changes as they happen");
+    const auto options = std::make_shared<WatchOptions>();
+    watch.option("FACT", options->names,
+                 "Facts, as `coresystem get --list` names them, or slot; all without one");
+    watch.flag("--events", options->eventsOnly, "Show only what a listener is told");
+    watch.flag("--reveal", options->reveal, "Show what identifies the device and its user in full");
     watch.flag("--json", invocation.json, "Print a JSON object a line");
     watch.setFooter("Examples: coresystem watch\n"
-                    "          coresystem watch -v --device phone.toml\n"
+                    "          coresystem watch roaming flight_mode --device phone.toml\n"
+                    "\"event\" is before what a listener is told; facts have the old and the new "
+                    "value.\n"
                     "-v also shows what is wrong with an edit. Ends at Ctrl-C (exit code 130) or "
                     "when nobody reads any more (0).");
-    watch.onUse(
-        [&invocation] { invocation.command = [&invocation] { return runWatch(invocation); }; });
+    watch.onUse([&invocation, options] {
+        if (options->eventsOnly && !options->names.empty())
+            throw UsageError("--events and facts cannot go together");
+        std::vector<std::string> names = watchableFactNames();
+        names.emplace_back(SLOTS);
+        for (const std::string& name : options->names)
+            checkFactName(name, names);
+        invocation.command = [&invocation, options] { return runWatch(invocation, *options); };
+    });
 }

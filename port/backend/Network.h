@@ -28,6 +28,10 @@ enum class WifiConnection { Failure, Disconnected, Association, Configuration, C
 class Watch {
 public:
     virtual ~Watch() = default;
+
+    /// Has `settled` called as well, on the same thread: after `changed`, once no other change waits
+    /// to be told. Each question that it asks is answered as things are now.
+    virtual void tellSettled(std::function<void()> settled) = 0;
 };
 
 class Network {

@@ -65,15 +65,19 @@ ChangeEvents::Slot& ChangeEvents::slotOf(Change change)
 
 bool ChangeEvents::isWatched()
 {
-    if (watch_ == nullptr)
+    const bool isNew = watch_ == nullptr;
+    if (isNew)
         watch_ = backend_.network().watch([this] { tell(); });
+    if (isNew && watch_ != nullptr)
+        watch_->tellSettled([this] { observe(); });
     return watch_ != nullptr;
 }
 
 bool ChangeEvents::isIdle() const
 {
-    return std::none_of(slots_.begin(), slots_.end(),
-                        [](const Slot& slot) { return slot.registration != nullptr; });
+    return observers_.empty() && std::none_of(slots_.begin(), slots_.end(), [](const Slot& slot) {
+               return slot.registration != nullptr;
+           });
 }
 
 bool ChangeEvents::set(Change change, Callback callback)
@@ -96,19 +100,37 @@ bool ChangeEvents::set(Change change, Callback callback)
     return true;
 }
 
+template <typename Remove>
+void ChangeEvents::removeOne(const Remove& remove)
+{
+    const std::lock_guard<std::mutex> lifecycle(lifecycle_);
+    std::unique_ptr<Watch> needless; // ends after the lock that its calls take
+    const std::lock_guard<std::mutex> reading(reading_);
+    remove();
+    if (isIdle())
+        needless.swap(watch_);
+}
+
 void ChangeEvents::unset(Change change)
 {
     Slot removed;
-    {
-        const std::lock_guard<std::mutex> lifecycle(lifecycle_);
-        std::unique_ptr<Watch> needless; // ends after the lock that its calls take
-        const std::lock_guard<std::mutex> reading(reading_);
-        std::swap(slotOf(change), removed);
-        if (isIdle())
-            needless.swap(watch_);
-    }
+    removeOne([&] { std::swap(slotOf(change), removed); });
     if (removed.registration != nullptr)
         removed.registration->close();
+}
+
+std::optional<ChangeEvents::Observer> ChangeEvents::observe(std::function<void()> look)
+{
+    const std::lock_guard<std::mutex> lifecycle(lifecycle_);
+    if (!isWatched())
+        return std::nullopt;
+    const std::lock_guard<std::mutex> reading(reading_);
+    return observers_.insert(observers_.end(), std::move(look));
+}
+
+void ChangeEvents::forget(Observer observer)
+{
+    removeOne([&] { observers_.erase(observer); });
 }
 
 void ChangeEvents::tell()
@@ -124,6 +146,13 @@ void ChangeEvents::tell()
         slot.value = now;
         slot.registration->post(*now);
     }
+}
+
+void ChangeEvents::observe()
+{
+    const std::lock_guard<std::mutex> reading(reading_);
+    for (const auto& look : observers_)
+        look();
 }
 
 ChangeEvents& changeEvents()
@@ -144,3 +173,25 @@ ChangeEvents& changeEvents()
 }
 
 } // namespace port
+
+struct coresystem_port::Changes::Observed {
+    port::ChangeEvents& events;
+    std::optional<port::ChangeEvents::Observer> observer;
+};
+
+coresystem_port::Changes::Changes(std::function<void()> changed)
+    : observed_(new Observed{port::changeEvents(), {}})
+{
+    observed_->observer = observed_->events.observe(std::move(changed));
+}
+
+coresystem_port::Changes::~Changes()
+{
+    if (observed_->observer && &observed_->events == &port::changeEvents())
+        observed_->events.forget(*observed_->observer);
+}
+
+bool coresystem_port::Changes::areWatched() const
+{
+    return observed_->observer.has_value();
+}

@@ -5,6 +5,7 @@
 
 #include <array>
 #include <functional>
+#include <list>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -39,6 +40,13 @@ public:
     /// of it that runs on another thread has ended when this returns.
     void unset(Change change);
 
+    /// Has `look` called on the watch's thread after changes, once the events of all were posted,
+    /// until it is forgotten. Nothing when changes cannot be watched.
+    using Observer = std::list<std::function<void()>>::iterator;
+    std::optional<Observer> observe(std::function<void()> look);
+    /// Not from inside a call; one that runs has ended when this returns.
+    void forget(Observer observer);
+
 private:
     struct Slot {
         std::shared_ptr<Registration> registration;
@@ -48,13 +56,17 @@ private:
     Slot& slotOf(Change change);
     bool isWatched();
     bool isIdle() const;
+    template <typename Remove>
+    void removeOne(const Remove& remove);
     void tell();
+    void observe();
 
     Backend& backend_;
     std::mutex lifecycle_; // of the watch; never held while waiting for a callback
     std::unique_ptr<Watch> watch_;
     std::mutex reading_; // of values, so that an older one never comes after a newer one
     std::array<Slot, 6> slots_;
+    std::list<std::function<void()>> observers_;
 };
 
 /// The events of this process's backend. A forked child begins with no callback: the threads and

@@ -8,6 +8,7 @@
 #ifndef CORESYSTEM_PORT_H
 #define CORESYSTEM_PORT_H
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -77,6 +78,26 @@ private:
     friend struct OriginsAccess;
     struct Collected;
     std::unique_ptr<Collected> collected_;
+};
+
+/// Tells, while it lives, whenever something that the backend answers may have changed.
+class CORESYSTEM_PORT_API Changes {
+public:
+    /// `changed` is called on a thread of the port's own, one call at a time, after the connection
+    /// events of the change were sent on their way; once for several changes that come together.
+    /// It may ask anything, and must not throw, nor set or remove a listener.
+    explicit Changes(std::function<void()> changed);
+    /// Waits for a call that runs; not from inside one.
+    ~Changes();
+    Changes(const Changes&) = delete;
+    Changes& operator=(const Changes&) = delete;
+
+    /// False when changes cannot be watched here: then it never tells.
+    bool areWatched() const;
+
+private:
+    struct Observed;
+    std::unique_ptr<Observed> observed_;
 };
 
 /// The backend that answers: "linux" (this machine's services) or "simulator" (a device file).

@@ -55,8 +55,10 @@ struct Peer {
     std::string formerOwner;
     const ObjectService* objects = nullptr; // whose objects are kept
     bool isDeaf = false;                    // its signals cannot be had
-    Objects tree;                           // null until it is read
-    std::optional<Error> problem;           // why it could not be
+    bool isHeard = false; // it tells when the properties of its one object changed
+    AwaitedReply kept;    // what was said of these, until it says more, for those who are told
+    Objects tree;         // null until it is read
+    std::optional<Error> problem; // why it could not be
     BusTime lastSent;
 };
 
@@ -89,8 +91,8 @@ private:
         BusTime sent;
         AwaitedReply awaited;
     };
-    // What there was to be seen at a change.
-    using Moment = std::map<const ObjectService*, Result<Objects>>;
+    // What there was to be seen at a change, by the services' names.
+    using Moment = std::map<std::string, Result<Objects>>;
     // Of the thread that tells of changes: what was so at the change that it tells of now.
     static thread_local const Moment* presentMoment;
     struct Watcher;
@@ -109,6 +111,7 @@ private:
     Peer& peerOf(const char* name);
     void attach(Peer& peer);
     void attachObjects(Peer& peer, const ObjectService& service);
+    void hear(Peer& peer, const BusObject& object);
     void addMatch(Peer& peer, const std::string& rule);
     // Answered by the bus, whichever service it is about.
     static bool isForBus(Kind kind)
@@ -163,6 +166,7 @@ private:
     void listenOnce(Lock& lock);
     void refresh(Lock& lock);
     void tell(Lock& lock);
+    void callAll(Lock& lock, std::function<void()> Watcher::*call);
     void kick() const;
 
     const std::vector<const char*> services_;

@@ -113,6 +113,8 @@ void Bus::Core::finish(const Call& call, sd_bus_message* message)
     else
         readReply(call, message, reply);
     reply.isDone = true;
+    if (call.kind == Kind::All && call.peer->isHeard)
+        call.peer->kept = call.awaited;
     if (call.kind == Kind::Managed)
         call.peer->problem = reply.error;
     if (call.kind == Kind::Match && reply.error)
@@ -256,8 +258,13 @@ void Bus::Core::takeSignal(sd_bus_message* message)
         return;
     }
     for (auto& [name, peer] : peers_) {
-        if (peer.owner != sender || peer.objects == nullptr)
+        if (peer.owner != sender || (peer.objects == nullptr && !peer.isHeard))
             continue;
+        if (peer.objects == nullptr) {
+            peer.kept.reset();
+            noteChange();
+            continue;
+        }
         if (sd_bus_message_is_signal(message, PROPERTIES, "PropertiesChanged") > 0)
             takeProperties(peer, message);
         else if (sd_bus_message_is_signal(message, OBJECT_MANAGER, "InterfacesAdded") > 0)
@@ -284,6 +291,8 @@ void Bus::Core::takeOwner(Peer& peer, const std::string& owner)
     if (!peer.owner.empty())
         peer.formerOwner = peer.owner;
     peer.owner = owner;
+    if (!owner.empty())
+        peer.kept.reset();
     // What the one before left unanswered says nothing of this one.
     forgetUnheard(peer, BusTime::max());
     dropPicture(peer);

@@ -70,6 +70,16 @@ void Bus::Core::attachObjects(Peer& peer, const ObjectService& service)
     startThread();
 }
 
+// Of a service that has one object, which nobody watches but those who asked about it.
+void Bus::Core::hear(Peer& peer, const BusObject& object)
+{
+    if (peer.isHeard)
+        return;
+    peer.isHeard = true;
+    addMatch(peer, "type='signal',sender='" + peer.name + "',interface='" + PROPERTIES +
+                       "',member='PropertiesChanged',arg0='" + object.interface + "'");
+}
+
 // Whether it let somebody wait in vain, and gave no sign of life since.
 bool Bus::Core::isOverdue(const Peer& peer, BusTime now) const
 {
@@ -254,7 +264,7 @@ std::vector<Result<Objects>> Bus::Core::look(const std::vector<Look>& questions)
     if (presentMoment != nullptr) {
         std::vector<Result<Objects>> now;
         for (const Look& question : questions) {
-            const auto found = presentMoment->find(&question.service);
+            const auto found = presentMoment->find(question.service.root.name);
             now.push_back(
                 found != presentMoment->end()
                     ? found->second
@@ -313,6 +323,11 @@ AwaitedReply Bus::Core::properties(const BusObject& object)
 {
     const Patience patience;
     Lock lock(mutex_);
+    // Whoever is told of changes keeps no service awake that ends when nobody asks it.
+    if (const auto peer = peers_.find(object.name);
+        std::this_thread::get_id() == thread_.get_id() && peer != peers_.end() &&
+        peer->second.kept != nullptr)
+        return peer->second.kept;
     auto reply = std::make_shared<Awaited>();
     for (bool again = true;; again = false) {
         if (const auto problem = connect(lock, patience.end())) {
@@ -322,6 +337,8 @@ AwaitedReply Bus::Core::properties(const BusObject& object)
         const unsigned generation = generation_;
         Peer& peer = peerOf(object.name);
         attach(peer);
+        if (!watchers_.empty())
+            hear(peer, object);
         awaitLife(lock, {&peer}, patience.end());
         reply->error = problem_;
         if (generation == generation_) {

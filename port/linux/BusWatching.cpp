@@ -26,6 +26,7 @@ thread_local const Bus::Core::Moment* Bus::Core::presentMoment = nullptr;
 struct Bus::Core::Watcher {
     std::vector<const ObjectService*> services;
     std::function<void()> changed;
+    std::function<void()> settled;
     bool isCalled = false;
     bool isOver = false;
 };
@@ -58,7 +59,7 @@ void Bus::Core::noteChange()
             if (isReady_ && peer != peers_.end() && !peer->second.owner.empty() &&
                 peer->second.tree == nullptr && !peer->second.problem && !isTelling_)
                 return;
-            moment.emplace(service, known(*service));
+            moment.emplace(service->root.name, known(*service));
         }
     if (moments_.size() >= MOST_MOMENTS)
         moments_.pop_front();
@@ -124,22 +125,31 @@ void Bus::Core::refresh(Lock& lock)
 
 void Bus::Core::tell(Lock& lock)
 {
+    const bool isAny = !moments_.empty();
     while (!moments_.empty() && !isEnding_) {
         const Moment moment = std::move(moments_.front());
         moments_.pop_front();
-        const auto watchers = watchers_;
-        for (const auto& watcher : watchers) {
-            if (watcher->isOver)
-                continue;
-            watcher->isCalled = true;
-            presentMoment = &moment;
-            lock.unlock();
-            watcher->changed();
-            lock.lock();
-            presentMoment = nullptr;
-            watcher->isCalled = false;
-            changed_.notify_all();
-        }
+        presentMoment = &moment;
+        callAll(lock, &Watcher::changed);
+        presentMoment = nullptr;
+    }
+    if (isAny && !isEnding_)
+        callAll(lock, &Watcher::settled);
+}
+
+void Bus::Core::callAll(Lock& lock, std::function<void()> Watcher::*call)
+{
+    const auto watchers = watchers_;
+    for (const auto& watcher : watchers) {
+        const auto called = (*watcher).*call; // it may be set meanwhile
+        if (watcher->isOver || !called)
+            continue;
+        watcher->isCalled = true;
+        lock.unlock();
+        called();
+        lock.lock();
+        watcher->isCalled = false;
+        changed_.notify_all();
     }
 }
 
@@ -198,6 +208,11 @@ public:
         core_.kick();
         if (std::this_thread::get_id() != core_.thread_.get_id())
             core_.changed_.wait(lock, [this] { return !watcher_->isCalled; });
+    }
+    void tellSettled(std::function<void()> settled) override
+    {
+        const Lock lock(core_.mutex_);
+        watcher_->settled = std::move(settled);
     }
 
 private:

@@ -42,6 +42,11 @@ public:
         thread_.run([this] { monitors_.clear(); });
     }
 
+    void tellSettled(std::function<void()> settled) override
+    {
+        thread_.run([&] { settled_ = std::move(settled); });
+    }
+
     bool start(const std::string& path)
     {
         thread_.run([&] {
@@ -66,12 +71,17 @@ private:
 
     static void onChanged(GFileMonitor*, GFile*, GFile*, GFileMonitorEvent event, gpointer self)
     {
-        if (isComplete(event))
-            static_cast<FileWatch*>(self)->changed_();
+        auto* const watch = static_cast<FileWatch*>(self);
+        if (!isComplete(event))
+            return;
+        watch->changed_();
+        if (watch->settled_)
+            watch->settled_();
     }
 
     const std::function<void()> changed_;
-    std::vector<Owned<GFileMonitor>> monitors_; // of the thread
+    std::function<void()> settled_; // of the thread, as what follows
+    std::vector<Owned<GFileMonitor>> monitors_;
     ContextThread thread_;
 };
 

@@ -50,7 +50,9 @@ class JsonForms(unittest.TestCase):
                               stdout=subprocess.PIPE, text=True, cwd=TREE) as watch:
             validator.validate(json.loads(watch.stdout.readline()))
             watch.terminate()
-        validator.validate({"event": "flight_mode", "state": "on"})
+        time = "2026-11-22T14:03:07.512+01:00"
+        validator.validate({"event": "flight_mode", "state": "on", "time": time})
+        validator.validate({"fact": "sim_mcc", "old": "310", "new": None, "reason": "no card", "time": time})
 
     def test_every_form_is_tried_and_named(self):
         names = {path.stem for path in SCHEMAS.glob("*.json")}

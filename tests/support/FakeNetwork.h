@@ -38,8 +38,9 @@ public:
     void tell()
     {
         const std::lock_guard<std::mutex> lock(telling_);
-        if (changed_)
-            changed_();
+        for (const auto* const call : {&changed_, &settled_})
+            if (*call)
+                (*call)();
     }
     int watches()
     {
@@ -90,7 +91,12 @@ private:
         {
             const std::lock_guard<std::mutex> lock(network_.telling_);
             --network_.watches_;
-            network_.changed_ = nullptr;
+            network_.changed_ = network_.settled_ = nullptr;
+        }
+        void tellSettled(std::function<void()> settled) override
+        {
+            const std::lock_guard<std::mutex> lock(network_.telling_);
+            network_.settled_ = std::move(settled);
         }
 
     private:
@@ -101,6 +107,7 @@ private:
     Answers answers_;
     std::mutex telling_; // held during a call, so that the end of a watch waits for it
     std::function<void()> changed_;
+    std::function<void()> settled_;
     int watches_ = 0;
 };
 
