@@ -26,6 +26,7 @@ namespace cli {
 namespace {
 
 constexpr timespec PATIENCE = {10, 0};
+constexpr timespec LAST_WORDS = {2, 0};
 constexpr char READY[] = "ready";
 constexpr char NO_DAEMON[] = " (on Debian the package dbus-daemon has it)";
 
@@ -179,6 +180,17 @@ bool comesByte(int end)
     return read(end, &byte, 1) == 1;
 }
 
+// Has a process of this one end, and waits for it; 0 is none.
+void end(pid_t child)
+{
+    if (child == 0)
+        return;
+    kill(child, SIGTERM);
+    while (waitpid(child, nullptr, WNOHANG) == 0)
+        if (sigtimedwait(&signalsOfChildren(), nullptr, &LAST_WORDS) < 0 && errno == EAGAIN)
+            return;
+}
+
 // Waits for every process that this one started, or inherited from one that it started.
 void awaitChildren()
 {
@@ -283,9 +295,8 @@ void PrivateBus::keep(bool withBus, const std::vector<std::string>& services, in
     if (write(readiness, answer.data(), answer.size()) >= 0)
         close(readiness);
     readAll(lifeline);
-    for (const pid_t each : {played, bus})
-        if (each != 0)
-            kill(each, SIGTERM);
+    end(played); // first: it has last words
+    end(bus);
     awaitChildren();
     std::error_code ignored;
     fs::remove_all(folder_, ignored);

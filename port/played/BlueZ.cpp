@@ -11,6 +11,13 @@ constexpr char AGENTS[] = "org.bluez.AgentManager1";
 // Of the range that is kept for documents (RFC 7042).
 constexpr char ADDRESS[] = "00:00:5E:00:53:02";
 constexpr char PEER[] = "00:00:5E:00:53:03";
+// What an adapter has without any profile: generic access and attributes, device information, PnP.
+constexpr const char* OWN_SERVICES[] = {
+    "00001800-0000-1000-8000-00805f9b34fb",
+    "00001801-0000-1000-8000-00805f9b34fb",
+    "0000180a-0000-1000-8000-00805f9b34fb",
+    "00001200-0000-1000-8000-00805f9b34fb",
+};
 constexpr char ADAPTER_PATH[] = "/org/bluez/hci0";
 constexpr char PEER_PATH[] = "/org/bluez/hci0/dev_00_00_5E_00_53_03";
 
@@ -34,6 +41,8 @@ Face adapter(const Facts& facts)
                           {"PowerState", textOf(isOn(facts) ? "on" : "off")},
                           {"DiscoverableTimeout", value("u", 180)},
                           {"Pairable", value("b", isOn(facts))},
+                          {"UUIDs", texts({OWN_SERVICES, std::end(OWN_SERVICES)})},
+                          {"Modalias", textOf("usb:v1D6Bp0246d0542")}, // the kernel's, and 5.66
                           {"Roles", texts({"central", "peripheral"})}});
 }
 

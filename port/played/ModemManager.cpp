@@ -145,7 +145,7 @@ class Modem {
 public:
     Modem(const Scene& scene, std::size_t index)
         : facts_(scene.facts), slot_(scene.facts.slots[index]), row_(rowOf(scene.facts, index)),
-          number_(scene.modems.numberOf(slot_))
+          number_(scene.modems.numberOf(slot_)), port_(std::to_string(index))
     {
     }
 
@@ -178,7 +178,7 @@ private:
     }
     std::string port(const char* prefix) const
     {
-        return prefix + std::to_string(number_);
+        return prefix + port_;
     }
 
     Face modem() const
@@ -273,7 +273,8 @@ private:
     const Facts& facts_;
     const SlotFacts& slot_;
     CardRow row_;
-    int number_;
+    const int number_;
+    const std::string port_; // stays the kernel's when the modem comes anew
 };
 
 World worldOf(const Scene& scene)

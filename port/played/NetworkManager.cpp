@@ -233,10 +233,10 @@ private:
         world.push_back(
             {deviceAt(FIRST_MODEM + number),
              {device(NM_DEVICE_TYPE_MODEM, stateOfModem(facts_, index),
-                     "cdc-wdm" + std::to_string(number), radios_[1],
+                     "cdc-wdm" + std::to_string(index), radios_[1],
                      {{"Udi", value("s", modem.c_str())},
                       {"IpInterface", value("s", facts_.connectedSlot() == index
-                                                     ? ("wwan" + std::to_string(number)).c_str()
+                                                     ? ("wwan" + std::to_string(index)).c_str()
                                                      : "")}}),
               face(DEVICE_MODEM,
                    {{"OperatorCode", value("s", isHome ? (slot.mcc + slot.mnc).c_str() : "")}}),

@@ -174,6 +174,7 @@ void Stage::leave()
         g_dbus_connection_unregister_object(bus_.get(), each.id);
     shown_.clear();
     g_dbus_connection_remove_filter(bus_.get(), filter_); // here, where its release may run at once
+    g_dbus_connection_flush_sync(bus_.get(), nullptr, nullptr);
     g_dbus_connection_close_sync(bus_.get(), nullptr, nullptr);
     bus_.reset();
     world_.clear();

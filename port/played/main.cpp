@@ -52,6 +52,7 @@ void play(const std::vector<std::string>& services)
     for (const int signal : {SIGTERM, SIGINT})
         g_unix_signal_add(signal, onSignal, loop);
     g_main_loop_run(loop);
+    player.refresh(); // what changed just before the end is told as well
     g_main_loop_unref(loop);
 }
 
