@@ -54,11 +54,19 @@ GVariant* dictionary(const std::vector<Face>& faces)
     return g_variant_builder_end(&all);
 }
 
+// Of the same type. GLib compares what was not put into bytes yet by what it prints of it.
+bool isSame(const Variant& left, const Variant& right)
+{
+    g_variant_get_data(left.get());
+    g_variant_get_data(right.get());
+    return g_variant_equal(left.get(), right.get()) != FALSE;
+}
+
 Values differences(const Values& before, const Values& after)
 {
     Values changed;
     for (const auto& [name, value] : after)
-        if (g_variant_equal(before.at(name).get(), value.get()) == FALSE)
+        if (!isSame(before.at(name), value))
             changed[name] = value;
     return changed;
 }
@@ -286,7 +294,7 @@ void Stage::tellAnswers(const Answers& before)
 {
     for (const auto& [which, answer] : answers_) {
         const auto old = before.find(which);
-        if (old != before.end() && g_variant_equal(old->second.get(), answer.get()) == FALSE)
+        if (old != before.end() && !isSame(old->second, answer))
             emit(which.first, which.second->interface, which.second->signal, nullptr);
     }
 }
