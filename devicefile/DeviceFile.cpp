@@ -16,6 +16,7 @@
 #include "../port/common/RegularFile.h"
 #include "Closest.h"
 #include "DevicePath.h"
+#include "TextPlaces.h"
 #include "Toml.h"
 
 namespace port::devicefile {
@@ -24,7 +25,7 @@ namespace {
 constexpr long SCHEMA = 1;
 
 // In quotes and on one line, whatever it holds.
-std::string quoted(std::string_view name)
+std::string inQuotes(std::string_view name)
 {
     const toml::value<std::string> text{std::string(name)};
     std::ostringstream stream;
@@ -41,7 +42,7 @@ std::string hint(std::string_view name, const std::vector<std::string>& known)
     if (name.size() > LONGEST_NAME)
         return "";
     const std::string meant = similar(std::string(name), known);
-    return meant.empty() ? "" : "; did you mean " + quoted(meant) + "?";
+    return meant.empty() ? "" : "; did you mean " + inQuotes(meant) + "?";
 }
 
 using Content = decltype(Value::content);
@@ -102,7 +103,7 @@ std::string listOf(const Names& names)
 {
     std::string list;
     for (const Name& row : names)
-        list += (list.empty() ? "" : ", ") + quoted(row.name);
+        list += (list.empty() ? "" : ", ") + inQuotes(row.name);
     return list;
 }
 
@@ -210,7 +211,7 @@ DevicePath pathIn(std::string_view text)
 
 std::string noPath(std::string_view text)
 {
-    return quoted(text) + " must be a path like settings.flight_mode or slot.0.sim";
+    return inQuotes(text) + " must be a path like settings.flight_mode or slot.0.sim";
 }
 
 bool isWhole(const SectionRow& section, const DevicePath& path)
@@ -289,7 +290,7 @@ private:
 
     std::string unknownKey(const SectionRow& row, std::string_view key) const
     {
-        return "unknown key " + quoted(key) + " in " + titleOf(row) +
+        return "unknown key " + inQuotes(key) + " in " + titleOf(row) +
                (isHinted() ? hint(key, keyNames(row)) : "");
     }
 
@@ -308,7 +309,7 @@ private:
     {
         const SectionRow* const row = findSection(name.str());
         if (row == nullptr)
-            return refuse(name.source(), "unknown key " + quoted(name) +
+            return refuse(name.source(), "unknown key " + inQuotes(name) +
                                              (isHinted() ? hint(name, sectionNames()) : ""));
         if (row->form == Form::List)
             return readList(*row, node);
@@ -425,7 +426,7 @@ private:
         if (section == nullptr)
             refuse(where, path.empty()
                               ? noPath("")
-                              : "unknown section " + quoted(path.front()) +
+                              : "unknown section " + inQuotes(path.front()) +
                                     (isHinted() ? hint(path.front(), sectionNames()) : ""));
         else if (section->name == "step")
             refuse(where, "a step cannot change a step");
@@ -485,10 +486,10 @@ private:
         const auto* const text = content ? std::get_if<std::string>(&*content) : nullptr;
         if (!content)
             refuse(node.source(),
-                   quoted(key) + " must be " + expected(type) +
+                   inQuotes(key) + " must be " + expected(type) +
                        (isHinted() ? hint(node.value_or(std::string()), namesOf(type)) : ""));
         else if (text != nullptr && text->find('\0') != std::string::npos)
-            refuse(node.source(), quoted(key) + " must not hold a NUL");
+            refuse(node.source(), inQuotes(key) + " must not hold a NUL");
         else
             return content;
         return std::nullopt;
@@ -502,7 +503,7 @@ private:
         for (const auto& [key, node] : table)
             readFaultKey(type, key, node, fault);
         if (problems_.size() == before && fault.error.empty() && fault.delayMs == 0)
-            refuse(table.source(), quoted(name) + " must have an error or a delay_ms");
+            refuse(table.source(), inQuotes(name) + " must have an error or a delay_ms");
         return problems_.size() == before ? std::optional<Content>(fault) : std::nullopt;
     }
 
@@ -510,7 +511,7 @@ private:
     {
         const Type* const own = key == "error" ? &type : findFaultKey(key.str());
         if (own == nullptr)
-            return refuse(key.source(), "unknown key " + quoted(key) +
+            return refuse(key.source(), "unknown key " + inQuotes(key) +
                                             " in a fault, which has error, delay_ms and call");
         const std::optional<Content> content = readContent(*own, key, node);
         if (!content)
@@ -573,11 +574,6 @@ std::size_t beginOfLine(const std::string& text, std::size_t number)
     return begin;
 }
 
-bool isCharacter(char byte) // or its first byte
-{
-    return (static_cast<unsigned char>(byte) & 0xc0U) != 0x80;
-}
-
 // Up to a comment; what has quotes is another mistake.
 BareWord bareWordOf(const std::string& text, std::size_t lineNumber)
 {
@@ -588,12 +584,14 @@ BareWord bareWordOf(const std::string& text, std::size_t lineNumber)
         sign == std::string::npos ? sign : line.find_first_not_of(" \t", sign + 1);
     if (at == std::string::npos || std::isalpha(static_cast<unsigned char>(line[at])) == 0)
         return {};
-    const std::string value = line.substr(at, line.find('#', at) - at);
-    if (value.find_first_of("\"'\\") != std::string::npos)
+    std::string word = line.substr(at, line.find('#', at) - at);
+    word.resize(word.find_last_not_of(" \t\r") + 1);
+    const bool isPlain = std::none_of(word.begin(), word.end(), [](unsigned char c) {
+        return c == '"' || c == '\'' || c == '\\' || std::iscntrl(c) != 0;
+    });
+    if (!isPlain)
         return {};
-    const auto before =
-        std::count_if(line.begin(), line.begin() + static_cast<std::ptrdiff_t>(at), isCharacter);
-    return {begin + at, value.find_last_not_of(" \t\r") + 1, static_cast<std::size_t>(before) + 1};
+    return {begin + at, word.size(), charactersOf(line.substr(0, at)) + 1};
 }
 
 std::string putInQuotes(const std::string& word)

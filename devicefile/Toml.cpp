@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <string_view>
+#include <utility>
 
 #include "TextPlaces.h"
 
@@ -162,13 +163,26 @@ std::string reasonOf(const toml::parse_error& error)
     return reason;
 }
 
+// A sign that stands in texts and comments only, for each letter outside ASCII, which does so too.
+std::string withoutLetters(std::string_view text)
+{
+    std::string ascii;
+    for (const char c : text.substr(TextPlaces(text).begin()))
+        if (beginsCharacter(c))
+            ascii += isAscii(c) ? c : '!';
+    return ascii;
+}
+
 } // namespace
 
 toml::table parseToml(const std::string& text, const std::string& path)
 {
     Check(text).run();
     try {
-        return toml::parse(text, path);
+        // A broken text throws here, before the parser meets a letter where it expects none.
+        toml::table table = toml::parse(withoutLetters(text), path);
+        const bool isAsciiOnly = std::all_of(text.begin(), text.end(), isAscii);
+        return isAsciiOnly ? std::move(table) : toml::parse(text, path);
     } catch (const toml::parse_error& error) {
         const toml::source_position where = error.source().begin;
         throw TomlError(reasonOf(error), where.line, where.column);

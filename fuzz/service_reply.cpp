@@ -63,9 +63,9 @@ public:
     {
         int ends[2];
         require(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends) == 0, "a socket");
-        const std::string all = "DATA\r\nOK 0123456789abcdef0123456789abcdef\r\n" + reply;
+        const std::string all =
+            "DATA\r\nOK 0123456789abcdef0123456789abcdef\r\nAGREE_UNIX_FD\r\n" + reply;
         require(sd_bus_new(&bus_) >= 0 && sd_bus_set_fd(bus_, ends[0], ends[0]) >= 0 &&
-                    sd_bus_negotiate_fds(bus_, 0) >= 0 &&
                     send(ends[1], all.data(), all.size(), MSG_NOSIGNAL) ==
                         static_cast<ssize_t>(all.size()) &&
                     sd_bus_start(bus_) >= 0,
