@@ -65,7 +65,7 @@ ExitCode runChange(const std::vector<Edit>& changes)
     }
 }
 
-void addGet(const Command& device, Invocation& invocation)
+void addDeviceGet(const Command& device, Invocation& invocation)
 {
     const Command get = device.add("get", "Show a value");
     const auto path = std::make_shared<std::string>();
@@ -98,7 +98,7 @@ void addChange(const Command& device, Invocation& invocation, const char* name,
 
 void cli::addDeviceEditCommands(const Command& device, Invocation& invocation)
 {
-    addGet(device, invocation);
+    addDeviceGet(device, invocation);
     addChange(device, invocation, "set", "ASSIGNMENT", "What to change, each PATH=VALUE",
               assignmentOf, "Set values",
               "Example: coresystem device set settings.flight_mode=true network.wifi=deactivated "

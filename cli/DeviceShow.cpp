@@ -19,7 +19,7 @@ namespace {
 using port::devicefile::Entry;
 
 // A step says what it sets as a path of its own.
-bool isIdentity(const Entry& entry)
+bool identifies(const Entry& entry)
 {
     const bool isOfStep = entry.section.compare(0, 4, "step") == 0;
     std::string text = isOfStep ? entry.key.substr(entry.key.find('.') + 1) : entry.path();
@@ -33,7 +33,7 @@ bool isIdentity(const Entry& entry)
 Json valueOf(const Entry& entry, bool reveal)
 {
     const Json value = std::visit([](const auto& content) { return Json(content); }, entry.value);
-    return isIdentity(entry) && !reveal ? masked(value) : value;
+    return identifies(entry) && !reveal ? masked(value) : value;
 }
 
 std::string shown(const Json& value)
@@ -63,7 +63,7 @@ std::string showText(const DeviceText& device, const std::vector<Entry>& entries
             text += "\n" + heading("[" + first->section + "]") + "\n" + aligned(rows);
         first = behind;
     }
-    const bool hides = !reveal && std::any_of(entries.begin(), entries.end(), isIdentity);
+    const bool hides = !reveal && std::any_of(entries.begin(), entries.end(), identifies);
     return text + (hides ? "\nWhat identifies the subscriber is masked; --reveal shows it.\n" : "");
 }
 

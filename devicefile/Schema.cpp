@@ -62,9 +62,9 @@ constexpr Name CARD_STATUSES[] = {
 };
 
 constexpr Name SERVICES[] = {
-    name("in_service", Service::InService),
-    name("out_of_service", Service::OutOfService),
-    name("emergency_only", Service::EmergencyOnly),
+    name("in_service", ServiceState::InService),
+    name("out_of_service", ServiceState::OutOfService),
+    name("emergency_only", ServiceState::EmergencyOnly),
 };
 
 constexpr Name UNKNOWN_SLOT[] = {{"unknown", -1}};

@@ -47,7 +47,7 @@ struct Imsi {
     std::string msin; // up to ten
 };
 
-enum class Service { InService, OutOfService, EmergencyOnly };
+enum class ServiceState { InService, OutOfService, EmergencyOnly };
 
 // Subscriptions by 0-based slot; nothing where it is not known.
 struct Subscriptions {
@@ -90,7 +90,7 @@ public:
     {
         return notSupported("no telephony");
     }
-    virtual Result<Sourced<Service>> service(const SlotName&)
+    virtual Result<Sourced<ServiceState>> service(const SlotName&)
     {
         return notSupported("no telephony");
     }

@@ -7,7 +7,7 @@
 namespace port::linux_backend {
 namespace {
 
-constexpr std::size_t LIMIT = 1024 * 1024;
+constexpr std::size_t CONFIGURATION_LIMIT = 1024 * 1024;
 
 // "db/csc/salescode" stands in the group [db/csc], under the name salescode.
 struct Place {
@@ -43,7 +43,7 @@ Result<std::string> readText(const std::string& file, const Place& place)
 {
     std::string content;
     std::string problem;
-    if (!readRegularFile(file, LIMIT, content, problem))
+    if (!readRegularFile(file, CONFIGURATION_LIMIT, content, problem))
         return notAvailable(problem);
     Owned<GError> error;
     const Owned<GKeyFile> keyFile(g_key_file_new());

@@ -12,7 +12,7 @@
 namespace port::linux_backend {
 namespace {
 
-constexpr char SWITCHES[] = "/dev/rfkill"; // each read is one event
+constexpr char SWITCH_EVENTS[] = "/dev/rfkill"; // each read is one event
 
 Descriptor listenToLinks()
 {
@@ -35,7 +35,7 @@ void KernelEvents::open()
     Descriptor links = listenToLinks();
     if (links.number() >= 0)
         sockets_.push_back(std::move(links));
-    Descriptor switches(::open(SWITCHES, O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    Descriptor switches(::open(SWITCH_EVENTS, O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (switches.number() >= 0)
         sockets_.push_back(std::move(switches));
 }

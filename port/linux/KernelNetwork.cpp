@@ -16,7 +16,7 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr char INTERFACES[] = "/sys/class/net";
-constexpr char ADAPTERS[] = "/sys/class/bluetooth";
+constexpr char ADAPTER_FOLDER[] = "/sys/class/bluetooth";
 constexpr char SWITCHES[] = "/sys/class/rfkill";
 
 // The entries of a folder, in a fixed order; none when it is not there.
@@ -120,7 +120,7 @@ bool KernelNetwork::isConnectedOverBluetooth() const
 
 bool KernelNetwork::hasBluetoothAdapter() const
 {
-    return !entriesOf(root_ + ADAPTERS).empty();
+    return !entriesOf(root_ + ADAPTER_FOLDER).empty();
 }
 
 Result<Sourced<bool>> KernelNetwork::areRadiosSwitchedOff() const

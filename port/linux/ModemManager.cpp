@@ -32,18 +32,18 @@ auto orderOf(const Modem& modem)
 }
 
 constexpr Registration REGISTRATIONS[] = {
-    {MM_MODEM_3GPP_REGISTRATION_STATE_IDLE, Service::OutOfService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_SEARCHING, Service::OutOfService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_DENIED, Service::OutOfService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING, Service::InService, true},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_SMS_ONLY, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_SMS_ONLY, Service::InService, true},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_EMERGENCY_ONLY, Service::EmergencyOnly, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_CSFB_NOT_PREFERRED, Service::InService, false},
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_CSFB_NOT_PREFERRED, Service::InService, true},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_IDLE, ServiceState::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME, ServiceState::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_SEARCHING, ServiceState::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_DENIED, ServiceState::OutOfService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING, ServiceState::InService, true},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_SMS_ONLY, ServiceState::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_SMS_ONLY, ServiceState::InService, true},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_EMERGENCY_ONLY, ServiceState::EmergencyOnly, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_HOME_CSFB_NOT_PREFERRED, ServiceState::InService, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING_CSFB_NOT_PREFERRED, ServiceState::InService, true},
     // Some services of this place only, for whoever has no subscription here.
-    {MM_MODEM_3GPP_REGISTRATION_STATE_ATTACHED_RLOS, Service::EmergencyOnly, false},
+    {MM_MODEM_3GPP_REGISTRATION_STATE_ATTACHED_RLOS, ServiceState::EmergencyOnly, false},
 };
 
 } // namespace

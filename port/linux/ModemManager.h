@@ -31,7 +31,7 @@ constexpr std::size_t MOST_MODEMS = 16;
 // What a state of registration means.
 struct Registration {
     std::uint32_t state; // MMModem3gppRegistrationState
-    Service service;
+    ServiceState service;
     bool roaming;
 };
 

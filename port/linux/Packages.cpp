@@ -9,7 +9,7 @@
 namespace port::linux_backend {
 namespace {
 
-constexpr std::size_t LIMIT = 64 * 1024 * 1024;
+constexpr std::size_t STATUS_LIMIT = 64 * 1024 * 1024;
 
 // Takes one line off the front of a text.
 std::string_view takeLine(std::string_view& text)
@@ -69,7 +69,7 @@ Result<Sourced<std::optional<std::string>>> LinuxPackages::version(const std::st
 {
     std::string status;
     std::string problem;
-    if (!readRegularFile(root_ + DPKG_STATUS, LIMIT, status, problem))
+    if (!readRegularFile(root_ + DPKG_STATUS, STATUS_LIMIT, status, problem))
         return notAvailable(std::string(DPKG_STATUS) + ": " + problem);
     const auto found = versionIn(status, name);
     if (!found)

@@ -223,10 +223,10 @@ Result<Registration> registrationOf(const Slot& slot)
     return state ? notAvailable("the modem's registration is not known") : state.error();
 }
 
-Result<Service> serviceOf(const Slot& slot)
+Result<ServiceState> serviceOf(const Slot& slot)
 {
     const Result<Registration> registration = registrationOf(slot);
-    return registration ? Result<Service>(registration.value().service) : registration.error();
+    return registration ? Result<ServiceState>(registration.value().service) : registration.error();
 }
 
 Result<bool> isRoaming(const Slot& slot)
@@ -375,7 +375,7 @@ Result<Fact> LinuxTelephony::imei(const SlotName& name)
     return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_EQUIPMENTIDENTIFIER, imeiOf);
 }
 
-Result<Sourced<Service>> LinuxTelephony::service(const SlotName& name)
+Result<Sourced<ServiceState>> LinuxTelephony::service(const SlotName& name)
 {
     return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, serviceOf);
 }

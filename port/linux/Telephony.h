@@ -22,7 +22,7 @@ public:
     Result<Sourced<Imsi>> imsi(const SlotName& name) override;
     Result<Sourced<std::optional<std::string>>> number(const SlotName& name) override;
     Result<Fact> imei(const SlotName& name) override;
-    Result<Sourced<Service>> service(const SlotName& name) override;
+    Result<Sourced<ServiceState>> service(const SlotName& name) override;
     Result<Sourced<bool>> roaming(const SlotName& name) override;
     Result<Sourced<Subscriptions>> subscriptions() override;
     Result<Sourced<bool>> smsReady(const SlotName& name) override;

@@ -31,7 +31,7 @@ SlotFacts slotOf(const Section& section)
     slot.msin = textOf(section, "msin");
     slot.number = textOf(section, "number");
     slot.imei = textOf(section, "imei");
-    slot.service = find<Service>(section, "service");
+    slot.service = find<ServiceState>(section, "service");
     slot.isRoaming = find<bool>(section, "roaming").value_or(false);
     slot.hasMessages = find<bool>(section, "sms").value_or(false);
     slot.isEnabled = find<bool>(section, "enabled").value_or(true);
@@ -77,7 +77,7 @@ std::optional<std::size_t> Facts::connectedSlot() const
         slots[static_cast<std::size_t>(*dataSlot)].isReady())
         return static_cast<std::size_t>(*dataSlot);
     for (std::size_t i = 0; i < slots.size(); ++i)
-        if (slots[i].isReady() && slots[i].service == Service::InService)
+        if (slots[i].isReady() && slots[i].service == ServiceState::InService)
             return i;
     return std::nullopt;
 }

@@ -22,7 +22,7 @@ struct SlotFacts {
     std::string msin;
     std::string number;
     std::string imei;
-    std::optional<Service> service;
+    std::optional<ServiceState> service;
     bool isRoaming = false;
     bool hasMessages = false;
     bool isEnabled = true;

@@ -70,12 +70,12 @@ MMModemState stateOfReady(const Facts& facts, std::size_t index)
     const SlotFacts& slot = facts.slots[index];
     if (facts.connectedSlot() == index)
         return MM_MODEM_STATE_CONNECTED;
-    if (slot.service == Service::InService)
+    if (slot.service == ServiceState::InService)
         return MM_MODEM_STATE_REGISTERED;
     if (!slot.isEnabled || !facts.isCellularOn())
         return MM_MODEM_STATE_DISABLED;
-    return slot.service == Service::OutOfService ? MM_MODEM_STATE_SEARCHING
-                                                 : MM_MODEM_STATE_ENABLED;
+    return slot.service == ServiceState::OutOfService ? MM_MODEM_STATE_SEARCHING
+                                                      : MM_MODEM_STATE_ENABLED;
 }
 
 CardRow rowOf(const Facts& facts, std::size_t index)
@@ -93,10 +93,10 @@ CardRow rowOf(const Facts& facts, std::size_t index)
 
 MMModem3gppRegistrationState registrationOf(const SlotFacts& slot, MMModemState state)
 {
-    if (slot.service == Service::InService)
+    if (slot.service == ServiceState::InService)
         return slot.isRoaming ? MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING
                               : MM_MODEM_3GPP_REGISTRATION_STATE_HOME;
-    if (slot.service == Service::EmergencyOnly)
+    if (slot.service == ServiceState::EmergencyOnly)
         return MM_MODEM_3GPP_REGISTRATION_STATE_EMERGENCY_ONLY;
     if (slot.service && state == MM_MODEM_STATE_SEARCHING)
         return MM_MODEM_3GPP_REGISTRATION_STATE_SEARCHING;
@@ -154,7 +154,7 @@ public:
         Object modem{numbered(MM_DBUS_MODEM_PREFIX, number_), {this->modem()}, true};
         const bool hasFailed = row_.state == MM_MODEM_STATE_FAILED;
         // A modem without a card knows of a network only what the file says.
-        if (!hasFailed || (slot_.service && slot_.service != Service::OutOfService))
+        if (!hasFailed || (slot_.service && slot_.service != ServiceState::OutOfService))
             modem.faces.push_back(network());
         if (!hasFailed)
             addAbilities(modem);
@@ -210,7 +210,7 @@ private:
 
     Face network() const
     {
-        const bool isHome = slot_.service == Service::InService && !slot_.isRoaming;
+        const bool isHome = slot_.service == ServiceState::InService && !slot_.isRoaming;
         MMModem3gppPacketServiceState packets = MM_MODEM_3GPP_PACKET_SERVICE_STATE_UNKNOWN;
         if (isRegistered())
             packets = facts_.cellular == CellularState::CallOnlyAvailable
@@ -246,7 +246,7 @@ private:
     {
         return face(MM_DBUS_INTERFACE_MODEM_VOICE,
                     {{MM_MODEM_VOICE_PROPERTY_EMERGENCYONLY,
-                      value("b", !isRegistered() && slot_.service != Service::InService)}});
+                      value("b", !isRegistered() && slot_.service != ServiceState::InService)}});
     }
 
     Face card() const
@@ -312,7 +312,7 @@ const SlotFacts& slotOf(const Request& request)
 bool isServedElsewhere(const Facts& facts, std::size_t index)
 {
     for (std::size_t i = 0; i < facts.slots.size(); ++i)
-        if (i != index && facts.slots[i].service == Service::InService)
+        if (i != index && facts.slots[i].service == ServiceState::InService)
             return true;
     return false;
 }

@@ -229,7 +229,7 @@ private:
         const SlotFacts& slot = facts_.slots[index];
         const int number = scene_.modems.numberOf(slot);
         const std::string modem = numbered(MM_DBUS_MODEM_PREFIX, number);
-        const bool isHome = slot.service == Service::InService && !slot.isRoaming;
+        const bool isHome = slot.service == ServiceState::InService && !slot.isRoaming;
         world.push_back(
             {deviceAt(FIRST_MODEM + number),
              {device(NM_DEVICE_TYPE_MODEM, stateOfModem(facts_, index),

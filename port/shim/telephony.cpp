@@ -88,14 +88,14 @@ int handOutNumber(const std::optional<std::string>& number, char*& slot)
     return number ? TELEPHONY_ERROR_NONE : TELEPHONY_ERROR_OPERATION_FAILED;
 }
 
-telephony_network_service_state_e serviceState(port::Service service)
+telephony_network_service_state_e serviceState(port::ServiceState service)
 {
     switch (service) {
-    case port::Service::InService:
+    case port::ServiceState::InService:
         return TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE;
-    case port::Service::EmergencyOnly:
+    case port::ServiceState::EmergencyOnly:
         return TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY;
-    case port::Service::OutOfService:
+    case port::ServiceState::OutOfService:
         break;
     }
     return TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE;
@@ -169,7 +169,7 @@ int telephony_network_get_service_state(telephony_h handle,
 {
     return port::callSlot(Call(__func__, CODES, {Question::NetworkService}), handle,
                           Question::NetworkService, &Telephony::service, state,
-                          [](port::Service service, telephony_network_service_state_e& slot) {
+                          [](port::ServiceState service, telephony_network_service_state_e& slot) {
                               return store(serviceState(service), slot);
                           });
 }

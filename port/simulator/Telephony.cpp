@@ -156,9 +156,9 @@ Result<Fact> SimulatedTelephony::imei(const SlotName& name)
     return get<std::string>(name, "imei");
 }
 
-Result<Sourced<Service>> SimulatedTelephony::service(const SlotName& name)
+Result<Sourced<ServiceState>> SimulatedTelephony::service(const SlotName& name)
 {
-    return get<Service>(name, "service");
+    return get<ServiceState>(name, "service");
 }
 
 Result<Sourced<bool>> SimulatedTelephony::roaming(const SlotName& name)

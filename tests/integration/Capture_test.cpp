@@ -6,7 +6,7 @@
 #include "support/ModemsOnBus.h"
 #include "support/Program.h"
 
-using port::Service;
+using port::ServiceState;
 
 namespace {
 
@@ -36,7 +36,7 @@ protected:
         modems->enable(id);
         ASSERT_TRUE(modems->waitUntil([&] {
             const auto service = telephony.service("/virtual/" + id);
-            return service && service.value().value == Service::InService;
+            return service && service.value().value == ServiceState::InService;
         }));
     }
 

@@ -23,7 +23,7 @@ using port::CardStatus;
 using port::CellularState;
 using port::LinkState;
 using port::Result;
-using port::Service;
+using port::ServiceState;
 using port::SlotName;
 using port::Sourced;
 using port::WifiConnection;
@@ -150,7 +150,8 @@ struct Case {
 bool isRegistered(const Facts& facts, std::size_t index)
 {
     const SlotFacts& slot = facts.slots[index];
-    return slot.isReady() && (slot.service == Service::InService || facts.connectedSlot() == index);
+    return slot.isReady() &&
+           (slot.service == ServiceState::InService || facts.connectedSlot() == index);
 }
 
 bool hasModem(const Case& now)
@@ -303,7 +304,7 @@ const Difference DIFFERENCES[] = {
     {"roaming", "a modem is abroad only where it has service",
      [](const Case& now) {
          return !now.slot().service || now.section().find("roaming") == nullptr ||
-                (now.slot().isRoaming && now.slot().service != Service::InService);
+                (now.slot().isRoaming && now.slot().service != ServiceState::InService);
      }},
     {"messages", "are ready only on a modem that is registered",
      [](const Case& now) {

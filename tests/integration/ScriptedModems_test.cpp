@@ -17,7 +17,7 @@
 using port::CardStatus;
 using port::Error;
 using port::Result;
-using port::Service;
+using port::ServiceState;
 using port::SlotName;
 using port::Sourced;
 using port::linux_backend::Bus;
@@ -121,7 +121,7 @@ TEST_F(ScriptedModemsTest, EverySimSlotOfAModemIsASlot)
     EXPECT_EQ(CardStatus::Unknown, valueOf(telephony.card(HOME + "#3")).status);
     EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME + "#1")));
     EXPECT_EQ("+15551230001", valueOf(telephony.number(HOME + "#1")));
-    EXPECT_EQ(Service::InService, valueOf(telephony.service(HOME + "#1")));
+    EXPECT_EQ(ServiceState::InService, valueOf(telephony.service(HOME + "#1")));
     EXPECT_TRUE(valueOf(telephony.smsReady(HOME + "#1")));
 }
 
@@ -303,15 +303,15 @@ TEST_F(ScriptedModemsTest, ServiceAndRoamingFollowTheRegistration)
 {
     const struct {
         int registration;
-        Service service;
+        ServiceState service;
         bool roaming;
     } rows[] = {
-        {0, Service::OutOfService, false},   {1, Service::InService, false},
-        {2, Service::OutOfService, false},   {3, Service::OutOfService, false},
-        {5, Service::InService, true},       {6, Service::InService, false},
-        {7, Service::InService, true},       {8, Service::EmergencyOnly, false},
-        {9, Service::InService, false},      {10, Service::InService, true},
-        {11, Service::EmergencyOnly, false},
+        {0, ServiceState::OutOfService, false},   {1, ServiceState::InService, false},
+        {2, ServiceState::OutOfService, false},   {3, ServiceState::OutOfService, false},
+        {5, ServiceState::InService, true},       {6, ServiceState::InService, false},
+        {7, ServiceState::InService, true},       {8, ServiceState::EmergencyOnly, false},
+        {9, ServiceState::InService, false},      {10, ServiceState::InService, true},
+        {11, ServiceState::EmergencyOnly, false},
     };
     for (const auto& row : rows) {
         FakeModem modem;
@@ -333,7 +333,7 @@ TEST_F(ScriptedModemsTest, UnknownRegistrationIsNotInvented)
         for (const char* const state : {"<-1>", "<2>", "<3>"}) { // failed, locked, disabled
             modem.modem["State"] = state;
             tell(modem);
-            EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME))) << state;
+            EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME))) << state;
             EXPECT_FALSE(valueOf(telephony.roaming(HOME))) << state;
         }
     }

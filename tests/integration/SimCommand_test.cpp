@@ -7,7 +7,7 @@
 #include "support/ModemsOnBus.h"
 #include "support/Program.h"
 
-using port::Service;
+using port::ServiceState;
 using testing::HasSubstr;
 using testing::Not;
 
@@ -29,7 +29,7 @@ protected:
         modems->enable(id);
         ASSERT_TRUE(modems->waitUntil([&] {
             const auto service = telephony.service("/virtual/" + id);
-            return service && service.value().value == Service::InService;
+            return service && service.value().value == ServiceState::InService;
         }));
     }
 

@@ -16,7 +16,7 @@
 using port::CardStatus;
 using port::Error;
 using port::Result;
-using port::Service;
+using port::ServiceState;
 using port::SlotName;
 using port::Sourced;
 using port::linux_backend::Bus;
@@ -42,7 +42,7 @@ protected:
     {
         return modems->waitUntil([&] {
             const auto service = telephony.service(slot);
-            return service && service.value().value == Service::InService;
+            return service && service.value().value == ServiceState::InService;
         });
     }
 
@@ -91,7 +91,7 @@ TEST_F(TelephonyTest, ModemAtHomeTellsEverything)
     EXPECT_EQ("+4915112345678", valueOf(telephony.number(HOME)));
     EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
 
-    EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
     EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
     modems->enable("home");
     EXPECT_TRUE(comesIntoService(HOME));
@@ -112,7 +112,7 @@ TEST_F(TelephonyTest, RoamingBeginsAndEnds)
     EXPECT_TRUE(valueOf(telephony.roaming(HOME)));
     modem.change([](AtModem::State& state) { state.registration = 1; });
     EXPECT_TRUE(modems->waitUntil([&] { return !valueOf(telephony.roaming(HOME)); }));
-    EXPECT_EQ(Service::InService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::InService, valueOf(telephony.service(HOME)));
 }
 
 TEST_F(TelephonyTest, SearchingModemIsOutOfServiceUntilItFindsItsNetwork)
@@ -121,7 +121,7 @@ TEST_F(TelephonyTest, SearchingModemIsOutOfServiceUntilItFindsItsNetwork)
     searching.registration = 2;
     AtModem& modem = modems->add("home", searching);
     modems->enable("home");
-    EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
     EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
     EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
     modem.change([](AtModem::State& state) { state.registration = 1; });
@@ -134,7 +134,7 @@ TEST_F(TelephonyTest, DeniedRegistrationIsOutOfService)
     refused.registration = 3;
     modems->add("home", refused);
     modems->enable("home");
-    EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
     EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
     EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
     EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status);
@@ -149,7 +149,7 @@ TEST_F(TelephonyTest, MissingCardIsNoSim)
     expectNoSim(telephony.imsi(HOME), "there is no SIM card");
     expectNoSim(telephony.number(HOME), "there is no SIM card");
     EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
-    EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
     EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
     EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
 }
@@ -163,7 +163,7 @@ TEST_F(TelephonyTest, CardThatWantsItsPinIsNoSim)
     expectNoSim(telephony.imsi(HOME), "the SIM card is locked: it wants a PIN");
     expectNoSim(telephony.number(HOME), "the SIM card is locked: it wants a PIN");
     EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
-    EXPECT_EQ(Service::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
 }
 
 TEST_F(TelephonyTest, CardThatWantsItsPukIsToldFromABlockedOne)

@@ -6,7 +6,7 @@ using port::Card;
 using port::CardStatus;
 using port::Error;
 using port::Imsi;
-using port::Service;
+using port::ServiceState;
 using port::Subscriptions;
 using port::Telephony;
 using testing::ElementsAre;
@@ -82,7 +82,7 @@ TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
     EXPECT_EQ(line(4), imsi.value().source);
     expectAnswer(std::optional<std::string>("+15550100"), line(7), telephony.number("cp0"));
     expectAnswer("490154203237518", line(8), telephony.imei("cp0"));
-    expectAnswer(Service::InService, line(9), telephony.service("cp0"));
+    expectAnswer(ServiceState::InService, line(9), telephony.service("cp0"));
     expectAnswer(true, line(10), telephony.roaming("cp0"));
     expectAnswer(false, line(11), telephony.smsReady("cp0"));
 }

@@ -21,7 +21,7 @@
 
 using port::CardStatus;
 using port::Error;
-using port::Service;
+using port::ServiceState;
 using port::Telephony;
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -210,7 +210,9 @@ std::string slotLine(Telephony& telephony, const port::SlotName& name)
            "; IMEI " + told(telephony.imei(name), [](const std::string& imei) { return imei; }) +
            "; " +
            told(telephony.service(name),
-                [](Service service) { return std::string(SERVICES[static_cast<int>(service)]); }) +
+                [](ServiceState service) {
+                    return std::string(SERVICES[static_cast<int>(service)]);
+                }) +
            "; roaming " + told(telephony.roaming(name), yesOrNo) + "; SMS " +
            told(telephony.smsReady(name), yesOrNo);
 }

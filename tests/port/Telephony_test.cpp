@@ -203,11 +203,11 @@ TEST_F(TelephonyListTest, StateFollowsTheCard)
 TEST_F(TelephonyListTest, ServiceStateIsTold)
 {
     const struct {
-        port::Service service;
+        port::ServiceState service;
         int state;
-    } rows[] = {{port::Service::InService, 0},
-                {port::Service::OutOfService, 1},
-                {port::Service::EmergencyOnly, 2}};
+    } rows[] = {{port::ServiceState::InService, 0},
+                {port::ServiceState::OutOfService, 1},
+                {port::ServiceState::EmergencyOnly, 2}};
     for (const auto& row : rows) {
         telephony.serviceAnswer = answered(row.service);
         telephony_network_service_state_e state = TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE;
@@ -218,7 +218,7 @@ TEST_F(TelephonyListTest, ServiceStateIsTold)
 
 TEST_F(TelephonyListTest, RoamingIsToldWhateverTheServiceIs)
 {
-    telephony.serviceAnswer = answered(port::Service::OutOfService);
+    telephony.serviceAnswer = answered(port::ServiceState::OutOfService);
     for (const bool roams : {true, false}) {
         telephony.roamingAnswer = answered(roams);
         bool roaming = !roams;

@@ -23,7 +23,7 @@ public:
     Answer<port::Imsi> imsiAnswer = answered(port::Imsi{"001", "01", "0123456789"});
     Answer<Number> numberAnswer = answered(Number("+15550100"));
     Answer<std::string> imeiAnswer = answered(std::string("490154203237518"));
-    Answer<port::Service> serviceAnswer = answered(port::Service::InService);
+    Answer<port::ServiceState> serviceAnswer = answered(port::ServiceState::InService);
     Answer<bool> roamingAnswer = answered(false);
     Answer<port::Subscriptions> subscriptionsAnswer = answered(port::Subscriptions{});
     Answer<bool> smsAnswer = answered(true);
@@ -51,7 +51,7 @@ public:
     {
         return tell("imei " + slot, imeiAnswer);
     }
-    Answer<port::Service> service(const port::SlotName& slot) override
+    Answer<port::ServiceState> service(const port::SlotName& slot) override
     {
         return tell("service " + slot, serviceAnswer);
     }
