@@ -251,7 +251,7 @@ TEST_F(SimulatorSchemaTest, NoFileTakesLong)
                  }),
     };
 // Many times slower with a sanitizer, and under the emulator of another processor.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || !defined(__x86_64__)
+#if defined(WITH_SANITIZERS) || !defined(__x86_64__)
     constexpr std::chrono::seconds LIMIT(40);
 #else
     constexpr std::chrono::seconds LIMIT(2);
