@@ -8,8 +8,6 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "../../devicefile/Descriptor.h"
-
 namespace {
 
 using port::Descriptor;
@@ -40,14 +38,25 @@ bool readUpTo(const Descriptor& file, std::size_t limit, std::string& content)
 
 } // namespace
 
+port::Descriptor port::openRegularFile(const std::string& path, std::string& problem)
+{
+    Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    problem = refusal(file);
+    return problem.empty() ? std::move(file) : Descriptor();
+}
+
+std::string port::largerThan(std::size_t limit)
+{
+    return "larger than " + std::to_string(limit) + " bytes";
+}
+
 bool port::readRegularFile(const std::string& path, std::size_t limit, std::string& content,
                            std::string& problem)
 {
-    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
-    problem = refusal(file);
+    const Descriptor file = openRegularFile(path, problem);
     if (problem.empty() && !readUpTo(file, limit, content))
         problem = std::strerror(errno);
     if (problem.empty() && content.size() > limit)
-        problem = "larger than " + std::to_string(limit) + " bytes";
+        problem = largerThan(limit);
     return problem.empty();
 }

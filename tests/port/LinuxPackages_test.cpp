@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Installed packages, from a made-up package database and from this machine's own.
+#include <fcntl.h>
 #include <gmock/gmock.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "linux/Packages.h"
@@ -114,6 +116,61 @@ TEST_F(LinuxPackagesTest, OddDatabasesAreTold)
     tree.remove(DPKG_STATUS);
     tree.write(std::string(DPKG_STATUS) + "/x", "");
     EXPECT_EQ("error: /var/lib/dpkg/status: Is a directory", version("shell"));
+}
+
+TEST_F(LinuxPackagesTest, FileThatDidNotChangeIsReadOnceAndNoFurtherThanNeeded)
+{
+    const std::string aaa = stanza("aaa", "install ok installed", "1");
+    const std::string half = stanza("half", "install ok unpacked", "1");
+    const std::string zzz = stanza("zzz", "install ok installed", "9");
+    const std::string whole = aaa + half + zzz;
+    port::linux_backend::PackageIndex index;
+    std::vector<std::size_t> reads;
+    const auto versionOf = [&](const std::string& name) {
+        const auto found = index.version(name, [&](std::size_t offset, std::string& text) {
+            reads.push_back(offset);
+            text.append(whole, offset, 10);
+            return true;
+        });
+        return found ? found.value().value_or("not installed") : found.error().reason;
+    };
+    EXPECT_EQ("1", versionOf("aaa"));
+    EXPECT_LT(reads.back(), aaa.size());
+    reads.clear();
+    EXPECT_EQ("1", versionOf("aaa"));
+    EXPECT_TRUE(reads.empty());
+    EXPECT_EQ("9", versionOf("zzz"));
+    EXPECT_EQ(aaa.size(), reads.front());
+    EXPECT_EQ("not installed", versionOf("half"));
+    reads.clear();
+    EXPECT_EQ("9", versionOf("zzz"));
+    EXPECT_EQ("not installed", versionOf("none"));
+    EXPECT_THAT(reads, testing::ElementsAre(whole.size()));
+}
+
+TEST_F(LinuxPackagesTest, ChangedFileIsReadAnew)
+{
+    LinuxPackages packages(tree.root());
+    for (const char* const version : {"1", "2", "3"}) {
+        const std::string file = tree.write(
+            DPKG_STATUS, stanza("aaa", "install ok installed", version)); // all of one size
+        EXPECT_EQ(version, packages.version("aaa").value().value);
+        const timespec long_ago[2] = {{1000000000, 0}, {1000000000, 0}};
+        ASSERT_EQ(0, utimensat(AT_FDCWD, file.c_str(), long_ago, 0));
+        EXPECT_EQ(version, packages.version("aaa").value().value);
+    }
+}
+
+TEST_F(LinuxPackagesTest, MoreThanAnIndexHoldsIsAnsweredAllTheSame)
+{
+    std::string many;
+    for (int i = 0; i < 9; ++i)
+        many += stanza("p" + std::to_string(i), "install ok installed", std::string(1000000, 'v'));
+    tree.write(DPKG_STATUS, many + stanza("last", "install ok installed", "1"));
+    LinuxPackages packages(tree.root());
+    for (const char* const name : {"last", "p8", "p0", "last"})
+        EXPECT_TRUE(packages.version(name).value().value) << name;
+    EXPECT_FALSE(packages.version("none").value().value);
 }
 
 TEST_F(LinuxPackagesTest, MachinesOwnDatabaseAgreesWithItsPackageManager)
