@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "BlueZ.h"
 
+#include <algorithm>
+
 namespace port::linux_backend {
 
 Look adapters()
@@ -14,11 +16,11 @@ Look adapters()
             }};
 }
 
-Result<std::vector<bool>> adaptersIn(const Result<Objects>& objects)
+Result<std::vector<Adapter>> adaptersIn(const Result<Objects>& objects)
 {
     if (!objects)
         return objects.error();
-    std::vector<bool> adapters;
+    std::vector<Adapter> adapters;
     for (const auto& [path, interfaces] : *objects.value()) {
         const auto adapter = Object(path, interfaces).properties(BLUEZ.interface);
         if (!adapter)
@@ -26,8 +28,10 @@ Result<std::vector<bool>> adaptersIn(const Result<Objects>& objects)
         const auto powered = adapter.value().flag("Powered");
         if (!powered)
             return notAvailable("bluez: " + powered.error().reason);
-        adapters.push_back(powered.value());
+        adapters.push_back({path.substr(path.rfind('/') + 1), powered.value()});
     }
+    std::stable_partition(adapters.begin(), adapters.end(),
+                          [](const Adapter& each) { return each.isPowered; });
     return adapters;
 }
 

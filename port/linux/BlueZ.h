@@ -3,6 +3,7 @@
 #ifndef PORT_LINUX_BLUEZ_H
 #define PORT_LINUX_BLUEZ_H
 
+#include <string>
 #include <vector>
 
 #include "Bus.h"
@@ -16,8 +17,13 @@ constexpr ObjectService ADAPTERS = {BLUEZ, "/", nullptr, BLUEZ_INTERFACES, nullp
 /// Asks for the adapters.
 Look adapters();
 
-/// Whether each adapter is switched on, from the objects of ADAPTERS.
-Result<std::vector<bool>> adaptersIn(const Result<Objects>& objects);
+struct Adapter {
+    std::string name; // "hci0"
+    bool isPowered;
+};
+
+/// The adapters, those first that are switched on, from the objects of ADAPTERS.
+Result<std::vector<Adapter>> adaptersIn(const Result<Objects>& objects);
 
 } // namespace port::linux_backend
 

@@ -48,6 +48,9 @@ struct ObjectService {
     const char* settingsSignal; // what such an object sends when that changes
 };
 
+/// Whether a question's error says that the service does not run, and not that it keeps silent.
+bool saysAbsent(const Error& error, const BusObject& service);
+
 /// The settings of an object, from GetSettings, stand beside its interfaces under such names.
 std::string settingsName(const std::string& section);
 

@@ -34,6 +34,11 @@ Error absent(const std::string& name)
     return notAvailable(name + " is not on the system bus");
 }
 
+bool saysAbsent(const Error& error, const BusObject& service)
+{
+    return error.reason == absent(service.name).reason;
+}
+
 Bus::Core::Core(std::initializer_list<const char*> services) : services_(services) {}
 
 Bus::Core::~Core()

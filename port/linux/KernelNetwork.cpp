@@ -7,6 +7,7 @@
 #include <vector>
 
 #include <net/if.h>
+#include <net/if_arp.h>
 
 #include "Files.h"
 
@@ -17,7 +18,7 @@ namespace fs = std::filesystem;
 
 constexpr char INTERFACES[] = "/sys/class/net";
 constexpr char ADAPTER_FOLDER[] = "/sys/class/bluetooth";
-constexpr char SWITCHES[] = "/sys/class/rfkill";
+constexpr char MODEM_FOLDER[] = "/sys/class/wwan";
 
 // The entries of a folder, in a fixed order; none when it is not there.
 std::vector<std::string> entriesOf(const std::string& folder)
@@ -49,10 +50,30 @@ bool isWifi(const std::string& interface)
     return exists(interface + "/phy80211") || exists(interface + "/wireless");
 }
 
+// What the kernel calls the kind of an interface; empty for a plain one.
+std::string typeOf(const std::string& interface)
+{
+    const std::string mark = "\nDEVTYPE=";
+    const std::string event = "\n" + textOf(interface, "/uevent") + "\n";
+    const std::size_t found = event.find(mark);
+    if (found == std::string::npos)
+        return "";
+    const std::size_t begin = found + mark.size();
+    return event.substr(begin, event.find('\n', begin) - begin);
+}
+
 bool isBluetooth(const std::string& interface)
 {
-    return ("\n" + textOf(interface, "/uevent") + "\n").find("\nDEVTYPE=bluetooth\n") !=
-           std::string::npos;
+    return typeOf(interface) == "bluetooth";
+}
+
+// A container's end of a pair is its socket; the machine's ends are ports of a bridge.
+bool isEthernet(const std::string& interface)
+{
+    const bool isPair = textOf(interface, "/iflink") != textOf(interface, "/ifindex") &&
+                        !exists(interface + "/master");
+    return textOf(interface, "/type") == std::to_string(ARPHRD_ETHER) && !isWifi(interface) &&
+           typeOf(interface).empty() && (exists(interface + "/device") || isPair);
 }
 
 bool isUp(const std::string& interface)
@@ -85,29 +106,38 @@ WifiConnection connectionOf(const std::string& interface)
                : WifiConnection::Disconnected;
 }
 
-// The state of the Wi-Fi interface that is furthest.
+// The state of the interface of a kind that is furthest.
 template <typename T>
-Result<Sourced<T>> furthestWifi(const std::string& root, T (*stateOf)(const std::string&))
+Result<Sourced<T>> furthest(const std::string& root, const char* kind,
+                            bool (*isOfKind)(const std::string&), T (*stateOf)(const std::string&))
 {
-    std::vector<T> states;
-    for (const std::string& interface : entriesOf(root + INTERFACES))
-        if (isWifi(interface))
-            states.push_back(stateOf(interface));
-    if (states.empty())
-        return notSupported(std::string("no Wi-Fi interface in ") + INTERFACES);
-    return Sourced<T>{*std::max_element(states.begin(), states.end()), INTERFACES};
+    Result<Sourced<T>> found =
+        notSupported(std::string("no ") + kind + " interface in " + INTERFACES);
+    for (const std::string& interface : entriesOf(root + INTERFACES)) {
+        if (!isOfKind(interface))
+            continue;
+        const T state = stateOf(interface);
+        if (!found || found.value().value < state)
+            found = Sourced<T>{state, interface.substr(root.size())};
+    }
+    return found;
 }
 
 } // namespace
 
 Result<Sourced<LinkState>> KernelNetwork::wifi() const
 {
-    return furthestWifi(root_, &linkStateOf);
+    return furthest(root_, "Wi-Fi", &isWifi, &linkStateOf);
 }
 
 Result<Sourced<WifiConnection>> KernelNetwork::wifiConnection() const
 {
-    return furthestWifi(root_, &connectionOf);
+    return furthest(root_, "Wi-Fi", &isWifi, &connectionOf);
+}
+
+Result<Sourced<LinkState>> KernelNetwork::ethernet() const
+{
+    return furthest(root_, "Ethernet", &isEthernet, &linkStateOf);
 }
 
 bool KernelNetwork::isConnectedOverBluetooth() const
@@ -121,6 +151,25 @@ bool KernelNetwork::isConnectedOverBluetooth() const
 bool KernelNetwork::hasBluetoothAdapter() const
 {
     return !entriesOf(root_ + ADAPTER_FOLDER).empty();
+}
+
+bool KernelNetwork::isBluetoothSwitchedOn() const
+{
+    const auto switches = entriesOf(root_ + SWITCHES);
+    return std::any_of(switches.begin(), switches.end(), [](const std::string& each) {
+        return textOf(each, "/type") == "bluetooth" && textOf(each, "/soft") != "1";
+    });
+}
+
+bool KernelNetwork::hasModem() const
+{
+    const auto interfaces = entriesOf(root_ + INTERFACES);
+    const auto switches = entriesOf(root_ + SWITCHES);
+    return !entriesOf(root_ + MODEM_FOLDER).empty() ||
+           std::any_of(interfaces.begin(), interfaces.end(),
+                       [](const std::string& each) { return typeOf(each) == "wwan"; }) ||
+           std::any_of(switches.begin(), switches.end(),
+                       [](const std::string& each) { return textOf(each, "/type") == "wwan"; });
 }
 
 Result<Sourced<bool>> KernelNetwork::areRadiosSwitchedOff() const

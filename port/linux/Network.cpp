@@ -37,20 +37,41 @@ WifiConnection wifiConnectionOf(std::uint32_t deviceState)
     }
 }
 
-bool isManaged(std::uint32_t deviceState)
+// An Ethernet device without a cable is "unavailable".
+LinkState ethernetStateOf(std::uint32_t deviceState)
 {
-    return deviceState > NM_DEVICE_STATE_UNMANAGED;
+    return deviceState == NM_DEVICE_STATE_ACTIVATED ? LinkState::Connected
+                                                    : LinkState::Disconnected;
 }
 
-// The state of the Wi-Fi device that is furthest.
+std::string sourceOf(const BusObject& service, const std::string& part)
+{
+    return service.name + (part.empty() ? "" : " " + part);
+}
+
+// The state of the device that is furthest, of those that NetworkManager manages.
 template <typename T>
-Result<T> wifiIn(const Result<NetworkView>& now, T off, T (*stateOf)(std::uint32_t deviceState))
+std::optional<Sourced<T>> furthestOf(const std::vector<NetworkDevice>& devices,
+                                     T (*stateOf)(std::uint32_t deviceState))
+{
+    std::optional<Sourced<T>> furthest;
+    for (const NetworkDevice& device : devices) {
+        const T state = stateOf(device.state);
+        if (device.state > NM_DEVICE_STATE_UNMANAGED && (!furthest || furthest->value < state))
+            furthest = Sourced<T>{state, sourceOf(NETWORK_MANAGER, device.interface)};
+    }
+    return furthest;
+}
+
+template <typename T>
+Result<Sourced<T>> wifiIn(const Result<NetworkView>& now, T off,
+                          T (*stateOf)(std::uint32_t deviceState))
 {
     if (!now)
         return now.error();
     const NetworkView& view = now.value();
     const auto isThere = view.isThere(Radio::Wifi);
-    const auto devices = view.statesOf(NM_DEVICE_TYPE_WIFI);
+    const auto devices = view.devicesOf({NM_DEVICE_TYPE_WIFI});
     const auto isOn = view.isOn(Radio::Wifi);
     const auto networking = view.isOn();
     if (!isThere || !isThere.value())
@@ -58,14 +79,27 @@ Result<T> wifiIn(const Result<NetworkView>& now, T off, T (*stateOf)(std::uint32
     if (!devices || !isOn || !networking)
         return devices ? isOn ? networking.error() : isOn.error() : devices.error();
     if (!isOn.value() || !networking.value() || devices.value().empty())
-        return off;
-    std::vector<T> states;
-    for (const std::uint32_t device : devices.value())
-        if (isManaged(device))
-            states.push_back(stateOf(device));
-    if (states.empty())
+        return Sourced<T>{off, NETWORK_MANAGER.name};
+    const auto furthest = furthestOf(devices.value(), stateOf);
+    if (!furthest)
         return notAvailable("NetworkManager leaves the Wi-Fi device to others");
-    return *std::max_element(states.begin(), states.end());
+    return *furthest;
+}
+
+Result<Sourced<LinkState>> ethernetIn(const Result<NetworkView>& view)
+{
+    if (!view)
+        return view.error();
+    const auto devices = view.value().devicesOf({NM_DEVICE_TYPE_ETHERNET});
+    const auto networking = view.value().isOn();
+    if (!devices || !networking)
+        return devices ? networking.error() : devices.error();
+    auto furthest = furthestOf(devices.value(), &ethernetStateOf);
+    if (!furthest)
+        return notAvailable("NetworkManager manages no Ethernet device");
+    if (!networking.value())
+        furthest->value = LinkState::Deactivated;
+    return *furthest;
 }
 
 template <typename T>
@@ -78,11 +112,11 @@ Result<Sourced<T>> from(const BusObject& service, const Result<T>& answer)
 
 // NetworkManager's answer, or the kernel's when it has none.
 template <typename T>
-Result<Sourced<T>> orKernel(const Result<T>& answer, const KernelNetwork& kernel,
+Result<Sourced<T>> orKernel(const Result<Sourced<T>>& answer, const KernelNetwork& kernel,
                             Result<Sourced<T>> (KernelNetwork::*read)() const)
 {
     if (answer || answer.error().kind != Error::Kind::NotAvailable)
-        return from(NETWORK_MANAGER, answer);
+        return answer;
     return orElse(answer.error(), (kernel.*read)());
 }
 
@@ -102,10 +136,13 @@ Result<bool> areRadiosSwitchedOff(const NetworkView& view)
     return isWifiThere.value() ? !isWifiOn.value() : !isCellularOn.value();
 }
 
-bool hasActivated(const Result<std::vector<std::uint32_t>>& deviceStates)
+bool hasActivated(const NetworkView& view, NMDeviceType type)
 {
-    return deviceStates && std::count(deviceStates.value().begin(), deviceStates.value().end(),
-                                      NM_DEVICE_STATE_ACTIVATED) != 0;
+    const auto devices = view.devicesOf({type});
+    return devices && std::any_of(devices.value().begin(), devices.value().end(),
+                                  [](const NetworkDevice& device) {
+                                      return device.state == NM_DEVICE_STATE_ACTIVATED;
+                                  });
 }
 
 bool isAbroad(const Modem& modem)
@@ -142,13 +179,15 @@ Result<CellularState> cellularStateOf(const Modem& modem)
 }
 
 // Of the modem that is furthest; a modem that cannot be read counts only when no other can.
-Result<CellularState> furthestOf(const std::vector<Modem>& modems)
+Result<Sourced<CellularState>> furthestOf(const std::vector<Modem>& modems)
 {
-    std::optional<Result<CellularState>> furthest;
+    std::optional<Result<Sourced<CellularState>>> furthest;
     for (const Modem& modem : modems) {
         const auto state = cellularStateOf(modem);
-        if (!furthest || !*furthest || (state && state.value() > furthest->value()))
-            furthest = state;
+        if (!furthest || !*furthest || (state && state.value() > furthest->value().value))
+            furthest = state ? Sourced<CellularState>{state.value(),
+                                                      sourceOf(MODEM_MANAGER, modem.device())}
+                             : Result<Sourced<CellularState>>(state.error());
     }
     return furthest ? *furthest : notSupported("ModemManager knows no modem");
 }
@@ -186,6 +225,26 @@ Result<bool> isPacketDataOn(const NetworkView& view)
                        [](const auto& connection) { return connection.connectsItself; });
 }
 
+bool isAnyConnected(const std::vector<Modem>& modems)
+{
+    return std::any_of(modems.begin(), modems.end(), [](const Modem& modem) {
+        const auto state = modem.state();
+        return state && state.value() == MM_MODEM_STATE_CONNECTED;
+    });
+}
+
+// A setting of the cellular radio, for a machine that has one.
+Result<Sourced<bool>> cellularSetting(const Result<NetworkView>& view,
+                                      Result<bool> (*read)(const NetworkView&))
+{
+    if (!view)
+        return view.error();
+    const auto isThere = view.value().isThere(Radio::Cellular);
+    if (!isThere || !isThere.value())
+        return isThere ? notSupported("NetworkManager knows no modem") : isThere.error();
+    return from(NETWORK_MANAGER, read(view.value()));
+}
+
 } // namespace
 
 Result<NetworkView> LinuxNetwork::view()
@@ -215,19 +274,41 @@ Result<Sourced<LinkState>> LinuxNetwork::bluetooth()
         return adapters.error();
     if (adapters.value().empty())
         return notSupported("BlueZ knows no Bluetooth adapter");
-    if (std::count(adapters.value().begin(), adapters.value().end(), true) == 0)
-        return Sourced<LinkState>{LinkState::Deactivated, BLUEZ.name};
+    const Adapter& first = adapters.value().front();
+    const std::string source = sourceOf(BLUEZ, first.name);
+    if (!first.isPowered)
+        return Sourced<LinkState>{LinkState::Deactivated, source};
     const auto view = NetworkView::from(replies[1]);
-    const bool isConnected = view ? hasActivated(view.value().statesOf(NM_DEVICE_TYPE_BT))
-                                  : kernel_.isConnectedOverBluetooth();
-    return Sourced<LinkState>{isConnected ? LinkState::Connected : LinkState::Disconnected,
-                              BLUEZ.name};
+    const bool isConnected =
+        view ? hasActivated(view.value(), NM_DEVICE_TYPE_BT) : kernel_.isConnectedOverBluetooth();
+    return Sourced<LinkState>{isConnected ? LinkState::Connected : LinkState::Disconnected, source};
 }
 
-Result<Sourced<bool>> LinuxNetwork::flightModeIn(const Result<NetworkView>& view) const
+Result<Sourced<LinkState>> LinuxNetwork::ethernet()
+{
+    return orKernel(ethernetIn(view()), kernel_, &KernelNetwork::ethernet);
+}
+
+// BlueZ, or where it does not tell the kernel's switches; nobody when Bluetooth is off.
+std::string LinuxNetwork::whoHasBluetoothOn()
+{
+    const auto adapters = adaptersIn(bus_.look(linux_backend::adapters()));
+    if (!adapters)
+        return kernel_.isBluetoothSwitchedOn() ? KernelNetwork::SWITCHES : "";
+    const bool isOn = !adapters.value().empty() && adapters.value().front().isPowered;
+    return isOn ? sourceOf(BLUEZ, adapters.value().front().name) : "";
+}
+
+// Bluetooth is asked only where all else is off.
+Result<Sourced<bool>> LinuxNetwork::flightModeIn(const Result<NetworkView>& view)
 {
     const auto off = view ? areRadiosSwitchedOff(view.value()) : Result<bool>(view.error());
-    return orKernel(off, kernel_, &KernelNetwork::areRadiosSwitchedOff);
+    auto flightMode =
+        orKernel(from(NETWORK_MANAGER, off), kernel_, &KernelNetwork::areRadiosSwitchedOff);
+    if (!flightMode || !flightMode.value().value)
+        return flightMode;
+    const std::string witness = whoHasBluetoothOn();
+    return witness.empty() ? flightMode : Sourced<bool>{false, witness};
 }
 
 Result<Sourced<bool>> LinuxNetwork::flightMode()
@@ -235,21 +316,14 @@ Result<Sourced<bool>> LinuxNetwork::flightMode()
     return flightModeIn(view());
 }
 
-// A setting of the cellular radio, for a machine that has one.
-Result<Sourced<bool>> LinuxNetwork::cellularSetting(Result<bool> (*read)(const NetworkView&))
-{
-    const auto now = view();
-    if (!now)
-        return now.error();
-    const auto isThere = now.value().isThere(Radio::Cellular);
-    if (!isThere || !isThere.value())
-        return isThere ? notSupported("NetworkManager knows no modem") : isThere.error();
-    return from(NETWORK_MANAGER, read(now.value()));
-}
-
+// Data that flows is on, whoever had it flow: a connection may be made of ModemManager itself.
 Result<Sourced<bool>> LinuxNetwork::packetData()
 {
-    return cellularSetting(&isPacketDataOn);
+    const auto replies = bus_.look({{NETWORKS, nullptr}, modems()});
+    const auto modems = modemsIn(replies[1]);
+    if (modems && isAnyConnected(modems.value()))
+        return Sourced<bool>{true, MODEM_MANAGER.name};
+    return cellularSetting(NetworkView::from(replies[0]), &isPacketDataOn);
 }
 
 // The platform keeps the setting and its effect apart; NetworkManager keeps one of them.
@@ -260,34 +334,42 @@ Result<Sourced<bool>> LinuxNetwork::mobileData()
 
 Result<Sourced<bool>> LinuxNetwork::dataRoaming()
 {
-    return cellularSetting(&isRoamingAllowed);
+    return cellularSetting(view(), &isRoamingAllowed);
 }
 
-Result<CellularState> LinuxNetwork::cellularIn(const std::vector<Modem>& modems,
-                                               const Result<NetworkView>& view) const
+Result<Sourced<CellularState>> LinuxNetwork::cellularIn(const std::vector<Modem>& modems,
+                                                        const Result<NetworkView>& view)
 {
     const auto state = furthestOf(modems);
-    if (!state || state.value() == CellularState::Connected)
+    if (!state || state.value().value == CellularState::Connected)
         return state;
-    if (view && hasActivated(view.value().statesOf(NM_DEVICE_TYPE_MODEM)))
-        return CellularState::Connected;
+    const auto but = [&state](CellularState other) {
+        return Sourced<CellularState>{other, state.value().source};
+    };
+    if (view && hasActivated(view.value(), NM_DEVICE_TYPE_MODEM))
+        return but(CellularState::Connected);
     const auto flightMode = flightModeIn(view);
     if (flightMode && flightMode.value().value)
-        return CellularState::FlightMode;
-    if (state.value() != CellularState::RoamingOff)
+        return but(CellularState::FlightMode);
+    if (state.value().value != CellularState::RoamingOff)
         return state;
     const auto allowed = view ? isRoamingAllowed(view.value()) : Result<bool>(view.error());
     // Where nobody forbids it, data is allowed abroad.
-    return allowed && !allowed.value() ? CellularState::RoamingOff : CellularState::Available;
+    return but(allowed && !allowed.value() ? CellularState::RoamingOff : CellularState::Available);
 }
 
 Result<Sourced<CellularState>> LinuxNetwork::cellular()
 {
     const auto replies = bus_.look({modems(), {NETWORKS, nullptr}});
     const auto modems = modemsIn(replies[0]);
-    if (!modems)
+    const auto view = NetworkView::from(replies[1]);
+    if (modems)
+        return cellularIn(modems.value(), view);
+    const auto isKnown = view ? view.value().isThere(Radio::Cellular) : Result<bool>(false);
+    if (!saysAbsent(modems.error(), MODEM_MANAGER) || !isKnown || isKnown.value() ||
+        kernel_.hasModem())
         return modems.error();
-    return from(MODEM_MANAGER, cellularIn(modems.value(), NetworkView::from(replies[1])));
+    return notSupported(modems.error().reason + "; no modem in /sys/class");
 }
 
 std::unique_ptr<Watch> LinuxNetwork::watch(std::function<void()> changed)

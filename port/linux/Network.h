@@ -20,6 +20,7 @@ public:
     Result<Sourced<LinkState>> wifi() override;
     Result<Sourced<WifiConnection>> wifiConnection() override;
     Result<Sourced<LinkState>> bluetooth() override;
+    Result<Sourced<LinkState>> ethernet();
     Result<Sourced<bool>> flightMode();
     Result<Sourced<bool>> packetData();
     Result<Sourced<bool>> mobileData();
@@ -28,10 +29,10 @@ public:
 
 private:
     Result<NetworkView> view();
-    Result<Sourced<bool>> cellularSetting(Result<bool> (*read)(const NetworkView&));
-    Result<Sourced<bool>> flightModeIn(const Result<NetworkView>& view) const;
-    Result<CellularState> cellularIn(const std::vector<Modem>& modems,
-                                     const Result<NetworkView>& view) const;
+    Result<Sourced<bool>> flightModeIn(const Result<NetworkView>& view);
+    std::string whoHasBluetoothOn();
+    Result<Sourced<CellularState>> cellularIn(const std::vector<Modem>& modems,
+                                              const Result<NetworkView>& view);
 
     Bus& bus_;
     const KernelNetwork kernel_;

@@ -119,31 +119,35 @@ Result<bool> NetworkView::isOn(Radio radio) const
 Result<bool> NetworkView::isThere(Radio radio) const
 {
     const Result<Properties> all = manager();
-    const auto states = statesOf(rowOf(radio).device);
-    if (!all || !states)
-        return all ? states.error() : all.error();
+    const auto devices = devicesOf({rowOf(radio).device});
+    if (!all || !devices)
+        return all ? devices.error() : all.error();
     // The flags are there from version 1.38 on; they know a radio whose device has gone.
     const Result<std::uint32_t> flags = all.value().number("RadioFlags");
-    return !states.value().empty() || (flags && (flags.value() & rowOf(radio).flag) != 0);
+    return !devices.value().empty() || (flags && (flags.value() & rowOf(radio).flag) != 0);
 }
 
-Result<std::vector<std::uint32_t>> NetworkView::statesOf(NMDeviceType type) const
+Result<std::vector<NetworkDevice>>
+NetworkView::devicesOf(std::initializer_list<NMDeviceType> types) const
 {
-    std::vector<std::uint32_t> states;
+    std::vector<NetworkDevice> devices;
     for (const auto& [path, interfaces] : *objects_) {
         const Object object(path, interfaces);
         const Result<Properties> device = object.properties(NM_DBUS_INTERFACE_DEVICE);
         if (!device)
             continue;
         const Result<std::uint32_t> kind = device.value().number("DeviceType");
-        if (kind && kind.value() != static_cast<std::uint32_t>(type))
+        if (kind && std::none_of(types.begin(), types.end(), [&kind](NMDeviceType type) {
+                return kind.value() == static_cast<std::uint32_t>(type);
+            }))
             continue;
         const Result<std::uint32_t> state = device.value().number("State");
         if (!kind || !state)
             return fromNetworkManager(kind ? state.error() : kind.error());
-        states.push_back(state.value());
+        const Result<std::string> interface = device.value().text("Interface");
+        devices.push_back({state.value(), interface ? interface.value() : ""});
     }
-    return states;
+    return devices;
 }
 
 // Whether a predicate holds for one of the connections that are up or coming up.

@@ -3,6 +3,7 @@
 #ifndef PORT_LINUX_NETWORK_MANAGER_H
 #define PORT_LINUX_NETWORK_MANAGER_H
 
+#include <initializer_list>
 #include <optional>
 #include <string>
 #include <vector>
@@ -30,6 +31,12 @@ constexpr ObjectService NETWORKS = {NETWORK_MANAGER,
 
 enum class Radio { Wifi, Cellular };
 
+// A device that NetworkManager knows; a number, since a service may say what its enumeration lacks.
+struct NetworkDevice {
+    std::uint32_t state;   // NMDeviceState
+    std::string interface; // empty when it has none
+};
+
 // A connection of type gsm or cdma as the user set it up.
 struct CellularConnection {
     bool isActive = false;
@@ -51,8 +58,8 @@ public:
     /// The same and the switch on the case, where there is one.
     Result<bool> isOn(Radio radio) const;
     Result<bool> isThere(Radio radio) const;
-    /// Of all devices of that type; numbers, since a service may say what its enumeration lacks.
-    Result<std::vector<std::uint32_t>> statesOf(NMDeviceType type) const; // NMDeviceState
+    /// All devices of one of these types.
+    Result<std::vector<NetworkDevice>> devicesOf(std::initializer_list<NMDeviceType> types) const;
     /// Whether a cellular connection is up, or coming up.
     bool hasActiveCellularConnection() const;
 

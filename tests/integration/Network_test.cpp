@@ -5,6 +5,7 @@
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <filesystem>
 #include <mutex>
 #include <numeric>
 #include <optional>
@@ -60,6 +61,7 @@ struct Networks {
     bool cellularOn = true;
     unsigned radioFlags = 3;
     std::vector<std::pair<unsigned, unsigned>> devices; // type and state
+    std::vector<std::string> interfaces;                // of these
     std::vector<std::string> connections;               // "connection" and further settings
     int active = -1;                                    // one of the connections
 };
@@ -100,7 +102,10 @@ std::string objectsOf(const Networks& networks)
         objects.push_back(object(std::string(NM_PATH) + "/Devices/" + std::to_string(i),
                                  std::string(NM) + ".Device",
                                  number("DeviceType", networks.devices[i].first) + ", " +
-                                     number("State", networks.devices[i].second)));
+                                     number("State", networks.devices[i].second) +
+                                     (i < networks.interfaces.size()
+                                          ? ", 'Interface': <'" + networks.interfaces[i] + "'>"
+                                          : "")));
     for (std::size_t i = 0; i < networks.connections.size(); ++i)
         objects.push_back(object(connectionPath(i), std::string(NM) + ".Settings.Connection",
                                  "'Unsaved': <false>"));
@@ -128,6 +133,13 @@ std::string shown(T value, const char* source)
 {
     return show(Result<Sourced<T>>(Sourced<T>{value, source}));
 }
+
+// The source of what a modem tells.
+const char MODEM_0[] = "org.freedesktop.ModemManager1 /org/freedesktop/ModemManager1/Modem/0";
+const char MODEM_2[] = "org.freedesktop.ModemManager1 /org/freedesktop/ModemManager1/Modem/2";
+
+const char HCI_0[] = "org.bluez hci0";
+const char HCI_1[] = "org.bluez hci1";
 
 const std::string ON = "1 <org.freedesktop.NetworkManager>";
 const std::string OFF = "0 <org.freedesktop.NetworkManager>";
@@ -269,8 +281,9 @@ TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
     root.write("/sys/class/net/wlan0/flags", "0x1003\n");
     root.write("/sys/class/net/wlan0/carrier", "1\n");
     root.write("/sys/class/net/wlan0/operstate", "up\n");
-    EXPECT_EQ(shown(LinkState::Connected, "/sys/class/net"), show(network.wifi()));
-    EXPECT_EQ(shown(WifiConnection::Connected, "/sys/class/net"), show(network.wifiConnection()));
+    const char wlan[] = "/sys/class/net/wlan0";
+    EXPECT_EQ(shown(LinkState::Connected, wlan), show(network.wifi()));
+    EXPECT_EQ(shown(WifiConnection::Connected, wlan), show(network.wifiConnection()));
 }
 
 TEST_F(NetworkTest, KernelAnswersWithoutNetworkManager)
@@ -290,18 +303,18 @@ TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
 {
     serve(Networks());
     serveAdapters({"'Powered': <false>"});
-    EXPECT_EQ(shown(LinkState::Deactivated, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
     serveAdapters({"'Powered': <false>", "'Powered': <true>"});
-    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Disconnected, HCI_1), show(network.bluetooth()));
     Networks networks;
     networks.devices = {{BLUETOOTH, 30}};
     serve(networks);
-    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Disconnected, HCI_1), show(network.bluetooth()));
     networks.devices = {{BLUETOOTH, 30}, {BLUETOOTH, 100}};
     serve(networks);
-    EXPECT_EQ(shown(LinkState::Connected, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Connected, HCI_1), show(network.bluetooth()));
     serveAdapters({"'Powered': <false>"});
-    EXPECT_EQ(shown(LinkState::Deactivated, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
 }
 
 TEST_F(NetworkTest, MachineWithoutBluetoothHasNone)
@@ -322,9 +335,9 @@ TEST_F(NetworkTest, KernelTellsOfABluetoothConnectionWithoutNetworkManager)
     root.write("/sys/class/net/bnep0/flags", "0x1003\n");
     root.write("/sys/class/net/bnep0/carrier", "1\n");
     root.write("/sys/class/net/bnep0/operstate", "down\n");
-    EXPECT_EQ(shown(LinkState::Disconnected, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Disconnected, HCI_0), show(network.bluetooth()));
     root.write("/sys/class/net/bnep0/operstate", "up\n");
-    EXPECT_EQ(shown(LinkState::Connected, BLUEZ), show(network.bluetooth()));
+    EXPECT_EQ(shown(LinkState::Connected, HCI_0), show(network.bluetooth()));
 }
 
 TEST_F(NetworkTest, FlightModeIsEveryRadioSwitchedOff)
@@ -349,6 +362,30 @@ TEST_F(NetworkTest, FlightModeIsEveryRadioSwitchedOff)
         EXPECT_EQ(row.flightMode ? ON : OFF, show(network.flightMode()))
             << row.radios << row.wifiOn << row.cellularOn;
     }
+}
+
+TEST_F(NetworkTest, BluetoothThatIsOnIsNoFlightMode)
+{
+    Networks networks;
+    networks.radioFlags = 1;
+    networks.wifiOn = false;
+    serve(networks);
+    EXPECT_EQ(ON, show(network.flightMode()));
+    root.write("/sys/class/rfkill/rfkill0/type", "bluetooth\n");
+    root.write("/sys/class/rfkill/rfkill0/soft", "0\n");
+    EXPECT_EQ("0 </sys/class/rfkill>", show(network.flightMode()));
+    serveAdapters({"'Powered': <false>"}); // BlueZ knows better
+    EXPECT_EQ(ON, show(network.flightMode()));
+    serveAdapters({});
+    EXPECT_EQ(ON, show(network.flightMode()));
+    serveAdapters({"'Powered': <false>", "'Powered': <true>"});
+    EXPECT_EQ("0 <org.bluez hci1>", show(network.flightMode()));
+    serveModems({"'State': <3>"});
+    EXPECT_EQ(shown(CellularState::OutOfService, MODEM_0), show(network.cellular()));
+    networkManager.reset(); // the kernel's switches count
+    root.write("/sys/class/rfkill/rfkill1/type", "wlan\n");
+    root.write("/sys/class/rfkill/rfkill1/soft", "1\n");
+    EXPECT_EQ("0 <org.bluez hci1>", show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, SwitchOnTheCaseIsNoFlightMode)
@@ -382,6 +419,57 @@ TEST_F(NetworkTest, DataIsOnWhenAConnectionWouldComeUp)
     networks.cellularOn = false;
     serve(networks);
     EXPECT_EQ(OFF, show(network.packetData()));
+}
+
+TEST_F(NetworkTest, DataIsOnWhileAModemIsConnectedWhoeverHadItConnect)
+{
+    const std::string on = "1 <org.freedesktop.ModemManager1>";
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    serve(networks);
+    serveModems({"'State': <8>", "'State': <11>"});
+    EXPECT_EQ(on, show(network.packetData()));
+    EXPECT_EQ(on, show(network.mobileData()));
+    networkManager.reset();
+    EXPECT_EQ(on, show(network.mobileData()));
+    serve(networks);
+    serveModems({"'State': <8>"});
+    EXPECT_EQ(OFF, show(network.mobileData()));
+}
+
+TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
+{
+    const struct {
+        unsigned device;
+        bool networking;
+        LinkState state;
+    } rows[] = {{20, true, LinkState::Disconnected},
+                {70, true, LinkState::Disconnected},
+                {100, true, LinkState::Connected},
+                {100, false, LinkState::Deactivated}};
+    for (const auto& row : rows) {
+        Networks networks;
+        networks.networking = row.networking;
+        networks.devices = {{1, 10}, {1, row.device}, {WIFI, 100}};
+        networks.interfaces = {"eth0", "eth1", "wlan0"};
+        serve(networks);
+        EXPECT_EQ(shown(row.state, "org.freedesktop.NetworkManager eth1"), show(network.ethernet()))
+            << row.device;
+        if (row.networking) {
+            EXPECT_EQ(shown(LinkState::Connected, "org.freedesktop.NetworkManager wlan0"),
+                      show(network.wifi()));
+        }
+    }
+    Networks networks;
+    networks.devices = {{1, 10}};
+    serve(networks);
+    EXPECT_EQ("not supported: NetworkManager manages no Ethernet device; "
+              "no Ethernet interface in /sys/class/net",
+              show(network.ethernet()));
+    root.write("/sys/class/net/eth0/type", "1\n");
+    root.write("/sys/class/net/eth0/device/uevent", "");
+    root.write("/sys/class/net/eth0/flags", "0x1003\n");
+    EXPECT_EQ(shown(LinkState::Disconnected, "/sys/class/net/eth0"), show(network.ethernet()));
 }
 
 TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
@@ -444,7 +532,7 @@ TEST_F(NetworkTest, CellularFollowsTheModem)
     };
     for (const auto& row : rows) {
         serveModems({row.modem});
-        EXPECT_EQ(shown(row.state, MM), show(network.cellular())) << row.modem;
+        EXPECT_EQ(shown(row.state, MODEM_0), show(network.cellular())) << row.modem;
     }
 }
 
@@ -455,12 +543,12 @@ TEST_F(NetworkTest, RoamingIsOffWhereTheConnectionForbidsIt)
     networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
     serve(networks);
     serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
-    EXPECT_EQ(shown(CellularState::RoamingOff, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::RoamingOff, MODEM_0), show(network.cellular()));
     serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
-    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::Available, MODEM_0), show(network.cellular()));
     networkManager.reset();
     serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
-    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::Available, MODEM_0), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, FlightModeHidesTheModemThatIsNotConnected)
@@ -470,9 +558,9 @@ TEST_F(NetworkTest, FlightModeHidesTheModemThatIsNotConnected)
     networks.cellularOn = false;
     serve(networks);
     serveModems({"'State': <3>"});
-    EXPECT_EQ(shown(CellularState::FlightMode, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::FlightMode, MODEM_0), show(network.cellular()));
     serveModems({"'State': <11>"});
-    EXPECT_EQ(shown(CellularState::Connected, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::Connected, MODEM_0), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
@@ -481,20 +569,27 @@ TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
     networks.devices = {{MODEM, 100}};
     serve(networks);
     serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
-    EXPECT_EQ(shown(CellularState::Connected, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::Connected, MODEM_0), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, ModemThatIsFurthestCounts)
 {
     serveModems({"'State': <'broken'>", "'State': <3>",
                  "'State': <8>|'RegistrationState': <uint32 1>", "'State': <7>"});
-    EXPECT_EQ(shown(CellularState::Available, MM), show(network.cellular()));
+    EXPECT_EQ(shown(CellularState::Available, MODEM_2), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
 {
-    EXPECT_EQ("error: org.freedesktop.ModemManager1 is not on the system bus",
-              show(network.cellular()));
+    const std::string reason = "org.freedesktop.ModemManager1 is not on the system bus";
+    EXPECT_EQ("not supported: " + reason + "; no modem in /sys/class", show(network.cellular()));
+    root.write("/sys/class/wwan/wwan0/uevent", "");
+    EXPECT_EQ("error: " + reason, show(network.cellular()));
+    std::filesystem::remove_all(root.path("/sys/class/wwan"));
+    Networks networks;
+    networks.devices = {{MODEM, 30}};
+    serve(networks);
+    EXPECT_EQ("error: " + reason, show(network.cellular()));
     serveModems({});
     EXPECT_EQ("not supported: ModemManager knows no modem", show(network.cellular()));
 }

@@ -114,6 +114,52 @@ TEST_F(LinuxKernelNetworkTest, RadiosAreOffWhenEverySwitchIs)
     EXPECT_FALSE(kernel.areRadiosSwitchedOff().value().value);
 }
 
+TEST_F(LinuxKernelNetworkTest, EthernetIsACardOrAContainersEndOfAPair)
+{
+    const struct {
+        const char* name;
+        std::vector<std::pair<const char*, const char*>> files;
+        bool counts;
+    } rows[] = {
+        {"br0", {{"uevent", "DEVTYPE=bridge\n"}, {"iflink", "2"}, {"ifindex", "2"}}, false},
+        {"dummy0", {{"iflink", "3"}, {"ifindex", "3"}}, false},
+        {"lo", {{"type", "772"}, {"device/uevent", ""}}, false},
+        {"veth0", {{"iflink", "9"}, {"ifindex", "4"}, {"master/uevent", ""}}, false},
+        {"wlan0", {{"device/uevent", ""}, {"wireless/status", ""}}, false},
+        {"wwan0", {{"uevent", "DEVTYPE=wwan\n"}, {"device/uevent", ""}}, false},
+        {"eth0", {{"device/uevent", ""}}, true},
+        {"eth1", {{"iflink", "9"}, {"ifindex", "5"}}, true},
+    };
+    for (const auto& row : rows) {
+        const TemporaryTree machine;
+        const std::string folder = std::string("/sys/class/net/") + row.name;
+        machine.write(folder + "/type", "1\n");
+        for (const auto& [file, text] : row.files)
+            machine.write(folder + "/" + file, text);
+        const auto found = KernelNetwork(machine.root()).ethernet();
+        EXPECT_EQ(row.counts, static_cast<bool>(found)) << row.name;
+        EXPECT_EQ(row.counts ? folder : "no Ethernet interface in /sys/class/net",
+                  found ? found.value().source : found.error().reason);
+    }
+}
+
+TEST_F(LinuxKernelNetworkTest, ModemAndSwitchOfBluetoothAreFound)
+{
+    EXPECT_FALSE(kernel.hasModem());
+    EXPECT_FALSE(kernel.isBluetoothSwitchedOn());
+    addSwitch("rfkill0", "bluetooth", "1");
+    EXPECT_FALSE(kernel.isBluetoothSwitchedOn());
+    addSwitch("rfkill1", "bluetooth", "0");
+    EXPECT_TRUE(kernel.isBluetoothSwitchedOn());
+    for (const auto& [file, text] : {std::pair("/sys/class/wwan/wwan0/uevent", ""),
+                                     {"/sys/class/net/wwan0/uevent", "DEVTYPE=wwan\n"},
+                                     {"/sys/class/rfkill/rfkill0/type", "wwan\n"}}) {
+        const TemporaryTree machine;
+        machine.write(file, text);
+        EXPECT_TRUE(KernelNetwork(machine.root()).hasModem()) << file;
+    }
+}
+
 TEST_F(LinuxKernelNetworkTest, MachinesOwnTreeIsReadWithoutHarm)
 {
     const KernelNetwork own("");
