@@ -218,6 +218,23 @@ Ask yesOrNo(std::vector<Question> questions, std::function<bool()> read)
     };
 }
 
+// What the port tells of a link alone; a device that has none tells why not in place of a source.
+Ask link(Question question)
+{
+    return [question](const Origins&) {
+        const auto [word, origin] = coresystem_port::ask(question);
+        if (word.empty())
+            return noAnswer(origin.reason);
+        return Fact{"", word, origin.available ? origin.source : origin.reason, ""};
+    };
+}
+
+bool isMissing(Question link)
+{
+    return coresystem_port::ask(link).word == "not_supported";
+}
+
+// What is not there is not connected; what cannot be asked may be.
 Ask connected(bool overWifi, bool overBluetooth)
 {
     std::vector<Question> counted = {Question::Cellular};
@@ -225,7 +242,37 @@ Ask connected(bool overWifi, bool overBluetooth)
         counted.push_back(Question::Wifi);
     if (overBluetooth)
         counted.push_back(Question::Bluetooth);
-    return yesOrNo(counted, [=] { return library().IsNetworkConnected(overWifi, overBluetooth); });
+    return [=](const Origins& origins) {
+        const bool isOn = library().IsNetworkConnected(overWifi, overBluetooth);
+        std::vector<std::string> sources;
+        std::vector<std::string> missing;
+        std::vector<std::string> unknown;
+        for (const Question question : counted) {
+            const auto origin = origins.of(question);
+            if (origin.available)
+                sources.push_back(origin.source);
+            else
+                (isOn || isMissing(question) ? missing : unknown).push_back(origin.reason);
+        }
+        if (!unknown.empty())
+            return noAnswer(butTold(joined(unknown), "no"));
+        return Fact{"", isOn, joined(sources.empty() ? missing : sources), ""};
+    };
+}
+
+// As a person means it: also by cable, and by what only the network's manager knows.
+Fact askConnectedAny(const Origins& origins)
+{
+    const Fact told = connected(true, true)(origins);
+    if (told.value == true)
+        return told;
+    const auto ethernet = coresystem_port::ask(Question::Ethernet);
+    const auto connectivity = coresystem_port::ask(Question::Connectivity);
+    if (ethernet.word == "connected")
+        return {"", true, ethernet.origin.source, ""};
+    if (!connectivity.word.empty() && connectivity.word != "none")
+        return {"", true, connectivity.origin.source, ""};
+    return ethernet.word.empty() ? noAnswer(joined({ethernet.origin.reason, told.reason})) : told;
 }
 
 Fact askSalesCode(const Origins& origins)
@@ -332,10 +379,15 @@ std::vector<FactRow> allFacts()
         {"data_roaming",
          yesOrNo({Question::DataRoaming}, [] { return library().IsDataRoamingEnabled(); })},
         {"mobile_data", yesOrNo({Question::MobileData}, [] { return library().IsMobileData(); })},
+        {"cellular", link(Question::Cellular)},
+        {"wifi", link(Question::Wifi)},
+        {"bluetooth", link(Question::Bluetooth)},
+        {"ethernet", link(Question::Ethernet)},
+        {"connectivity", link(Question::Connectivity)},
         {"connected_cellular", connected(false, false)},
-        {"connected_wifi", connected(true, false)},
-        {"connected_bluetooth", connected(false, true)},
-        {"connected_any", connected(true, true)},
+        {"connected_cellular_or_wifi", connected(true, false)},
+        {"connected_cellular_or_bluetooth", connected(false, true)},
+        {"connected_any", askConnectedAny},
         {"sales_code", askSalesCode},
         {"storage_available",
          yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
@@ -361,8 +413,9 @@ const std::vector<FactRow>& facts()
 
 const FactRow& rowOf(const std::string& name)
 {
+    const std::string meant = cli::factNameOf(name);
     return *std::find_if(facts().begin(), facts().end(),
-                         [&](const FactRow& each) { return each.name == name; });
+                         [&](const FactRow& each) { return each.name == meant; });
 }
 
 bool isDaemons(const std::string& name)
@@ -492,7 +545,7 @@ std::vector<std::string> cli::factNames()
 
 void cli::checkFactName(const std::string& name, const std::vector<std::string>& names)
 {
-    if (std::find(names.begin(), names.end(), name) != names.end())
+    if (std::find(names.begin(), names.end(), factNameOf(name)) != names.end())
         return;
     const std::string meant = port::devicefile::similar(name, names);
     throw UsageError("there is no fact " + quoted(name) +
@@ -513,6 +566,23 @@ cli::Fact cli::askFact(const std::string& name)
     fact.name = name;
     fact.isIdentity = isIdentity(name);
     return fact;
+}
+
+const std::vector<std::pair<std::string, std::string>>& cli::factAliases()
+{
+    static const std::vector<std::pair<std::string, std::string>> all = {
+        {"connected_wifi", "connected_cellular_or_wifi"},
+        {"connected_bluetooth", "connected_cellular_or_bluetooth"},
+    };
+    return all;
+}
+
+std::string cli::factNameOf(const std::string& name)
+{
+    const auto& aliases = factAliases();
+    const auto alias = std::find_if(aliases.begin(), aliases.end(),
+                                    [&](const auto& each) { return each.first == name; });
+    return alias != aliases.end() ? alias->second : name;
 }
 
 std::vector<cli::Fact> cli::askFacts(const std::vector<std::string>& names)

@@ -4,6 +4,7 @@
 #define CLI_FACTS_H
 
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "Session.h"
@@ -22,11 +23,17 @@ struct Fact {
 /// The names of all facts, in the order in which they are shown.
 std::vector<std::string> factNames();
 
-/// Throws a UsageError about a name that is none of those, with the one that is meant.
+/// Throws a UsageError about a name that is none of those, nor a former one of them, with the one
+/// that is meant.
 void checkFactName(const std::string& name, const std::vector<std::string>& names);
 
-/// Asks the library for facts of factNames(), in that order. Returns within seconds also when a
-/// source never answers: its fact has no value then, and a reason that says so.
+/// Former names of facts, and their names: each asks for the same.
+const std::vector<std::pair<std::string, std::string>>& factAliases();
+/// The name itself, of a former one the present one.
+std::string factNameOf(const std::string& name);
+
+/// Asks the library for facts of factNames(), or by their former names, in that order. Returns within
+/// seconds also when a source never answers: its fact has no value then, and a reason that says so.
 std::vector<Fact> askFacts(const std::vector<std::string>& names);
 
 /// The names of those that can be watched: all but the device daemon's, which tells of no change.

@@ -33,7 +33,7 @@ const std::vector<Section> SECTIONS = {
     {"Device", {""}},
     {"Language", {"language"}},
     {"SIM card", {"sim_", "phone_number", "imei", "roaming"}},
-    {"Network", {"connected"}},
+    {"Network", {"cellular", "wifi", "bluetooth", "ethernet", "connect"}},
     {"Settings", {"flight_mode", "data_roaming", "mobile_data", "sales_code"}},
     {"Storage", {"storage"}},
 };
@@ -51,14 +51,12 @@ const Section& sectionOf(const std::string& name)
                          [&](const Section& section) { return isIn(section, name); });
 }
 
-std::vector<std::string> rowOf(const Fact& fact, std::size_t nameWidth)
+std::vector<std::string> rowOf(const Fact& fact)
 {
-    std::string name = fact.name;
-    name.resize(std::max(name.size(), nameWidth), ' ');
     if (fact.value.is_null())
-        return {name, "not available"};
+        return {fact.name, "not available"};
     const std::string text = textOf(fact.value);
-    return {name, text.empty() ? "\"\"" : text, shortened(fact.source)};
+    return {fact.name, text.empty() ? "\"\"" : text, shortened(fact.source)};
 }
 
 // Facts under what they have in common, in the order in which that comes up.
@@ -105,15 +103,12 @@ std::string missingText(const std::vector<Fact>& facts)
 
 std::string infoText(const std::vector<Fact>& facts)
 {
-    std::size_t nameWidth = 0;
-    for (const Fact& fact : facts)
-        nameWidth = std::max(nameWidth, fact.name.size());
     std::string text = backendLine() + "\n";
     for (const Section& section : SECTIONS) {
         Rows rows;
         for (const Fact& fact : facts)
             if (&sectionOf(fact.name) == &section)
-                rows.push_back(rowOf(fact, nameWidth));
+                rows.push_back(rowOf(fact));
         if (!rows.empty())
             text += "\n" + heading(section.title) + "\n" + aligned(rows);
     }
@@ -132,6 +127,13 @@ std::string infoJson(const std::vector<Fact>& facts)
         if (!fact.today.is_null())
             today[fact.name] = fact.today;
     }
+    for (const auto& [former, name] : factAliases()) {
+        if (!json.contains(name) || json.contains(former))
+            continue;
+        json[former] = json[name];
+        Json& told = sources.contains(name) ? sources : reasons;
+        told[former] = told[name];
+    }
     json["sources"] = sources;
     json["reasons"] = reasons;
     if (!today.empty())
@@ -141,8 +143,18 @@ std::string infoJson(const std::vector<Fact>& facts)
 
 // What an application may learn of its connections.
 const std::vector<std::string> NETWORK_FACTS = {
-    "connected_cellular", "connected_wifi", "connected_bluetooth", "connected_any",
-    "flight_mode",        "mobile_data",    "data_roaming",
+    "cellular",
+    "wifi",
+    "bluetooth",
+    "ethernet",
+    "connectivity",
+    "connected_cellular",
+    "connected_cellular_or_wifi",
+    "connected_cellular_or_bluetooth",
+    "connected_any",
+    "flight_mode",
+    "mobile_data",
+    "data_roaming",
 };
 
 std::vector<Fact> askAll(const std::vector<std::string>& names, bool reveal)
@@ -235,8 +247,10 @@ void addNetwork(const Command& app, Invocation& invocation)
 {
     const Command network = app.add("network", "Show connections and their switches");
     network.flag("--json", invocation.json, "Print JSON");
-    network.setFooter("A connection over Wi-Fi or Bluetooth counts beside the cellular one: "
-                      "\"connected_wifi\" is yes when either is there.");
+    network.setFooter(
+        "Each link is told alone, then as applications ask for it, who always count the cellular "
+        "one: \"connected_cellular_or_wifi\" is yes when either is there.\n"
+        "\"connected_any\" also counts a cable, which applications are not told of.");
     network.onUse([&invocation] {
         invocation.command = [&invocation] { return runInfo(invocation, NETWORK_FACTS, false); };
     });

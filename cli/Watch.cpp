@@ -352,8 +352,10 @@ void cli::addWatchCommand(const Command& app, Invocation& invocation)
             throw UsageError("--events and facts cannot go together");
         std::vector<std::string> names = watchableFactNames();
         names.emplace_back(SLOTS);
-        for (const std::string& name : options->names)
+        for (std::string& name : options->names) {
             checkFactName(name, names);
+            name = factNameOf(name);
+        }
         invocation.command = [&invocation, options] { return runWatch(invocation, *options); };
     });
 }

@@ -103,6 +103,12 @@ constexpr Name WIFI_CONNECTIONS[] = {
     {"not_supported", Meaning::Kind::NotSupported},
 };
 
+constexpr Name CONNECTIVITIES[] = {
+    name("unknown", Connectivity::Unknown), name("none", Connectivity::None),
+    name("portal", Connectivity::Portal),   name("limited", Connectivity::Limited),
+    name("full", Connectivity::Full),
+};
+
 // A call that hands out a pointer or a list may also succeed without.
 constexpr Name OR_NULL[] = {{"null", Meaning::Kind::Nothing}};
 constexpr Name OR_EMPTY[] = {{"empty", Meaning::Kind::Nothing}};

@@ -22,6 +22,10 @@ enum class CellularState {
 // Of a radio that carries connections, Wi-Fi or Bluetooth.
 enum class LinkState { Deactivated, Disconnected, Connected };
 
+// What the network gives access to: to nothing, to a page that wants a consent, not to the
+// Internet, to all of it. Unknown is what a device file says; it is no answer.
+enum class Connectivity { Unknown, None, Portal, Limited, Full };
+
 enum class WifiConnection { Failure, Disconnected, Association, Configuration, Connected };
 
 // Something that is watched for as long as this lives.
@@ -56,6 +60,16 @@ public:
     virtual Result<Sourced<LinkState>> bluetooth()
     {
         return notSupported("no Bluetooth");
+    }
+
+    // No call of the platform asks for what follows.
+    virtual Result<Sourced<LinkState>> ethernet()
+    {
+        return notSupported("no Ethernet");
+    }
+    virtual Result<Sourced<Connectivity>> connectivity()
+    {
+        return notAvailable("connectivity is not known");
     }
 
     /// Calls `changed` whenever one of the answers, or a switch of the cellular network or of

@@ -27,6 +27,13 @@ Value wifiDevice(Backend& backend)
     return state ? Value(state.value().value != LinkState::Deactivated) : std::nullopt;
 }
 
+// Off and disconnected are one to whoever is told.
+Value wifiStatus(Backend& backend)
+{
+    const auto state = backend.network().wifi();
+    return state ? Value(state.value().value == LinkState::Connected) : std::nullopt;
+}
+
 template <auto read>
 Value radio(Backend& backend)
 {
@@ -45,7 +52,7 @@ constexpr struct {
 } CHANGES[] = {
     {Change::WifiDevice, wifiDevice},
     {Change::WifiConnection, radio<&Network::wifiConnection>},
-    {Change::WifiStatus, radio<&Network::wifi>},
+    {Change::WifiStatus, wifiStatus},
     {Change::PacketData, fact<Question::PacketData>},
     {Change::FlightMode, fact<Question::FlightMode>},
     {Change::DataRoaming, fact<Question::DataRoaming>},

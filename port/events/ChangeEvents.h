@@ -25,8 +25,8 @@ enum class Change { WifiDevice, WifiConnection, WifiStatus, PacketData, FlightMo
 /// Two callbacks on two threads that remove each other wait for each other for ever.
 class ChangeEvents {
 public:
-    /// Is given the new value: of WifiDevice and the switches 0 or 1, of WifiConnection a
-    /// WifiConnection, of WifiStatus a LinkState.
+    /// Is given the new value: of WifiConnection a WifiConnection, of all others 0 or 1; WifiStatus
+    /// is whether Wi-Fi is connected.
     using Callback = std::function<void(int value)>;
 
     explicit ChangeEvents(Backend& backend) : backend_(backend) {}

@@ -47,6 +47,8 @@ enum class Question {
     SmsReadiness,
     Subscriptions,
     DeviceSerial,
+    Ethernet,
+    Connectivity,
 };
 
 /// Where an answer came from, or why there was none.
@@ -109,6 +111,18 @@ CORESYSTEM_PORT_API std::string deviceFile();
 /// What is wrong with the device file now, as FILE:LINE:COLUMN: text where a place is known; empty
 /// when it is good or another backend answers.
 CORESYSTEM_PORT_API std::string deviceFileProblem();
+
+/// An answer of the backend itself.
+struct Answer {
+    std::string word; ///< as a device file says it: "connected"; "not_supported" where this device
+                      ///< has no such thing; empty when there is no answer
+    Origin origin;    ///< "not_supported" has a reason, and no source
+};
+
+/// Asks the backend, and not CoreSystem, which puts several of them together, for Cellular, Wifi,
+/// Bluetooth, Ethernet or Connectivity. Waits at most 2 seconds. Other questions have no answer
+/// here.
+CORESYSTEM_PORT_API Answer ask(Question question);
 
 /// Something that the backend draws on.
 struct Service {

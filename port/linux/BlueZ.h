@@ -12,7 +12,8 @@ namespace port::linux_backend {
 
 constexpr BusObject BLUEZ = {"org.bluez", "/", "org.bluez.Adapter1", Start::Never};
 constexpr Names BLUEZ_INTERFACES = {BLUEZ.interface};
-constexpr ObjectService ADAPTERS = {BLUEZ, "/", nullptr, BLUEZ_INTERFACES, nullptr, nullptr};
+constexpr ObjectService ADAPTERS = {BLUEZ,   "/",     nullptr, BLUEZ_INTERFACES,
+                                    nullptr, nullptr, nullptr};
 
 /// Asks for the adapters.
 Look adapters();

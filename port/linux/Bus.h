@@ -46,6 +46,7 @@ struct ObjectService {
     Names interfaces;           // that are kept
     const char* settings;       // interface of the objects that tell more by GetSettings, or null
     const char* settingsSignal; // what such an object sends when that changes
+    const char* states;         // interface that sends StateChanged, with its State first, or null
 };
 
 /// Whether a question's error says that the service does not run, and not that it keeps silent.

@@ -152,6 +152,7 @@ private:
     void takeSignal(sd_bus_message* message);
     void takeOwner(Peer& peer, const std::string& owner);
     void takeProperties(Peer& peer, sd_bus_message* message);
+    void takeState(Peer& peer, sd_bus_message* message);
     void takeInterfaces(Peer& peer, sd_bus_message* message, bool areThere);
     void setProperties(Peer& peer, const std::string& path, const std::string& interface,
                        PropertyMap&& changes, bool areAll);

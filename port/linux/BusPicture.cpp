@@ -271,6 +271,9 @@ void Bus::Core::takeSignal(sd_bus_message* message)
             takeInterfaces(peer, message, true);
         else if (sd_bus_message_is_signal(message, OBJECT_MANAGER, "InterfacesRemoved") > 0)
             takeInterfaces(peer, message, false);
+        else if (peer.objects->states != nullptr &&
+                 sd_bus_message_is_signal(message, peer.objects->states, "StateChanged") > 0)
+            takeState(peer, message);
         else if (peer.objects->settings != nullptr && peer.tree != nullptr &&
                  sd_bus_message_is_signal(message, peer.objects->settings,
                                           peer.objects->settingsSignal) > 0) {
@@ -361,6 +364,19 @@ void Bus::Core::takeProperties(Peer& peer, sd_bus_message* message)
     if (!reader.properties(changes) || !reader.texts(withoutValue) || !withoutValue.empty())
         return dropPicture(peer);
     setProperties(peer, sd_bus_message_get_path(message), interface, std::move(changes), false);
+}
+
+// A state that does not last may be told only so, and not as a property.
+void Bus::Core::takeState(Peer& peer, sd_bus_message* message)
+{
+    std::uint32_t state = 0;
+    if (peer.tree == nullptr)
+        return;
+    sd_bus_message_rewind(message, 1);
+    if (sd_bus_message_read_basic(message, SD_BUS_TYPE_UINT32, &state) <= 0)
+        return dropPicture(peer);
+    setProperties(peer, sd_bus_message_get_path(message), peer.objects->states,
+                  {{"State", Value(state)}}, false);
 }
 
 void Bus::Core::takeInterfaces(Peer& peer, sd_bus_message* message, bool areThere)

@@ -67,6 +67,8 @@ void Bus::Core::attachObjects(Peer& peer, const ObjectService& service)
     if (service.settings != nullptr)
         addMatch(peer, signal + "interface='" + service.settings + "',member='" +
                            service.settingsSignal + "'");
+    if (service.states != nullptr)
+        addMatch(peer, signal + "interface='" + service.states + "',member='StateChanged'");
     startThread();
 }
 

@@ -20,8 +20,8 @@ constexpr BusObject MODEM_MANAGER = {MM_DBUS_SERVICE, MM_DBUS_PATH, MM_DBUS_INTE
 constexpr Names MODEM_INTERFACES = {MM_DBUS_INTERFACE_MODEM, MM_DBUS_INTERFACE_MODEM_MODEM3GPP,
                                     MM_DBUS_INTERFACE_MODEM_MODEMCDMA,
                                     MM_DBUS_INTERFACE_MODEM_MESSAGING, MM_DBUS_INTERFACE_SIM};
-constexpr ObjectService MODEMS = {MODEM_MANAGER,    MM_DBUS_PATH, "Version",
-                                  MODEM_INTERFACES, nullptr,      nullptr};
+constexpr ObjectService MODEMS = {MODEM_MANAGER, MM_DBUS_PATH, "Version", MODEM_INTERFACES,
+                                  nullptr,       nullptr,      nullptr};
 /// Asks for the modems.
 Look modems();
 

@@ -102,6 +102,22 @@ Result<Sourced<LinkState>> ethernetIn(const Result<NetworkView>& view)
     return *furthest;
 }
 
+Result<Connectivity> connectivityOf(std::uint32_t state)
+{
+    switch (state) {
+    case NM_CONNECTIVITY_NONE:
+        return Connectivity::None;
+    case NM_CONNECTIVITY_PORTAL:
+        return Connectivity::Portal;
+    case NM_CONNECTIVITY_LIMITED:
+        return Connectivity::Limited;
+    case NM_CONNECTIVITY_FULL:
+        return Connectivity::Full;
+    default:
+        return notAvailable("NetworkManager does not know the connectivity");
+    }
+}
+
 template <typename T>
 Result<Sourced<T>> from(const BusObject& service, const Result<T>& answer)
 {
@@ -309,6 +325,13 @@ Result<Sourced<bool>> LinuxNetwork::flightModeIn(const Result<NetworkView>& view
         return flightMode;
     const std::string witness = whoHasBluetoothOn();
     return witness.empty() ? flightMode : Sourced<bool>{false, witness};
+}
+
+Result<Sourced<Connectivity>> LinuxNetwork::connectivity()
+{
+    const auto now = view();
+    const auto state = now ? now.value().connectivity() : Result<std::uint32_t>(now.error());
+    return from(NETWORK_MANAGER, state ? connectivityOf(state.value()) : state.error());
 }
 
 Result<Sourced<bool>> LinuxNetwork::flightMode()

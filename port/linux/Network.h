@@ -20,7 +20,8 @@ public:
     Result<Sourced<LinkState>> wifi() override;
     Result<Sourced<WifiConnection>> wifiConnection() override;
     Result<Sourced<LinkState>> bluetooth() override;
-    Result<Sourced<LinkState>> ethernet();
+    Result<Sourced<LinkState>> ethernet() override;
+    Result<Sourced<Connectivity>> connectivity() override;
     Result<Sourced<bool>> flightMode();
     Result<Sourced<bool>> packetData();
     Result<Sourced<bool>> mobileData();

@@ -166,6 +166,14 @@ bool anyActive(const Tree& objects, Predicate holds)
     });
 }
 
+Result<std::uint32_t> NetworkView::connectivity() const
+{
+    const Result<Properties> all = manager();
+    const auto state =
+        all ? all.value().number("Connectivity") : Result<std::uint32_t>(all.error());
+    return state ? state : all ? fromNetworkManager(state.error()) : state;
+}
+
 bool NetworkView::hasActiveCellularConnection() const
 {
     return anyActive(*objects_, [](const Properties& connection) {

@@ -27,7 +27,8 @@ constexpr ObjectService NETWORKS = {NETWORK_MANAGER,
                                     "WirelessEnabled",
                                     NETWORK_INTERFACES,
                                     NM_DBUS_INTERFACE_SETTINGS_CONNECTION,
-                                    "Updated"};
+                                    "Updated",
+                                    NM_DBUS_INTERFACE_DEVICE};
 
 enum class Radio { Wifi, Cellular };
 
@@ -60,6 +61,7 @@ public:
     Result<bool> isThere(Radio radio) const;
     /// All devices of one of these types.
     Result<std::vector<NetworkDevice>> devicesOf(std::initializer_list<NMDeviceType> types) const;
+    Result<std::uint32_t> connectivity() const; // NMConnectivityState
     /// Whether a cellular connection is up, or coming up.
     bool hasActiveCellularConnection() const;
 

@@ -26,21 +26,16 @@ Variant textOf(const std::string& text)
     return value("s", text.c_str());
 }
 
-bool isOn(const Facts& facts)
-{
-    return facts.bluetooth && facts.bluetooth != LinkState::Deactivated;
-}
-
 Face adapter(const Facts& facts)
 {
     return face(ADAPTER, {{"Address", textOf(ADDRESS)},
                           {"AddressType", textOf("public")},
                           {"Name", textOf(facts.deviceName)},
                           {"Alias", textOf(facts.deviceName)},
-                          {"Powered", value("b", isOn(facts))},
-                          {"PowerState", textOf(isOn(facts) ? "on" : "off")},
+                          {"Powered", value("b", facts.isBluetoothOn())},
+                          {"PowerState", textOf(facts.isBluetoothOn() ? "on" : "off")},
                           {"DiscoverableTimeout", value("u", 180)},
-                          {"Pairable", value("b", isOn(facts))},
+                          {"Pairable", value("b", facts.isBluetoothOn())},
                           {"UUIDs", texts({OWN_SERVICES, std::end(OWN_SERVICES)})},
                           {"Modalias", textOf("usb:v1D6Bp0246d0542")}, // the kernel's, and 5.66
                           {"Roles", texts({"central", "peripheral"})}});
@@ -77,9 +72,9 @@ World worldOf(const Scene& scene)
 Outcome setPowered(const Request& request)
 {
     const bool on = g_variant_get_boolean(request.arguments) != FALSE;
-    if (on == isOn(request.scene.facts))
+    if (on == request.scene.facts.isBluetoothOn())
         return {};
-    return Outcome::change({set("network.bluetooth", on ? "disconnected" : "deactivated")});
+    return Outcome::change(bluetoothSwitch(request.scene.facts, on));
 }
 
 Outcome disconnect(const Request&)
@@ -99,7 +94,7 @@ Outcome nothing(const Request&)
 
 Outcome refuse(const Request& request)
 {
-    if (!isOn(request.scene.facts))
+    if (!request.scene.facts.isBluetoothOn())
         return Outcome::refuse("org.bluez.Error.NotReady", "Resource Not Ready");
     return Outcome::refuse("org.bluez.Error.NotSupported", "Operation is not supported");
 }

@@ -82,6 +82,10 @@ struct Facts {
     {
         return !isFlying() && cellular != CellularState::FlightMode;
     }
+    bool isBluetoothOn() const
+    {
+        return bluetooth && bluetooth != LinkState::Deactivated;
+    }
     /// The slot over which data goes; nothing while no data goes over the cellular network.
     std::optional<std::size_t> connectedSlot() const;
 };

@@ -92,7 +92,8 @@ std::string slotKey(std::size_t slot, const char* key)
     return "slot[" + std::to_string(slot) + "]." + key;
 }
 
-// One radio that is switched on in flight mode ends it; the others stay off, by their own keys.
+// One radio that is switched on in flight mode ends it; the others stay off, by their own keys. The
+// last one that is switched off begins it.
 std::vector<Edit> wifiSwitch(const Facts& facts, bool on)
 {
     std::vector<Edit> changes = {set("network.wifi", on ? "disconnected" : "deactivated"),
@@ -102,7 +103,7 @@ std::vector<Edit> wifiSwitch(const Facts& facts, bool on)
         if (facts.cellular)
             changes.push_back(set("network.cellular", "flight_mode"));
     }
-    if (!on && facts.hasTelephony && !facts.isCellularOn())
+    if (!on && facts.hasTelephony && !facts.isCellularOn() && !facts.isBluetoothOn())
         changes.push_back(set("settings.flight_mode", "true"));
     return changes;
 }
@@ -118,7 +119,22 @@ std::vector<Edit> cellularSwitch(const Facts& facts, bool on)
         if (facts.wifi)
             changes.push_back(set("network.wifi", "deactivated"));
     }
-    if (!on && facts.wifi && !facts.isWifiOn())
+    if (!on && facts.wifi && !facts.isWifiOn() && !facts.isBluetoothOn())
+        changes.push_back(set("settings.flight_mode", "true"));
+    return changes;
+}
+
+std::vector<Edit> bluetoothSwitch(const Facts& facts, bool on)
+{
+    std::vector<Edit> changes = {set("network.bluetooth", on ? "disconnected" : "deactivated")};
+    if (on && facts.isFlying()) {
+        changes.push_back(set("settings.flight_mode", "false"));
+        if (facts.wifi)
+            changes.push_back(set("network.wifi", "deactivated"));
+        if (facts.cellular)
+            changes.push_back(set("network.cellular", "flight_mode"));
+    }
+    if (!on && facts.hasTelephony && facts.wifi && !facts.isCellularOn() && !facts.isWifiOn())
         changes.push_back(set("settings.flight_mode", "true"));
     return changes;
 }

@@ -146,6 +146,7 @@ std::string slotKey(std::size_t slot, const char* key);
 /// The changes that switch the cellular radio.
 std::vector<devicefile::Edit> cellularSwitch(const Facts& facts, bool on);
 std::vector<devicefile::Edit> wifiSwitch(const Facts& facts, bool on);
+std::vector<devicefile::Edit> bluetoothSwitch(const Facts& facts, bool on);
 
 } // namespace port::played
 

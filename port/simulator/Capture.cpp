@@ -305,6 +305,12 @@ private:
         addRadio(lines, "wifi", network.wifi(), "connection_get_wifi_state");
         lines.add("wifi_connection", network.wifiConnection());
         addRadio(lines, "bluetooth", network.bluetooth(), "connection_get_bt_state");
+        lines.add("ethernet", network.ethernet());
+        const auto connectivity = network.connectivity();
+        if (connectivity)
+            lines.add("connectivity", connectivity);
+        else // without its key a device file's links tell it
+            lines.put("connectivity", "\"unknown\"", connectivity.error().reason);
         return lines.text();
     }
 

@@ -34,18 +34,55 @@ Result<Sourced<WifiConnection>> connectionOf(const Result<Sourced<LinkState>>& w
                                    wifi.value().source};
 }
 
+Result<Sourced<CellularState>> cellularOf(const Device& device)
+{
+    return radio(device, "cellular", CellularState::FlightMode);
+}
+
+Result<Sourced<LinkState>> bluetoothOf(const Device& device)
+{
+    return radio(device, "bluetooth", LinkState::Deactivated);
+}
+
+Result<Sourced<LinkState>> wifiOf(const Device& device)
+{
+    return radio(device, "wifi", LinkState::Deactivated);
+}
+
+Result<Sourced<LinkState>> ethernetOf(const Device& device)
+{
+    const Section& network = device.section("network");
+    if (network.find("ethernet") == nullptr)
+        return notSupported(network.source() + ": [network] has no ethernet");
+    return network.get<LinkState>("ethernet");
+}
+
+// What a link that is connected gives, one after the other, when the file does not say.
+Result<Sourced<Connectivity>> connectivityOf(const Device& device)
+{
+    const auto cellular = cellularOf(device);
+    const bool isConnected = cellular && cellular.value().value == CellularState::Connected;
+    std::string source = cellular ? cellular.value().source : "";
+    for (const auto& link : {wifiOf(device), bluetoothOf(device), ethernetOf(device)}) {
+        if (!isConnected && link && link.value().value == LinkState::Connected)
+            return Sourced<Connectivity>{Connectivity::Full, link.value().source};
+        source = link && source.empty() ? link.value().source : source;
+    }
+    if (source.empty())
+        return notAvailable(device.section("network").source() + ": [network] tells of no link");
+    return Sourced<Connectivity>{isConnected ? Connectivity::Full : Connectivity::None, source};
+}
+
 } // namespace
 
 Result<Sourced<CellularState>> SimulatedNetwork::cellular()
 {
-    return file_.ask<CellularState>(
-        [](const Device& device) { return radio(device, "cellular", CellularState::FlightMode); });
+    return file_.ask<CellularState>(cellularOf);
 }
 
 Result<Sourced<LinkState>> SimulatedNetwork::wifi()
 {
-    return file_.ask<LinkState>(
-        [](const Device& device) { return radio(device, "wifi", LinkState::Deactivated); });
+    return file_.ask<LinkState>(wifiOf);
 }
 
 Result<Sourced<WifiConnection>> SimulatedNetwork::wifiConnection()
@@ -53,15 +90,33 @@ Result<Sourced<WifiConnection>> SimulatedNetwork::wifiConnection()
     return file_.ask<WifiConnection>([](const Device& device) {
         const Section& network = device.section("network");
         if (network.find("wifi_connection") == nullptr)
-            return connectionOf(radio(device, "wifi", LinkState::Deactivated));
+            return connectionOf(wifiOf(device));
         return network.get<WifiConnection>("wifi_connection");
     });
 }
 
 Result<Sourced<LinkState>> SimulatedNetwork::bluetooth()
 {
-    return file_.ask<LinkState>(
-        [](const Device& device) { return radio(device, "bluetooth", LinkState::Deactivated); });
+    return file_.ask<LinkState>(bluetoothOf);
+}
+
+Result<Sourced<LinkState>> SimulatedNetwork::ethernet()
+{
+    return file_.ask<LinkState>(ethernetOf);
+}
+
+Result<Sourced<Connectivity>> SimulatedNetwork::connectivity()
+{
+    return file_.ask<Connectivity>([](const Device& device) {
+        const Section& network = device.section("network");
+        const auto said = network.get<Connectivity>("connectivity");
+        if (!said)
+            return connectivityOf(device);
+        if (said.value().value == Connectivity::Unknown)
+            return Result<Sourced<Connectivity>>(
+                notAvailable(said.value().source + ": the connectivity is unknown"));
+        return said;
+    });
 }
 
 std::unique_ptr<Watch> SimulatedNetwork::watch(std::function<void()> changed)

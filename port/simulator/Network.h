@@ -9,7 +9,8 @@
 namespace port::simulator {
 
 // What a key says holds, also in flight mode. A radio without a key is off in flight mode; a Wi-Fi
-// connection without one is as its radio's state tells.
+// connection without one is as its radio's state tells. Without its key there is no Ethernet,
+// and the connectivity is as the links tell.
 class SimulatedNetwork : public Network {
 public:
     explicit SimulatedNetwork(devicefile::DeviceFile& file) : file_(file) {}
@@ -18,6 +19,8 @@ public:
     Result<Sourced<LinkState>> wifi() override;
     Result<Sourced<WifiConnection>> wifiConnection() override;
     Result<Sourced<LinkState>> bluetooth() override;
+    Result<Sourced<LinkState>> ethernet() override;
+    Result<Sourced<Connectivity>> connectivity() override;
     std::unique_ptr<Watch> watch(std::function<void()> changed) override;
 
 private:

@@ -12,7 +12,12 @@
 #include <thread>
 
 #include <gmock/gmock.h>
+#include <net/if.h>
+#include <sched.h>
+#include <sys/ioctl.h>
+#include <sys/socket.h>
 
+#include "devicefile/Descriptor.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/TemporaryTree.h"
@@ -472,6 +477,23 @@ TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
     EXPECT_EQ(shown(LinkState::Disconnected, "/sys/class/net/eth0"), show(network.ethernet()));
 }
 
+TEST_F(NetworkTest, ConnectivityIsWhatNetworkManagerSays)
+{
+    const std::pair<unsigned, const char*> rows[] = {
+        {0, "error: NetworkManager does not know the connectivity"},
+        {1, "1 <org.freedesktop.NetworkManager>"},
+        {2, "2 <org.freedesktop.NetworkManager>"},
+        {3, "3 <org.freedesktop.NetworkManager>"},
+        {4, "4 <org.freedesktop.NetworkManager>"},
+    };
+    for (const auto& [number, answer] : rows) {
+        serve(networkManager, NM,
+              reply({object(NM_PATH, NM,
+                            "'WirelessEnabled': <true>, " + ::number("Connectivity", number))}));
+        EXPECT_EQ(answer, show(network.connectivity()));
+    }
+}
+
 TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
 {
     Networks networks;
@@ -770,6 +792,71 @@ TEST_F(WatchTest, EveryKindOfChangeIsTold)
     }));
     EXPECT_TRUE(isTold([this] { serveModems({}); }));
     EXPECT_TRUE(isTold([this] { serveAdapters({}); }));
+}
+
+TEST_F(WatchTest, FailureThatDoesNotLastIsTold)
+{
+    Networks networks;
+    networks.devices = {{WIFI, 50}};
+    serve(networks);
+    std::vector<WifiConnection> told;
+    watch = network.watch([&] {
+        const auto now = network.wifiConnection();
+        if (now && (told.empty() || told.back() != now.value().value)) {
+            told.push_back(now.value().value);
+            calls.note();
+        }
+    });
+    ASSERT_TRUE(calls.waitFor(1));
+    const std::string device = std::string(NM_PATH) + "/Devices/0";
+    const std::string interface = std::string(NM) + ".Device";
+    networkManager->emit(device, interface, "StateChanged", "(uint32 120, uint32 50, uint32 7)");
+    networkManager->emit(device, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                         "('" + interface + "', {'State': <uint32 30>}, @as [])");
+    EXPECT_TRUE(calls.waitFor(3));
+    watch.reset();
+    EXPECT_THAT(told, testing::ElementsAre(WifiConnection::Association, WifiConnection::Failure,
+                                           WifiConnection::Disconnected));
+}
+
+// Sets an interface's flags, of which the kernel tells whoever listens in this network.
+bool switchOn(const char* interface)
+{
+    ifreq request = {};
+    std::snprintf(request.ifr_name, sizeof request.ifr_name, "%s", interface);
+    request.ifr_flags = IFF_UP;
+    const port::Descriptor socket(::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+    return ioctl(socket.number(), SIOCSIFFLAGS, &request) == 0;
+}
+
+TEST_F(WatchTest, KernelTellsOfALinkWhileNetworkManagerIsGone)
+{
+    const std::string wlan = "/sys/class/net/wlan0";
+    root.write(wlan + "/wireless/status", "");
+    root.write(wlan + "/flags", "0x1003\n");
+    root.write(wlan + "/carrier", "1\n");
+    std::atomic<LinkState> told{LinkState::Deactivated};
+    bool hasNetwork = false;
+    bool isToldOf = false;
+    std::thread inANetworkOfItsOwn([&] {
+        hasNetwork = unshare(CLONE_NEWNET) == 0;
+        if (!hasNetwork)
+            return;
+        watch = network.watch([&] {
+            told = network.wifi().value().value;
+            calls.note();
+        });
+        if (!calls.waitFor(1))
+            return;
+        root.write(wlan + "/operstate", "up\n");
+        isToldOf = isTold([] { EXPECT_TRUE(switchOn("lo")); });
+    });
+    inANetworkOfItsOwn.join();
+    if (!hasNetwork)
+        GTEST_SKIP() << "needs a network namespace";
+    EXPECT_TRUE(isToldOf);
+    EXPECT_EQ(LinkState::Connected, told);
+    watch.reset();
 }
 
 TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)

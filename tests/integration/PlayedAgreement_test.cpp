@@ -176,11 +176,13 @@ bool isKeptFromRoaming(const Facts& facts)
     return isServed(facts) && !atHome && !facts.dataRoaming.value_or(true);
 }
 
-// What NetworkManager's switches make of the radios that are there.
+// What NetworkManager's switches and BlueZ's adapter make of the radios that are there.
 bool areRadiosOff(const Facts& facts)
 {
     const bool isWifiOff = !facts.isWifiOn();
     const bool isCellularOff = !facts.isCellularOn();
+    if (facts.isBluetoothOn())
+        return false;
     if (facts.wifi.has_value() == !facts.slots.empty())
         return isWifiOff && isCellularOff;
     return facts.wifi ? isWifiOff : isCellularOff;
@@ -272,6 +274,8 @@ const Difference DIFFERENCES[] = {
     {"wifi connection", "the file says of the connection what Wi-Fi is not", differsFromItsWifi},
     {"flight mode", "is unknown in a file and never on a machine",
      [](const Case& now) { return !now.facts.flightMode; }},
+    {"flight mode", "no machine is in it while its adapter of Bluetooth is on",
+     [](const Case& now) { return now.facts.isFlying() && now.facts.isBluetoothOn(); }},
     {"flight mode", "is what it is when every radio that is there is off",
      [](const Case& now) { return !now.facts.isFlying() && areRadiosOff(now.facts); }},
     {"packet data", "NetworkManager knows one setting, of a modem that is there and on",

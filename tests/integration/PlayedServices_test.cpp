@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What clients of the played services see, hear and may do.
 #include <fstream>
+#include <tuple>
 
 #include <gmock/gmock.h>
 
@@ -199,7 +200,15 @@ TEST_F(PlayedServices, WriteWhatAClientChangesIntoTheFile)
     EXPECT_EQ(value("settings.flight_mode"), "false");
     EXPECT_EQ(set(NM, NM_PATH, NM, "WwanEnabled", "false"), "()");
     EXPECT_EQ(value("network.cellular"), "flight_mode");
-    EXPECT_EQ(value("settings.flight_mode"), "true"); // with the last radio
+    EXPECT_EQ(value("settings.flight_mode"), "false");
+    for (const auto& [powered, state, flightMode] :
+         {std::tuple("false", "deactivated", "true"), // with the last radio
+          {"true", "disconnected", "false"},
+          {"false", "deactivated", "true"}}) {
+        EXPECT_EQ(set("org.bluez", ADAPTER, "org.bluez.Adapter1", "Powered", powered), "()");
+        EXPECT_EQ(value("network.bluetooth"), state);
+        EXPECT_EQ(value("settings.flight_mode"), flightMode);
+    }
     EXPECT_EQ(get(NM, NM_PATH, NM, "WwanEnabled"), "(<false>,)");
     EXPECT_EQ(set(NM, NM_PATH, NM, "WwanEnabled", "true"), "()");
     EXPECT_EQ(value("settings.flight_mode"), "false");
@@ -211,9 +220,6 @@ TEST_F(PlayedServices, WriteWhatAClientChangesIntoTheFile)
               "('/org/freedesktop/NetworkManager/ActiveConnection/2',)");
     EXPECT_EQ(value("network.cellular"), "connected");
     EXPECT_EQ(get(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "State"), "(<11>,)");
-
-    EXPECT_EQ(set("org.bluez", ADAPTER, "org.bluez.Adapter1", "Powered", "false"), "()");
-    EXPECT_EQ(value("network.bluetooth"), "deactivated");
 
     EXPECT_EQ(call(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "Enable", "(false,)"), "()");
     EXPECT_EQ(value("slot[0].enabled"), "false");

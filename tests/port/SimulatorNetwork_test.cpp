@@ -6,6 +6,7 @@
 #include "support/DeviceFileTest.h"
 
 using port::CellularState;
+using port::Connectivity;
 using port::FontSize;
 using port::LinkState;
 using port::WifiConnection;
@@ -99,6 +100,39 @@ TEST_F(SimulatorNetworkTest, WifiConnectionFollowsTheRadioWhenNothingIsSaid)
     }
     describe("[settings]\nflight_mode = true\n");
     expectAnswer(WifiConnection::Disconnected, line(3), network.wifiConnection());
+}
+
+TEST_F(SimulatorNetworkTest, EthernetIsThereWhenItIsSaid)
+{
+    describe("[network]\nethernet = 'disconnected'\n");
+    expectAnswer(LinkState::Disconnected, line(3), network.ethernet());
+    describe("[network]\nwifi = 'connected'\n");
+    expectError(Kind::NotSupported, line(2) + ": [network] has no ethernet", network.ethernet());
+}
+
+TEST_F(SimulatorNetworkTest, ConnectivityFollowsTheLinksWhenNothingIsSaid)
+{
+    const struct {
+        const char* keys;
+        Connectivity connectivity;
+    } rows[] = {
+        {"wifi = 'disconnected'", Connectivity::None},
+        {"cellular = 'connected'", Connectivity::Full},
+        {"wifi = 'connected'", Connectivity::Full},
+        {"bluetooth = 'connected'", Connectivity::Full},
+        {"ethernet = 'connected'", Connectivity::Full},
+        {"connectivity = 'portal'\nwifi = 'connected'", Connectivity::Portal},
+    };
+    for (const auto& row : rows) {
+        describe(std::string("[network]\n") + row.keys + "\n");
+        expectAnswer(row.connectivity, line(3), network.connectivity());
+    }
+    describe("[network]\nconnectivity = 'unknown'\nwifi = 'connected'\n");
+    expectError(Kind::NotAvailable, line(3) + ": the connectivity is unknown",
+                network.connectivity());
+    describe("[network]\n");
+    expectError(Kind::NotAvailable, line(2) + ": [network] tells of no link",
+                network.connectivity());
 }
 
 TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)

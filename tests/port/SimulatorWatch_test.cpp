@@ -219,7 +219,7 @@ TEST_F(SimulatorWatchTest, BrokenEditIsReportedOnceAndKeepsTheLastGoodState)
     replace("[settings]\nflight_mode = maybe\n");
     EXPECT_THAT(log.next(), HasSubstr(line(3) + ":15: "));
     replace(flightMode(false) + "[network]\nwifi = 'connected'\n");
-    EXPECT_THAT(taken(1), ElementsAre("status2")); // and none of what was the same before
+    EXPECT_THAT(taken(1), ElementsAre("status1")); // and none of what was the same before
     EXPECT_EQ("", log.next(0));
     replace("[settings]\nflight_mode = maybe\n"); // again, since it was good in between
     EXPECT_THAT(log.next(), HasSubstr(line(3) + ":15: "));
