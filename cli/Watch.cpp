@@ -25,7 +25,8 @@
 namespace cli {
 namespace {
 
-constexpr char SLOTS[] = "slot"; // stands for the facts of the SIM slots
+constexpr std::size_t WIDTH = 22; // of names; few are longer
+constexpr char SLOTS[] = "slot";  // stands for the facts of the SIM slots
 
 const char* nameOfConnection(int state)
 {
@@ -130,8 +131,6 @@ public:
     Printer(Loop& loop, bool asJson, const WatchOptions& options)
         : loop_(loop), asJson_(asJson), options_(options)
     {
-        for (const std::string& name : watchableFactNames())
-            width_ = std::max(width_, name.size());
     }
 
     void OnWifiDeviceStateChanged(int state, void*) override
@@ -202,7 +201,7 @@ private:
     try {
         const std::string time = now(asJson_);
         json["time"] = time;
-        what.resize(std::max(what.size(), width_), ' ');
+        what.resize(std::max(what.size(), WIDTH), ' ');
         writeOut(asJson_ ? lineOf(json) : time + "  " + what + "  " + how + "\n");
     } catch (...) {
         failure_ = std::current_exception();
@@ -212,7 +211,6 @@ private:
     Loop& loop_;
     const bool asJson_;
     const WatchOptions& options_;
-    std::size_t width_ = 0; // of names
     std::exception_ptr failure_;
 };
 
