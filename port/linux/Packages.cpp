@@ -161,7 +161,8 @@ Result<std::optional<std::string>> LinuxPackages::ask(const std::string& name)
     auto answer = index_.version(name, [&file](std::size_t offset, std::string& text) {
         const std::size_t size = text.size();
         text.resize(size + STATUS_BLOCK);
-        const ssize_t count = pread(file.number(), &text[size], STATUS_BLOCK, static_cast<off_t>(offset));
+        const ssize_t count =
+            pread(file.number(), &text[size], STATUS_BLOCK, static_cast<off_t>(offset));
         text.resize(size + static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
         return count >= 0;
     });
