@@ -66,9 +66,13 @@ public:
 
     bool start()
     {
+        bool isWatching = false;
         if (kernel_.number() >= 0)
-            thread_.run([this] { listen(); });
-        return !folders_.empty();
+            thread_.run([&] {
+                listen();
+                isWatching = !folders_.empty();
+            });
+        return isWatching;
     }
 
 private:

@@ -68,6 +68,8 @@ cellular = "call_only_available"
 wifi = "connected"
 wifi_connection = "configuration"
 bluetooth = "not_supported"
+ethernet = "connected"
+connectivity = "portal"
 [storage]
 block_size = 4096
 fragment_size = 1024

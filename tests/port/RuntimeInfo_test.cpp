@@ -165,7 +165,7 @@ TEST_F(RuntimeInfoTest, ChangesAreToldByKeyInAFixedOrder)
     EXPECT_THAT(taken(), IsEmpty());
     network.change([](Answers& answers) {
         answers.flightMode = answered(true);
-        answers.wifi = answered(LinkState::Deactivated);
+        answers.wifi = answered(LinkState::Connected);
         answers.packetData = answered(true);
         answers.dataRoaming = answered(true);
     });
