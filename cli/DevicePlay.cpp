@@ -72,7 +72,10 @@ public:
             const int ready =
                 poll(any, 3, static_cast<int>(std::max<std::int64_t>(left.count(), 0)));
             if (ready == 0)
-                throw std::runtime_error(when + ": no line came within " + limit + " s (--limit)");
+                throw std::runtime_error(std::string(when)
+                                             .append(": no line came within ")
+                                             .append(limit)
+                                             .append(" s (--limit)"));
             if (ready < 0 || any[0].revents != 0 || any[2].revents != 0 ||
                 read(STDIN_FILENO, &byte, 1) != 1)
                 return false;

@@ -11,7 +11,7 @@
 
 namespace cli {
 
-struct Fact {
+struct Fact { // NOLINT(bugprone-exception-escape): Json checks itself when it is moved
     std::string name;
     Json value;              // null when there is none
     std::string source;      // who served the value
