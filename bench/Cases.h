@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What is measured. Each case serves two ways: timed by Google Benchmark, and merely repeated, so
+// The measured cases. Each serves two ways: timed by Google Benchmark, and merely repeated, so
 // that callgrind can count its instructions.
 #ifndef BENCH_CASES_H
 #define BENCH_CASES_H

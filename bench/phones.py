@@ -28,7 +28,7 @@ GLib.io_add_watch(GLib.IOChannel.unix_new(0), GLib.IO_HUP, lambda *_: loop.quit(
 loop.run()
 print(len(told), told[-1] if told else 0)
 """
-# What changes the switch: a client, or whoever writes the file, so many times in a second.
+# Changes the switch, as a client or by writing the file, so many times a second.
 CLIENT = """
 from gi.repository import Gio, GLib
 bus = Gio.bus_get_sync(Gio.BusType.SYSTEM)

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <cstdint>
 #include <cstdlib>
 #include <functional>
 #include <initializer_list>
@@ -17,6 +18,7 @@
 #include <NetworkManager.h>
 #include <dlfcn.h>
 #include <libmm-glib.h>
+#include <systemd/sd-bus.h>
 
 #include <CoreSystem.h>
 #include <coresystem_port.h>
@@ -30,18 +32,14 @@ std::atomic<long> messagesSent{0};
 
 } // namespace
 
-// Stands before GLib's own, so that every message of the port is counted.
-extern "C" __attribute__((visibility("default"))) void
-g_dbus_connection_send_message_with_reply(GDBusConnection* connection, GDBusMessage* message,
-                                          GDBusSendMessageFlags flags, gint timeout,
-                                          volatile guint32* serial, GCancellable* cancellable,
-                                          GAsyncReadyCallback callback, gpointer userData)
+// Stands before systemd's own, so that every message of the port is counted.
+extern "C" __attribute__((visibility("default"))) int
+sd_bus_send(sd_bus* bus, sd_bus_message* message, std::uint64_t* cookie)
 {
     static const auto original =
-        reinterpret_cast<decltype(&g_dbus_connection_send_message_with_reply)>(
-            dlsym(RTLD_NEXT, "g_dbus_connection_send_message_with_reply"));
+        reinterpret_cast<decltype(&sd_bus_send)>(dlsym(RTLD_NEXT, "sd_bus_send"));
     ++messagesSent;
-    original(connection, message, flags, timeout, serial, cancellable, callback, userData);
+    return original(bus, message, cookie);
 }
 
 namespace {
@@ -133,6 +131,79 @@ bool asksNewClient(GDBusConnection* connection)
     return good;
 }
 
+constexpr char NETWORKS[] = "org.freedesktop.NetworkManager";
+constexpr char NETWORKS_PATH[] = "/org/freedesktop/NetworkManager";
+
+// A client that knows what to ask for, and does nothing else.
+class RawClient {
+public:
+    RawClient()
+    {
+        if (sd_bus_open_system(&bus_) < 0)
+            std::exit(EXIT_FAILURE);
+        sd_bus_match_signal(bus_, nullptr, NETWORKS, NETWORKS_PATH,
+                            "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                            &RawClient::onSignal, this);
+    }
+    ~RawClient()
+    {
+        sd_bus_unref(bus_);
+    }
+    RawClient(const RawClient&) = delete;
+    RawClient& operator=(const RawClient&) = delete;
+
+    bool asksProperty()
+    {
+        return calls(NETWORKS_PATH, "org.freedesktop.DBus.Properties", "Get", NETWORKS,
+                     "WwanEnabled");
+    }
+    bool asksAllOfTheRoot()
+    {
+        return calls(NETWORKS_PATH, "org.freedesktop.DBus.Properties", "GetAll", NETWORKS, nullptr);
+    }
+    bool asksTheTree()
+    {
+        return calls("/org/freedesktop", "org.freedesktop.DBus.ObjectManager", "GetManagedObjects",
+                     nullptr, nullptr);
+    }
+    bool waitsForASignal()
+    {
+        for (hasHeard_ = false; !hasHeard_;)
+            if (sd_bus_process(bus_, nullptr) == 0)
+                sd_bus_wait(bus_, UINT64_MAX);
+        return true;
+    }
+    void forgetSignals()
+    {
+        while (sd_bus_process(bus_, nullptr) > 0)
+            continue;
+    }
+
+private:
+    bool calls(const char* path, const char* interface, const char* method, const char* first,
+               const char* second)
+    {
+        sd_bus_message* question = nullptr;
+        sd_bus_message* reply = nullptr;
+        sd_bus_message_new_method_call(bus_, &question, NETWORKS, path, interface, method);
+        for (const char* const each : {first, second})
+            if (each != nullptr)
+                sd_bus_message_append(question, "s", each);
+        const bool good = sd_bus_call(bus_, question, 0, nullptr, &reply) >= 0;
+        sd_bus_message_unref(reply);
+        sd_bus_message_unref(question);
+        return good;
+    }
+    static int onSignal(sd_bus_message*, void* self, sd_bus_error*)
+    {
+        static_cast<RawClient*>(self)->hasHeard_ = true;
+        return 0;
+    }
+
+    sd_bus* bus_ = nullptr;
+    bool hasHeard_ = false;
+};
+
 bool runs(const char* command)
 {
     return std::system(command) == 0; // NOLINT(cert-env33-c): a fixed text
@@ -178,6 +249,7 @@ bool knowsPackage()
 
 void measureOtherQuestions()
 {
+    RawClient raw;
     measureAll({
         {"IsNetworkConnected", [] { return !library().IsNetworkConnected(false, false); }, 1000},
         {"IsNetworkConnected with Wi-Fi and Bluetooth",
@@ -193,6 +265,9 @@ void measureOtherQuestions()
                          "WwanEnabled >/dev/null");
          },
          50},
+        {"a raw client: one property", [&] { return raw.asksProperty(); }, 1000},
+        {"a raw client: all of the root object", [&] { return raw.asksAllOfTheRoot(); }, 1000},
+        {"a raw client: the whole tree", [&] { return raw.asksTheTree(); }, 300},
         {"GetPackageVersion", knowsPackage, 300},
         {"dpkg-query", [] { return runs("dpkg-query -W -f '${Version}' libc6 >/dev/null"); }, 50},
     });
@@ -229,6 +304,16 @@ void measureEvents(const NetworkManagerOnBus& networks)
              },
              50});
     library().SetConnectionEventListener(nullptr, nullptr);
+    RawClient raw;
+    bool isOn = true;
+    measure({"switch to the signal, as a raw client has it",
+             [&] {
+                 raw.forgetSignals();
+                 isOn = !isOn;
+                 networks.setSwitch("WwanEnabled", isOn);
+                 return raw.waitsForASignal();
+             },
+             50});
 }
 
 GDBusConnection* systemBus()

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What every question pays: instance access, a lock by name, debug lines; and the floor: what
+// The price of every question: instance access, a lock by name, debug lines; and the floor: what
 // two locks, a search in constant time and a copy cost at least.
 #include "Cases.h"
 
