@@ -1,5 +1,5 @@
 # shellcheck shell=bash disable=SC2034
-# What ./run and ./test share: where the tree is, and installing what is missing.
+# Shared by ./run and ./test: where the tree is, and installing what is missing.
 # Sourced by bash scripts.
 set -euo pipefail
 

@@ -1,16 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a question costs at worst: services and buses that misbehave, descriptors that run out, and
+// The worst cost of a question: services and buses that misbehave, descriptors that run out, and
 // processes that fork.
 #include <atomic>
 #include <chrono>
 #include <cstdlib>
 #include <functional>
+#include <future>
 #include <iostream>
 #include <memory>
 #include <thread>
+#include <utility>
 
 #include <gmock/gmock.h>
+#include <linux/filter.h>
+#include <linux/seccomp.h>
+#include <sys/prctl.h>
 #include <sys/resource.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <tapi_common.h>
@@ -20,6 +26,7 @@
 #include "events/ChangeEvents.h"
 #include "support/Child.h"
 #include "support/HostileBus.h"
+#include "support/Pauses.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
@@ -33,6 +40,7 @@ namespace {
 
 constexpr int CONNECTING_MS = 500;
 constexpr int QUESTION_MS = 2000;
+constexpr int ONE_WAIT_MS = 1200;           // with the slack, a question's 2 s
 constexpr int SLACK_MS = 800 * TIME_FACTOR; // of a busy machine
 constexpr char MODEM_MANAGER[] = "org.freedesktop.ModemManager1";
 constexpr char TREE[] = "GetManagedObjects";
@@ -106,22 +114,27 @@ protected:
         unsetenv("CORESYSTEM_DEVICE");
     }
 
+    // All at the same time, each of a backend that was asked nothing before.
     void expectEachWithin(int milliseconds, const std::string& situation)
     {
-        int worst = 0;
-        for (const Question& question : questions()) {
+        const Pauses pauses;
+        std::vector<int> times(questions().size());
+        together(static_cast<int>(times.size()), [&](int number) {
             const auto fresh = port::makeLinuxBackend();
-            const int time = millisecondsOf([&] { question.ask(*fresh); });
-            EXPECT_LT(time, milliseconds + SLACK_MS) << situation << ": " << question.name;
-            worst = std::max(worst, time);
-        }
-        std::cout << situation << ": worst " << worst << " ms" << std::endl;
+            times[number] = millisecondsOf([&] { questions()[number].ask(*fresh); });
+        });
+        for (std::size_t number = 0; number < times.size(); ++number)
+            EXPECT_LT(times[number], milliseconds + SLACK_MS + pauses.ofAnAnswer())
+                << situation << ": " << questions()[number].name;
+        std::cout << situation << ": worst " << *std::max_element(times.begin(), times.end())
+                  << " ms" << std::endl;
     }
 
     // Sixteen that ask one backend.
     static void expectEachThreadWithin(int milliseconds, const std::string& situation)
     {
         const auto backend = port::makeLinuxBackend();
+        const Pauses pauses;
         std::atomic<int> worst{0};
         together(16, [&](int) {
             for (const Question& question : questions()) {
@@ -132,7 +145,7 @@ protected:
             }
         });
         std::cout << situation << ", 16 threads: worst " << worst << " ms" << std::endl;
-        EXPECT_LT(worst, milliseconds + SLACK_MS);
+        EXPECT_LT(worst, milliseconds + SLACK_MS + pauses.ofAnAnswer());
     }
 
     PrivateBus bus;
@@ -179,12 +192,12 @@ TEST_F(HostileTest, ServicesThatAreLateOrStoppedAreOneQuestionsWait)
         services.back()->answer(simOf("<'001010123456789'>", "<'00101'>"));
         services.back()->answerLate(std::chrono::milliseconds(900));
     }
-    expectEachWithin(QUESTION_MS - SLACK_MS, "late");
+    expectEachWithin(ONE_WAIT_MS, "late");
     expectEachThreadWithin(QUESTION_MS, "late");
     for (const auto& service : services)
         for (const char* const method : {TREE, "Get", "GetAll", "Ping", "GetSettings"})
             service->keepSilent(method);
-    expectEachWithin(QUESTION_MS - SLACK_MS, "stopped");
+    expectEachWithin(ONE_WAIT_MS, "stopped");
     expectEachThreadWithin(QUESTION_MS, "stopped");
 }
 
@@ -254,16 +267,82 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
     }
 }
 
+// Answers in a service's place, before it does.
+class Stranger {
+public:
+    explicit Stranger(const std::string& address)
+        : connection_(g_dbus_connection_new_for_address_sync(address.c_str(), BUS_CLIENT, nullptr,
+                                                             nullptr, nullptr))
+    {
+    }
+    ~Stranger()
+    {
+        g_dbus_connection_close_sync(connection_, nullptr, nullptr);
+        g_object_unref(connection_);
+    }
+    Stranger(const Stranger&) = delete;
+    Stranger& operator=(const Stranger&) = delete;
+
+    void answer(GDBusMessage* question, const std::string& body) const
+    {
+        GDBusMessage* const reply = ScriptedService::reply(question, body);
+        g_dbus_connection_send_message(connection_, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                       nullptr);
+        g_object_unref(reply);
+    }
+    // Waits for the reply, before which all that was sent has been passed on.
+    void ask(const char* name, const char* method) const
+    {
+        GVariant* const reply = g_dbus_connection_call_sync(
+            connection_, name, "/", "org.freedesktop.DBus.ObjectManager", method, nullptr, nullptr,
+            G_DBUS_CALL_FLAGS_NONE, QUESTION_MS, nullptr, nullptr);
+        if (reply != nullptr)
+            g_variant_unref(reply);
+    }
+
+private:
+    GDBusConnection* const connection_;
+};
+
+TEST_F(HostileTest, StrangerIsNotBelieved)
+{
+    bus.start();
+    ScriptedService modems(bus.address(), MODEM_MANAGER);
+    const Stranger stranger(bus.address());
+    FakeModem other;
+    other.path += "1";
+    std::promise<std::shared_ptr<GDBusMessage>> asked;
+    modems.follow(TREE, [&asked, isFirst = true](GDBusMessage* question) mutable {
+        if (std::exchange(isFirst, false))
+            asked.set_value({G_DBUS_MESSAGE(g_object_ref(question)), g_object_unref});
+        return ScriptedService::reply(question, treeOf({FakeModem().text()}));
+    });
+    modems.answerOnlyTogether(2); // the backend's question and the stranger's
+    const auto backend = port::makeLinuxBackend();
+    auto asking = std::async([&] { return backend->telephony().slots(); });
+    const auto question = asked.get_future().get();
+    stranger.answer(question.get(), treeOf({FakeModem().text(), other.text()}));
+    stranger.ask(MODEM_MANAGER, TREE);
+    const auto answer = asking.get();
+    ASSERT_TRUE(answer) << reasonOf(answer);
+    EXPECT_EQ(std::vector<std::string>{"/virtual/home"}, answer.value().value);
+}
+
 TEST_F(HostileTest, BusThatIsStartedAgainLeavesNothingBehind)
 {
     const char* const wanted = std::getenv("CORESYSTEM_BUS_RESTARTS");
     const int restarts = wanted != nullptr ? std::atoi(wanted) : 200;
     const auto backend = port::makeLinuxBackend();
+    const auto reason = [&] {
+        const std::string first = reasonOf(backend->telephony().slots());
+        return first != "the system bus does not answer" // a machine may let it stand for long
+                   ? first
+                   : reasonOf(backend->telephony().slots());
+    };
     Usage before;
     for (int i = 0; i < restarts; ++i) {
         bus.start();
-        EXPECT_EQ(std::string(MODEM_MANAGER) + " is not on the system bus",
-                  reasonOf(backend->telephony().slots()));
+        EXPECT_EQ(std::string(MODEM_MANAGER) + " is not on the system bus", reason());
         bus.kill();
         if (i == restarts / 10) // what is made once is there
             before = Usage();
@@ -356,6 +435,43 @@ TEST_F(HostileTest, ProcessWithoutDescriptorsLives)
             << hasAsked;
 }
 
+// From here on this process makes no thread.
+void makeNoMoreThreads()
+{
+    sock_filter program[] = {
+        BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
+        BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_clone, 1, 0),
+        BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_clone3, 0, 1),
+        BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ERRNO | EAGAIN),
+        BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW),
+    };
+    const sock_fprog filter = {std::size(program), program};
+    prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
+    prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &filter);
+}
+
+TEST_F(HostileTest, ProcessWithoutThreadsLives)
+{
+#ifdef __SANITIZE_THREAD__
+    GTEST_SKIP() << "the thread sanitizer lets a forked child start no thread";
+#endif
+    bus.start();
+    ScriptedService modems(bus.address(), MODEM_MANAGER);
+    modems.answerTo(TREE, treeOf({FakeModem().text()}));
+    EXPECT_EQ("lives", inChild([&]() -> std::string {
+                  makeNoMoreThreads();
+                  const auto backend = port::makeLinuxBackend();
+                  for (const Question& question : questions())
+                      if (question.name != std::string("listener"))
+                          question.ask(*backend);
+                  port::ChangeEvents events(*backend);
+                  if (events.set(port::Change::FlightMode, [](int) {}))
+                      return "a listener was set";
+                  const std::string reason = reasonOf(backend->telephony().slots());
+                  return reason.empty() ? "lives" : reason;
+              }));
+}
+
 // A process with a listener whose threads ask all the time forks; the child asks everything, sets
 // and unsets a listener. What the child's questions gave, and how long they took at most.
 std::string askedByChildrenOfABusyProcess(int children)
@@ -395,8 +511,9 @@ std::string askedByChildrenOfABusyProcess(int children)
 
 TEST_F(HostileTest, ForkedChildIsAnsweredAtOnce)
 {
-#ifdef __SANITIZE_THREAD__
-    GTEST_SKIP() << "the thread sanitizer lets a forked child start no thread";
+#ifdef WITH_SANITIZERS
+    GTEST_SKIP() << "a child forked among threads finds ThreadSanitizer refusing it threads, and "
+                    "AddressSanitizer's allocator locked";
 #endif
     bus.start();
     const ScriptedService modems(bus.address(), MODEM_MANAGER);

@@ -24,10 +24,10 @@ def report(cases, count):
     return f'<?xml version="1.0"?><testsuites tests="{count}"><testsuite>{cases}</testsuite></testsuites>'
 
 
-def count(ctest, program):
-    """The lines for ctest's report and the program's; no text, no report."""
+def count(ctest, program, again=None):
+    """The lines for ctest's report, the program's and that of a second run; no text, no report."""
     with tempfile.TemporaryDirectory() as folder:
-        for name, text in (("ctest", ctest), (ENTRY, program)):
+        for name, text in (("ctest", ctest), (ENTRY, program), ("again", again)):
             if text is not None:
                 (pathlib.Path(folder) / f"{name}.xml").write_text(text, encoding="utf-8")
         done = subprocess.run([TOOL, folder], stdout=subprocess.PIPE, text=True, check=True)
@@ -67,6 +67,13 @@ class CountTests(unittest.TestCase):
                          [("passed", "unit.S.Passes"), ("failed", ENTRY)])
         self.assertEqual([line[:2] for line in count(ctest % "fail", report(FAILS, 1))],
                          [("failed", "unit.S.Fails")])
+
+    def test_what_ran_once_more_counts_as_it_did_then(self):
+        case = '<testcase name="%s" status="%s"/>'
+        first = f'<testsuite tests="2">{case % ("a", "fail")}{case % ("b", "fail")}</testsuite>'
+        again = f'<testsuite tests="2">{case % ("a", "run")}{case % ("b", "fail")}</testsuite>'
+        self.assertEqual(count(first, None, again), [("passed", "a", ""), ("failed", "b", "")])
+        self.assertEqual([("failed", "ctest")], [line[:2] for line in count(first, None, "<testsuite")])
 
     def test_report_of_ctest_that_cannot_be_right_is_a_failure(self):
         for ctest in (None, "", "<testsuite", '<testsuite tests="0"/>', '<testsuite tests="2"><testcase '
