@@ -25,7 +25,7 @@ public:
     Argument called(const std::string& name) const;
     /// Makes it a list: each time that it is given adds a value.
     Argument takesAll() const;
-    /// What is wrong with a value; empty when nothing is.
+    /// Explains what is wrong with a value; empty when nothing is.
     Argument checkedBy(std::string (*problemOf)(const std::string& value)) const;
 
     bool isGiven() const;
@@ -52,7 +52,7 @@ public:
 
     /// Ends the help with the command's own remarks and those that hold for every command.
     void setFooter(const std::string& remarks) const;
-    /// What follows when the command was given and its words are right.
+    /// Runs when the command was given and its words are right.
     void onUse(const std::function<void()>& action) const;
 
 private:

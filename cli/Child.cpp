@@ -1,8 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Child.h"
 
+#include <cerrno>
+#include <cstring>
+#include <stdexcept>
+
 #include <glib.h>
 #include <sys/prctl.h>
+#include <sys/signalfd.h>
 #include <unistd.h>
 
 namespace cli {
@@ -14,6 +19,13 @@ sigset_t setOf(std::initializer_list<int> signals)
     sigemptyset(&set);
     for (const int signal : signals)
         sigaddset(&set, signal);
+    return set;
+}
+
+// Leaves out the end of a child, which a shell may have started before it became this program.
+const sigset_t& endingSignals()
+{
+    static const sigset_t set = setOf({SIGHUP, SIGINT, SIGQUIT, SIGTERM, SIGUSR1, SIGUSR2});
     return set;
 }
 
@@ -44,6 +56,26 @@ HeldSignals::HeldSignals()
 HeldSignals::~HeldSignals()
 {
     sigprocmask(SIG_SETMASK, &before_, nullptr);
+}
+
+SignalReader::SignalReader()
+    : descriptor_(signalfd(-1, &endingSignals(), SFD_CLOEXEC | SFD_NONBLOCK))
+{
+    if (descriptor_ < 0)
+        throw std::runtime_error(std::string("no signals: ") + std::strerror(errno));
+}
+
+SignalReader::~SignalReader()
+{
+    close(descriptor_);
+}
+
+int SignalReader::read() const
+{
+    signalfd_siginfo signal = {};
+    return ::read(descriptor_, &signal, sizeof signal) == sizeof signal
+               ? static_cast<int>(signal.ssi_signo)
+               : 0;
 }
 
 pid_t startChild(std::vector<std::string> command, const Streams& streams)

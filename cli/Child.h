@@ -44,6 +44,29 @@ private:
     sigset_t before_;
 };
 
+/// While it lives, the signals that would end this process wait to be read. Needs no thread, which
+/// GLib's way does.
+class SignalReader {
+public:
+    /// Throws std::runtime_error when there is no descriptor left.
+    SignalReader();
+    ~SignalReader();
+    SignalReader(const SignalReader&) = delete;
+    SignalReader& operator=(const SignalReader&) = delete;
+
+    /// Can be polled for input.
+    int descriptor() const
+    {
+        return descriptor_;
+    }
+    /// The signal that came; 0 when none did. Does not wait.
+    int read() const;
+
+private:
+    const HeldSignals held_;
+    const int descriptor_;
+};
+
 } // namespace cli
 
 #endif

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What may stand at the end of a command line. The completions of all shells ask for it, so that
+// Completes the last word of a command line. The completions of all shells ask for it, so that
 // none of them knows a command or an option itself.
 #ifndef CLI_COMPLETION_H
 #define CLI_COMPLETION_H

@@ -47,7 +47,7 @@ bool isKeyOfKind(const Kind& kind, const std::string& key, const CountryAtlas& a
     });
 }
 
-// What a key means when it is taken as one kind.
+// The reading of a key as one kind.
 struct Reading {
     const Kind* kind;
     std::string key;

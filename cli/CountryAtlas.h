@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the library's country methods answer, gathered by asking them.
+// The library's answers about countries, gathered by asking them.
 #ifndef CLI_COUNTRY_ATLAS_H
 #define CLI_COUNTRY_ATLAS_H
 

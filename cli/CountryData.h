@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What is true today where the library's tables say something else, and what they leave out. Only
-// the command knows it: the library's answers stay as they are.
+// Corrects the library's tables where they are no longer true, and fills what they leave out. Only
+// the command knows this: the library's answers stay as they are.
 #ifndef CLI_COUNTRY_DATA_H
 #define CLI_COUNTRY_DATA_H
 

@@ -71,7 +71,7 @@ std::string areaForm(const std::string& key)
     return digits.size() < 2 ? "" : digits.insert(1, "-");
 }
 
-// What the country-data files say of a country that the library has no row of.
+// Looks in the country-data files for a country that the library has no row of.
 std::string outsideTheTables(const std::string& key)
 {
     std::vector<std::string> known;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What to tell somebody whose country key the library does not know.
+// Hints for somebody whose country key the library does not know.
 #ifndef CLI_COUNTRY_HINT_H
 #define CLI_COUNTRY_HINT_H
 

@@ -18,7 +18,7 @@ struct Capture {
     bool force = false;
 };
 
-// What the machine tells may be more than a device file can say.
+// Report the machine's facts that a device file cannot hold.
 void checkCaptured(const std::string& text)
 {
     const auto reading = port::devicefile::readDevice(text, "captured");

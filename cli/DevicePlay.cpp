@@ -1,16 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem device play`: the steps of a scenario, one after the other, onto another device file.
 #include <algorithm>
-#include <cerrno>
 #include <charconv>
 #include <chrono>
-#include <cstring>
 #include <filesystem>
 #include <memory>
 #include <optional>
 
 #include <poll.h>
-#include <sys/signalfd.h>
 #include <unistd.h>
 
 #include "Child.h"
@@ -42,22 +39,10 @@ struct Play {
 // Waits for the time of a step, a line of standard input, or a signal that ends it all.
 class Pace {
 public:
-    Pace() : signals_(signalfd(-1, &signalsOfChildren(), SFD_CLOEXEC))
-    {
-        if (signals_ < 0)
-            throw std::runtime_error(std::string("no signals: ") + std::strerror(errno));
-    }
-    ~Pace()
-    {
-        close(signals_);
-    }
-    Pace(const Pace&) = delete;
-    Pace& operator=(const Pace&) = delete;
-
     /// False when it is to end.
     bool awaitTime(int milliseconds) const
     {
-        pollfd either[] = {{signals_, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+        pollfd either[] = {{signals_.descriptor(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
         return poll(either, 2, milliseconds) == 0;
     }
     bool awaitLine(const std::string& limit, const std::string& when) const
@@ -67,8 +52,9 @@ public:
         char byte = 0;
         while (byte != '\n') {
             const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - Clock::now());
-            pollfd any[] = {
-                {signals_, POLLIN, 0}, {STDIN_FILENO, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+            pollfd any[] = {{signals_.descriptor(), POLLIN, 0},
+                            {STDIN_FILENO, POLLIN, 0},
+                            {STDOUT_FILENO, 0, 0}};
             const int ready =
                 poll(any, 3, static_cast<int>(std::max<std::int64_t>(left.count(), 0)));
             if (ready == 0)
@@ -83,23 +69,21 @@ public:
         return true;
     }
 
-    /// What it ends with before its time: a signal, a reader that is gone, or no more input.
+    /// The reason why it ends early: a signal, a reader that is gone, or no more input.
     ExitCode endBefore() const
     {
-        signalfd_siginfo signal = {};
-        pollfd either[] = {{signals_, POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
-        poll(either, 2, 0);
-        if (either[0].revents != 0 && read(signals_, &signal, sizeof signal) == sizeof signal)
-            return static_cast<ExitCode>(ENDED_BY_SIGNAL + static_cast<int>(signal.ssi_signo));
-        return either[1].revents != 0 ? SUCCESS : FAILURE;
+        if (const int signal = signals_.read())
+            return static_cast<ExitCode>(ENDED_BY_SIGNAL + signal);
+        pollfd reader = {STDOUT_FILENO, 0, 0};
+        poll(&reader, 1, 0);
+        return reader.revents != 0 ? SUCCESS : FAILURE;
     }
 
 private:
-    const HeldSignals held_;
-    const int signals_;
+    const SignalReader signals_;
 };
 
-// What is shown of a scenario while it runs.
+// Shows the progress of a scenario while it runs.
 class Progress {
 public:
     explicit Progress(std::size_t steps) : steps_(steps) {}

@@ -50,7 +50,7 @@ Fact answer(const Origins& origins, Question question, Json value)
     return {"", std::move(value), origins.of(question).source, ""};
 }
 
-// What stands between the semicolons of several texts, each once.
+// Lists the parts between the semicolons of several texts, each once.
 std::string joined(const std::vector<std::string>& texts)
 {
     const std::string separator = "; ";
@@ -73,7 +73,7 @@ Fact noAnswer(const std::string& reason)
     return {"", nullptr, "", reason};
 }
 
-// What applications get in place of an answer.
+// The value that applications get in place of an answer.
 std::string butTold(const std::string& reason, const std::string& told)
 {
     return reason + "; applications are told " + told;
@@ -178,7 +178,7 @@ Fact askSimCountry(const Origins& origins)
     const Fact mcc = ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)(origins);
     if (mcc.value.is_null())
         return mcc;
-    const cli::Answer country = cli::askCountryOf(mcc.value.get<std::string>());
+    const cli::ValueOrReason country = cli::askCountryOf(mcc.value.get<std::string>());
     return {"", country.value, country.value.is_null() ? "" : mcc.source, country.reason};
 }
 
@@ -195,7 +195,7 @@ Fact askImei(const Origins& origins)
 
 Fact askRoamingOfFirstSlot(const Origins& origins)
 {
-    const cli::Answer roaming = cli::askRoaming(0);
+    const cli::ValueOrReason roaming = cli::askRoaming(0);
     return roaming.value.is_null() ? noAnswer(roaming.reason)
                                    : answer(origins, Question::Roaming, roaming.value);
 }
@@ -218,23 +218,21 @@ Ask yesOrNo(std::vector<Question> questions, std::function<bool()> read)
     };
 }
 
-// What the port tells of a link alone; a device that has none tells why not in place of a source.
-Ask link(Question question)
+// The state of a link or of a modem's network, which only the port knows; where there is none, the
+// reason stands for a source.
+Ask alone(Question question)
 {
     return [question](const Origins&) {
-        const auto [word, origin] = coresystem_port::ask(question);
-        if (word.empty())
+        const auto told = coresystem_port::ask(question);
+        const auto& origin = told.origin;
+        const cli::ValueOrReason value = cli::answerOf(question, told);
+        if (value.value.is_null())
             return noAnswer(origin.reason);
-        return Fact{"", word, origin.available ? origin.source : origin.reason, ""};
+        return Fact{"", value.value, origin.available ? origin.source : origin.reason, ""};
     };
 }
 
-bool isMissing(Question link)
-{
-    return coresystem_port::ask(link).word == "not_supported";
-}
-
-// What is not there is not connected; what cannot be asked may be.
+// Treats a link that is not there as not connected; one that cannot be asked may be.
 Ask connected(bool overWifi, bool overBluetooth)
 {
     std::vector<Question> counted = {Question::Cellular};
@@ -252,7 +250,7 @@ Ask connected(bool overWifi, bool overBluetooth)
             if (origin.available)
                 sources.push_back(origin.source);
             else
-                (isOn || isMissing(question) ? missing : unknown).push_back(origin.reason);
+                (isOn || origin.isMissing ? missing : unknown).push_back(origin.reason);
         }
         if (!unknown.empty())
             return noAnswer(butTold(joined(unknown), "no"));
@@ -272,6 +270,10 @@ Fact askConnectedAny(const Origins& origins)
         return {"", true, ethernet.origin.source, ""};
     if (!connectivity.word.empty() && connectivity.word != "none")
         return {"", true, connectivity.origin.source, ""};
+    // A connection over Bluetooth is made by who tells of the connectivity.
+    if (told.value.is_null() && connectivity.word == "none" &&
+        connected(true, false)(origins).value == false)
+        return {"", false, connectivity.origin.source, ""};
     return ethernet.word.empty() ? noAnswer(joined({ethernet.origin.reason, told.reason})) : told;
 }
 
@@ -379,11 +381,17 @@ std::vector<FactRow> allFacts()
         {"data_roaming",
          yesOrNo({Question::DataRoaming}, [] { return library().IsDataRoamingEnabled(); })},
         {"mobile_data", yesOrNo({Question::MobileData}, [] { return library().IsMobileData(); })},
-        {"cellular", link(Question::Cellular)},
-        {"wifi", link(Question::Wifi)},
-        {"bluetooth", link(Question::Bluetooth)},
-        {"ethernet", link(Question::Ethernet)},
-        {"connectivity", link(Question::Connectivity)},
+        {"cellular", alone(Question::Cellular)},
+        {"operator", alone(Question::OperatorName)},
+        {"operator_mcc", alone(Question::OperatorMcc)},
+        {"operator_mnc", alone(Question::OperatorMnc)},
+        {"access_technology", alone(Question::AccessTechnology)},
+        {"signal", alone(Question::SignalStrength)},
+        {"wifi", alone(Question::Wifi)},
+        {"ssid", alone(Question::Ssid)},
+        {"bluetooth", alone(Question::Bluetooth)},
+        {"ethernet", alone(Question::Ethernet)},
+        {"connectivity", alone(Question::Connectivity)},
         {"connected_cellular", connected(false, false)},
         {"connected_cellular_or_wifi", connected(true, false)},
         {"connected_cellular_or_bluetooth", connected(false, true)},
@@ -426,7 +434,7 @@ bool isDaemons(const std::string& name)
 constexpr std::chrono::seconds PATIENCE(4);
 std::atomic<int> askingThreads{0};
 
-// What threads of their own ask for, and one waits for as long as it likes.
+// An answer that a thread of its own asks for, and that can be waited for with a limit.
 class Answers {
 public:
     explicit Answers(const std::vector<std::string>& names)

@@ -42,7 +42,7 @@ std::vector<std::string> watchableFactNames();
 /// Asks for one of these on this thread, and waits for as long as its source takes.
 Fact askFact(const std::string& name);
 
-/// What is told of each SIM slot, "slot[1].roaming"; of the first one only what no fact tells.
+/// The facts of each SIM slot, "slot[1].roaming"; the first only what no other fact tells.
 std::vector<Fact> askSlotFacts();
 
 /// Whether a question of askFacts() is still waiting for its answer. It cannot be called back: such

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the command says about itself.
+// The help texts of the command.
 #ifndef CLI_HELP_H
 #define CLI_HELP_H
 
@@ -12,7 +12,7 @@ namespace cli {
 /// The help of a command, in lines that fit the terminal.
 std::string helpText(const CLI::App& command);
 
-/// What somebody sees who gives no command.
+/// The text for somebody who gives no command.
 std::string startPage();
 
 /// Where more is said of a command.

@@ -15,7 +15,7 @@
 namespace cli {
 namespace {
 
-// What is wrong with the device file is told once, not with each fact.
+// Report a mistake in the device file once, not with each fact.
 std::string shortReason(const std::string& reason)
 {
     const std::string problem = coresystem_port::deviceFileProblem();
@@ -28,12 +28,14 @@ struct Section {
     std::vector<std::string> beginnings; // of the names of its facts
 };
 
-// What no section names is of the device itself.
+// Counts a fact that no section names as one of the device itself.
 const std::vector<Section> SECTIONS = {
     {"Device", {""}},
     {"Language", {"language"}},
     {"SIM card", {"sim_", "phone_number", "imei", "roaming"}},
-    {"Network", {"cellular", "wifi", "bluetooth", "ethernet", "connect"}},
+    {"Network",
+     {"cellular", "operator", "access_technology", "signal", "wifi", "ssid", "bluetooth",
+      "ethernet", "connect"}},
     {"Settings", {"flight_mode", "data_roaming", "mobile_data", "sales_code"}},
     {"Storage", {"storage"}},
 };
@@ -141,21 +143,18 @@ std::string infoJson(const std::vector<Fact>& facts)
     return jsonText(json);
 }
 
-// What an application may learn of its connections.
-const std::vector<std::string> NETWORK_FACTS = {
-    "cellular",
-    "wifi",
-    "bluetooth",
-    "ethernet",
-    "connectivity",
-    "connected_cellular",
-    "connected_cellular_or_wifi",
-    "connected_cellular_or_bluetooth",
-    "connected_any",
-    "flight_mode",
-    "mobile_data",
-    "data_roaming",
-};
+// The facts about connections.
+std::vector<std::string> networkFacts()
+{
+    std::vector<std::string> names = factNames();
+    names.erase(std::remove_if(names.begin(), names.end(),
+                               [](const std::string& name) {
+                                   return sectionOf(name).title != std::string("Network");
+                               }),
+                names.end());
+    names.insert(names.end(), {"flight_mode", "mobile_data", "data_roaming"});
+    return names;
+}
 
 std::vector<Fact> askAll(const std::vector<std::string>& names, bool reveal)
 {
@@ -182,7 +181,7 @@ ExitCode reportMissing(const Fact& fact)
     return NOT_AVAILABLE;
 }
 
-// What `get` is asked for.
+// The facts that `get` was asked for.
 struct Wanted {
     std::vector<std::string> names;
     bool list = false;
@@ -248,11 +247,13 @@ void addNetwork(const Command& app, Invocation& invocation)
     const Command network = app.add("network", "Show connections and their switches");
     network.flag("--json", invocation.json, "Print JSON");
     network.setFooter(
-        "Each link is told alone, then as applications ask for it, who always count the cellular "
-        "one: \"connected_cellular_or_wifi\" is yes when either is there.\n"
-        "\"connected_any\" also counts a cable, which applications are not told of.");
+        "Each link is shown on its own, then in the combinations that applications ask for, all of "
+        "which count the cellular link: \"connected_cellular_or_wifi\" is yes when either is up.\n"
+        "\"connected_any\" also counts a cable, which applications do not see. \"operator\" to "
+        "\"signal\" describe the modem that carries the data, else the first one with service; "
+        "`coresystem sim` shows them for each.");
     network.onUse([&invocation] {
-        invocation.command = [&invocation] { return runInfo(invocation, NETWORK_FACTS, false); };
+        invocation.command = [&invocation] { return runInfo(invocation, networkFacts(), false); };
     });
 }
 

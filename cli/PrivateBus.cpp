@@ -11,6 +11,7 @@
 
 #include <fcntl.h>
 #include <gio/gio.h>
+#include <pwd.h>
 #include <sys/file.h>
 #include <sys/prctl.h>
 #include <sys/stat.h>
@@ -162,7 +163,7 @@ Pipe makePipe()
     return {ends[0], ends[1]};
 }
 
-// What comes until the other side closes it.
+// Reads until the other side closes it.
 std::string readAll(int end)
 {
     std::string all;
@@ -254,8 +255,12 @@ void PrivateBus::writeConfiguration() const
 
 void PrivateBus::start(bool withBus, const std::vector<std::string>& services)
 {
-    if (withBus)
+    if (withBus) {
+        if (getpwuid(geteuid()) == nullptr) // as in a container with a user of any number
+            throw std::runtime_error("the private bus lets in only users with a name, and user " +
+                                     std::to_string(geteuid()) + " has none in /etc/passwd");
         writeConfiguration();
+    }
     const Pipe readiness = makePipe();
     const Pipe lifeline = makePipe();
     keeper_ = fork();

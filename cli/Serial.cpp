@@ -24,7 +24,7 @@ std::string faultOf(const char* call, const char* error)
                             : "";
 }
 
-// What the daemon answers in place of a serial number; empty when it answers nothing.
+// The daemon's answer when it has no serial number; empty when it answers nothing.
 std::string answerOfDaemon()
 {
     GError* error = nullptr;

@@ -12,11 +12,12 @@
 namespace cli {
 namespace {
 
-// What is told of a slot.
+// The lines about a slot.
 struct Column {
+    int table; // each is told on its own
     const char* title;
     const char* key; // in JSON
-    Answer SimSlot::*answer;
+    ValueOrReason SimSlot::*answer;
     bool isIdentity;      // masked unless it is to be revealed
     const char* fact;     // that tells it of the first slot, or empty
     const char* yes = ""; // the words for true and false
@@ -24,15 +25,24 @@ struct Column {
 };
 
 constexpr Column COLUMNS[] = {
-    {"SIM", "status", &SimSlot::status, false, ""},
-    {"MCC", "mcc", &SimSlot::mcc, false, "sim_mcc"},
-    {"MNC", "mnc", &SimSlot::mnc, false, "sim_mnc"},
-    {"MSIN", "msin", &SimSlot::msin, true, ""},
-    {"number", "phone_number", &SimSlot::phoneNumber, true, "phone_number"},
-    {"country", "country", &SimSlot::country, false, "sim_country"},
-    {"network", "roaming", &SimSlot::roaming, false, "roaming", "roaming", "home"},
-    {"SMS", "sms", &SimSlot::sms, false, "", "ready", "not ready"},
+    {0, "SIM", "status", &SimSlot::status, false, ""},
+    {0, "MCC", "mcc", &SimSlot::mcc, false, "sim_mcc"},
+    {0, "MNC", "mnc", &SimSlot::mnc, false, "sim_mnc"},
+    {0, "MSIN", "msin", &SimSlot::msin, true, ""},
+    {0, "number", "phone_number", &SimSlot::phoneNumber, true, "phone_number"},
+    {0, "country", "country", &SimSlot::country, false, "sim_country"},
+    {0, "network", "roaming", &SimSlot::roaming, false, "roaming", "roaming", "home"},
+    {0, "SMS", "sms", &SimSlot::sms, false, "", "ready", "not ready"},
+    {1, "operator", "operator", &SimSlot::operatorName, false, ""},
+    {1, "its MCC", "operator_mcc", &SimSlot::operatorMcc, false, ""},
+    {1, "its MNC", "operator_mnc", &SimSlot::operatorMnc, false, ""},
+    {1, "technology", "access_technology", &SimSlot::accessTechnology, false, ""},
+    {1, "signal %", "signal", &SimSlot::signal, false, ""},
+    {2, "power", "power", &SimSlot::power, false, ""},
+    {2, "PIN tries", "pin_tries", &SimSlot::pinTries, false, ""},
+    {2, "ICCID", "iccid", &SimSlot::iccid, true, ""},
 };
+constexpr int TABLES = 3;
 
 Json shown(const Column& column, const SimSlot& slot, bool reveal)
 {
@@ -45,20 +55,45 @@ std::string cellOf(const Column& column, const SimSlot& slot, bool reveal)
     const Json value = shown(column, slot, reveal);
     if (value.is_boolean())
         return value.get<bool>() ? column.yes : column.no;
-    return value.is_null() ? "-" : value.get<std::string>();
+    return value.is_null() ? "-" : textOf(value);
+}
+
+// Whether anything is known of what a table tells.
+bool isFilled(const std::vector<SimSlot>& slots, int table)
+{
+    for (const SimSlot& slot : slots)
+        for (const Column& column : COLUMNS)
+            if (column.table == table && !(slot.*column.answer).value.is_null())
+                return true;
+    return false;
+}
+
+std::string tableText(const std::vector<SimSlot>& slots, int number, bool reveal)
+{
+    Rows rows = {{"slot"}};
+    if (number == 0)
+        rows[0].emplace_back("modem");
+    for (const Column& column : COLUMNS)
+        if (column.table == number)
+            rows[0].emplace_back(column.title);
+    for (const SimSlot& slot : slots) {
+        rows.push_back({std::to_string(slot.number)});
+        if (number == 0)
+            rows.back().push_back(slot.modem);
+        for (const Column& column : COLUMNS)
+            if (column.table == number)
+                rows.back().push_back(cellOf(column, slot, reveal));
+    }
+    return table(rows);
 }
 
 std::string slotsText(const std::vector<SimSlot>& slots, bool reveal)
 {
-    Rows rows = {{"slot", "modem"}};
-    for (const Column& column : COLUMNS)
-        rows[0].emplace_back(column.title);
-    for (const SimSlot& slot : slots) {
-        rows.push_back({std::to_string(slot.number), slot.modem});
-        for (const Column& column : COLUMNS)
-            rows.back().push_back(cellOf(column, slot, reveal));
-    }
-    return table(rows);
+    std::string text = tableText(slots, 0, reveal);
+    for (int number = 1; number < TABLES; ++number)
+        if (isFilled(slots, number))
+            text += "\n" + tableText(slots, number, reveal);
+    return text;
 }
 
 // Each reason once for a slot, with everything that it takes away.
@@ -68,7 +103,7 @@ std::string reasonsText(const std::vector<SimSlot>& slots)
     for (const SimSlot& slot : slots) {
         std::map<std::string, std::size_t> rowOfReason;
         for (const Column& column : COLUMNS) {
-            const Answer& answer = slot.*column.answer;
+            const ValueOrReason& answer = slot.*column.answer;
             if (!answer.value.is_null())
                 continue;
             const auto [found, isNew] = rowOfReason.emplace(answer.reason, rows.size());
@@ -114,7 +149,7 @@ Json slotJson(const SimSlot& slot, bool reveal)
     Json json = {{"slot", slot.number}, {"modem", slot.modem}};
     Json reasons = Json::object();
     for (const Column& column : COLUMNS) {
-        const Answer& answer = slot.*column.answer;
+        const ValueOrReason& answer = slot.*column.answer;
         json[column.key] = shown(column, slot, reveal);
         if (answer.value.is_null())
             reasons[column.key] = answer.reason;
@@ -159,7 +194,7 @@ std::vector<Fact> askSlotFacts()
     std::vector<Fact> facts;
     for (const SimSlot& slot : askSims().slots)
         for (const Column& column : COLUMNS) {
-            const Answer& answer = slot.*column.answer;
+            const ValueOrReason& answer = slot.*column.answer;
             if (slot.number == 0 && *column.fact != '\0')
                 continue;
             facts.push_back({"slot[" + std::to_string(slot.number) + "]." + column.key,
@@ -174,7 +209,7 @@ void cli::addSimCommand(const Command& app, Invocation& invocation)
 {
     const Command sim = app.add("sim", "Show SIM cards");
     const auto reveal = std::make_shared<bool>(false);
-    sim.flag("--reveal", *reveal, "Show MSIN and phone number in full");
+    sim.flag("--reveal", *reveal, "Show MSIN, phone number and ICCID in full");
     sim.flag("--json", invocation.json, "Print JSON");
     sim.setFooter("Examples: coresystem sim\n"
                   "          coresystem sim --reveal --device phone\n"

@@ -70,26 +70,26 @@ std::string wordOf(const Word<Number> (&words)[count], Number number)
 }
 
 // The reason of a question that failed; it has none when the modem went away before it was asked.
-Answer unanswered(const Origins& origins, Question question)
+ValueOrReason unanswered(const Origins& origins, Question question)
 {
     const std::string reason = origins.of(question).reason;
     return {nullptr, reason.empty() ? "the platform gave no answer" : reason};
 }
 
-Answer askStatus(int slot)
+ValueOrReason askStatus(int slot)
 {
     const Origins origins;
     TelSimCardStatus_t status = NOT_READ;
     library().IsAvaliableState(slot, &status);
     return status == NOT_READ ? unanswered(origins, Question::SimCard)
-                              : Answer{wordOf(STATUSES, status), ""};
+                              : ValueOrReason{wordOf(STATUSES, status), ""};
 }
 
 struct Identity {
-    Answer mcc;
-    Answer mnc;
-    Answer msin;
-    Answer country;
+    ValueOrReason mcc;
+    ValueOrReason mnc;
+    ValueOrReason msin;
+    ValueOrReason country;
 };
 
 Identity askIdentity(const char* modem)
@@ -100,17 +100,17 @@ Identity askIdentity(const char* modem)
     std::string msin;
     if (library().GetSimInfo(modem, &mcc, &mnc, &msin))
         return {{mcc, ""}, {mnc, ""}, {msin, ""}, askCountryOf(mcc)};
-    const Answer none = unanswered(origins, Question::SimIdentity);
+    const ValueOrReason none = unanswered(origins, Question::SimIdentity);
     return {none, none, none, none};
 }
 
 // The platform fails, or succeeds with nothing, when the card holds no number.
-Answer askPhoneNumber(telephony_h& handle)
+ValueOrReason askPhoneNumber(telephony_h& handle)
 {
     const Origins origins;
     char* number = nullptr;
     const bool wasRead = library().GetPhoneNumber(&handle, &number);
-    Answer answer = unanswered(origins, Question::PhoneNumber);
+    ValueOrReason answer = unanswered(origins, Question::PhoneNumber);
     if (wasRead && number != nullptr)
         answer = {number, ""};
     else if (origins.of(Question::PhoneNumber).available)
@@ -119,37 +119,65 @@ Answer askPhoneNumber(telephony_h& handle)
     return answer;
 }
 
-Answer askSms(char* modem)
+ValueOrReason askSms(char* modem)
 {
     const Origins origins;
     int ready = 0;
-    return library().CheckSmsEnabled(modem, &ready) ? Answer{ready != 0, ""}
+    return library().CheckSmsEnabled(modem, &ready) ? ValueOrReason{ready != 0, ""}
                                                     : unanswered(origins, Question::SmsReadiness);
+}
+
+// The port's own facts, and their places in a slot.
+struct ModemFact {
+    Question question;
+    ValueOrReason SimSlot::*answer;
+};
+constexpr ModemFact MODEM_FACTS[] = {
+    {Question::OperatorName, &SimSlot::operatorName},
+    {Question::OperatorMcc, &SimSlot::operatorMcc},
+    {Question::OperatorMnc, &SimSlot::operatorMnc},
+    {Question::AccessTechnology, &SimSlot::accessTechnology},
+    {Question::SignalStrength, &SimSlot::signal},
+    {Question::PowerState, &SimSlot::power},
+    {Question::PinTries, &SimSlot::pinTries},
+    {Question::Iccid, &SimSlot::iccid},
+};
+
+void askModem(SimSlot& slot)
+{
+    std::vector<Question> questions;
+    for (const ModemFact& fact : MODEM_FACTS)
+        questions.push_back(fact.question);
+    const auto answers = coresystem_port::askModem(slot.modem, questions);
+    for (std::size_t i = 0; i < answers.size(); ++i)
+        slot.*MODEM_FACTS[i].answer = answerOf(questions[i], answers[i]);
 }
 
 SimSlot askSlot(int number, char* modem, telephony_h& handle)
 {
-    const Answer status = askStatus(number);
+    const ValueOrReason status = askStatus(number);
     const Identity identity = askIdentity(modem);
-    return {number,
-            modem,
-            status,
-            identity.mcc,
-            identity.mnc,
-            identity.msin,
-            identity.country,
-            askPhoneNumber(handle),
-            askRoaming(number),
-            askSms(modem)};
+    SimSlot slot = {number,
+                    modem,
+                    status,
+                    identity.mcc,
+                    identity.mnc,
+                    identity.msin,
+                    identity.country,
+                    askPhoneNumber(handle),
+                    askRoaming(number),
+                    askSms(modem)};
+    askModem(slot);
+    return slot;
 }
 
 template <typename Number, std::size_t count>
-Answer askSubscription(char* modem, bool (CoreSystem::*ask)(char*, Number*),
-                       const Word<Number> (&words)[count])
+ValueOrReason askSubscription(char* modem, bool (CoreSystem::*ask)(char*, Number*),
+                              const Word<Number> (&words)[count])
 {
     const Origins origins;
     auto slot = words[0].number;
-    return (library().*ask)(modem, &slot) ? Answer{wordOf(words, slot), ""}
+    return (library().*ask)(modem, &slot) ? ValueOrReason{wordOf(words, slot), ""}
                                           : unanswered(origins, Question::Subscriptions);
 }
 
@@ -189,6 +217,15 @@ cli::Sims cli::askSims()
     return sims;
 }
 
+cli::ValueOrReason cli::answerOf(Question question, const coresystem_port::Answer& told)
+{
+    if (told.word.empty())
+        return {nullptr, told.origin.reason};
+    const bool isNumber = told.origin.available &&
+                          (question == Question::SignalStrength || question == Question::PinTries);
+    return {isNumber ? Json(std::stoi(told.word)) : Json(told.word), ""};
+}
+
 std::string cli::whyNoSlotAnswers(const Origins& origins, Question question)
 {
     const coresystem_port::Origin asked = origins.of(question);
@@ -200,20 +237,21 @@ std::string cli::whyNoSlotAnswers(const Origins& origins, Question question)
     char** const modems = library().GetCpNameList();
     std::string states;
     for (int slot = 0; modems != nullptr && modems[slot] != nullptr; ++slot) {
-        const Answer status = askStatus(slot);
+        const ValueOrReason status = askStatus(slot);
         states += (states.empty() ? "slot " : "; slot ") + std::to_string(slot) + ": " +
                   (status.value.is_null() ? status.reason : status.value.get<std::string>());
     }
     return states.empty() ? whyNoSlots(origins) : "no usable SIM card: " + states;
 }
 
-cli::Answer cli::askCountryOf(const std::string& mcc)
+cli::ValueOrReason cli::askCountryOf(const std::string& mcc)
 {
     const Silence silence; // of the MCCs that the table lacks
     char* name = nullptr;
     library().GetCountryNameFromMcc(mcc.c_str(), &name);
-    const Answer answer =
-        name != nullptr ? Answer{name, ""} : Answer{nullptr, "the country table has no MCC " + mcc};
+    const ValueOrReason answer =
+        name != nullptr ? ValueOrReason{name, ""}
+                        : ValueOrReason{nullptr, "the country table has no MCC " + mcc};
     std::free(name);
     return answer;
 }
@@ -224,7 +262,7 @@ std::string cli::whyNoImei(const Origins& origins)
     return reason.empty() ? whyNoSlots(origins) : reason;
 }
 
-cli::Answer cli::askRoaming(int slot)
+cli::ValueOrReason cli::askRoaming(int slot)
 {
     const Origins origins;
     bool roaming = false;
@@ -235,9 +273,9 @@ cli::Answer cli::askRoaming(int slot)
     const coresystem_port::Origin service = origins.of(Question::NetworkService);
     if (service.available)
         return origins.of(Question::Roaming).reason.empty()
-                   ? Answer{nullptr, "the slot is not in service"}
+                   ? ValueOrReason{nullptr, "the slot is not in service"}
                    : unanswered(origins, Question::Roaming);
-    return service.reason.empty() ? Answer{nullptr, whyNoSlots(origins)}
+    return service.reason.empty() ? ValueOrReason{nullptr, whyNoSlots(origins)}
                                   : unanswered(origins, Question::NetworkService);
 }
 

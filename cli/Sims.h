@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the library tells an application about the SIM slots.
+// The library's answers about the SIM slots, and the port's about their modems.
 #ifndef CLI_SIMS_H
 #define CLI_SIMS_H
 
@@ -13,7 +13,7 @@
 namespace cli {
 
 // Null with a reason when it was not answered.
-struct Answer {
+struct ValueOrReason {
     Json value;
     std::string reason;
 };
@@ -21,20 +21,29 @@ struct Answer {
 struct SimSlot {
     int number;
     std::string modem;
-    Answer status; // "ready", "absent", ...
-    Answer mcc;
-    Answer mnc;
-    Answer msin;
-    Answer country; // its English name
-    Answer phoneNumber;
-    Answer roaming;
-    Answer sms; // whether text messages can be sent and received
+    ValueOrReason status; // "ready", "absent", ...
+    ValueOrReason mcc;
+    ValueOrReason mnc;
+    ValueOrReason msin;
+    ValueOrReason country; // its English name
+    ValueOrReason phoneNumber;
+    ValueOrReason roaming;
+    ValueOrReason sms; // whether text messages can be sent and received
+    // No application is told what follows.
+    ValueOrReason operatorName = {};
+    ValueOrReason operatorMcc = {};
+    ValueOrReason operatorMnc = {};
+    ValueOrReason accessTechnology = {};
+    ValueOrReason signal = {}; // in per cent
+    ValueOrReason power = {};
+    ValueOrReason pinTries = {};
+    ValueOrReason iccid = {};
 };
 
 // The slot that serves something by default, or "unknown".
 struct DefaultSlot {
     const char* use; // "network", ...
-    Answer slot;
+    ValueOrReason slot;
 };
 
 struct Sims {
@@ -45,6 +54,9 @@ struct Sims {
 
 Sims askSims();
 
+/// What the port tells, as a text or a number.
+ValueOrReason answerOf(coresystem_port::Question question, const coresystem_port::Answer& told);
+
 /// Why no slot answered a question whose origins are these: no telephony, no usable card, or the
 /// question's own reason.
 std::string whyNoSlotAnswers(const coresystem_port::Origins& origins,
@@ -54,10 +66,10 @@ std::string whyNoSlotAnswers(const coresystem_port::Origins& origins,
 std::string whyNoImei(const coresystem_port::Origins& origins);
 
 /// The English name of an MCC's country.
-Answer askCountryOf(const std::string& mcc);
+ValueOrReason askCountryOf(const std::string& mcc);
 
 /// Whether a slot is roaming.
-Answer askRoaming(int slot);
+ValueOrReason askRoaming(int slot);
 
 /// The value with all but its last two characters hidden.
 Json masked(const Json& value);

@@ -44,8 +44,8 @@ Character characterAt(const std::string& text, std::size_t position)
     return character;
 }
 
-// What a terminal does not show but obeys: marks that turn the order of letters, or are nothing to
-// see.
+// Characters that a terminal obeys but does not show: marks that turn the order of letters, or
+// have no width.
 bool isInvisible(wchar_t code)
 {
     constexpr std::pair<wchar_t, wchar_t> RANGES[] = {
@@ -178,7 +178,7 @@ cli::Rows printableRows(cli::Rows rows)
     return rows;
 }
 
-// What the rows fill when none of them is broken.
+// The width of the rows when none of them is broken.
 std::size_t fullWidthOf(const std::vector<std::size_t>& widths)
 {
     return std::accumulate(widths.begin(), widths.end(), GAP * (widths.size() - 1));

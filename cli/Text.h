@@ -24,7 +24,7 @@ std::string quoted(const std::string& text);
 std::string listed(const std::vector<std::string>& words);
 
 /// Rows of cells, aligned under each other, two blanks apart; printable() is applied to each cell.
-/// What does not fit the terminal goes on in lines below, further in.
+/// Continues what does not fit the terminal in lines below, indented.
 using Rows = std::vector<std::vector<std::string>>;
 std::string aligned(const Rows& rows, const std::string& indent = "  ");
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // `coresystem watch`: what a listener is told of connection changes, and each fact that changes.
 #include <algorithm>
-#include <csignal>
 #include <exception>
 #include <map>
 #include <memory>
@@ -15,6 +14,7 @@
 #include <glib-unix.h>
 #include <unistd.h>
 
+#include "Child.h"
 #include "Commands.h"
 #include "Facts.h"
 #include "Session.h"
@@ -51,8 +51,7 @@ class Loop {
 public:
     Loop()
     {
-        g_unix_signal_add(SIGINT, onSignal<SIGINT>, this);
-        g_unix_signal_add(SIGTERM, onSignal<SIGTERM>, this);
+        g_unix_fd_add(signals_.descriptor(), G_IO_IN, onSignal, this);
         g_unix_fd_add(STDOUT_FILENO, G_IO_ERR, onReaderGone, this);
     }
 
@@ -67,11 +66,11 @@ public:
     }
 
 private:
-    template <int number>
-    static gboolean onSignal(gpointer self)
+    static gboolean onSignal(int, GIOCondition, gpointer self)
     {
-        static_cast<Loop*>(self)->end_ = static_cast<ExitCode>(ENDED_BY_SIGNAL + number);
-        static_cast<Loop*>(self)->quit();
+        Loop& loop = *static_cast<Loop*>(self);
+        loop.end_ = static_cast<ExitCode>(ENDED_BY_SIGNAL + loop.signals_.read());
+        loop.quit();
         return G_SOURCE_CONTINUE;
     }
     static gboolean onReaderGone(int, GIOCondition, gpointer self)
@@ -80,6 +79,7 @@ private:
         return G_SOURCE_REMOVE;
     }
 
+    const SignalReader signals_;
     ExitCode end_ = SUCCESS;
     std::unique_ptr<GMainLoop, void (*)(GMainLoop*)> loop_{g_main_loop_new(nullptr, FALSE),
                                                            g_main_loop_unref};
@@ -336,13 +336,13 @@ void cli::addWatchCommand(const Command& app, Invocation& invocation)
     const auto options = std::make_shared<WatchOptions>();
     watch.option("FACT", options->names,
                  "Facts, as `coresystem get --list` names them, or slot; all without one");
-    watch.flag("--events", options->eventsOnly, "Show only what a listener is told");
+    watch.flag("--events", options->eventsOnly, "Show only the events that a listener receives");
     watch.flag("--reveal", options->reveal, "Show what identifies the device and its user in full");
     watch.flag("--json", invocation.json, "Print a JSON object a line");
     watch.setFooter("Examples: coresystem watch\n"
                     "          coresystem watch roaming flight_mode --device phone.toml\n"
-                    "\"event\" is before what a listener is told; facts have the old and the new "
-                    "value.\n"
+                    "Events that a listener receives begin with \"event\"; facts show the old and "
+                    "the new value.\n"
                     "-v also shows what is wrong with an edit. Ends at Ctrl-C (exit code 130) or "
                     "when nobody reads any more (0).");
     watch.onUse([&invocation, options] {

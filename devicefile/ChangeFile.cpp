@@ -38,7 +38,7 @@ bool isSame(const struct stat& left, const struct stat& right)
     return left.st_dev == right.st_dev && left.st_ino == right.st_ino;
 }
 
-// What lies beside a file while it is changed: hidden, and called after it.
+// The file that lies beside another while that is changed: hidden, and named after it.
 constexpr char LOCK[] = ".coresystem-lock";
 constexpr char SUCCESSOR[] = ".coresystem-XXXXXX";
 

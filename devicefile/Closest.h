@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a mistyped word was meant to be.
+// Finds the word that a mistyped one was meant to be.
 #ifndef DEVICEFILE_CLOSEST_H
 #define DEVICEFILE_CLOSEST_H
 

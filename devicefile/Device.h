@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a device file says, as values that know where they stand.
+// The content of a device file, as values that know where they stand.
 #ifndef DEVICEFILE_DEVICE_H
 #define DEVICEFILE_DEVICE_H
 
@@ -18,7 +18,7 @@
 
 namespace port::devicefile {
 
-// What a call is told to do in place of what it does.
+// The behaviour that replaces a call's own.
 struct Fault {
     std::string error; // its name in the file; empty: none, the call is late only
     Meaning meaning;   // the error's
@@ -92,7 +92,7 @@ private:
     std::map<std::string, Value> values_;
 };
 
-// What a scenario changes, all at once, some time after the step before it.
+// The changes that a scenario makes at once, some time after the step before.
 struct Step {
     std::int64_t afterMs = 0;
     std::string note;

@@ -33,8 +33,8 @@ std::string inQuotes(std::string_view name)
     return stream.str();
 }
 
-// What to add to a message about a name that is none of the known ones. A text that is much longer
-// than any of them is meant to be none, and costs much to compare.
+// Suggests the known name that was meant by an unknown one. A text that is much longer
+// than all of them was meant to be none, and costs much to compare.
 constexpr std::size_t LONGEST_NAME = 64;
 
 std::string hint(std::string_view name, const std::vector<std::string>& known)
@@ -77,9 +77,10 @@ bool isWithin(const Type& type, std::int64_t number)
     return type.least <= number && number <= type.most;
 }
 
-bool isLongEnough(const Type& type, const std::string& text)
+bool fits(const Type& type, const std::string& text)
 {
-    return static_cast<std::int64_t>(text.size()) >= type.least;
+    const auto size = static_cast<std::int64_t>(text.size());
+    return size >= type.least && (type.most < type.least || size <= type.most);
 }
 
 std::vector<std::string> sectionNames()
@@ -120,11 +121,13 @@ std::string countOf(const Type& type)
            std::to_string(type.most);
 }
 
-// What a key must be, for its writer.
+// Tells the writer of a key which values it takes.
 std::string expected(const Type& type)
 {
     switch (type.kind) {
     case Type::Kind::Text:
+        if (type.most >= type.least)
+            return "a text of " + countOf(type) + " bytes in quotes";
         return type.least > 0 ? "a text in quotes that is not empty" : "a text in quotes";
     case Type::Kind::Digits:
         return countOf(type) + " digits in quotes";
@@ -182,7 +185,7 @@ std::optional<Content> readText(const Type& type, const std::string& text)
     case Type::Kind::BusFault:
         return readFault(type, text);
     case Type::Kind::Text:
-        return isLongEnough(type, text) ? std::optional<Content>(text) : std::nullopt;
+        return fits(type, text) ? std::optional<Content>(text) : std::nullopt;
     default:
         return std::nullopt;
     }
@@ -435,7 +438,7 @@ private:
         return nullptr;
     }
 
-    // What holds between a slot's keys, and between slots.
+    // Check what must hold between a slot's keys, and between slots.
     void completeSlot(Section& slot, const toml::table& table)
     {
         // An IMSI has 15 digits at most (ITU E.212).

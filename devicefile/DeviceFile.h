@@ -29,8 +29,8 @@ struct Problem {
 /// FILE:LINE:COLUMN: text.
 std::string describe(const std::string& path, const Problem& problem);
 
-/// What the text of a device file says, and every mistake in it, in the order of the text. What is
-/// no TOML has one: the first.
+/// The content of a device file, and every mistake in it, in the order of the text. Text that
+/// is not TOML has one: the first.
 struct Reading {
     Device device; // only of use without a problem
     std::vector<Problem> problems;
@@ -65,7 +65,7 @@ public:
     /// is parsed once, whichever threads meet which of them; nobody waits for another's text.
     Result<std::shared_ptr<const Device>> device();
 
-    /// What a function of the device tells.
+    /// The result of a function of the device.
     template <typename T, typename Function>
     Result<Sourced<T>> ask(Function function)
     {

@@ -125,7 +125,7 @@ bool isInList(const DevicePath& path)
     return section != nullptr && section->form == Form::List && path.size() > 2;
 }
 
-// What is there as a text: every value, and how long each list is.
+// The content as text: every value, and the length of each list.
 using Values = std::map<std::string, std::string>;
 
 Values valuesOf(const toml::table& root)
@@ -174,7 +174,7 @@ public:
     {
     }
 
-    // What stands there now.
+    // The text that stands there now.
     std::string_view old() const
     {
         return isThere() && !walk_.node->is_table() ? document_.textOf(*walk_.node) : "";

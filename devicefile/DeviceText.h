@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Reads and changes single values in the text of a device file. No input or output here.
 //
-// What a change promises: the new text is TOML in which the value is the one asked for and every
+// A change promises this: the new text is TOML in which the value is the one asked for and every
 // other value is what it was. Of the text only the value's own bytes change, or, for a key that
 // comes or goes, one run of bytes: comments, order, blanks, quotes, line endings and a byte order
 // mark stay, as does a missing line ending at the end. A change that cannot be made so is an error.

@@ -2,6 +2,7 @@
 #include "Schema.h"
 
 #include <algorithm>
+#include <array>
 #include <iterator>
 #include <limits>
 
@@ -67,6 +68,34 @@ constexpr Name SERVICES[] = {
     name("emergency_only", ServiceState::EmergencyOnly),
 };
 
+// As ModemManager says it.
+constexpr Name ACCESS_TECHNOLOGIES[] = {
+    name("pots", AccessTechnology::Pots),
+    name("gsm", AccessTechnology::Gsm),
+    name("gsm-compact", AccessTechnology::GsmCompact),
+    name("gprs", AccessTechnology::Gprs),
+    name("edge", AccessTechnology::Edge),
+    name("umts", AccessTechnology::Umts),
+    name("hsdpa", AccessTechnology::Hsdpa),
+    name("hsupa", AccessTechnology::Hsupa),
+    name("hspa", AccessTechnology::Hspa),
+    name("hspa-plus", AccessTechnology::HspaPlus),
+    name("1xrtt", AccessTechnology::OneXrtt),
+    name("evdo0", AccessTechnology::Evdo0),
+    name("evdoa", AccessTechnology::EvdoA),
+    name("evdob", AccessTechnology::EvdoB),
+    name("lte", AccessTechnology::Lte),
+    name("5gnr", AccessTechnology::FiveGNr),
+    name("lte-cat-m", AccessTechnology::LteCatM),
+    name("lte-nb-iot", AccessTechnology::LteNbIot),
+};
+
+constexpr Name POWER_STATES[] = {
+    name("off", PowerState::Off),
+    name("low", PowerState::Low),
+    name("on", PowerState::On),
+};
+
 constexpr Name UNKNOWN_SLOT[] = {{"unknown", -1}};
 
 constexpr Name VOICES[] = {
@@ -113,6 +142,19 @@ constexpr Name CONNECTIVITIES[] = {
 constexpr Name OR_NULL[] = {{"null", Meaning::Kind::Nothing}};
 constexpr Name OR_EMPTY[] = {{"empty", Meaning::Kind::Nothing}};
 
+// The rows of two lists, one after the other.
+template <std::size_t First, std::size_t Second>
+constexpr std::array<Name, First + Second> joined(const Name (&first)[First],
+                                                  const Name (&second)[Second])
+{
+    std::array<Name, First + Second> all{};
+    for (std::size_t i = 0; i < First; ++i)
+        all[i] = first[i];
+    for (std::size_t i = 0; i < Second; ++i)
+        all[First + i] = second[i];
+    return all;
+}
+
 constexpr auto PACKAGE_MANAGER_ERRORS_OR_NULL = joined(PACKAGE_MANAGER_ERRORS, OR_NULL);
 constexpr auto SYSTEM_INFO_ERRORS_OR_NULL = joined(SYSTEM_INFO_ERRORS, OR_NULL);
 constexpr auto SYSTEM_SETTINGS_ERRORS_OR_NULL = joined(SYSTEM_SETTINGS_ERRORS, OR_NULL);
@@ -133,6 +175,7 @@ constexpr std::int64_t ANY = std::numeric_limits<std::int64_t>::max();
 
 constexpr Type TEXT{Type::Kind::Text};
 constexpr Type SOME_TEXT{Type::Kind::Text, 1};
+constexpr Type SSID{Type::Kind::Text, 1, 32}; // IEEE 802.11, 9.4.2.2
 constexpr Type SWITCH{Type::Kind::Switch};
 constexpr Type NUMBER{Type::Kind::Number};
 

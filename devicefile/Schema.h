@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a device file may say: its sections, their keys and the type of each.
+// The schema of device files: their sections, their keys and the type of each.
 #ifndef DEVICEFILE_SCHEMA_H
 #define DEVICEFILE_SCHEMA_H
 
@@ -10,7 +10,7 @@
 
 namespace port::devicefile {
 
-// What a number or a name in quotes stands for.
+// The meaning of a number or of a name in quotes.
 struct Meaning {
     enum class Kind {
         Number,       // `number`, which may be an enumerator's or an error's
@@ -31,7 +31,7 @@ struct Meaning {
     }
 };
 
-// What is wrong with the bus of a program that is run on a device.
+// The fault of the bus of a program that is run on a device.
 enum class BusFault { NoBus };
 
 // How a service misbehaves.
@@ -58,7 +58,7 @@ struct Names {
 
 struct Type {
     enum class Kind {
-        Text,     // in quotes, without a NUL, `least` bytes or longer
+        Text,     // in quotes, without a NUL, from `least` to `most` bytes; no end below `least`
         Digits,   // in quotes, from `least` to `most` of them
         Number,   // a phone number in quotes, or "null"
         Switch,   // true or false

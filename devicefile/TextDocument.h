@@ -27,7 +27,7 @@ public:
         return root_;
     }
 
-    /// What is written for a node that stands behind "=" or in brackets.
+    /// The text of a node that stands behind "=" or in brackets.
     std::string_view textOf(const toml::node& node) const;
 
     std::string withValue(const toml::node& old, const std::string& value) const;

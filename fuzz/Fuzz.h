@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the fuzzers share.
+// Shared by the fuzzers.
 #ifndef FUZZ_FUZZ_H
 #define FUZZ_FUZZ_H
 

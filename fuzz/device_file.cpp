@@ -26,7 +26,7 @@ void checkReason(const std::string& reason)
             "the message is one line with its place", reason);
 }
 
-// What the simulator builds on.
+// Checks the properties that the simulator relies on.
 void checkDevice(const Device& device)
 {
     std::set<std::string> modems;

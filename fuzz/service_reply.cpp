@@ -56,7 +56,7 @@ std::string replyOf(const std::string& type, const std::string& body)
     return header + body;
 }
 
-// What the other end of a connection says; null for what is refused as no message.
+// The message at the other end of a connection; null for one that is refused.
 class Connection {
 public:
     explicit Connection(const std::string& reply)

@@ -58,7 +58,7 @@ void readPackages(const std::string& text)
     }
 }
 
-// What a reason may hold is in none of the made-up texts' alphabet.
+// A reason's own characters are in none of the made-up texts' alphabet.
 void readConfiguration(const std::string& text)
 {
     const MemoryFile file(text);

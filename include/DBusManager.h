@@ -7,7 +7,7 @@
 typedef struct _GDBusConnection GDBusConnection; // NOLINT(bugprone-reserved-identifier)
 typedef struct _GDBusMessage GDBusMessage;       // NOLINT(bugprone-reserved-identifier)
 
-/// What GetDeviceUniqueID() answers.
+/// The codes that GetDeviceUniqueID() returns.
 enum CoreDbusError {
     CORE_DBUS_ERROR_NONE = 0,
     CORE_DBUS_ERROR_CONNECTION_FAIL = 1,    ///< no connection to the system bus

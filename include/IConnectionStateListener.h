@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 /// \file
-/// What an application implements to be told of connection changes.
+/// The interface that an application implements to hear of connection changes.
 #ifndef CORESYSTEM_I_CONNECTION_STATE_LISTENER_H
 #define CORESYSTEM_I_CONNECTION_STATE_LISTENER_H
 

@@ -109,7 +109,7 @@ __attribute__((noinline)) const char* keptMccOfCallingCode(const char* countryCa
     return mcc;
 }
 
-// What the identity questions answer without a handle list.
+// The code of an identity question without a handle list.
 const int NO_HANDLES = 4;
 
 // A SIM identity question: how one slot is read, and what the walks over the slots make of it. The

@@ -27,7 +27,7 @@
 // Log lines are rare: their code stays out of the callers' way.
 #define CORESYSTEM_COLD __attribute__((cold, noinline))
 
-// What every line begins with: file, function, line.
+// Begins every line: file, function, line.
 #define LOG_PREFIX "%s: %s(%d) > "
 
 #define LOG_SITE (::coresystem::LogSite{CORESYSTEM_DEFAULT_TAG, __FILE__, __func__, __LINE__})

@@ -52,7 +52,7 @@ inline void convert(const Keys& keys, const KeyIndex& index, const Values& value
 
 const char* const SIM_ACCESS = "CORE_MUTEX_NAME_SIM_ACCESS";
 
-// What the identity reads answer when they fail, whatever the platform said.
+// The code of an identity read that fails, whatever the platform said.
 const int READ_FAILED = 4;
 
 // Runs one platform call under the SIM access lock and nothing else.

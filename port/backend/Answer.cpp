@@ -1,52 +1,137 @@
 // SPDX-License-Identifier: Apache-2.0
 // Answers in the words of a device file.
+#include <algorithm>
+
 #include "../../devicefile/Schema.h"
 #include "Backend.h"
+#include "Origin.h"
 
 namespace {
 
 using coresystem_port::Answer;
+using coresystem_port::Question;
+using port::Error;
+using port::ModemReport;
 using port::Result;
 using port::Sourced;
 using port::devicefile::Meaning;
 
-std::string wordOf(const char* key, Meaning meaning)
+struct Key {
+    const char* section;
+    const char* name;
+};
+
+std::string nameOf(const Key& key, Meaning meaning)
 {
-    const auto& section = *port::devicefile::findSection("network");
-    for (const auto& name : port::devicefile::findKey(section, key)->names)
+    const auto& section = *port::devicefile::findSection(key.section);
+    for (const auto& name : port::devicefile::findKey(section, key.name)->names)
         if (name.meaning == meaning)
             return std::string(name.name);
     return {};
 }
 
 template <typename T>
-Answer answer(const char* key, const Result<Sourced<T>>& found)
+std::string wordOf(const Key& key, const T& value)
 {
+    if constexpr (std::is_enum_v<T>)
+        return nameOf(key, static_cast<std::int64_t>(value));
+    else if constexpr (std::is_same_v<T, std::string>)
+        return value;
+    else
+        return std::to_string(value);
+}
+
+template <typename T>
+Answer answer(const Key& key, const Result<Sourced<T>>& found)
+{
+    const coresystem_port::Origin origin = port::originOf(found);
     if (found)
-        return {wordOf(key, static_cast<std::int64_t>(found.value().value)),
-                {true, found.value().source, ""}};
-    const bool isSupported = found.error().kind != port::Error::Kind::NotSupported;
-    return {isSupported ? "" : wordOf(key, Meaning::Kind::NotSupported),
-            {false, "", found.error().reason}};
+        return {wordOf(key, found.value().value), origin};
+    return {origin.isMissing ? nameOf(key, Meaning::Kind::NotSupported) : "", origin};
+}
+
+Answer noAnswer(const Error& error)
+{
+    return {"", port::originOf(Result<port::Fact>(error))};
+}
+
+Answer answerIn(const ModemReport& report, Question question)
+{
+    switch (question) {
+    case Question::OperatorName:
+        return answer({"slot", "operator"}, report.operatorName);
+    case Question::OperatorMcc:
+        return answer({"slot", "operator_mcc"}, report.operatorMcc);
+    case Question::OperatorMnc:
+        return answer({"slot", "operator_mnc"}, report.operatorMnc);
+    case Question::AccessTechnology:
+        return answer({"slot", "access_technology"}, report.accessTechnology);
+    case Question::SignalStrength:
+        return answer({"slot", "signal"}, report.signal);
+    case Question::PowerState:
+        return answer({"slot", "power"}, report.power);
+    case Question::PinTries:
+        return answer({"slot", "pin_retries"}, report.pinTries);
+    case Question::Iccid:
+        return answer({"slot", "iccid"}, port::backend().telephony().iccid(report.slot));
+    default:
+        return noAnswer(port::notAvailable("no question of a link or a modem"));
+    }
+}
+
+// The first of those that are used for most.
+Answer answerOfModemInUse(Question question)
+{
+    const auto reports = port::backend().telephony().reports();
+    if (!reports)
+        return noAnswer(reports.error());
+    const auto most =
+        std::max_element(reports.value().begin(), reports.value().end(),
+                         [](const ModemReport& a, const ModemReport& b) { return a.use < b.use; });
+    return most != reports.value().end()
+               ? answerIn(*most, question)
+               : noAnswer(port::notAvailable("the telephony service knows no modem"));
+}
+
+// Without a report where none of the questions needs it.
+ModemReport reportOf(const std::string& modem, const std::vector<Question>& questions)
+{
+    if (std::all_of(questions.begin(), questions.end(),
+                    [](Question question) { return question == Question::Iccid; }))
+        return port::emptyReport(modem, port::notAvailable("no modem " + modem));
+    return port::reportOf(port::backend().telephony(), modem);
 }
 
 } // namespace
 
-coresystem_port::Answer coresystem_port::ask(Question question)
+Answer coresystem_port::ask(Question question)
 {
     port::Network& network = port::backend().network();
     switch (question) {
     case Question::Cellular:
-        return answer("cellular", network.cellular());
+        return answer({"network", "cellular"}, network.cellular());
     case Question::Wifi:
-        return answer("wifi", network.wifi());
+        return answer({"network", "wifi"}, network.wifi());
     case Question::Bluetooth:
-        return answer("bluetooth", network.bluetooth());
+        return answer({"network", "bluetooth"}, network.bluetooth());
     case Question::Ethernet:
-        return answer("ethernet", network.ethernet());
+        return answer({"network", "ethernet"}, network.ethernet());
     case Question::Connectivity:
-        return answer("connectivity", network.connectivity());
+        return answer({"network", "connectivity"}, network.connectivity());
+    case Question::Ssid:
+        return answer({"network", "ssid"}, network.ssid());
     default:
-        return {"", {false, "", "no question of a link"}};
+        return answerOfModemInUse(question);
     }
+}
+
+std::vector<Answer> coresystem_port::askModem(const std::string& modem,
+                                              const std::vector<Question>& questions)
+{
+    const ModemReport report = reportOf(modem, questions);
+    std::vector<Answer> answers;
+    answers.reserve(questions.size());
+    for (const Question question : questions)
+        answers.push_back(answerIn(report, question));
+    return answers;
 }

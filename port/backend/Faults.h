@@ -9,7 +9,7 @@
 
 namespace port {
 
-// What a call does in place of what it is for.
+// The behaviour that a device file gives a call instead of its own.
 struct CallFault {
     enum class Answer {
         Own,        // its own: it is late only

@@ -19,10 +19,10 @@ enum class CellularState {
     Connected,
 };
 
-// Of a radio that carries connections, Wi-Fi or Bluetooth.
+// The state of a radio that carries connections, Wi-Fi or Bluetooth.
 enum class LinkState { Deactivated, Disconnected, Connected };
 
-// What the network gives access to: to nothing, to a page that wants a consent, not to the
+// How far the network reaches: nowhere, to a page that asks for consent, not to the
 // Internet, to all of it. Unknown is what a device file says; it is no answer.
 enum class Connectivity { Unknown, None, Portal, Limited, Full };
 
@@ -66,6 +66,11 @@ public:
     virtual Result<Sourced<LinkState>> ethernet()
     {
         return notSupported("no Ethernet");
+    }
+    /// The name of the Wi-Fi network that is connected, UTF-8.
+    virtual Result<Fact> ssid()
+    {
+        return notSupported("no Wi-Fi");
     }
     virtual Result<Sourced<Connectivity>> connectivity()
     {

@@ -36,7 +36,7 @@ struct coresystem_port::Origins::Collected {
 namespace coresystem_port {
 
 struct OriginsAccess {
-    // Of this thread.
+    // The innermost collection of this thread.
     static Origins::Collected*& innermost()
     {
         static thread_local Origins::Collected* collected = nullptr;

@@ -12,13 +12,17 @@ namespace port {
 void recordOrigin(coresystem_port::Question question, const coresystem_port::Origin& origin);
 
 template <typename T>
+coresystem_port::Origin originOf(const Result<Sourced<T>>& answer)
+{
+    if (answer)
+        return {true, answer.value().source, ""};
+    return {false, "", answer.error().reason, answer.error().kind == Error::Kind::NotSupported};
+}
+
+template <typename T>
 void recordOrigin(coresystem_port::Question question, const Result<Sourced<T>>& answer)
 {
-    coresystem_port::Origin origin;
-    origin.available = static_cast<bool>(answer);
-    (answer ? origin.source : origin.reason) =
-        answer ? answer.value().source : answer.error().reason;
-    recordOrigin(question, origin);
+    recordOrigin(question, originOf(answer));
 }
 
 } // namespace port

@@ -72,7 +72,7 @@ Result<T> orElse(const Error& first, const Result<T>& second)
     return Error{second.error().kind, first.reason + "; " + second.error().reason};
 }
 
-// What a backend answers, and the service or file that served it.
+// A backend's answer, and the service or file that gave it.
 template <typename T>
 struct Sourced {
     T value;

@@ -47,7 +47,54 @@ struct Imsi {
     std::string msin; // up to ten
 };
 
+// Numbered as ModemManager's bits are.
+enum class AccessTechnology {
+    Pots,
+    Gsm,
+    GsmCompact,
+    Gprs,
+    Edge,
+    Umts,
+    Hsdpa,
+    Hsupa,
+    Hspa,
+    HspaPlus,
+    OneXrtt,
+    Evdo0,
+    EvdoA,
+    EvdoB,
+    Lte,
+    FiveGNr,
+    LteCatM,
+    LteNbIot,
+};
+
+enum class PowerState { Off, Low, On };
+
 enum class ServiceState { InService, OutOfService, EmergencyOnly };
+
+// What a slot's modem tells of itself and of the network that it is registered with, each for
+// itself.
+struct ModemReport {
+    // What the modem is used for; more of it comes later.
+    enum class Use { None, Service, Data };
+
+    SlotName slot;
+    Use use;
+    Result<Fact> operatorName;
+    Result<Fact> operatorMcc;
+    Result<Fact> operatorMnc;
+    Result<Sourced<AccessTechnology>> accessTechnology; // the newest of several at once
+    Result<Sourced<int>> signal;                        // in per cent
+    Result<Sourced<PowerState>> power;
+    Result<Sourced<int>> pinTries; // before the card wants its PUK
+};
+
+/// A report in which each answer is this error.
+inline ModemReport emptyReport(const SlotName& slot, const Error& error)
+{
+    return {slot, ModemReport::Use::None, error, error, error, error, error, error, error};
+}
 
 // Subscriptions by 0-based slot; nothing where it is not known.
 struct Subscriptions {
@@ -107,7 +154,32 @@ public:
     {
         return notSupported("no telephony");
     }
+
+    // No call of the platform asks for what follows.
+
+    /// Of every slot, in the order of slots(), all of one moment.
+    virtual Result<std::vector<ModemReport>> reports()
+    {
+        return notSupported("no telephony");
+    }
+    /// The ICCID of the card (ITU-T E.118), also while it is locked. NoSim: there is none.
+    virtual Result<Fact> iccid(const SlotName&)
+    {
+        return notSupported("no telephony");
+    }
 };
+
+/// The report of one modem; where there is none, an empty one that says why.
+inline ModemReport reportOf(Telephony& telephony, const SlotName& slot)
+{
+    const auto reports = telephony.reports();
+    if (!reports)
+        return emptyReport(slot, reports.error());
+    for (const ModemReport& report : reports.value())
+        if (report.slot == slot)
+            return report;
+    return emptyReport(slot, notAvailable("no modem " + slot));
+}
 
 } // namespace port
 

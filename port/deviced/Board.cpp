@@ -51,7 +51,7 @@ void CallLimit::apply(GDBusConnection* connection)
     g_dbus_connection_add_filter(connection, &CallLimit::onMessage, this, nullptr);
 }
 
-// What goes out is the answer to a call that came in, whoever of this process gives it.
+// Counts each outgoing reply as the end of an incoming call, whoever of this process sends it.
 GDBusMessage* CallLimit::onMessage(GDBusConnection* connection, GDBusMessage* message,
                                    gboolean isIncoming, gpointer self)
 {

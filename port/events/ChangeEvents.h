@@ -16,7 +16,7 @@ namespace port {
 
 class Registration;
 
-// What can be told, in the order in which it is told when several facts change at once.
+// The events, in the order in which they are posted when several facts change at once.
 enum class Change { WifiDevice, WifiConnection, WifiStatus, PacketData, FlightMode, DataRoaming };
 
 /// One callback for each change. The backend is watched only while there is a callback. Any thread,

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 /// \file
-/// What the port tells about itself: which backend answers, where an answer came from, what is
+/// Information about the port itself: which backend answers, where an answer came from, what is
 /// missing.
 ///
 /// Facts about the device are asked of CoreSystem, not here. Every function may be called from any
@@ -49,6 +49,15 @@ enum class Question {
     DeviceSerial,
     Ethernet,
     Connectivity,
+    Ssid,
+    OperatorName,
+    OperatorMcc,
+    OperatorMnc,
+    AccessTechnology,
+    SignalStrength,
+    PowerState,
+    PinTries,
+    Iccid,
 };
 
 /// Where an answer came from, or why there was none.
@@ -56,6 +65,7 @@ struct Origin {
     bool available = false;
     std::string source; ///< the service or file that served the answer; empty when there was none
     std::string reason; ///< why there was no answer; empty when there was one
+    bool isMissing = false; ///< there was none because this device has no such thing
 };
 
 /// The origin of the last answer to a question in this process; neither source nor reason when it
@@ -108,21 +118,29 @@ CORESYSTEM_PORT_API std::string backendName();
 /// The device file that the simulator reads; empty with another backend.
 CORESYSTEM_PORT_API std::string deviceFile();
 
-/// What is wrong with the device file now, as FILE:LINE:COLUMN: text where a place is known; empty
+/// The mistake in the device file now, as FILE:LINE:COLUMN: text where a place is known; empty
 /// when it is good or another backend answers.
 CORESYSTEM_PORT_API std::string deviceFileProblem();
 
 /// An answer of the backend itself.
 struct Answer {
-    std::string word; ///< as a device file says it: "connected"; "not_supported" where this device
-                      ///< has no such thing; empty when there is no answer
+    std::string word; ///< as a device file says it: "connected", "75"; "not_supported" where this
+                      ///< device has no such thing; empty when there is no answer
     Origin origin;    ///< "not_supported" has a reason, and no source
 };
 
-/// Asks the backend, and not CoreSystem, which puts several of them together, for Cellular, Wifi,
-/// Bluetooth, Ethernet or Connectivity. Waits at most 2 seconds. Other questions have no answer
-/// here.
+/// Asks the backend, and not CoreSystem, which puts several of them together or knows none of them:
+/// for Cellular, Wifi, Bluetooth, Ethernet, Connectivity or Ssid; for what askModem() tells, of the
+/// modem over which data goes, else of the first one with service, else of the first one. Waits at
+/// most 2 seconds. Other questions have no answer here.
 CORESYSTEM_PORT_API Answer ask(Question question);
+
+/// Asks the backend about the modem of one SIM slot, for OperatorName, OperatorMcc, OperatorMnc,
+/// AccessTechnology, SignalStrength, PowerState, PinTries or Iccid. The answers are in the order of
+/// the questions, and of one moment. `modem` is a name as CoreSystem::GetCpNameList() gives it; of
+/// another one nothing is known. Waits at most 2 seconds for Iccid, and as long for all others.
+CORESYSTEM_PORT_API std::vector<Answer> askModem(const std::string& modem,
+                                                 const std::vector<Question>& questions);
 
 /// Something that the backend draws on.
 struct Service {
@@ -136,7 +154,7 @@ struct Service {
 /// Looks for everything that the backend draws on. Waits for an unresponsive bus at most 2 seconds.
 CORESYSTEM_PORT_API std::vector<Service> findServices();
 
-/// What captureDevice() writes down.
+/// Options of captureDevice().
 struct CaptureOptions {
     bool reveal = false;               ///< who the device and its user are, too
     std::vector<std::string> packages; ///< those whose versions are wanted

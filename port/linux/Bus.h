@@ -47,6 +47,7 @@ struct ObjectService {
     const char* settings;       // interface of the objects that tell more by GetSettings, or null
     const char* settingsSignal; // what such an object sends when that changes
     const char* states;         // interface that sends StateChanged, with its State first, or null
+    Names noise = {};           // properties that no answer rests on: their changes are not taken
 };
 
 /// Whether a question's error says that the service does not run, and not that it keeps silent.
@@ -55,8 +56,8 @@ bool saysAbsent(const Error& error, const BusObject& service);
 /// The settings of an object, from GetSettings, stand beside its interfaces under such names.
 std::string settingsName(const std::string& section);
 
-// What is asked anew: a property, or with an empty name all of an object that its service does not
-// manage; that object is among the others then.
+// Names what to ask again: a property, or with an empty name a whole object that its service does
+// not manage; that object is among the others then.
 struct Deciding {
     std::string path;
     const char* interface;

@@ -47,7 +47,7 @@ struct Awaited {
 };
 using AwaitedReply = std::shared_ptr<Awaited>;
 
-// What a service is known to be.
+// How a service is known: its names and its objects.
 struct Peer {
     std::string name;
     bool isAttached = false; // the bus tells of its coming and going
@@ -91,9 +91,9 @@ private:
         BusTime sent;
         AwaitedReply awaited;
     };
-    // What there was to be seen at a change, by the services' names.
+    // The pictures at the moment of a change, by the services' names.
     using Moment = std::map<std::string, Result<Objects>>;
-    // Of the thread that tells of changes: what was so at the change that it tells of now.
+    // Set on the thread that reports changes: the moment of the change that it reports now.
     static thread_local const Moment* presentMoment;
     struct Watcher;
     class WatchHandle;

@@ -6,7 +6,7 @@
 namespace port::linux_backend {
 namespace {
 
-// What an entry of a list or a table costs beside its text.
+// The cost of an entry of a list or a table beside its text.
 constexpr std::size_t ENTRY_BYTES = 64;
 
 bool isWanted(const std::string& interface, Names wanted)
@@ -75,6 +75,14 @@ bool MessageReader::numbers(std::map<std::uint32_t, std::uint32_t>& numbers)
     });
 }
 
+bool MessageReader::numberAndFlag(std::pair<std::uint32_t, bool>& both)
+{
+    int flag = 0; // as sd-bus has it
+    const bool good = sd_bus_message_read(message_, "(ub)", &both.first, &flag) > 0;
+    both.second = flag != 0;
+    return good;
+}
+
 bool MessageReader::bytes(std::vector<std::uint8_t>& bytes)
 {
     const void* data = nullptr;
@@ -108,6 +116,8 @@ bool MessageReader::contents(const std::string& type, Value& value)
         return texts(value.emplace<std::vector<std::string>>());
     if (type == "ay")
         return bytes(value.emplace<std::vector<std::uint8_t>>());
+    if (type == "(ub)")
+        return numberAndFlag(value.emplace<std::pair<std::uint32_t, bool>>());
     if (type == "a{uu}")
         return numbers(value.emplace<std::map<std::uint32_t, std::uint32_t>>());
     if (type == "ao") {

@@ -61,6 +61,7 @@ private:
     bool isRoomFor(std::size_t bytes);
     bool tooMany(const char* noun, std::size_t limit);
     bool numbers(std::map<std::uint32_t, std::uint32_t>& numbers);
+    bool numberAndFlag(std::pair<std::uint32_t, bool>& both);
     bool bytes(std::vector<std::uint8_t>& bytes);
     bool contents(const std::string& type, Value& value);
     template <typename T>

@@ -13,7 +13,7 @@ namespace port::linux_backend {
 using BusClock = std::chrono::steady_clock;
 using BusTime = BusClock::time_point;
 
-// What is left of a thread's time for its question. Calls that follow each other at once belong to
+// The time left to a thread for its question. Calls that follow each other at once belong to
 // one question; calls that took no time cost none.
 class Patience {
 public:

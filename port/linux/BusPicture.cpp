@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What arrives: replies and signals, of which the pictures of the services' objects are made.
+// Receives replies and signals, and makes of them the pictures of the services' objects.
 #include <algorithm>
 #include <cstring>
 
@@ -46,12 +46,12 @@ std::vector<std::string> pathsWithoutSettings(const ObjectService& service, cons
 }
 
 //
-// What arrives
+// Receiving
 //
 
 int Bus::Core::onMessage(sd_bus_message* message, void* core, sd_bus_error*)
 {
-    // What this throws for want of memory must not pass through a C library. A message is lost
+    // An exception for want of memory must not pass through a C library. A message is lost
     // then: the pictures begin anew with another connection.
     try {
         return static_cast<Core*>(core)->take(message) ? 1 : 0;
@@ -138,7 +138,7 @@ Error Bus::Core::errorOf(const Peer& peer, sd_bus_message* message, bool& isGone
     return notAvailable(text);
 }
 
-// What a reply of each kind is made of, and the method that it answers, for people.
+// The signature of each kind of reply, and the method that it answers, for people to read.
 Bus::Core::Shape Bus::Core::shapeOf(Kind kind)
 {
     switch (kind) {
@@ -296,7 +296,7 @@ void Bus::Core::takeOwner(Peer& peer, const std::string& owner)
     peer.owner = owner;
     if (!owner.empty())
         peer.kept.reset();
-    // What the one before left unanswered says nothing of this one.
+    // Forget what the previous owner left unanswered: it says nothing about this one.
     forgetUnheard(peer, BusTime::max());
     dropPicture(peer);
     noteChange();
@@ -335,7 +335,7 @@ void Bus::Core::setProperties(Peer& peer, const std::string& path, const std::st
     noteChange();
 }
 
-// Of an object that is still there; unknown ones are asked again.
+// Sets them for an object that still exists; unknown ones are asked again.
 void Bus::Core::setSettings(Peer& peer, const std::string& path, const Interfaces& sections,
                             bool areKnown)
 {
@@ -363,7 +363,10 @@ void Bus::Core::takeProperties(Peer& peer, sd_bus_message* message)
         return;
     if (!reader.properties(changes) || !reader.texts(withoutValue) || !withoutValue.empty())
         return dropPicture(peer);
-    setProperties(peer, sd_bus_message_get_path(message), interface, std::move(changes), false);
+    for (const char* const name : peer.objects->noise)
+        changes.erase(name);
+    if (!changes.empty())
+        setProperties(peer, sd_bus_message_get_path(message), interface, std::move(changes), false);
 }
 
 // A state that does not last may be told only so, and not as a property.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What services are asked, and how long they are waited for.
+// Asks services, and limits how long their answers are waited for.
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -72,7 +72,7 @@ void Bus::Core::attachObjects(Peer& peer, const ObjectService& service)
     startThread();
 }
 
-// Of a service that has one object, which nobody watches but those who asked about it.
+// Listens to a service that has one object, which only those who asked about it watch.
 void Bus::Core::hear(Peer& peer, const BusObject& object)
 {
     if (peer.isHeard)
@@ -207,7 +207,7 @@ AwaitedReply Bus::Core::askSettings(Peer& peer, const std::string& path, BusTime
                 "GetSettings", {}, end);
 }
 
-// What must be asked before the question can be answered; nothing when it can.
+// Lists what must be asked before the question can be answered; empty when it can.
 std::vector<AwaitedReply> Bus::Core::askNext(Search& search, BusTime end)
 {
     search.replies.clear();
@@ -233,7 +233,7 @@ std::vector<AwaitedReply> Bus::Core::askNext(Search& search, BusTime end)
     const bool wasRead = search.readings > 0;
     for (const Deciding& each :
          search.question.deciding ? search.question.deciding(*peer.tree) : std::vector<Deciding>())
-        // What was just read is not read again.
+        // Do not read again what was just read.
         if ((!wasRead || *each.property == '\0') && (isFirst || *each.property == '\0') &&
             search.asked.insert(each.path + "#" + each.property).second)
             search.replies.push_back(askDeciding(peer, each, end));

@@ -63,7 +63,7 @@ std::string toHex(const Id& id)
     return text;
 }
 
-// What firmware says when its maker gave no number, in small letters.
+// Firmware's texts for "the maker gave no number", in small letters.
 constexpr std::string_view NO_SERIALS[] = {
     "to be filled by o.e.m.",
     "default string",

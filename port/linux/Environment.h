@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What is taken from the environment and the home of the user who runs the process.
+// Reads the environment and the home of the user who runs the process.
 #ifndef PORT_LINUX_ENVIRONMENT_H
 #define PORT_LINUX_ENVIRONMENT_H
 

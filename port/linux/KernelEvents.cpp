@@ -55,8 +55,8 @@ std::vector<int> KernelEvents::sockets() const
 
 bool KernelEvents::read(int socket)
 {
-    // What is told is read from /sys/class then: only that it was told counts, also when more was
-    // told than the socket could hold.
+    // Only the arrival counts, even when more was sent than the socket could hold: the state is read
+    // from /sys/class.
     std::array<char, 16384> text;
     bool hasTold = false;
     while (::read(socket, text.data(), text.size()) > 0 || errno == ENOBUFS) {

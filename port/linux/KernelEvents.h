@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the kernel tells of changes of interfaces (rtnetlink(7)) and of switches of radios
-// (/dev/rfkill). Where one of them is not there, nothing is told of it.
+// The kernel's messages about changes of interfaces (rtnetlink(7)) and of switches of radios
+// (/dev/rfkill). Where one of the two is missing, its changes go unnoticed.
 #ifndef PORT_LINUX_KERNEL_EVENTS_H
 #define PORT_LINUX_KERNEL_EVENTS_H
 
@@ -15,7 +15,7 @@ public:
     void open();
     void close();
 
-    /// Of those that are open: what arrives is read by read().
+    /// The open sockets; read() takes what arrives at them.
     std::vector<int> sockets() const;
 
     /// Takes all that waits at one of the sockets; whether it may tell of a change.

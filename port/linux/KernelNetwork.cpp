@@ -50,7 +50,7 @@ bool isWifi(const std::string& interface)
     return exists(interface + "/phy80211") || exists(interface + "/wireless");
 }
 
-// What the kernel calls the kind of an interface; empty for a plain one.
+// The kernel's name for the kind of an interface; empty for a plain one.
 std::string typeOf(const std::string& interface)
 {
     const std::string mark = "\nDEVTYPE=";

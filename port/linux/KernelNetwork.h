@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the kernel itself tells of radios and network interfaces, in /sys/class.
+// Radios and network interfaces as the kernel shows them, in /sys/class.
 #ifndef PORT_LINUX_KERNEL_NETWORK_H
 #define PORT_LINUX_KERNEL_NETWORK_H
 

@@ -57,7 +57,7 @@ public:
     {
         return stalls_.load(std::memory_order_relaxed) ? std::chrono::milliseconds(0) : PATIENCE;
     }
-    // What became of a line; the errno of a failure tells.
+    // Records whether a line was taken; after a failure errno says why not.
     bool note(bool taken)
     {
         const bool stalls = !taken && (errno == EAGAIN || errno == EWOULDBLOCK);

@@ -11,7 +11,7 @@ namespace {
 // More SIM slots than this are not believed.
 constexpr std::size_t MOST_SIMS = 16;
 
-// What stands for "no object".
+// The path that means "no object".
 constexpr char NO_OBJECT[] = "/";
 
 std::string objectOrNone(const std::string& path)
@@ -97,10 +97,9 @@ Result<std::uint32_t> Modem::retriesLeft(MMModemLock lock) const
     return modem_.numberOf(MM_MODEM_PROPERTY_UNLOCKRETRIES, lock);
 }
 
-bool Modem::isPoweredOff() const
+Result<std::uint32_t> Modem::powerState() const
 {
-    const Result<std::uint32_t> power = modem_.number(MM_MODEM_PROPERTY_POWERSTATE);
-    return power && power.value() == MM_MODEM_POWER_STATE_OFF;
+    return modem_.number(MM_MODEM_PROPERTY_POWERSTATE);
 }
 
 Result<std::uint32_t> Modem::numberOfNetwork(const char* interface, const char* name) const
@@ -130,6 +129,32 @@ bool Modem::isCdmaRoaming() const
             return true;
     }
     return false;
+}
+
+Result<std::string> Modem::textOfNetwork(const char* name) const
+{
+    const auto network = object_.properties(MM_DBUS_INTERFACE_MODEM_MODEM3GPP);
+    return network ? network.value().text(name) : network.error();
+}
+
+Result<std::string> Modem::operatorName() const
+{
+    return textOfNetwork(MM_MODEM_MODEM3GPP_PROPERTY_OPERATORNAME);
+}
+
+Result<std::string> Modem::operatorCode() const
+{
+    return textOfNetwork(MM_MODEM_MODEM3GPP_PROPERTY_OPERATORCODE);
+}
+
+Result<std::uint32_t> Modem::accessTechnologies() const
+{
+    return modem_.number(MM_MODEM_PROPERTY_ACCESSTECHNOLOGIES);
+}
+
+Result<std::pair<std::uint32_t, bool>> Modem::signal() const
+{
+    return modem_.numberAndFlag(MM_MODEM_PROPERTY_SIGNALQUALITY);
 }
 
 Result<std::string> Modem::equipmentIdentifier() const

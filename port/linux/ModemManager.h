@@ -28,7 +28,7 @@ Look modems();
 /// More modems than this are not believed.
 constexpr std::size_t MOST_MODEMS = 16;
 
-// What a state of registration means.
+// Explains a registration state.
 struct Registration {
     std::uint32_t state; // MMModem3gppRegistrationState
     ServiceState service;
@@ -70,11 +70,15 @@ public:
     Result<std::uint32_t> failedReason() const; // MMModemStateFailedReason
     Result<std::uint32_t> lock() const;         // MMModemLock
     Result<std::uint32_t> retriesLeft(MMModemLock lock) const;
-    bool isPoweredOff() const;
+    Result<std::uint32_t> powerState() const;    // MMModemPowerState
     Result<std::uint32_t> registration() const;  // MMModem3gppRegistrationState
     Result<std::uint32_t> packetService() const; // MMModem3gppPacketServiceState
     /// Whether either of its two networks is one abroad, by the rules of CDMA.
     bool isCdmaRoaming() const;
+    Result<std::string> operatorName() const;
+    Result<std::string> operatorCode() const;              // MCC and MNC
+    Result<std::uint32_t> accessTechnologies() const;      // MMModemAccessTechnology, several
+    Result<std::pair<std::uint32_t, bool>> signal() const; // per cent, and whether it is recent
     Result<std::string> equipmentIdentifier() const;
     Result<std::vector<std::string>> ownNumbers() const;
     bool hasMessaging() const;
@@ -82,6 +86,7 @@ public:
 private:
     void readSims();
     Result<std::uint32_t> numberOfNetwork(const char* interface, const char* name) const;
+    Result<std::string> textOfNetwork(const char* name) const;
 
     Object object_;
     Properties modem_;

@@ -194,7 +194,7 @@ Result<CellularState> cellularStateOf(const Modem& modem)
     return isAbroad(modem) ? CellularState::RoamingOff : CellularState::Available;
 }
 
-// Of the modem that is furthest; a modem that cannot be read counts only when no other can.
+// Takes the modem that got furthest; one that cannot be read counts only when no other can.
 Result<Sourced<CellularState>> furthestOf(const std::vector<Modem>& modems)
 {
     std::optional<Result<Sourced<CellularState>>> furthest;
@@ -332,6 +332,17 @@ Result<Sourced<Connectivity>> LinuxNetwork::connectivity()
     const auto now = view();
     const auto state = now ? now.value().connectivity() : Result<std::uint32_t>(now.error());
     return from(NETWORK_MANAGER, state ? connectivityOf(state.value()) : state.error());
+}
+
+Result<Fact> LinuxNetwork::ssid()
+{
+    const auto now = view();
+    if (!now)
+        return now.error();
+    const auto isThere = now.value().isThere(Radio::Wifi);
+    if (isThere && !isThere.value())
+        return notSupported("NetworkManager knows no Wi-Fi device");
+    return now.value().ssid();
 }
 
 Result<Sourced<bool>> LinuxNetwork::flightMode()

@@ -22,6 +22,7 @@ public:
     Result<Sourced<LinkState>> bluetooth() override;
     Result<Sourced<LinkState>> ethernet() override;
     Result<Sourced<Connectivity>> connectivity() override;
+    Result<Fact> ssid() override;
     Result<Sourced<bool>> flightMode();
     Result<Sourced<bool>> packetData();
     Result<Sourced<bool>> mobileData();

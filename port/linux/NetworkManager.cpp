@@ -3,6 +3,8 @@
 
 #include <algorithm>
 
+#include <glib.h>
+
 namespace port::linux_backend {
 namespace {
 
@@ -174,6 +176,42 @@ Result<std::uint32_t> NetworkView::connectivity() const
     return state ? state : all ? fromNetworkManager(state.error()) : state;
 }
 
+// A name is any bytes; what is no text cannot be told as one.
+Result<std::string> NetworkView::nameOf(const std::string& accessPoint) const
+{
+    const auto point = at(accessPoint, NM_DBUS_INTERFACE_ACCESS_POINT);
+    const auto bytes =
+        point ? point.value().bytes("Ssid") : Result<std::vector<std::uint8_t>>(point.error());
+    if (!bytes)
+        return fromNetworkManager(bytes.error());
+    const std::string name(bytes.value().begin(), bytes.value().end());
+    if (name.empty())
+        return notAvailable("the Wi-Fi network hides its name");
+    if (g_utf8_validate(name.data(), static_cast<gssize>(name.size()), nullptr) == FALSE)
+        return notAvailable("the name of the Wi-Fi network is no text");
+    return name;
+}
+
+Result<Fact> NetworkView::ssid() const
+{
+    for (const auto& [path, interfaces] : *objects_) {
+        const Object object(path, interfaces);
+        const auto device = object.properties(NM_DBUS_INTERFACE_DEVICE);
+        const auto radio = object.properties(NM_DBUS_INTERFACE_DEVICE_WIRELESS);
+        const auto state = device ? device.value().number("State") : device.error();
+        if (!radio || !state || state.value() != NM_DEVICE_STATE_ACTIVATED)
+            continue;
+        const auto point = radio.value().path("ActiveAccessPoint");
+        const auto name = point ? nameOf(point.value()) : fromNetworkManager(point.error());
+        if (!name)
+            return name.error();
+        const auto interface = device.value().text("Interface");
+        return Fact{name.value(),
+                    std::string(NETWORK_MANAGER.name) + (interface ? " " + interface.value() : "")};
+    }
+    return notAvailable("Wi-Fi is not connected");
+}
+
 bool NetworkView::hasActiveCellularConnection() const
 {
     return anyActive(*objects_, [](const Properties& connection) {
@@ -214,7 +252,7 @@ Result<std::vector<CellularConnection>> NetworkView::cellularConnections() const
     return found;
 }
 
-// What a connection's devices call themselves below NetworkManager: a modem's device is named by
+// The names of a connection's devices below NetworkManager: a modem's device is named by
 // its ModemManager object.
 std::optional<std::string> NetworkView::deviceBelow(const Properties& connection) const
 {

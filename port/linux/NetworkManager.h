@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What NetworkManager knows: switches of radios, devices, connections.
+// NetworkManager's state: switches of radios, devices, connections.
 #ifndef PORT_LINUX_NETWORK_MANAGER_H
 #define PORT_LINUX_NETWORK_MANAGER_H
 
@@ -18,9 +18,14 @@ namespace port::linux_backend {
 constexpr BusObject NETWORK_MANAGER = {NM_DBUS_SERVICE, NM_DBUS_PATH, NM_DBUS_INTERFACE,
                                        Start::Never};
 
-constexpr Names NETWORK_INTERFACES = {NM_DBUS_INTERFACE, NM_DBUS_INTERFACE_DEVICE,
+constexpr Names NETWORK_INTERFACES = {NM_DBUS_INTERFACE,
+                                      NM_DBUS_INTERFACE_DEVICE,
                                       NM_DBUS_INTERFACE_ACTIVE_CONNECTION,
-                                      NM_DBUS_INTERFACE_SETTINGS_CONNECTION};
+                                      NM_DBUS_INTERFACE_SETTINGS_CONNECTION,
+                                      NM_DBUS_INTERFACE_DEVICE_WIRELESS,
+                                      NM_DBUS_INTERFACE_ACCESS_POINT};
+// What changes all the time on a radio, and decides nothing.
+constexpr Names NETWORK_NOISE = {"AccessPoints", "Bitrate", "LastScan", "LastSeen", "Strength"};
 // The object manager stands above the service's main object.
 constexpr ObjectService NETWORKS = {NETWORK_MANAGER,
                                     "/org/freedesktop",
@@ -28,7 +33,8 @@ constexpr ObjectService NETWORKS = {NETWORK_MANAGER,
                                     NETWORK_INTERFACES,
                                     NM_DBUS_INTERFACE_SETTINGS_CONNECTION,
                                     "Updated",
-                                    NM_DBUS_INTERFACE_DEVICE};
+                                    NM_DBUS_INTERFACE_DEVICE,
+                                    NETWORK_NOISE};
 
 enum class Radio { Wifi, Cellular };
 
@@ -62,6 +68,8 @@ public:
     /// All devices of one of these types.
     Result<std::vector<NetworkDevice>> devicesOf(std::initializer_list<NMDeviceType> types) const;
     Result<std::uint32_t> connectivity() const; // NMConnectivityState
+    /// The name of the network of the first Wi-Fi device that is connected.
+    Result<Fact> ssid() const;
     /// Whether a cellular connection is up, or coming up.
     bool hasActiveCellularConnection() const;
 
@@ -79,6 +87,7 @@ private:
     Result<bool> managerFlag(const char* name) const;
     Result<Properties> at(const std::string& path, const char* interface) const;
     bool isActive(const std::string& connection) const;
+    Result<std::string> nameOf(const std::string& accessPoint) const;
     std::optional<std::string> deviceBelow(const Properties& connection) const;
 
     Objects objects_;

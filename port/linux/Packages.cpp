@@ -69,7 +69,7 @@ Result<std::optional<std::string>> answer(const std::string& name, std::string_v
     return std::optional<std::string>(version);
 }
 
-// What has no end in it is no package.
+// Rejects a stanza without an end: it is no package.
 Result<std::optional<std::string>> answerAtEnd(const std::string& rest)
 {
     // dpkg ends every stanza with an empty line.

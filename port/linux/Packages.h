@@ -21,7 +21,7 @@ namespace port::linux_backend {
 /// The package database of dpkg(1), below the root.
 constexpr const char DPKG_STATUS[] = "/var/lib/dpkg/status";
 
-// What the text of that database says of installed packages. It is read no further than questions
+// Installed packages, as that database lists them. Its text is read no further than questions
 // want it, and what was read is known; in bounded memory.
 class PackageIndex {
 public:

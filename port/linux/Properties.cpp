@@ -81,6 +81,16 @@ Result<std::int32_t> Properties::signedNumber(const char* name) const
     return copied(value<std::int32_t>(name, "number"));
 }
 
+Result<std::pair<std::uint32_t, bool>> Properties::numberAndFlag(const char* name) const
+{
+    return copied(value<std::pair<std::uint32_t, bool>>(name, "number with a truth value"));
+}
+
+Result<std::vector<std::uint8_t>> Properties::bytes(const char* name) const
+{
+    return copied(value<std::vector<std::uint8_t>>(name, "list of bytes"));
+}
+
 Result<std::uint32_t> Properties::numberOf(const char* name, std::uint32_t key) const
 {
     const auto found = value<std::map<std::uint32_t, std::uint32_t>>(name, "table of numbers");

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a service tells of its objects, read without trusting it: a property that is missing or of
+// Reads the properties of a service's objects without trusting it: a property that is missing or of
 // another type is an error that names it.
 #ifndef PORT_LINUX_PROPERTIES_H
 #define PORT_LINUX_PROPERTIES_H
@@ -30,10 +30,10 @@ inline bool operator==(const OtherValue&, const OtherValue&)
 {
     return true;
 }
-using Value =
-    std::variant<OtherValue, bool, std::int32_t, std::uint32_t, std::string, ObjectPath,
-                 std::vector<std::string>, std::vector<ObjectPath>,
-                 std::map<std::uint32_t, std::uint32_t>, std::uint8_t, std::vector<std::uint8_t>>;
+using Value = std::variant<OtherValue, bool, std::int32_t, std::uint32_t, std::string, ObjectPath,
+                           std::vector<std::string>, std::vector<ObjectPath>,
+                           std::map<std::uint32_t, std::uint32_t>, std::uint8_t,
+                           std::vector<std::uint8_t>, std::pair<std::uint32_t, bool>>;
 using PropertyMap = std::map<std::string, Value>;
 
 // The properties of one interface of an object.
@@ -50,6 +50,8 @@ public:
     Result<std::vector<std::string>> paths(const char* name) const;
     Result<std::uint32_t> number(const char* name) const;
     Result<std::int32_t> signedNumber(const char* name) const;
+    Result<std::pair<std::uint32_t, bool>> numberAndFlag(const char* name) const;
+    Result<std::vector<std::uint8_t>> bytes(const char* name) const;
     /// The value of one key in a table of numbers.
     Result<std::uint32_t> numberOf(const char* name, std::uint32_t key) const;
 

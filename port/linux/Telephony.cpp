@@ -42,7 +42,7 @@ private:
 
 namespace {
 
-// What is known about a card, and what to tell whoever wants to read it.
+// The status of a card, and the error for whoever wants to read it.
 struct Finding {
     CardStatus status;
     const char* reason;
@@ -106,7 +106,8 @@ Result<Finding> findingOfState(const Slot& slot, std::int32_t state)
         const Result<std::uint32_t> reason = slot.modem().failedReason();
         return reason ? Result<Finding>(findingOfFailure(reason.value())) : reason.error();
     }
-    if (slot.modem().isPoweredOff())
+    const Result<std::uint32_t> power = slot.modem().powerState();
+    if (power && power.value() == MM_MODEM_POWER_STATE_OFF)
         return POWERED_OFF;
     if (state == MM_MODEM_STATE_INITIALIZING)
         return NOT_READY;
@@ -245,6 +246,102 @@ Result<bool> isSmsReady(const Slot& slot)
            slot.modem().hasMessaging();
 }
 
+// Why there is no card to be asked, readable or not; nothing when there is one.
+std::optional<Error> absenceOf(const Slot& slot)
+{
+    if (slot.isActive() && !slot.sim().empty())
+        return std::nullopt;
+    return noSim(findingOutOfUse(slot).reason);
+}
+
+ModemReport::Use useOf(const Slot& slot)
+{
+    const Result<std::int32_t> state = slot.modem().state();
+    if (!state || !slot.isActive() || state.value() < MM_MODEM_STATE_REGISTERED)
+        return ModemReport::Use::None;
+    return state.value() == MM_MODEM_STATE_CONNECTED ? ModemReport::Use::Data
+                                                     : ModemReport::Use::Service;
+}
+
+Result<std::string> mccOf(const Modem& modem)
+{
+    const Result<std::string> code = modem.operatorCode();
+    if (code && !isDigits(code.value(), 5, 6))
+        return notAvailable("OperatorCode is no MCC and MNC");
+    return code ? code.value().substr(0, 3) : code;
+}
+
+Result<std::string> mncOf(const Modem& modem)
+{
+    const Result<std::string> mcc = mccOf(modem);
+    return mcc ? modem.operatorCode().value().substr(3) : mcc;
+}
+
+static_assert(MM_MODEM_ACCESS_TECHNOLOGY_POTS ==
+                      1U << static_cast<unsigned>(AccessTechnology::Pots) &&
+                  MM_MODEM_ACCESS_TECHNOLOGY_5GNR ==
+                      1U << static_cast<unsigned>(AccessTechnology::FiveGNr) &&
+                  MM_MODEM_ACCESS_TECHNOLOGY_LTE_NB_IOT ==
+                      1U << static_cast<unsigned>(AccessTechnology::LteNbIot),
+              "access technologies are numbered as ModemManager's bits are");
+
+// Of several at once the newest: 5G that leans on LTE is 5G.
+Result<AccessTechnology> technologyOf(const Modem& modem)
+{
+    const Result<std::uint32_t> all = modem.accessTechnologies();
+    if (!all)
+        return all.error();
+    if (all.value() == MM_MODEM_ACCESS_TECHNOLOGY_ANY)
+        return notAvailable("the access technology is not known");
+    if ((all.value() & MM_MODEM_ACCESS_TECHNOLOGY_5GNR) != 0)
+        return AccessTechnology::FiveGNr;
+    for (auto bit = static_cast<int>(AccessTechnology::LteNbIot); bit >= 0; --bit)
+        if ((all.value() & (1U << static_cast<unsigned>(bit))) != 0)
+            return static_cast<AccessTechnology>(bit);
+    return notAvailable("the access technology is not known");
+}
+
+// A modem that has not measured says 0, and that this is not recent.
+Result<int> signalOf(const Modem& modem)
+{
+    const auto signal = modem.signal();
+    if (!signal)
+        return signal.error();
+    const auto [perCent, isRecent] = signal.value();
+    if (perCent > 100 || (perCent == 0 && !isRecent))
+        return notAvailable("the signal is not known");
+    return static_cast<int>(perCent);
+}
+
+Result<PowerState> powerOf(const Modem& modem)
+{
+    const Result<std::uint32_t> power = modem.powerState();
+    if (!power)
+        return power.error();
+    switch (power.value()) {
+    case MM_MODEM_POWER_STATE_OFF:
+        return PowerState::Off;
+    case MM_MODEM_POWER_STATE_LOW:
+        return PowerState::Low;
+    case MM_MODEM_POWER_STATE_ON:
+        return PowerState::On;
+    default:
+        return notAvailable("the modem's power state is not known");
+    }
+}
+
+Result<int> pinTriesOf(const Slot& slot)
+{
+    if (const auto absence = absenceOf(slot))
+        return *absence;
+    const Result<std::uint32_t> tries = slot.modem().retriesLeft(MM_MODEM_LOCK_SIM_PIN);
+    if (!tries)
+        return tries.error();
+    if (tries.value() > 10)
+        return notAvailable("the tries left for the PIN are not known");
+    return static_cast<int>(tries.value());
+}
+
 SlotName nameOf(const Modem& modem, std::size_t index, std::set<SlotName>& taken)
 {
     SlotName name = modem.device();
@@ -288,14 +385,48 @@ Result<Sourced<T>> sourced(const SlotName& name, const Result<T>& answer)
     return Sourced<T>{answer.value(), sourceOf(name)};
 }
 
+// What is there only while a slot's modem has a network.
+template <typename T>
+Result<Sourced<T>> ofNetwork(const Slot& slot, Result<T> (*read)(const Modem&))
+{
+    if (!slot.isActive())
+        return noSim(findingOutOfUse(slot).reason);
+    if (useOf(slot) == ModemReport::Use::None)
+        return notAvailable("the modem is not registered with a network");
+    return sourced(slot.name(), read(slot.modem()));
+}
+
+ModemReport reportOf(const Slot& slot)
+{
+    return {slot.name(),
+            useOf(slot),
+            ofNetwork<std::string>(slot, [](const Modem& modem) { return modem.operatorName(); }),
+            ofNetwork(slot, mccOf),
+            ofNetwork(slot, mncOf),
+            ofNetwork(slot, technologyOf),
+            ofNetwork(slot, signalOf),
+            sourced(slot.name(), powerOf(slot.modem())),
+            sourced(slot.name(), pinTriesOf(slot))};
+}
+
+Result<std::string> iccidIn(const Properties& sim)
+{
+    const Result<std::string> identifier = sim.text(MM_SIM_PROPERTY_SIMIDENTIFIER);
+    if (identifier && !isDigits(identifier.value(), 18, 20))
+        return notAvailable("SimIdentifier is no ICCID");
+    return identifier;
+}
+
 // The SIM's object, which is among the others when it was asked for.
-Result<Imsi> imsiOf(const Objects& objects, const std::string& path)
+template <typename T>
+Result<T> ofSim(const Objects& objects, const std::string& path,
+                Result<T> (*read)(const Properties&))
 {
     const auto found = objects->find(path);
     const auto sim = found != objects->end()
                          ? Object(path, found->second).properties(MM_DBUS_INTERFACE_SIM)
                          : notAvailable("the SIM card is gone");
-    return sim ? imsiIn(sim.value()) : sim.error();
+    return sim ? read(sim.value()) : sim.error();
 }
 
 Result<std::vector<Slot>> slotsIn(const Result<Objects>& objects)
@@ -304,18 +435,32 @@ Result<std::vector<Slot>> slotsIn(const Result<Objects>& objects)
     return modems ? Result<std::vector<Slot>>(slotsOf(modems.value())) : modems.error();
 }
 
-// One property of a slot's modem; of its SIM all.
-std::function<std::vector<Deciding>(const Tree&)>
-decidingOf(const SlotName& name, const char* interface, const char* property)
+using Choice = std::function<std::vector<Deciding>(const Tree&)>;
+
+Result<Slot> findIn(const Tree& tree, const SlotName& name)
+{
+    return find(slotsIn(std::make_shared<const Tree>(tree)), name);
+}
+
+// One property of a slot's modem.
+Choice decidingOf(const SlotName& name, const char* interface, const char* property)
 {
     return [=](const Tree& tree) -> std::vector<Deciding> {
-        const auto slot = find(slotsIn(std::make_shared<const Tree>(tree)), name);
+        const auto slot = findIn(tree, name);
         if (!slot)
             return {};
-        const bool isSim = *property == '\0';
-        if (isSim && obstacleOf(slot.value()))
+        return {{slot.value().modem().path(), interface, property}};
+    };
+}
+
+// All of a slot's SIM, unless something is in the way.
+Choice decidingOfSim(const SlotName& name, std::optional<Error> (*obstacle)(const Slot&))
+{
+    return [=](const Tree& tree) -> std::vector<Deciding> {
+        const auto slot = findIn(tree, name);
+        if (!slot || obstacle(slot.value()))
             return {};
-        return {{isSim ? slot.value().sim() : slot.value().modem().path(), interface, property}};
+        return {{slot.value().sim(), MM_DBUS_INTERFACE_SIM, ""}};
     };
 }
 
@@ -354,15 +499,28 @@ Result<Sourced<Card>> LinuxTelephony::card(const SlotName& name)
     return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, cardOf);
 }
 
-Result<Sourced<Imsi>> LinuxTelephony::imsi(const SlotName& name)
+template <typename T>
+Result<Sourced<T>> LinuxTelephony::aboutSim(const SlotName& name,
+                                            std::optional<Error> (*obstacle)(const Slot&),
+                                            Result<T> (*read)(const Properties&))
 {
-    const auto objects = bus_.look({MODEMS, decidingOf(name, MM_DBUS_INTERFACE_SIM, "")});
+    const auto objects = bus_.look({MODEMS, decidingOfSim(name, obstacle)});
     const Result<Slot> slot = find(slotsIn(objects), name);
     if (!slot)
         return slot.error();
-    if (const auto obstacle = obstacleOf(slot.value()))
-        return *obstacle;
-    return sourced(name, imsiOf(objects.value(), slot.value().sim()));
+    if (const auto error = obstacle(slot.value()))
+        return *error;
+    return sourced(name, ofSim(objects.value(), slot.value().sim(), read));
+}
+
+Result<Sourced<Imsi>> LinuxTelephony::imsi(const SlotName& name)
+{
+    return aboutSim(name, obstacleOf, imsiIn);
+}
+
+Result<Fact> LinuxTelephony::iccid(const SlotName& name)
+{
+    return aboutSim(name, absenceOf, iccidIn);
 }
 
 Result<Sourced<std::optional<std::string>>> LinuxTelephony::number(const SlotName& name)
@@ -388,6 +546,17 @@ Result<Sourced<bool>> LinuxTelephony::roaming(const SlotName& name)
 Result<Sourced<bool>> LinuxTelephony::smsReady(const SlotName& name)
 {
     return about(name, MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, isSmsReady);
+}
+
+Result<std::vector<ModemReport>> LinuxTelephony::reports()
+{
+    const auto slots = slotsIn(bus_.look(modems()));
+    if (!slots)
+        return slots.error();
+    std::vector<ModemReport> all;
+    for (const Slot& slot : slots.value())
+        all.push_back(reportOf(slot));
+    return all;
 }
 
 Result<Sourced<Subscriptions>> LinuxTelephony::subscriptions()

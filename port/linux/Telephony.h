@@ -26,11 +26,16 @@ public:
     Result<Sourced<bool>> roaming(const SlotName& name) override;
     Result<Sourced<Subscriptions>> subscriptions() override;
     Result<Sourced<bool>> smsReady(const SlotName& name) override;
+    Result<std::vector<ModemReport>> reports() override;
+    Result<Fact> iccid(const SlotName& name) override;
 
 private:
     template <typename T>
     Result<Sourced<T>> about(const SlotName& name, const char* interface, const char* property,
                              Result<T> (*read)(const Slot&));
+    template <typename T>
+    Result<Sourced<T>> aboutSim(const SlotName& name, std::optional<Error> (*obstacle)(const Slot&),
+                                Result<T> (*read)(const Properties&));
 
     Bus& bus_;
 };

@@ -62,7 +62,7 @@ Result<Sourced<double>> textScaling()
                               G_VARIANT_TYPE_DOUBLE))
         return missing("the schema has a key of another type");
     Owned<GVariant> value = storedValue(std::string(path) + KEY);
-    // What the user never set, or set to no factor, has the schema's value.
+    // Fall back to the schema's value where the user set none, or one that is no factor.
     if (!value || !isFactor(value.get(), key.get()))
         value.reset(g_settings_schema_key_get_default_value(key.get()));
     return Sourced<double>{g_variant_get_double(value.get()), SOURCE};

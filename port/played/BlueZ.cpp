@@ -7,11 +7,11 @@ namespace {
 
 constexpr char ADAPTER[] = "org.bluez.Adapter1";
 constexpr char DEVICE[] = "org.bluez.Device1";
-constexpr char AGENTS[] = "org.bluez.AgentManager1";
-// Of the range that is kept for documents (RFC 7042).
+constexpr char AGENT_MANAGER[] = "org.bluez.AgentManager1";
+// Taken from the range that is reserved for documentation (RFC 7042).
 constexpr char ADDRESS[] = "00:00:5E:00:53:02";
 constexpr char PEER[] = "00:00:5E:00:53:03";
-// What an adapter has without any profile: generic access and attributes, device information, PnP.
+// Offered without any profile: generic access and attributes, device information, PnP.
 constexpr const char* OWN_SERVICES[] = {
     "00001800-0000-1000-8000-00805f9b34fb",
     "00001801-0000-1000-8000-00805f9b34fb",
@@ -20,11 +20,6 @@ constexpr const char* OWN_SERVICES[] = {
 };
 constexpr char ADAPTER_PATH[] = "/org/bluez/hci0";
 constexpr char PEER_PATH[] = "/org/bluez/hci0/dev_00_00_5E_00_53_03";
-
-Variant textOf(const std::string& text)
-{
-    return value("s", text.c_str());
-}
 
 Face adapter(const Facts& facts)
 {
@@ -54,11 +49,11 @@ Face peer()
                          {"ServicesResolved", value("b", TRUE)}});
 }
 
-World worldOf(const Scene& scene)
+World bluezWorld(const Scene& scene)
 {
-    World world = {
-        {"/org/bluez",
-         {face(AGENTS), face("org.bluez.HealthManager1"), face("org.bluez.ProfileManager1")}}};
+    World world = {{"/org/bluez",
+                    {face(AGENT_MANAGER), face("org.bluez.HealthManager1"),
+                     face("org.bluez.ProfileManager1")}}};
     if (scene.facts.bluetooth)
         world.push_back({ADAPTER_PATH,
                          {adapter(scene.facts), face("org.bluez.GattManager1"),
@@ -77,7 +72,7 @@ Outcome setPowered(const Request& request)
     return Outcome::change(bluetoothSwitch(request.scene.facts, on));
 }
 
-Outcome disconnect(const Request&)
+Outcome disconnectPeer(const Request&)
 {
     return Outcome::change({set("network.bluetooth", "disconnected")});
 }
@@ -87,21 +82,11 @@ Outcome filters(const Request&)
     return Outcome::answer(g_variant_new_parsed("(['UUIDs', 'RSSI', 'Pathloss', 'Transport'],)"));
 }
 
-Outcome nothing(const Request&)
-{
-    return {};
-}
-
-Outcome refuse(const Request& request)
+Outcome refuseInBluez(const Request& request)
 {
     if (!request.scene.facts.isBluetoothOn())
         return Outcome::refuse("org.bluez.Error.NotReady", "Resource Not Ready");
     return Outcome::refuse("org.bluez.Error.NotSupported", "Operation is not supported");
-}
-
-bool isThere(const Facts&)
-{
-    return true;
 }
 
 } // namespace
@@ -112,18 +97,18 @@ const Role& bluez()
         "bluez",
         "org.bluez",
         "/",
-        worldOf,
-        isThere,
-        {{AGENTS, "RegisterAgent", nothing},
-         {AGENTS, "UnregisterAgent", nothing},
-         {AGENTS, "RequestDefaultAgent", nothing},
+        bluezWorld,
+        nullptr,
+        {{AGENT_MANAGER, "RegisterAgent", nothing},
+         {AGENT_MANAGER, "UnregisterAgent", nothing},
+         {AGENT_MANAGER, "RequestDefaultAgent", nothing},
          {ADAPTER, "GetDiscoveryFilters", filters},
          {DEVICE, "Connect", nothing},
-         {DEVICE, "Disconnect", disconnect}},
+         {DEVICE, "Disconnect", disconnectPeer}},
         {{ADAPTER, "Powered", setPowered}},
         {},
         {},
-        refuse,
+        refuseInBluez,
         false,
     };
     return service;

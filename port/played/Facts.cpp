@@ -13,7 +13,7 @@ std::optional<T> find(const Section& section, const char* key)
     return found ? std::optional<T>(found.value().value) : std::nullopt;
 }
 
-std::string textOf(const Section& section, const char* key)
+std::string textIn(const Section& section, const char* key)
 {
     return find<std::string>(section, key).value_or("");
 }
@@ -21,22 +21,29 @@ std::string textOf(const Section& section, const char* key)
 SlotFacts slotOf(const Section& section)
 {
     SlotFacts slot;
-    slot.name = textOf(section, "cp_name");
+    slot.name = textIn(section, "cp_name");
     if (find<bool>(section, "denied").value_or(false)) // nobody may know anything of it
         return slot;
     slot.card =
         find<CardStatus>(section, section.find("init_status") != nullptr ? "init_status" : "sim");
-    slot.mcc = textOf(section, "mcc");
-    slot.mnc = textOf(section, "mnc");
-    slot.msin = textOf(section, "msin");
-    slot.number = textOf(section, "number");
-    slot.imei = textOf(section, "imei");
+    slot.mcc = textIn(section, "mcc");
+    slot.mnc = textIn(section, "mnc");
+    slot.msin = textIn(section, "msin");
+    slot.number = textIn(section, "number");
+    slot.imei = textIn(section, "imei");
     slot.service = find<ServiceState>(section, "service");
     slot.isRoaming = find<bool>(section, "roaming").value_or(false);
+    slot.operatorName = textIn(section, "operator");
+    slot.operatorMcc = textIn(section, "operator_mcc");
+    slot.operatorMnc = textIn(section, "operator_mnc");
+    slot.accessTechnology = find<AccessTechnology>(section, "access_technology");
+    slot.signal = find<int>(section, "signal");
+    slot.power = find<PowerState>(section, "power");
+    slot.iccid = textIn(section, "iccid");
     slot.hasMessages = find<bool>(section, "sms").value_or(false);
     slot.isEnabled = find<bool>(section, "enabled").value_or(true);
-    slot.pin = textOf(section, "pin");
-    slot.puk = textOf(section, "puk");
+    slot.pin = textIn(section, "pin");
+    slot.puk = textIn(section, "puk");
     slot.pinRetries = find<int>(section, "pin_retries");
     slot.pukRetries = find<int>(section, "puk_retries");
     return slot;
@@ -96,17 +103,18 @@ Facts factsOf(const devicefile::Device& device)
     facts.cellular = radio(network, "cellular", facts.isFlying(), CellularState::FlightMode);
     facts.wifi = radio(network, "wifi", facts.isFlying(), LinkState::Deactivated);
     facts.wifiConnection = find<WifiConnection>(network, "wifi_connection");
+    facts.ssid = textIn(network, "ssid");
     facts.bluetooth = radio(network, "bluetooth", facts.isFlying(), LinkState::Deactivated);
     facts.dataRoaming = find<bool>(settings, "data_roaming");
     facts.packetData = find<bool>(settings, "packet_data");
     facts.mobileData = find<bool>(settings, "mobile_data");
     facts.dataSlot = find<int>(device.section("subscriptions"), "data");
-    facts.deviceName = textOf(settings, "device_name");
-    facts.hostName = textOf(settings, "host_name");
-    facts.language = textOf(settings, "language");
-    facts.modelName = textOf(about, "model_name");
-    facts.platform = joined(textOf(about, "platform_name"), textOf(about, "platform_version"));
-    facts.serial = textOf(about, "serial");
+    facts.deviceName = textIn(settings, "device_name");
+    facts.hostName = textIn(settings, "host_name");
+    facts.language = textIn(settings, "language");
+    facts.modelName = textIn(about, "model_name");
+    facts.platform = joined(textIn(about, "platform_name"), textIn(about, "platform_version"));
+    facts.serial = textIn(about, "serial");
     for (const std::string& name : devicefile::keyNames(*devicefile::findSection("service")))
         facts.behaviours[name] = behaviourOf(device.section("service"), name.c_str());
     return facts;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a device file says of what the services tell.
+// The facts of a device file that the played services publish.
 #ifndef PORT_PLAYED_FACTS_H
 #define PORT_PLAYED_FACTS_H
 
@@ -24,6 +24,13 @@ struct SlotFacts {
     std::string imei;
     std::optional<ServiceState> service;
     bool isRoaming = false;
+    std::string operatorName;
+    std::string operatorMcc;
+    std::string operatorMnc;
+    std::optional<AccessTechnology> accessTechnology;
+    std::optional<int> signal;
+    std::optional<PowerState> power;
+    std::string iccid;
     bool hasMessages = false;
     bool isEnabled = true;
     std::string pin; // empty: any is right
@@ -34,6 +41,16 @@ struct SlotFacts {
     bool isReady() const
     {
         return card == CardStatus::Ready;
+    }
+    /// MCC and MNC of the network that it is registered with: at home those of its card, unless the
+    /// file says others. Empty when they are not known.
+    std::string operatorCode() const
+    {
+        if (service != ServiceState::InService)
+            return "";
+        if (!operatorMcc.empty() && !operatorMnc.empty())
+            return operatorMcc + operatorMnc;
+        return isRoaming ? "" : mcc + mnc;
     }
 };
 
@@ -57,6 +74,7 @@ struct Facts {
     std::optional<CellularState> cellular;
     std::optional<LinkState> wifi;
     std::optional<WifiConnection> wifiConnection;
+    std::string ssid;
     std::optional<LinkState> bluetooth;
     std::optional<bool> flightMode;
     std::optional<bool> dataRoaming;

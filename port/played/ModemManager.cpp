@@ -2,32 +2,24 @@
 // ModemManager: a modem for each slot.
 #include <ModemManager/ModemManager.h>
 
+#include "../../devicefile/Card.h"
 #include "Service.h"
 
 namespace port::played {
 namespace {
 
-const std::string VERSION = versionText(MM_MAJOR_VERSION, MM_MINOR_VERSION, MM_MICRO_VERSION);
-
 using devicefile::Edit;
 
 constexpr char ERROR[] = "org.freedesktop.ModemManager1.Error.";
 constexpr char FIRMWARE[] = MM_DBUS_INTERFACE_MODEM_FIRMWARE;
-constexpr int PIN_RETRIES = 3; // of a card that nobody tried yet (3GPP TS 31.101)
-constexpr int PUK_RETRIES = 10;
-
-std::string numbered(const char* prefix, int number)
-{
-    return prefix + ("/" + std::to_string(number));
-}
+constexpr int PUK_RETRIES = 10; // of a card that nobody tried yet (3GPP TS 31.101)
 
 bool hasCard(const SlotFacts& slot)
 {
-    return slot.card && !ModemNumbers::hasFailed(slot) && slot.card != CardStatus::PoweredOff &&
-           slot.card != CardStatus::Unknown;
+    return slot.card && devicefile::isCardThere(*slot.card);
 }
 
-// What a card's status is to ModemManager while it cannot be used.
+// ModemManager's view of each status in which a card cannot be used.
 struct CardRow {
     CardStatus card;
     MMModemState state;
@@ -107,8 +99,10 @@ MMModem3gppRegistrationState registrationOf(const SlotFacts& slot, MMModemState 
 
 MMModemPowerState powerOf(const Facts& facts, const SlotFacts& slot)
 {
-    if (slot.card == CardStatus::PoweredOff)
+    if (slot.card == CardStatus::PoweredOff || slot.power == PowerState::Off)
         return MM_MODEM_POWER_STATE_OFF;
+    if (slot.power)
+        return slot.power == PowerState::On ? MM_MODEM_POWER_STATE_ON : MM_MODEM_POWER_STATE_LOW;
     return facts.isCellularOn() ? MM_MODEM_POWER_STATE_ON : MM_MODEM_POWER_STATE_LOW;
 }
 
@@ -116,22 +110,11 @@ Variant retriesOf(const SlotFacts& slot)
 {
     if (!hasCard(slot))
         return interfaceOf(MM_DBUS_INTERFACE_MODEM).defaults.at(MM_MODEM_PROPERTY_UNLOCKRETRIES);
-    const bool isPinGone = slot.card == CardStatus::PukRequired || slot.card == CardStatus::Blocked;
     const bool isPukGone = slot.card == CardStatus::Blocked;
-    const int pin = isPinGone ? 0 : slot.pinRetries.value_or(PIN_RETRIES);
+    const int pin = devicefile::pinTriesOf(*slot.card, slot.pinRetries);
     const int puk = isPukGone ? 0 : slot.pukRetries.value_or(PUK_RETRIES);
     return share(g_variant_ref_sink(g_variant_new_parsed(
         "@a{uu} {%u: %u, %u: %u}", MM_MODEM_LOCK_SIM_PIN, pin, MM_MODEM_LOCK_SIM_PUK, puk)));
-}
-
-Variant textOf(const std::string& text)
-{
-    return value("s", text.c_str());
-}
-
-Variant pathOf(const std::string& path)
-{
-    return value("o", path.c_str());
 }
 
 std::string identifierOf(const std::string& text)
@@ -205,12 +188,22 @@ private:
              {MM_MODEM_PROPERTY_STATEFAILEDREASON, value("u", row_.reason)},
              {MM_MODEM_PROPERTY_OWNNUMBERS,
               texts(slot_.isReady() && !slot_.number.empty() ? Paths{slot_.number} : Paths())},
+             {MM_MODEM_PROPERTY_ACCESSTECHNOLOGIES, value("u", technologies())},
+             {MM_MODEM_PROPERTY_SIGNALQUALITY,
+              value("(ub)", isRegistered() ? slot_.signal.value_or(0) : 0,
+                    isRegistered() && slot_.signal)},
              {MM_MODEM_PROPERTY_POWERSTATE, value("u", powerOf(facts_, slot_))}});
+    }
+
+    guint32 technologies() const
+    {
+        return isRegistered() && slot_.accessTechnology
+                   ? 1U << static_cast<unsigned>(*slot_.accessTechnology)
+                   : static_cast<guint32>(MM_MODEM_ACCESS_TECHNOLOGY_UNKNOWN);
     }
 
     Face network() const
     {
-        const bool isHome = slot_.service == ServiceState::InService && !slot_.isRoaming;
         MMModem3gppPacketServiceState packets = MM_MODEM_3GPP_PACKET_SERVICE_STATE_UNKNOWN;
         if (isRegistered())
             packets = facts_.cellular == CellularState::CallOnlyAvailable
@@ -221,7 +214,9 @@ private:
                      {MM_MODEM_MODEM3GPP_PROPERTY_REGISTRATIONSTATE,
                       value("u", registrationOf(slot_, row_.state))},
                      {MM_MODEM_MODEM3GPP_PROPERTY_OPERATORCODE,
-                      textOf(isRegistered() && isHome ? slot_.mcc + slot_.mnc : "")},
+                      textOf(isRegistered() ? slot_.operatorCode() : "")},
+                     {MM_MODEM_MODEM3GPP_PROPERTY_OPERATORNAME,
+                      textOf(isRegistered() ? slot_.operatorName : "")},
                      {MM_MODEM_MODEM3GPP_PROPERTY_ENABLEDFACILITYLOCKS,
                       value("u", row_.lock == MM_MODEM_LOCK_SIM_PIN ? MM_MODEM_3GPP_FACILITY_SIM
                                                                     : MM_MODEM_3GPP_FACILITY_NONE)},
@@ -257,6 +252,7 @@ private:
             MM_DBUS_INTERFACE_SIM,
             {{MM_SIM_PROPERTY_ACTIVE, value("b", TRUE)},
              {MM_SIM_PROPERTY_SIMTYPE, value("u", MM_SIM_TYPE_PHYSICAL)},
+             {MM_SIM_PROPERTY_SIMIDENTIFIER, textOf(slot_.iccid)},
              {MM_SIM_PROPERTY_IMSI,
               textOf(isWhole && !slot_.msin.empty() ? slot_.mcc + slot_.mnc + slot_.msin : "")},
              {MM_SIM_PROPERTY_OPERATORIDENTIFIER, textOf(isWhole ? slot_.mcc + slot_.mnc : "")}});
@@ -277,13 +273,15 @@ private:
     const std::string port_; // stays the kernel's when the modem comes anew
 };
 
-World worldOf(const Scene& scene)
+World modemWorld(const Scene& scene)
 {
     World world;
     for (std::size_t i = 0; i < scene.facts.slots.size(); ++i)
         Modem(scene, i).show(world);
     world.push_back({MM_DBUS_PATH,
-                     {face(MM_DBUS_INTERFACE, {{"Version", value("s", VERSION.c_str())}})},
+                     {face(MM_DBUS_INTERFACE,
+                           {{"Version", textOf(versionText(MM_MAJOR_VERSION, MM_MINOR_VERSION,
+                                                           MM_MICRO_VERSION))}})},
                      false});
     return world;
 }
@@ -347,17 +345,18 @@ Outcome setPower(const Request& request)
     guint32 state = 0;
     g_variant_get(request.arguments, "(u)", &state);
     const bool isOff = slotOf(request).card == CardStatus::PoweredOff;
-    if (state == MM_MODEM_POWER_STATE_ON && isOff)
-        return Outcome::change({set(slotKey(slotAt(request), "sim"), "available")});
+    std::vector<Edit> changes = {unset(slotKey(slotAt(request), "power"))};
+    if (isOff)
+        changes.push_back(set(slotKey(slotAt(request), "sim"), "available"));
     if (state == MM_MODEM_POWER_STATE_ON)
-        return {};
+        return isOff || slotOf(request).power ? Outcome::change(std::move(changes)) : Outcome();
     return Outcome::refuse(std::string(ERROR) + "Core.Unsupported",
                            "Requested power transition is not supported by this modem");
 }
 
 Outcome listBearers(const Request& request)
 {
-    GVariant* const bearers = request.values().at(MM_MODEM_PROPERTY_BEARERS).get();
+    GVariant* const bearers = request.value(MM_MODEM_PROPERTY_BEARERS);
     return Outcome::answer(g_variant_new("(@ao)", bearers));
 }
 
@@ -395,8 +394,8 @@ Outcome sendPin(const Request& request)
     if (slot.card != CardStatus::PinRequired)
         return wrongState("Cannot send PIN: device is not SIM-PIN locked");
     if (!slot.pin.empty() && slot.pin != pin)
-        return countDown(slotAt(request), "pin_retries", slot.pinRetries.value_or(PIN_RETRIES),
-                         "puk");
+        return countDown(slotAt(request), "pin_retries",
+                         slot.pinRetries.value_or(devicefile::PIN_TRIES), "puk");
     return unlock(slotAt(request), {});
 }
 
@@ -439,24 +438,19 @@ const char* const NO_LOCATION = "(@a{uv} {},)";
 const char* const NO_PROFILES = "(@aa{sv} [],)";
 const char* const NO_FIRMWARE = "('', @aa{sv} [])";
 
-Outcome nothing(const Request&)
-{
-    return {};
-}
-
-Outcome refuse(const Request& request)
+Outcome refuseAsUnsupported(const Request& request)
 {
     return Outcome::refuse(std::string(ERROR) + "Core.Unsupported",
                            "Operation not supported: " + request.member);
 }
 
-GVariant* stateTale(GVariant* before, GVariant* after)
+GVariant* modemStateTale(GVariant* before, GVariant* after)
 {
     return g_variant_new("(iiu)", g_variant_get_int32(before), g_variant_get_int32(after),
                          MM_MODEM_STATE_CHANGE_REASON_UNKNOWN);
 }
 
-bool isThere(const Facts& facts)
+bool hasTelephony(const Facts& facts)
 {
     return facts.hasTelephony;
 }
@@ -469,8 +463,8 @@ const Role& modemManager()
         "ModemManager",
         MM_DBUS_SERVICE,
         MM_DBUS_PATH,
-        worldOf,
-        isThere,
+        modemWorld,
+        hasTelephony,
         {
             {MM_DBUS_INTERFACE, "ScanDevices", nothing},
             {MM_DBUS_INTERFACE, "SetLogging", nothing},
@@ -487,9 +481,9 @@ const Role& modemManager()
             {MM_DBUS_INTERFACE_SIM, "SendPuk", sendPuk},
         },
         {},
-        {{MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, "StateChanged", false, stateTale}},
+        {{MM_DBUS_INTERFACE_MODEM, MM_MODEM_PROPERTY_STATE, "StateChanged", false, modemStateTale}},
         {},
-        refuse,
+        refuseAsUnsupported,
         true,
     };
     return service;

@@ -11,17 +11,16 @@ namespace {
 
 constexpr char MANAGER_OF_OBJECTS[] = "/org/freedesktop";
 constexpr char WIRELESS[] = NM_DBUS_INTERFACE_DEVICE_WIRELESS;
-constexpr char AGENTS[] = NM_DBUS_INTERFACE ".AgentManager";
+constexpr char SECRET_AGENTS[] = NM_DBUS_INTERFACE ".AgentManager";
 constexpr char DNS[] = NM_DBUS_INTERFACE ".DnsManager";
 constexpr char DEVICE_MODEM[] = NM_DBUS_INTERFACE_DEVICE ".Modem";
 constexpr char DEVICE_BLUETOOTH[] = NM_DBUS_INTERFACE_DEVICE_BLUETOOTH;
 constexpr char ACCESS_POINT[] = NM_DBUS_PATH_ACCESS_POINT "/1";
-// Of the range that is kept for documents (RFC 7042).
+// Taken from the range that is reserved for documentation (RFC 7042).
 constexpr char WIFI_ADDRESS[] = "00:00:5E:00:53:01";
 constexpr char BLUETOOTH_ADDRESS[] = "00:00:5E:00:53:03";
 constexpr char NAME_OF_WIFI[] = "Wi-Fi";
 constexpr guint32 FLAG_DEVICE_NM_SUPPORTED = 1;
-const std::string VERSION = versionText(NM_MAJOR_VERSION, NM_MINOR_VERSION, NM_MICRO_VERSION);
 constexpr guint32 ENCODED = NM_ENCODE_VERSION(NM_MAJOR_VERSION, NM_MINOR_VERSION, NM_MICRO_VERSION);
 
 // The connections that the user has set up, one for each kind of radio.
@@ -37,10 +36,6 @@ constexpr Kind BLUETOOTH = {"Bluetooth", "2d9b2c9f-8d57-4e0c-9f4e-6a2f0a3c0003",
 constexpr const Kind* KINDS[] = {&WIFI, &GSM, &BLUETOOTH};
 constexpr int FIRST_MODEM = 3; // among the devices
 
-std::string numbered(const char* prefix, int number)
-{
-    return prefix + ("/" + std::to_string(number));
-}
 std::string settingsOf(const Kind& kind)
 {
     return numbered(NM_DBUS_PATH_SETTINGS, kind.number);
@@ -53,9 +48,15 @@ std::string deviceAt(int number)
 {
     return numbered("/org/freedesktop/NetworkManager/Devices", number);
 }
-Variant pathOf(const std::string& path)
+// A network whose name the file does not say has one all the same.
+std::string ssidOf(const Facts& facts)
 {
-    return value("o", path.c_str());
+    return facts.ssid.empty() ? NAME_OF_WIFI : facts.ssid;
+}
+
+GVariant* bytesOf(const std::string& text)
+{
+    return g_variant_new_fixed_array(G_VARIANT_TYPE_BYTE, text.data(), text.size(), 1);
 }
 
 NMDeviceState stateOfWifi(const Facts& facts)
@@ -89,7 +90,7 @@ bool isComingUp(NMDeviceState state)
     return state > NM_DEVICE_STATE_DISCONNECTED && state < NM_DEVICE_STATE_ACTIVATED;
 }
 
-// What NetworkManager has of one kind of radio.
+// NetworkManager's objects for one kind of radio.
 struct Radio {
     const Kind* kind;
     bool hasSettings;
@@ -147,7 +148,7 @@ public:
                          {face(NM_DBUS_INTERFACE_SETTINGS,
                                {{"Connections", texts(settings, "ao")},
                                 {"Hostname", value("s", facts_.hostName.c_str())}})}});
-        world.push_back({NM_DBUS_PATH "/AgentManager", {face(AGENTS)}});
+        world.push_back({NM_DBUS_PATH "/AgentManager", {face(SECRET_AGENTS)}});
         world.push_back({NM_DBUS_PATH "/DnsManager", {face(DNS)}});
         world.push_back({NM_DBUS_PATH, {manager(devices)}});
         return world;
@@ -229,7 +230,6 @@ private:
         const SlotFacts& slot = facts_.slots[index];
         const int number = scene_.modems.numberOf(slot);
         const std::string modem = numbered(MM_DBUS_MODEM_PREFIX, number);
-        const bool isHome = slot.service == ServiceState::InService && !slot.isRoaming;
         world.push_back(
             {deviceAt(FIRST_MODEM + number),
              {device(NM_DEVICE_TYPE_MODEM, stateOfModem(facts_, index),
@@ -238,8 +238,7 @@ private:
                       {"IpInterface", value("s", facts_.connectedSlot() == index
                                                      ? ("wwan" + std::to_string(index)).c_str()
                                                      : "")}}),
-              face(DEVICE_MODEM,
-                   {{"OperatorCode", value("s", isHome ? (slot.mcc + slot.mnc).c_str() : "")}}),
+              face(DEVICE_MODEM, {{"OperatorCode", value("s", slot.operatorCode().c_str())}}),
               statistics}});
     }
 
@@ -255,11 +254,10 @@ private:
                      {"ActiveAccessPoint", pathOf(wifi.isActive() ? ACCESS_POINT : "/")}});
     }
 
-    static Face accessPoint()
+    Face accessPoint() const
     {
         return face(NM_DBUS_INTERFACE_ACCESS_POINT,
-                    {{"Ssid", share(g_variant_ref_sink(g_variant_new_fixed_array(
-                                  G_VARIANT_TYPE_BYTE, NAME_OF_WIFI, sizeof NAME_OF_WIFI - 1, 1)))},
+                    {{"Ssid", share(g_variant_ref_sink(bytesOf(ssidOf(facts_))))},
                      {"HwAddress", value("s", "00:00:5E:00:53:FF")},
                      {"Mode", value("u", NM_802_11_MODE_INFRA)},
                      {"LastSeen", value("i", -1)}});
@@ -300,7 +298,7 @@ private:
             state = NM_STATE_CONNECTING;
         return face(
             NM_DBUS_INTERFACE,
-            {{"Version", value("s", VERSION.c_str())},
+            {{"Version", textOf(versionText(NM_MAJOR_VERSION, NM_MINOR_VERSION, NM_MICRO_VERSION))},
              {"VersionInfo", value("@au", g_variant_new_fixed_array(G_VARIANT_TYPE_UINT32, &ENCODED,
                                                                     1, sizeof ENCODED))},
              {"Devices", texts(devices, "ao")},
@@ -322,7 +320,7 @@ private:
     std::vector<Radio> radios_; // in the order in which traffic prefers them
 };
 
-World worldOf(const Scene& scene)
+World networkWorld(const Scene& scene)
 {
     return Network(scene).world();
 }
@@ -350,10 +348,10 @@ Outcome setCellular(const Request& request)
     return Outcome::change(cellularSwitch(facts, on));
 }
 
-// What a method tells of a list that is a property too.
+// Answers a method with a list that is also a property.
 Outcome list(const Request& request, const char* property)
 {
-    return Outcome::answer(g_variant_new("(@ao)", request.values().at(property).get()));
+    return Outcome::answer(g_variant_new("(@ao)", request.value(property)));
 }
 Outcome devices(const Request& request)
 {
@@ -365,11 +363,11 @@ Outcome connections(const Request& request)
 }
 Outcome state(const Request& request)
 {
-    return Outcome::answer(g_variant_new("(@u)", request.values().at("State").get()));
+    return Outcome::answer(g_variant_new("(@u)", request.value("State")));
 }
 Outcome connectivity(const Request& request)
 {
-    return Outcome::answer(g_variant_new("(@u)", request.values().at("Connectivity").get()));
+    return Outcome::answer(g_variant_new("(@u)", request.value("Connectivity")));
 }
 
 Outcome permissions(const Request&)
@@ -390,7 +388,7 @@ const Object* findDevice(const Request& request, const std::string& interface)
     for (const Object& object : request.world)
         if (const Face* const device = object.find(NM_DBUS_INTERFACE_DEVICE))
             for (const char* const name : {"Interface", "IpInterface"})
-                if (interface == g_variant_get_string(device->values.at(name).get(), nullptr))
+                if (interface == g_variant_get_string(device->value(name), nullptr))
                     return &object;
     return nullptr;
 }
@@ -437,15 +435,18 @@ Outcome settings(const Request& request)
     GVariantDict own;
     g_variant_dict_init(&own, nullptr);
     if (&kind == &WIFI)
-        g_variant_dict_insert_value(&own, "ssid",
-                                    g_variant_new_fixed_array(G_VARIANT_TYPE_BYTE, NAME_OF_WIFI,
-                                                              sizeof NAME_OF_WIFI - 1, 1));
+        g_variant_dict_insert_value(&own, "ssid", bytesOf(ssidOf(facts)));
     if (&kind == &GSM && !facts.dataRoaming.value_or(true))
         g_variant_dict_insert(&own, "home-only", "b", TRUE);
-    return Outcome::answer(
-        g_variant_new_parsed("({'connection': %@a{sv}, %s: %@a{sv}, 'ipv4': {'method': <'auto'>}, "
-                             "'ipv6': {'method': <'auto'>}},)",
-                             g_variant_dict_end(&connection), kind.type, g_variant_dict_end(&own)));
+    static const Variant automatic =
+        share(g_variant_ref_sink(g_variant_new_parsed("{'method': <'auto'>}")));
+    GVariantBuilder all;
+    g_variant_builder_init(&all, G_VARIANT_TYPE("a{sa{sv}}"));
+    g_variant_builder_add(&all, "{s@a{sv}}", "connection", g_variant_dict_end(&connection));
+    g_variant_builder_add(&all, "{s@a{sv}}", kind.type, g_variant_dict_end(&own));
+    g_variant_builder_add(&all, "{s@a{sv}}", "ipv4", automatic.get());
+    g_variant_builder_add(&all, "{s@a{sv}}", "ipv6", automatic.get());
+    return Outcome::answer(g_variant_new("(a{sa{sv}})", &all));
 }
 
 Outcome connectionByUuid(const Request& request)
@@ -503,10 +504,9 @@ Outcome deactivate(const Request& request)
     return Outcome::change(ended(*kind));
 }
 
-Outcome disconnect(const Request& request)
+Outcome disconnectDevice(const Request& request)
 {
-    const std::string active =
-        g_variant_get_string(request.values().at("ActiveConnection").get(), nullptr);
+    const std::string active = g_variant_get_string(request.value("ActiveConnection"), nullptr);
     const Kind* const kind = kindAt(active, activeOf);
     if (kind == nullptr)
         return Outcome::refuse(NM_DBUS_INTERFACE_DEVICE ".NotActive", "This device is not active");
@@ -523,12 +523,7 @@ Outcome logging(const Request&)
     return Outcome::answer(g_variant_new("(ss)", "INFO", "DEFAULT"));
 }
 
-Outcome nothing(const Request&)
-{
-    return {};
-}
-
-Outcome refuse(const Request& request)
+Outcome refuseAsNotAuthorized(const Request& request)
 {
     return refused("PermissionDenied", "Not authorized: " + request.member);
 }
@@ -543,14 +538,9 @@ GVariant* stateOfActiveTale(GVariant*, GVariant* after)
     return g_variant_new("(uu)", g_variant_get_uint32(after),
                          NM_ACTIVE_CONNECTION_STATE_REASON_UNKNOWN);
 }
-GVariant* stateTale(GVariant*, GVariant* after)
+GVariant* networkStateTale(GVariant*, GVariant* after)
 {
     return g_variant_new("(u)", g_variant_get_uint32(after));
-}
-
-bool isThere(const Facts&)
-{
-    return true;
 }
 
 } // namespace
@@ -561,8 +551,8 @@ const Role& networkManager()
         "NetworkManager",
         NM_DBUS_SERVICE,
         MANAGER_OF_OBJECTS,
-        worldOf,
-        isThere,
+        networkWorld,
+        nullptr,
         {
             {NM_DBUS_INTERFACE, "GetDevices", devices},
             {NM_DBUS_INTERFACE, "GetAllDevices", devices},
@@ -573,26 +563,26 @@ const Role& networkManager()
             {NM_DBUS_INTERFACE, "state", state},
             {NM_DBUS_INTERFACE, "ActivateConnection", activate},
             {NM_DBUS_INTERFACE, "DeactivateConnection", deactivate},
-            {NM_DBUS_INTERFACE_DEVICE, "Disconnect", disconnect},
+            {NM_DBUS_INTERFACE_DEVICE, "Disconnect", disconnectDevice},
             {NM_DBUS_INTERFACE_SETTINGS, "ListConnections", connections},
             {NM_DBUS_INTERFACE_SETTINGS, "GetConnectionByUuid", connectionByUuid},
             {NM_DBUS_INTERFACE_SETTINGS_CONNECTION, "GetSettings", settings},
             {WIRELESS, "GetAccessPoints", noAccessPoints},
             {WIRELESS, "GetAllAccessPoints", noAccessPoints},
             {WIRELESS, "RequestScan", nothing},
-            {AGENTS, "Register", nothing},
-            {AGENTS, "RegisterWithCapabilities", nothing},
-            {AGENTS, "Unregister", nothing},
+            {SECRET_AGENTS, "Register", nothing},
+            {SECRET_AGENTS, "RegisterWithCapabilities", nothing},
+            {SECRET_AGENTS, "Unregister", nothing},
         },
         {{NM_DBUS_INTERFACE, "WirelessEnabled", setWifi},
          {NM_DBUS_INTERFACE, "WwanEnabled", setCellular}},
         {{NM_DBUS_INTERFACE_DEVICE, "State", "StateChanged", false, stateOfDeviceTale},
          {NM_DBUS_INTERFACE_ACTIVE_CONNECTION, "State", "StateChanged", true, stateOfActiveTale},
-         {NM_DBUS_INTERFACE, "State", "StateChanged", false, stateTale}},
+         {NM_DBUS_INTERFACE, "State", "StateChanged", false, networkStateTale}},
         {{NM_DBUS_INTERFACE, "AllDevices", "DeviceAdded", "DeviceRemoved"},
          {NM_DBUS_INTERFACE_SETTINGS, "Connections", "NewConnection", "ConnectionRemoved"},
          {WIRELESS, "AccessPoints", "AccessPointAdded", "AccessPointRemoved"}},
-        refuse,
+        refuseAsNotAuthorized,
         false,
         {{NM_DBUS_INTERFACE_SETTINGS_CONNECTION, "GetSettings", "Updated"}},
     };

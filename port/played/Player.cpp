@@ -102,16 +102,14 @@ std::string Player::change(const std::vector<devicefile::Edit>& changes)
 {
     std::string problem =
         devicefile::changeFile(file_.path(), devicefile::SIZE_LIMIT, [&](std::string& content) {
-            std::string text = content;
-            for (const devicefile::Edit& change : changes) {
-                if (!change.value && !devicefile::getValue(text, file_.path(), change.path))
-                    continue; // what is not there need not go
-                const auto changed = devicefile::changeText(text, file_.path(), {change});
-                if (!changed)
-                    return changed.error().reason;
-                text = changed.value();
-            }
-            content = text;
+            std::vector<devicefile::Edit> needed;
+            for (const devicefile::Edit& change : changes) // what is not there need not go
+                if (change.value || devicefile::getValue(content, file_.path(), change.path))
+                    needed.push_back(change);
+            const auto changed = devicefile::changeText(content, file_.path(), needed);
+            if (!changed)
+                return changed.error().reason;
+            content = changed.value();
             return std::string();
         });
     if (problem.empty())

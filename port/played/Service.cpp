@@ -5,6 +5,13 @@
 #include <cstdarg>
 
 namespace port::played {
+namespace {
+
+constexpr char WIFI_KEY[] = "network.wifi";
+constexpr char CELLULAR_KEY[] = "network.cellular";
+constexpr char BLUETOOTH_KEY[] = "network.bluetooth";
+
+} // namespace
 
 using devicefile::Edit;
 
@@ -13,6 +20,19 @@ const Face* Object::find(const std::string& interface) const
     const auto found = std::find_if(faces.begin(), faces.end(),
                                     [&](const Face& each) { return each.interface == interface; });
     return found != faces.end() ? &*found : nullptr;
+}
+
+GVariant* Face::value(const std::string& property) const
+{
+    const auto found = known.find(property);
+    return (found != known.end() ? found->second : defaults.at(property)).get();
+}
+
+Values Face::all() const
+{
+    Values all = known;
+    all.insert(defaults.begin(), defaults.end());
+    return all;
 }
 
 bool ModemNumbers::hasFailed(const SlotFacts& slot)
@@ -37,21 +57,16 @@ int ModemNumbers::numberOf(const SlotFacts& slot) const
     return rows_.at(slot.name).number;
 }
 
-const Values& Request::values() const
+GVariant* Request::value(const std::string& property) const
 {
-    for (const Object& object : world)
-        if (object.path == path)
-            if (const Face* const found = object.find(interface))
-                return found->values;
-    static const Values none;
-    return none;
+    const auto object = std::find_if(world.begin(), world.end(),
+                                     [this](const Object& each) { return each.path == path; });
+    return object->find(interface)->value(property);
 }
 
 Face face(const char* interface, Values known)
 {
-    const Values& defaults = interfaceOf(interface).defaults;
-    known.insert(defaults.begin(), defaults.end());
-    return {interface, std::move(known)};
+    return {interface, std::move(known), interfaceOf(interface).defaults};
 }
 
 Variant value(const char* format, ...)
@@ -61,6 +76,21 @@ Variant value(const char* format, ...)
     GVariant* const made = g_variant_new_va(format, nullptr, &arguments);
     va_end(arguments);
     return share(g_variant_ref_sink(made));
+}
+
+Variant textOf(const std::string& text)
+{
+    return value("s", text.c_str());
+}
+
+Variant pathOf(const std::string& path)
+{
+    return value("o", path.c_str());
+}
+
+std::string numbered(const char* prefix, int number)
+{
+    return prefix + ("/" + std::to_string(number));
 }
 
 Variant texts(const std::vector<std::string>& all, const char* type)
@@ -92,51 +122,49 @@ std::string slotKey(std::size_t slot, const char* key)
     return "slot[" + std::to_string(slot) + "]." + key;
 }
 
+Outcome nothing(const Request&)
+{
+    return {};
+}
+
 // One radio that is switched on in flight mode ends it; the others stay off, by their own keys. The
 // last one that is switched off begins it.
+std::vector<Edit> withFlightMode(const Facts& facts, const std::string& key, bool on,
+                                 std::vector<Edit> changes)
+{
+    const int radiosOn = facts.isWifiOn() + facts.isCellularOn() + facts.isBluetoothOn();
+    if (!on && radiosOn == 1 && facts.wifi && facts.hasTelephony)
+        changes.push_back(set("settings.flight_mode", "true"));
+    if (!on || !facts.isFlying())
+        return changes;
+    changes.push_back(set("settings.flight_mode", "false"));
+    if (facts.wifi && key != WIFI_KEY)
+        changes.push_back(set(WIFI_KEY, "deactivated"));
+    if (facts.cellular && key != CELLULAR_KEY)
+        changes.push_back(set(CELLULAR_KEY, "flight_mode"));
+    return changes;
+}
+
 std::vector<Edit> wifiSwitch(const Facts& facts, bool on)
 {
-    std::vector<Edit> changes = {set("network.wifi", on ? "disconnected" : "deactivated"),
-                                 unset("network.wifi_connection")};
-    if (on && facts.isFlying()) {
-        changes.push_back(set("settings.flight_mode", "false"));
-        if (facts.cellular)
-            changes.push_back(set("network.cellular", "flight_mode"));
-    }
-    if (!on && facts.hasTelephony && !facts.isCellularOn() && !facts.isBluetoothOn())
-        changes.push_back(set("settings.flight_mode", "true"));
-    return changes;
+    return withFlightMode(
+        facts, WIFI_KEY, on,
+        {set(WIFI_KEY, on ? "disconnected" : "deactivated"), unset("network.wifi_connection")});
 }
 
 std::vector<Edit> cellularSwitch(const Facts& facts, bool on)
 {
-    std::vector<Edit> changes = {set("network.cellular", on ? "available" : "flight_mode")};
+    std::vector<Edit> changes = {set(CELLULAR_KEY, on ? "available" : "flight_mode")};
     for (std::size_t i = 0; i < facts.slots.size(); ++i)
         if (facts.slots[i].isReady())
             changes.push_back(set(slotKey(i, "service"), on ? "in_service" : "out_of_service"));
-    if (on && facts.isFlying()) {
-        changes.push_back(set("settings.flight_mode", "false"));
-        if (facts.wifi)
-            changes.push_back(set("network.wifi", "deactivated"));
-    }
-    if (!on && facts.wifi && !facts.isWifiOn() && !facts.isBluetoothOn())
-        changes.push_back(set("settings.flight_mode", "true"));
-    return changes;
+    return withFlightMode(facts, CELLULAR_KEY, on, std::move(changes));
 }
 
 std::vector<Edit> bluetoothSwitch(const Facts& facts, bool on)
 {
-    std::vector<Edit> changes = {set("network.bluetooth", on ? "disconnected" : "deactivated")};
-    if (on && facts.isFlying()) {
-        changes.push_back(set("settings.flight_mode", "false"));
-        if (facts.wifi)
-            changes.push_back(set("network.wifi", "deactivated"));
-        if (facts.cellular)
-            changes.push_back(set("network.cellular", "flight_mode"));
-    }
-    if (!on && facts.hasTelephony && facts.wifi && !facts.isCellularOn() && !facts.isWifiOn())
-        changes.push_back(set("settings.flight_mode", "true"));
-    return changes;
+    return withFlightMode(facts, BLUETOOTH_KEY, on,
+                          {set(BLUETOOTH_KEY, on ? "disconnected" : "deactivated")});
 }
 
 const std::vector<const Role*>& allServices()

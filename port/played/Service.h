@@ -14,7 +14,12 @@ namespace port::played {
 /// An object of an interface, with every property.
 struct Face {
     std::string interface;
-    Values values;
+    Values known;
+    const Values& defaults; // of the interface: the properties of which nothing is known
+
+    /// Of a property that the interface has; lives as long as this does.
+    GVariant* value(const std::string& property) const;
+    Values all() const;
 };
 
 struct Object {
@@ -50,7 +55,7 @@ struct Scene {
     const ModemNumbers& modems;
 };
 
-/// What a client asks for. Its arguments have the types of the interface.
+/// A client's call. Its arguments have the types of the interface.
 struct Request {
     const Scene& scene;
     const World& world;
@@ -59,7 +64,8 @@ struct Request {
     std::string member; // a method, or the property that is to be set
     GVariant* arguments;
 
-    const Values& values() const;
+    /// Of a property of the interface, which the object must have.
+    GVariant* value(const std::string& property) const;
 };
 
 struct Outcome {
@@ -117,7 +123,7 @@ struct Role {
     const char* busName;
     const char* manager; // the path of its object manager; null: it has none
     World (*worldOf)(const Scene&);
-    bool (*isThere)(const Facts&);
+    bool (*isThere)(const Facts&); // null: always
     std::vector<Act> methods;
     std::vector<Act> setters;
     std::vector<Tale> tales;
@@ -137,12 +143,18 @@ const std::vector<const Role*>& allServices();
 // For the tables.
 Face face(const char* interface, Values known = {});
 Variant value(const char* format, ...);
+Variant textOf(const std::string& text);
+Variant pathOf(const std::string& path);
+/// PREFIX/NUMBER: a path.
+std::string numbered(const char* prefix, int number);
 Variant texts(const std::vector<std::string>& all, const char* type = "as");
 /// "1.42.4": that of the headers, since nmcli warns of a service of another version than its own.
 std::string versionText(int major, int minor, int micro);
 devicefile::Edit set(const std::string& path, const char* value);
 devicefile::Edit unset(const std::string& path);
 std::string slotKey(std::size_t slot, const char* key);
+/// Answers a call that has no effect here.
+Outcome nothing(const Request& request);
 /// The changes that switch the cellular radio.
 std::vector<devicefile::Edit> cellularSwitch(const Facts& facts, bool on);
 std::vector<devicefile::Edit> wifiSwitch(const Facts& facts, bool on);

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <stdexcept>
+#include <string_view>
 #include <utility>
 
 namespace port::played {
@@ -50,31 +51,36 @@ GVariant* dictionary(const std::vector<Face>& faces)
     GVariantBuilder all;
     g_variant_builder_init(&all, G_VARIANT_TYPE("a{sa{sv}}"));
     for (const Face& each : faces)
-        g_variant_builder_add(&all, "{s@a{sv}}", each.interface.c_str(), dictionary(each.values));
+        g_variant_builder_add(&all, "{s@a{sv}}", each.interface.c_str(), dictionary(each.all()));
     return g_variant_builder_end(&all);
 }
 
-// Of the same type. GLib compares what was not put into bytes yet by what it prints of it.
-bool isSame(const Variant& left, const Variant& right)
+std::string_view serialised(GVariant* value)
 {
-    g_variant_get_data(left.get());
-    g_variant_get_data(right.get());
-    return g_variant_equal(left.get(), right.get()) != FALSE;
+    return {static_cast<const char*>(g_variant_get_data(value)), g_variant_get_size(value)};
 }
 
-Values differences(const Values& before, const Values& after)
+// Compares two values of one type, both made here: each then has but one serialised form. GLib
+// itself compares some of them as they are printed.
+bool isSame(GVariant* left, GVariant* right)
+{
+    return left == right || serialised(left) == serialised(right);
+}
+
+Values differences(const Face& before, const Face& after)
 {
     Values changed;
-    for (const auto& [name, value] : after)
-        if (!isSame(before.at(name), value))
-            changed[name] = value;
+    for (const Values* const known : {&before.known, &after.known})
+        for (const auto& [name, value] : *known)
+            if (GVariant* const now = after.value(name); !isSame(before.value(name), now))
+                changed[name] = share(g_variant_ref(now));
     return changed;
 }
 
-std::vector<std::string> pathsIn(const Variant& list)
+std::vector<std::string> pathsIn(GVariant* list)
 {
     gsize count = 0;
-    const char** const paths = g_variant_get_objv(list.get(), &count);
+    const char** const paths = g_variant_get_objv(list, &count);
     std::vector<std::string> all(paths, paths + count);
     g_free(paths);
     return all;
@@ -118,7 +124,8 @@ void Stage::show(const Scene& scene)
         misbehave(behaviour->second);
     if (isGone_)
         return;
-    if (behaviour_.kind == Behaviour::Kind::Absent || !service_.isThere(scene.facts))
+    if (behaviour_.kind == Behaviour::Kind::Absent ||
+        (service_.isThere != nullptr && !service_.isThere(scene.facts)))
         return leave();
     World before = std::move(world_);
     world_ = service_.worldOf(scene);
@@ -294,7 +301,7 @@ void Stage::tellAnswers(const Answers& before)
 {
     for (const auto& [which, answer] : answers_) {
         const auto old = before.find(which);
-        if (old != before.end() && !isSame(old->second, answer))
+        if (old != before.end() && !isSame(old->second.get(), answer.get()))
             emit(which.first, which.second->interface, which.second->signal, nullptr);
     }
 }
@@ -338,7 +345,7 @@ void Stage::tellChanged(const Object& before, const Object& after)
 
 void Stage::tellChanged(const std::string& path, const Face& before, const Face& after)
 {
-    const Values changed = differences(before.values, after.values);
+    const Values changed = differences(before, after);
     if (changed.empty())
         return;
     const auto tellTales = [&](bool isBefore) {
@@ -346,8 +353,7 @@ void Stage::tellChanged(const std::string& path, const Face& before, const Face&
             if (after.interface == tale.interface && isBefore == tale.isBefore &&
                 changed.count(tale.property) != 0)
                 emit(path, tale.interface, tale.signal,
-                     tale.arguments(before.values.at(tale.property).get(),
-                                    after.values.at(tale.property).get()));
+                     tale.arguments(before.value(tale.property), after.value(tale.property)));
     };
     tellTales(true);
     emit(path, PROPERTIES, "PropertiesChanged",
@@ -362,8 +368,8 @@ void Stage::tellLists(const std::string& path, const Face& before, const Face& a
     for (const ListTale& tale : service_.lists) {
         if (after.interface != tale.interface)
             continue;
-        const auto old = pathsIn(before.values.at(tale.property));
-        const auto now = pathsIn(after.values.at(tale.property));
+        const auto old = pathsIn(before.value(tale.property));
+        const auto now = pathsIn(after.value(tale.property));
         for (const std::string& each : without(now, old))
             emit(path, tale.interface, tale.added, g_variant_new("(o)", each.c_str()));
         for (const std::string& each : without(old, now))
@@ -457,12 +463,12 @@ void Stage::answerProperty(GDBusMethodInvocation* call, const std::string& membe
     }
     if (member == "GetAll")
         return g_dbus_method_invocation_return_value(
-            call, g_variant_new("(@a{sv})", dictionary(shown->values)));
+            call, g_variant_new("(@a{sv})", dictionary(shown->all())));
     const char* name = nullptr;
     g_variant_get_child(arguments, 1, "&s", &name);
     if (member == "Get")
-        return g_dbus_method_invocation_return_value(
-            call, g_variant_new("(v)", shown->values.at(name).get()));
+        return g_dbus_method_invocation_return_value(call,
+                                                     g_variant_new("(v)", shown->value(name)));
     Owned<GVariant> value;
     g_variant_get_child(arguments, 2, "v", static_cast<GVariant**>(Out(value)));
     act(call, service_.setters, {*scene_, world_, path, interface, name, value.get()});

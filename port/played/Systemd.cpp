@@ -12,11 +12,6 @@ constexpr char LOCALE[] = "org.freedesktop.locale1";
 constexpr char INVALID[] = "org.freedesktop.DBus.Error.InvalidArgs";
 constexpr char LANG[] = "LANG=";
 
-Variant textOf(const std::string& text)
-{
-    return value("s", text.c_str());
-}
-
 World hostname(const Scene& scene)
 {
     const Facts& facts = scene.facts;
@@ -103,17 +98,12 @@ Outcome setLocale(const Request& request)
     return setText("settings.language", language);
 }
 
-Outcome refuse(const Request& request)
+Outcome refuseInSystemd(const Request& request)
 {
     if (request.member == "GetProductUUID")
         return Outcome::refuse("org.freedesktop.hostname1.NoProductUUID",
                                "Failed to read product UUID from firmware.");
     return Outcome::refuse("org.freedesktop.DBus.Error.AccessDenied", "Permission denied");
-}
-
-bool isThere(const Facts&)
-{
-    return true;
 }
 
 } // namespace
@@ -124,14 +114,14 @@ const Role& hostname1()
                                  HOSTNAME,
                                  nullptr,
                                  hostname,
-                                 isThere,
+                                 nullptr,
                                  {{HOSTNAME, "SetStaticHostname", setStatic},
                                   {HOSTNAME, "SetPrettyHostname", setPretty},
                                   {HOSTNAME, "GetHardwareSerial", serial}},
                                  {},
                                  {},
                                  {},
-                                 refuse,
+                                 refuseInSystemd,
                                  false};
     return service;
 }
@@ -139,8 +129,8 @@ const Role& hostname1()
 const Role& locale1()
 {
     static const Role service = {
-        "locale1", LOCALE, nullptr, locale, isThere, {{LOCALE, "SetLocale", setLocale}},
-        {},        {},     {},      refuse, false};
+        "locale1", LOCALE, nullptr, locale,          nullptr, {{LOCALE, "SetLocale", setLocale}},
+        {},        {},     {},      refuseInSystemd, false};
     return service;
 }
 

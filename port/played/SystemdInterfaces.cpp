@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What systemd has on the bus: names, types, and the value of what is not known.
+// systemd's interfaces on the bus: names, types, and the value of what is not known.
 #include "Interfaces.h"
 
 namespace port::played {

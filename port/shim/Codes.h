@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What one family of the platform's interface answers for a backend's errors.
+// The codes of one family of the platform's interface for a backend's errors.
 #ifndef PORT_SHIM_CODES_H
 #define PORT_SHIM_CODES_H
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the handles of the connection and package interfaces stand for.
+// The objects behind the handles of the connection and package interfaces.
 #ifndef PORT_SHIM_HANDLE_KINDS_H
 #define PORT_SHIM_HANDLE_KINDS_H
 

@@ -40,7 +40,7 @@ public:
         return handle;
     }
 
-    /// What a handle stands for; nothing when it is no live handle of this kind.
+    /// The object of a handle; nothing when it is no live handle of this kind.
     static std::optional<Content> find(Handle handle)
     {
         Registry& all = registry();

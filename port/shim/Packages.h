@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What both interfaces of the packages do.
+// Shared by both interfaces of the packages.
 #ifndef PORT_SHIM_PACKAGES_H
 #define PORT_SHIM_PACKAGES_H
 

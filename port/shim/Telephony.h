@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What both generations of the telephony interface share.
+// Shared by both generations of the telephony interface.
 #ifndef PORT_SHIM_TELEPHONY_H
 #define PORT_SHIM_TELEPHONY_H
 
@@ -10,7 +10,7 @@
 
 namespace port {
 
-/// What the newer interface says of a card in a status that the older one tells in detail.
+/// The newer interface's state of a card whose status the older one gives in detail.
 inline telephony_sim_state_e simState(CardStatus status)
 {
     switch (status) {

@@ -220,7 +220,7 @@ int askSubscription(const char* name, TapiHandle* handle, Subs (*choose)(const S
     });
 }
 
-// What is asked of a modem by its name.
+// Questions about a modem by its name.
 constexpr std::initializer_list<Question> MODEM_QUESTIONS = {
     Question::SimCard, Question::SimIdentity, Question::SmsReadiness, Question::Subscriptions};
 constexpr std::initializer_list<Question> LIST_QUESTIONS = {

@@ -101,7 +101,7 @@ telephony_network_service_state_e serviceState(port::ServiceState service)
     return TELEPHONY_NETWORK_SERVICE_STATE_OUT_OF_SERVICE;
 }
 
-// What is asked of a slot by its handle, and what is asked only of a card that is available.
+// Questions about a slot by its handle, and those that only an available card answers.
 constexpr std::initializer_list<Question> LIST_QUESTIONS = {
     Question::SimSlots, Question::SimCard,        Question::SimIdentity, Question::PhoneNumber,
     Question::Imei,     Question::NetworkService, Question::Roaming};

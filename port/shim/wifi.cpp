@@ -24,7 +24,7 @@ static_assert(stateOf(static_cast<int>(WifiConnection::Failure)) == WIFI_CONNECT
                       WIFI_CONNECTION_STATE_CONNECTED,
               "both count the states alike, from another start");
 
-// What an operation answers: 0 once the interface is on, else why it is not.
+// The result of an operation: 0 once the interface is on, otherwise the reason why it is not.
 std::atomic<int> readiness{WIFI_ERROR_INVALID_OPERATION};
 
 // A radio that cannot be asked now may answer later; a device without one never does.

@@ -51,7 +51,7 @@ std::string inComment(const std::string& text)
 // One section of the file, as it grows.
 class Lines {
 public:
-    /// What identifies the device or its user is masked unless it is to be revealed.
+    /// Masks what identifies the device or its user, unless it is to be revealed.
     explicit Lines(const char* section, bool reveal, Form form = Form::Section)
         : section_(section), reveal_(reveal)
     {
@@ -232,8 +232,22 @@ private:
         lines.add("imei", telephony.imei(name));
         lines.add("service", telephony.service(name));
         lines.add("roaming", telephony.roaming(name));
+        addReport(lines, name);
+        lines.add("iccid", telephony.iccid(name));
         lines.add("sms", telephony.smsReady(name));
         return lines.text();
+    }
+
+    void addReport(Lines& lines, const SlotName& name)
+    {
+        const ModemReport report = reportOf(backend_.telephony(), name);
+        lines.add("operator", report.operatorName);
+        lines.add("operator_mcc", report.operatorMcc);
+        lines.add("operator_mnc", report.operatorMnc);
+        lines.add("access_technology", report.accessTechnology);
+        lines.add("signal", report.signal);
+        lines.add("power", report.power);
+        lines.add("pin_retries", report.pinTries);
     }
 
     // The states that have no name of their own have one of the older interface.
@@ -304,6 +318,7 @@ private:
         addRadio(lines, "cellular", network.cellular(), "connection_get_cellular_state");
         addRadio(lines, "wifi", network.wifi(), "connection_get_wifi_state");
         lines.add("wifi_connection", network.wifiConnection());
+        lines.add("ssid", network.ssid());
         addRadio(lines, "bluetooth", network.bluetooth(), "connection_get_bt_state");
         lines.add("ethernet", network.ethernet());
         const auto connectivity = network.connectivity();

@@ -57,7 +57,7 @@ Result<Sourced<LinkState>> ethernetOf(const Device& device)
     return network.get<LinkState>("ethernet");
 }
 
-// What a link that is connected gives, one after the other, when the file does not say.
+// The connectivity that connected links provide, link by link, when the file does not say.
 Result<Sourced<Connectivity>> connectivityOf(const Device& device)
 {
     const auto cellular = cellularOf(device);
@@ -116,6 +116,18 @@ Result<Sourced<Connectivity>> SimulatedNetwork::connectivity()
             return Result<Sourced<Connectivity>>(
                 notAvailable(said.value().source + ": the connectivity is unknown"));
         return said;
+    });
+}
+
+Result<Fact> SimulatedNetwork::ssid()
+{
+    return file_.ask<std::string>([](const Device& device) -> Result<Fact> {
+        const auto wifi = wifiOf(device);
+        if (!wifi)
+            return wifi.error();
+        if (wifi.value().value != LinkState::Connected)
+            return notAvailable(wifi.value().source + ": Wi-Fi is not connected");
+        return device.section("network").get<std::string>("ssid");
     });
 }
 

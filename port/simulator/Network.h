@@ -8,7 +8,7 @@
 
 namespace port::simulator {
 
-// What a key says holds, also in flight mode. A radio without a key is off in flight mode; a Wi-Fi
+// A key always wins, also in flight mode. A radio without a key is off in flight mode; a Wi-Fi
 // connection without one is as its radio's state tells. Without its key there is no Ethernet,
 // and the connectivity is as the links tell.
 class SimulatedNetwork : public Network {
@@ -21,6 +21,7 @@ public:
     Result<Sourced<LinkState>> bluetooth() override;
     Result<Sourced<LinkState>> ethernet() override;
     Result<Sourced<Connectivity>> connectivity() override;
+    Result<Fact> ssid() override;
     std::unique_ptr<Watch> watch(std::function<void()> changed) override;
 
 private:

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Telephony.h"
 
+#include "../../devicefile/Card.h"
+#include "../backend/Network.h"
+
 namespace port::simulator {
 namespace {
 
@@ -51,15 +54,88 @@ const char* obstacle(CardStatus status)
     }
 }
 
+bool isReady(CardStatus status)
+{
+    return status == CardStatus::Ready;
+}
+
 // Why the card cannot be read; nothing when it can.
-std::optional<Error> obstacleOf(const Section& slot)
+std::optional<Error> obstacleOf(const Section& slot, bool (*isReadable)(CardStatus) = isReady)
 {
     const auto card = cardOf(slot);
     if (!card)
         return card.error();
-    if (card.value().value.status != CardStatus::Ready)
+    if (!isReadable(card.value().value.status))
         return noSim(card.value().source + ": " + obstacle(card.value().value.status));
     return std::nullopt;
+}
+
+Error isPrivate(const Section& slot)
+{
+    return denied(slot.find("denied")->source + ": this slot is private");
+}
+
+// What a file may say or not; why not is the same for each.
+template <typename T>
+Result<Sourced<T>> optional(const Section& slot, const char* key)
+{
+    return slot.find(key) != nullptr ? slot.get<T>(key)
+                                     : notAvailable(slot.source() + ": [[slot]] does not say");
+}
+
+template <typename T>
+Result<Sourced<T>> ofNetwork(const Section& slot, const char* key)
+{
+    const auto service = slot.get<ServiceState>("service");
+    if (!service)
+        return service.error();
+    if (service.value().value != ServiceState::InService)
+        return notAvailable(service.value().source + ": the slot is not in service");
+    return optional<T>(slot, key);
+}
+
+Result<Sourced<PowerState>> powerOf(const Section& slot)
+{
+    const auto card = cardOf(slot);
+    if (slot.find("power") == nullptr && card &&
+        card.value().value.status == CardStatus::PoweredOff)
+        return Sourced<PowerState>{PowerState::Off, card.value().source};
+    return optional<PowerState>(slot, "power");
+}
+
+Result<Sourced<int>> pinTriesIn(const Section& slot)
+{
+    if (const auto error = obstacleOf(slot, devicefile::isCardThere))
+        return *error;
+    const auto card = cardOf(slot).value();
+    const auto said = slot.get<int>("pin_retries");
+    const int tries = devicefile::pinTriesOf(
+        card.value.status, said ? std::optional<int>(said.value().value) : std::nullopt);
+    return Sourced<int>{tries, said ? said.value().source : card.source};
+}
+
+ModemReport::Use useOf(const Section& slot, bool carriesData)
+{
+    const auto service = slot.get<ServiceState>("service");
+    if (!service || service.value().value != ServiceState::InService)
+        return ModemReport::Use::None;
+    return carriesData ? ModemReport::Use::Data : ModemReport::Use::Service;
+}
+
+ModemReport reportOf(const Section& slot, bool carriesData)
+{
+    const SlotName name = slot.get<std::string>("cp_name").value().value;
+    if (isOn(slot, "denied"))
+        return emptyReport(name, isPrivate(slot));
+    return {name,
+            useOf(slot, carriesData),
+            ofNetwork<std::string>(slot, "operator"),
+            ofNetwork<std::string>(slot, "operator_mcc"),
+            ofNetwork<std::string>(slot, "operator_mnc"),
+            ofNetwork<AccessTechnology>(slot, "access_technology"),
+            ofNetwork<int>(slot, "signal"),
+            powerOf(slot),
+            pinTriesIn(slot)};
 }
 
 std::optional<int> slotNumber(const Section& section, const char* key)
@@ -91,7 +167,7 @@ Result<Section> SimulatedTelephony::slot(const SlotName& name)
         if (slot.get<std::string>("cp_name").value().value != name)
             continue;
         if (isOn(slot, "denied"))
-            return denied(slot.find("denied")->source + ": this slot is private");
+            return isPrivate(slot);
         return slot;
     }
     return notAvailable(file_.path() + ": no slot " + name);
@@ -169,6 +245,30 @@ Result<Sourced<bool>> SimulatedTelephony::roaming(const SlotName& name)
 Result<Sourced<bool>> SimulatedTelephony::smsReady(const SlotName& name)
 {
     return get<bool>(name, "sms");
+}
+
+Result<std::vector<ModemReport>> SimulatedTelephony::reports()
+{
+    const auto now = device();
+    if (!now)
+        return now.error();
+    const auto cellular = now.value()->section("network").get<CellularState>("cellular");
+    const bool isConnected = cellular && cellular.value().value == CellularState::Connected;
+    const auto data = slotNumber(now.value()->section("subscriptions"), "data");
+    std::vector<ModemReport> all;
+    for (const Section& slot : now.value()->slots)
+        all.push_back(reportOf(slot, isConnected && data == static_cast<int>(all.size())));
+    return all;
+}
+
+Result<Fact> SimulatedTelephony::iccid(const SlotName& name)
+{
+    const Result<Section> found = slot(name);
+    if (!found)
+        return found.error();
+    if (const auto error = obstacleOf(found.value(), devicefile::isCardThere))
+        return *error;
+    return optional<std::string>(found.value(), "iccid");
 }
 
 Result<Sourced<Subscriptions>> SimulatedTelephony::subscriptions()

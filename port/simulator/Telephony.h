@@ -21,6 +21,8 @@ public:
     Result<Sourced<bool>> roaming(const SlotName& name) override;
     Result<Sourced<Subscriptions>> subscriptions() override;
     Result<Sourced<bool>> smsReady(const SlotName& name) override;
+    Result<std::vector<ModemReport>> reports() override;
+    Result<Fact> iccid(const SlotName& name) override;
 
 private:
     Result<std::shared_ptr<const devicefile::Device>> device();

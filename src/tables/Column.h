@@ -182,7 +182,7 @@ constexpr Words<Rows, Width> wordsOf(const Column<Rows, Width>& column, Numbers<
 
 constexpr std::size_t NO_SLOT = ~std::size_t(0);
 
-// Which rows of the same cell are chained.
+// Selects the rows of the same cell that are chained.
 enum class Repeats { Kept, LeftOut };
 
 // Whether a row from one on, but before this row, has the same cell.

@@ -11,7 +11,7 @@ import re
 import subprocess
 import sys
 
-# What depends on where the library was built, or is none of its interface.
+# Attributes that depend on where the library was built, or are no part of its interface.
 WITHOUT = ("--no-corpus-path", "--no-comp-dir-path", "--no-show-locs", "--no-elf-needed",
            "--no-parameter-names", "--exported-interfaces-only")
 HINT = """

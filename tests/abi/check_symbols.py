@@ -85,6 +85,14 @@ def refresh_debian(library, symbols_file, version):
     symbols_file.write_text(text + "".join(f" {name}@Base {version}\n" for name in new))
 
 
+def refresh_exports(library, exports_file):
+    """The same for the list of exports, which is sorted below its comment."""
+    listed = set(read_list(exports_file))
+    new = {name.replace(NEW_STRING, "std::string") for name in exported(library)} - listed
+    comment = [line for line in exports_file.read_text().splitlines() if line.startswith("#")]
+    exports_file.write_text("\n".join([*comment, *sorted(listed | new)]) + "\n")
+
+
 def is_of_runtime(symbol, patterns):
     name = symbol.split("@")[0]
     return any(fnmatch.fnmatchcase(text, pattern) for text in (name, symbol)
@@ -166,7 +174,7 @@ def main():
     parser.add_argument("--exports", type=pathlib.Path, help="list of all exported names")
     parser.add_argument("--debian", type=pathlib.Path, help="the symbols file of its Debian package")
     parser.add_argument("--refresh", metavar="VERSION",
-                        help="add to that file what it lacks, as new in VERSION")
+                        help="add to these two files what they lack, as new in VERSION")
     parser.add_argument("--imports", type=pathlib.Path, help="libraries and all imported names ...")
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
     parser.add_argument("--strings", choices=("new", "old"), default="new",
@@ -180,9 +188,11 @@ def main():
     library = arguments.library
     libraries = read_libraries(arguments.imports) if arguments.imports else []
     problems = []
+    if arguments.refresh and arguments.exports:
+        refresh_exports(library, arguments.exports)
     if arguments.exports:
         problems += check_exports(library, read_list(arguments.exports), arguments.strings)
-    if arguments.refresh:
+    if arguments.refresh and arguments.debian:
         refresh_debian(library, arguments.debian, arguments.refresh)
     if arguments.debian:
         problems += check_debian(library, arguments.debian)

@@ -23,7 +23,7 @@ _coresystem
 printf '%s\\n' "${{COMPREPLY[@]}}"
 """
 
-# What zsh's completion system is given, of which `-d` names the array with the words.
+# Records the arguments of zsh's completion system; `-d` names the array with the words.
 ZSH = f"""
 _describe() {{ print -l -- "${{(@P)2}}" | sed 's/:.*//' }}
 _files() {{ print -l -- *(N) }}

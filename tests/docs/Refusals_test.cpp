@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What docs/device.md says of refusals, row by row: the library over a simulated device that
+// The table of refusals in docs/device.md, row by row: the library over a simulated device that
 // refuses the call of the row.
 #include <CoreSystem.h>
 
@@ -68,7 +68,7 @@ available_blocks = 409600
 const char TIME_ZONE[] = "UTC-9"; // nine hours east
 const char MADE_UP_IMEI[] = "324000000000000";
 
-// What the application sees, in the words of the document.
+// The application's view, in the words of the document.
 struct Answer {
     std::string returned;
     std::string output;

@@ -118,7 +118,7 @@ class TheDeviceFilesPage(unittest.TestCase):
 
     def test_names_every_name(self):
         for section in set(self.schema) - {"fault", "step"}:
-            names = set(re.findall(r'`"(\w+)"`', self.page[section]))
+            names = set(re.findall(r'`"([\w-]+)"`', self.page[section]))
             known = set(names_in(self.schema[section], self.definitions))
             self.assertEqual(names - {"null", "cp0", "cp1"}, known, section)
 

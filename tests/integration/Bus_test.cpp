@@ -344,7 +344,11 @@ TEST_F(BusTest, FrozenBusIsBoundedAndUsedAgainLater)
     });
     daemon.thaw();
     EXPECT_LT(time, Bus::CALL_TIMEOUT_MS + SLACK_MS);
-    EXPECT_EQ("box <hostname1 PrettyHostname>", askName(bus));
+    // A busy machine may not let it answer within the first question's time.
+    std::string name;
+    for (int i = 0; i < 10 && name.rfind("box", 0) != 0; ++i)
+        name = askName(bus);
+    EXPECT_EQ("box <hostname1 PrettyHostname>", name);
 }
 
 TEST_F(BusTest, FailedStartOfAServiceIsToldAtOnce)

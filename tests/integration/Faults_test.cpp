@@ -116,7 +116,7 @@ std::string yesOrNo(bool value)
     return value ? "yes" : "no";
 }
 
-// What a read answers and stores; "untouched" where it stores nothing.
+// The code of a read and the value that it stores; "untouched" where it stores nothing.
 template <typename Object>
 std::string stored(Object& object, int (Object::*read)(char**))
 {
@@ -314,7 +314,7 @@ public:
         std::rename(tree.path("/next.toml").c_str(), path.c_str());
     }
 
-    // What a probe sees on such a device, and the texts of the error lines, in a process that
+    // The result of a probe on such a device, and the texts of the error lines, in a process that
     // asked nothing before.
     std::string observe(const std::string& faults, const std::function<std::string()>& probe) const
     {
@@ -331,7 +331,7 @@ public:
     // Replaces the file, and waits until the events that follow from it have come.
     void change(const std::string& faults, const char* device) const
     {
-        // What is told last of all changes, past the calls that may fail.
+        // Wait for the event that comes last of all, past the calls that may fail.
         bool isTold = false;
         port::changeEvents().set(port::Change::DataRoaming, [&](int) { isTold = true; });
         describe(faults, device);
@@ -622,7 +622,7 @@ std::string with(int code, std::string seen)
     return seen;
 }
 
-// What the library takes of the device's own libraries, but for the utility and the bus library.
+// The library's imports from the device's own libraries, but for the utility and the bus library.
 std::set<std::string> importsOfPlatform()
 {
     const std::set<std::string> others = {"[coreutil]", "[gio-2.0]", "[gobject-2.0]", "[glib-2.0]"};
@@ -663,7 +663,7 @@ INSTANTIATE_TEST_SUITE_P(Rows, EachFaultTest, testing::ValuesIn(rows()), [](cons
     return "Row" + std::to_string(each.index) + "_" + each.param.call;
 });
 
-// What the library asks three times.
+// The call that the library makes three times.
 std::string flightModeThrice()
 {
     std::string seen;

@@ -8,6 +8,7 @@
 #include <gmock/gmock.h>
 
 #include "linux/Network.h"
+#include "support/Answer.h"
 #include "support/ModemsOnBus.h"
 #include "support/NetworkManagerOnBus.h"
 
@@ -19,12 +20,6 @@ using port::linux_backend::Bus;
 using port::linux_backend::LinuxNetwork;
 
 namespace {
-
-template <typename T>
-T valueOf(const Result<Sourced<T>>& answer)
-{
-    return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
-}
 
 class NetworkManagerTest : public testing::Test {
 protected:

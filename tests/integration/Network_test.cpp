@@ -58,7 +58,7 @@ std::string reply(const std::vector<std::string>& objects)
     return "({" + text + "},)";
 }
 
-// What NetworkManager is made to tell.
+// The state that NetworkManager is made to show.
 struct Networks {
     bool networking = true;
     bool wifiOn = true;
@@ -494,6 +494,53 @@ TEST_F(NetworkTest, ConnectivityIsWhatNetworkManagerSays)
     }
 }
 
+// What NetworkManager tells of a Wi-Fi device at an access point.
+std::string wifiAt(unsigned state, const std::string& point, const std::string& name)
+{
+    const std::string device = std::string(NM) + ".Device";
+    return reply({object(NM_PATH, NM, flag("WirelessEnabled", true) + number("RadioFlags", 1)),
+                  "@o '/Devices/1': {'" + device + "': {" + number("DeviceType", WIFI) + ", " +
+                      number("State", state) + ", 'Interface': <'wlan0'>}, '" + device +
+                      ".Wireless': {'ActiveAccessPoint': <@o '" + point +
+                      "'>, 'Bitrate': <uint32 1>}}",
+                  object("/AccessPoint/7", std::string(NM) + ".AccessPoint", name)});
+}
+
+TEST_F(NetworkTest, SsidIsThatOfTheAccessPointThatIsUsed)
+{
+    const auto ssid = [this] {
+        const auto answer = network.ssid();
+        return answer ? answer.value().value + " <" + answer.value().source + ">"
+                      : answer.error().reason;
+    };
+    const struct {
+        unsigned state;
+        const char* point;
+        const char* name;
+        const char* answer;
+    } rows[] = {
+        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0x00]>",
+         "the name of the Wi-Fi network is no text"},
+        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0xc3, 0xa9]>",
+         "C\u00e9 <org.freedesktop.NetworkManager wlan0>"},
+        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0xe9]>",
+         "the name of the Wi-Fi network is no text"},
+        {100, "/AccessPoint/7", "'Ssid': <@ay []>", "the Wi-Fi network hides its name"},
+        {100, "/AccessPoint/7", "'Ssid': <'C'>", "NetworkManager: Ssid is no list of bytes"},
+        {100, "/", "'Ssid': <[byte 0x43]>", "NetworkManager: / is not there"},
+        {70, "/AccessPoint/7", "'Ssid': <[byte 0x43]>", "Wi-Fi is not connected"},
+    };
+    for (const auto& row : rows) {
+        serve(networkManager, NM, wifiAt(row.state, row.point, row.name));
+        EXPECT_EQ(row.answer, ssid());
+    }
+    const int before = networkManager->timesAsked();
+    network.ssid();
+    EXPECT_EQ(1, networkManager->timesAsked() - before);
+    serve(Networks{});
+    EXPECT_EQ("Wi-Fi is not connected", ssid());
+}
+
 TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
 {
     Networks networks;
@@ -558,31 +605,27 @@ TEST_F(NetworkTest, CellularFollowsTheModem)
     }
 }
 
-TEST_F(NetworkTest, RoamingIsOffWhereTheConnectionForbidsIt)
+TEST_F(NetworkTest, EitherNetworkOfACdmaModemMayBeAbroad)
 {
     Networks networks;
     networks.devices = {{MODEM, 30}};
     networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
     serve(networks);
-    serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
-    EXPECT_EQ(shown(CellularState::RoamingOff, MODEM_0), show(network.cellular()));
-    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
-    EXPECT_EQ(shown(CellularState::Available, MODEM_0), show(network.cellular()));
-    networkManager.reset();
-    serveModems({"'State': <8>|'RegistrationState': <uint32 5>"});
-    EXPECT_EQ(shown(CellularState::Available, MODEM_0), show(network.cellular()));
-}
-
-TEST_F(NetworkTest, FlightModeHidesTheModemThatIsNotConnected)
-{
-    Networks networks;
-    networks.wifiOn = false;
-    networks.cellularOn = false;
-    serve(networks);
-    serveModems({"'State': <3>"});
-    EXPECT_EQ(shown(CellularState::FlightMode, MODEM_0), show(network.cellular()));
-    serveModems({"'State': <11>"});
-    EXPECT_EQ(shown(CellularState::Connected, MODEM_0), show(network.cellular()));
+    const struct {
+        const char* registrations;
+        CellularState state;
+    } rows[] = {{"2>, 'EvdoRegistrationState': <uint32 2", CellularState::Available},
+                {"3>, 'EvdoRegistrationState': <uint32 2", CellularState::RoamingOff},
+                {"2>, 'EvdoRegistrationState': <uint32 3", CellularState::RoamingOff}};
+    for (const auto& row : rows) {
+        const std::string modem = std::string(MM) + ".Modem";
+        serve(modemManager, MM,
+              reply({object("/org/freedesktop/ModemManager1/Modem/0", modem,
+                            "'State': <8>}, '" + modem +
+                                ".ModemCdma': {'Cdma1xRegistrationState': <uint32 " +
+                                row.registrations + ">")}));
+        EXPECT_EQ(shown(row.state, MODEM_0), show(network.cellular())) << row.registrations;
+    }
 }
 
 TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
@@ -597,7 +640,7 @@ TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
 TEST_F(NetworkTest, ModemThatIsFurthestCounts)
 {
     serveModems({"'State': <'broken'>", "'State': <3>",
-                 "'State': <8>|'RegistrationState': <uint32 1>", "'State': <7>"});
+                 "'State': <8>|'RegistrationState': <uint32 5>", "'State': <7>"});
     EXPECT_EQ(shown(CellularState::Available, MODEM_2), show(network.cellular()));
 }
 
@@ -722,7 +765,7 @@ public:
         std::unique_lock<std::mutex> lock(mutex_);
         return changed_.wait_for(lock, std::chrono::seconds(10), [&] { return count_ >= count; });
     }
-    // Of calls so far.
+    // The number of calls so far.
     int count()
     {
         const std::lock_guard<std::mutex> lock(mutex_);
@@ -792,6 +835,30 @@ TEST_F(WatchTest, EveryKindOfChangeIsTold)
     }));
     EXPECT_TRUE(isTold([this] { serveModems({}); }));
     EXPECT_TRUE(isTold([this] { serveAdapters({}); }));
+}
+
+// A radio measures all the time. The kernel may tell of this machine's own interfaces meanwhile.
+TEST_F(WatchTest, NoiseOfARadioIsNotTold)
+{
+    constexpr int TIMES = 100;
+    serve(networkManager, NM, wifiAt(100, "/AccessPoint/7", "'Ssid': <[byte 0x43]>"));
+    Calls ends; // seen by who is told
+    watch = network.watch([&] { network.ssid() ? calls.note() : ends.note(); });
+    ASSERT_TRUE(calls.waitFor(1));
+    const auto emit = [this](const char* path, const char* interface, const std::string& changes) {
+        networkManager->emit(path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                             std::string("('org.freedesktop.NetworkManager.") + interface + "', {" +
+                                 changes + "}, @as [])");
+    };
+    const int before = calls.count();
+    for (int i = 0; i < TIMES; ++i) {
+        emit("/Devices/1", "Device.Wireless", "'Bitrate': <uint32 " + std::to_string(i + 2) + ">");
+        emit("/AccessPoint/7", "AccessPoint", "'Strength': <byte " + std::to_string(i) + ">");
+    }
+    emit("/Devices/1", "Device.Wireless", "'ActiveAccessPoint': <@o '/'>");
+    EXPECT_TRUE(ends.waitFor(1));
+    EXPECT_LT(calls.count(), before + TIMES);
+    watch.reset();
 }
 
 TEST_F(WatchTest, FailureThatDoesNotLastIsTold)

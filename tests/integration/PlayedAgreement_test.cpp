@@ -2,6 +2,7 @@
 // The services that are played from a device file, asked by the linux backend as it is, and the
 // simulator asked about the same file: both answer the same, but where a row says why they cannot.
 #include <algorithm>
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -80,6 +81,47 @@ std::string answerOf(const Result<port::Fact>& result)
     return result ? textOf(result.value().value) : NO_ANSWER;
 }
 
+// All that a network tells a modem, and what the modem tells of itself.
+std::string networkOf(const port::ModemReport& report)
+{
+    return answerOf(report.operatorName) + " " + answerOf(report.operatorMcc) + " " +
+           answerOf(report.operatorMnc) + " " + answerOf(report.accessTechnology) + " " +
+           answerOf(report.signal);
+}
+std::string powerOf(const port::ModemReport& report)
+{
+    return answerOf(report.power);
+}
+std::string pinTriesOf(const port::ModemReport& report)
+{
+    return answerOf(report.pinTries);
+}
+
+template <std::string (*READ)(const port::ModemReport&)>
+std::string inReport(Backend& backend, const SlotName& slot)
+{
+    const auto reports = backend.telephony().reports();
+    if (reports)
+        for (const port::ModemReport& report : reports.value())
+            if (report.slot == slot)
+                return READ(report);
+    return "no report";
+}
+
+// The name of the slot whose modem is used for most.
+std::string slotInUse(Backend& backend, const SlotName&)
+{
+    const auto reports = backend.telephony().reports();
+    std::string used = NO_ANSWER;
+    auto most = port::ModemReport::Use::None;
+    for (const auto& report : reports ? reports.value() : std::vector<port::ModemReport>())
+        if (report.use > most) {
+            most = report.use;
+            used = report.slot;
+        }
+    return used;
+}
+
 struct Question {
     const char* name;
     bool isOfSlot;
@@ -125,9 +167,15 @@ const Question QUESTIONS[] = {
     OF_SLOT("service", service),
     OF_SLOT("roaming", roaming),
     OF_SLOT("messages", smsReady),
+    OF_SLOT("iccid", iccid),
+    OF_DEVICE("ssid", network, ssid),
+    {"used slot", false, slotInUse},
+    {"network", true, inReport<networkOf>},
+    {"power", true, inReport<powerOf>},
+    {"PIN tries", true, inReport<pinTriesOf>},
 };
 
-// What a row looks at.
+// The property that a row looks at.
 struct Case {
     const Device& device;
     const Facts& facts;
@@ -176,7 +224,7 @@ bool isKeptFromRoaming(const Facts& facts)
     return isServed(facts) && !atHome && !facts.dataRoaming.value_or(true);
 }
 
-// What NetworkManager's switches and BlueZ's adapter make of the radios that are there.
+// NetworkManager's switches and BlueZ's adapter for the radios that are there.
 bool areRadiosOff(const Facts& facts)
 {
     const bool isWifiOff = !facts.isWifiOn();
@@ -216,8 +264,7 @@ bool isPacketDataElsewhere(const Case& now)
         return on.has_value();
     if (!on)
         return true;
-    return (*on && !now.facts.isCellularOn()) ||
-           (!*on && now.facts.connectedSlot() && now.facts.isCellularOn());
+    return *on ? !now.facts.isCellularOn() : now.facts.connectedSlot().has_value();
 }
 
 bool differsFromItsWifi(const Case& now)
@@ -236,6 +283,20 @@ bool differsFromItsWifi(const Case& now)
 bool carriesData(const Facts& facts)
 {
     return facts.connectedSlot() && !(facts.isWifiOn() && facts.wifi == LinkState::Connected);
+}
+
+// Whether some slot's service says something else than its card and the cellular network do.
+bool differsInUse(const Case& now)
+{
+    const Facts& facts = now.facts;
+    const auto connected = facts.connectedSlot();
+    if (facts.cellular == CellularState::Connected &&
+        (!connected || static_cast<int>(*connected) != facts.dataSlot))
+        return true;
+    for (std::size_t i = 0; i < facts.slots.size(); ++i)
+        if (isRegistered(facts, i) != (facts.slots[i].service == ServiceState::InService))
+            return true;
+    return false;
 }
 
 bool isPrivate(const Case& now)
@@ -310,6 +371,33 @@ const Difference DIFFERENCES[] = {
          return !now.slot().service || now.section().find("roaming") == nullptr ||
                 (now.slot().isRoaming && now.slot().service != ServiceState::InService);
      }},
+    {"iccid", "a card of which nothing is said cannot be read",
+     [](const Case& now) { return !now.slot().card; }},
+    {"ssid", "a network whose name the file does not say has one all the same",
+     [](const Case& now) { return now.facts.ssid.empty(); }},
+    {"ssid", "NetworkManager has no flight mode in which a radio is on",
+     [](const Case& now) { return now.facts.isFlying(); }},
+    {"used slot", "the file says of the network what its slots do not", differsInUse},
+    {"network", "a modem without a usable card, or that carries data, is as that says",
+     [](const Case& now) {
+         return isRegistered(now.facts, now.index) !=
+                (now.slot().service == ServiceState::InService);
+     }},
+    {"network", "a modem at home is in its card's network, and MCC and MNC are one code",
+     [](const Case& now) {
+         return now.slot().operatorMcc.empty() || now.slot().operatorMnc.empty();
+     }},
+    {"power", "a modem is on, and low without its radio, where the file does not say it",
+     [](const Case& now) { return now.section().find("power") == nullptr; }},
+    {"", "a modem that is switched off has no card that can be used",
+     [](const Case& now) {
+         return now.slot().power == port::PowerState::Off &&
+                now.slot().card != CardStatus::PoweredOff;
+     }},
+    {"power", "a card that is powered off is a modem that is",
+     [](const Case& now) { return now.slot().card == CardStatus::PoweredOff; }},
+    {"PIN tries", "a card of which nothing is said cannot be asked",
+     [](const Case& now) { return !now.slot().card; }},
     {"messages", "are ready only on a modem that is registered",
      [](const Case& now) {
          return now.section().find("sms") == nullptr ||
@@ -344,8 +432,18 @@ protected:
         delete played_;
     }
 
-    // What differs without a reason; empty when nothing does.
+    // The differences without a reason; empty when there are none.
+    // What still differs when a machine that answers late, because others use it, had its time.
     static std::string compare(const std::string& text)
+    {
+        const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
+        std::string problems = compareOnce(text);
+        while (!problems.empty() && std::chrono::steady_clock::now() < end)
+            problems = compareOnce(text);
+        return problems;
+    }
+
+    static std::string compareOnce(const std::string& text)
     {
         const auto device = port::devicefile::parseDevice(text, "device");
         if (!device)
@@ -394,10 +492,10 @@ protected:
             std::vector<std::string> fewer = lines;
             fewer.erase(fewer.begin() + static_cast<std::ptrdiff_t>(i));
             if (port::devicefile::parseDevice(joined(fewer), "device") &&
-                !compare(joined(fewer)).empty())
+                !compareOnce(joined(fewer)).empty())
                 lines = fewer;
         }
-        return compare(joined(lines)) + joined(lines);
+        return compareOnce(joined(lines)) + joined(lines);
     }
 
     static PlayedDevice* played_;
@@ -457,6 +555,7 @@ public:
                                   "\"configuration\"", "\"connected\"", "\"not_supported\""});
         maybe("bluetooth",
               {"\"deactivated\"", "\"disconnected\"", "\"connected\"", "\"not_supported\""});
+        maybe("ssid", {"\"Home\"", "\"Caf\\u00e9\"", "\"abcdefghijklmnopqrstuvwxyz012345\""});
         lines_.emplace_back("[subscriptions]");
         maybe("data", {"0", "1", "\"unknown\""});
         for (unsigned slots = below(3); slots > 0; --slots)
@@ -497,6 +596,15 @@ private:
         maybe("service",
               {"\"in_service\"", "\"in_service\"", "\"out_of_service\"", "\"emergency_only\""});
         maybe("roaming", {"true", "false"});
+        maybe("operator", {"\"Net\"", "\"R\\u00e9seau\""});
+        maybe("operator_mcc", {"\"001\"", "\"208\""});
+        maybe("operator_mnc", {"\"02\"", "\"260\""});
+        maybe("access_technology", {"\"gsm\"", "\"lte\"", "\"5gnr\"", "\"lte-nb-iot\""});
+        maybe("signal", {"0", "57", "100"});
+        if (below(4) == 0)
+            maybe("power", {"\"on\"", "\"low\"", "\"off\""});
+        maybe("iccid", {"\"8999900000000000010\"", "\"899990000000000002\""});
+        maybe("pin_retries", {"0", "2", "10"});
         maybe("sms", {"true", "false"});
         maybe("enabled", {"true", "false"});
         if (below(10) == 0)
@@ -517,8 +625,8 @@ TEST_P(GeneratedDevices, Agree)
         std::string text;
         for (const std::string& line : lines)
             text += line + "\n";
-        if (!compare(text).empty())
-            FAIL() << "seed " << seed << "\n" << smallest(lines);
+        if (const std::string problems = compare(text); !problems.empty())
+            FAIL() << "seed " << seed << "\n" << problems << smallest(lines);
     }
 }
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What clients of the played services see, hear and may do.
+// Clients of the played services: what they see, hear and may do.
 #include <fstream>
 #include <tuple>
 
@@ -89,7 +89,7 @@ protected:
                     ("('" + interface + "', '" + name + "', <" + value + ">)").c_str());
     }
 
-    // What a service tells while the device becomes another, in its order.
+    // The signals of a service while the device becomes another, in order.
     std::vector<std::string> heard(const char* service, const std::string& text)
     {
         std::vector<std::string> told;
@@ -142,9 +142,8 @@ TEST_F(PlayedServices, HaveEveryPropertyOfEveryInterfaceInItsType)
             for (const auto& face : object.faces) {
                 const auto* const info = port::played::interfaceOf(face.interface).info;
                 for (auto** each = info->properties; each != nullptr && *each != nullptr; ++each) {
-                    const auto found = face.values.find((*each)->name);
-                    ASSERT_TRUE(found != face.values.end() && found->second) << (*each)->name;
-                    EXPECT_STREQ(g_variant_get_type_string(found->second.get()), (*each)->signature)
+                    EXPECT_STREQ(g_variant_get_type_string(face.value((*each)->name)),
+                                 (*each)->signature)
                         << face.interface << " " << (*each)->name;
                     ++count;
                 }
@@ -271,6 +270,9 @@ TEST_F(PlayedServices, RefuseTheRest)
     EXPECT_EQ(set(MM, MODEM, modem, "State", "3"), dbus + "InvalidArgs");
     EXPECT_EQ(set(NM, NM_PATH, NM, "WirelessEnabled", "'x'"), dbus + "InvalidArgs");
     EXPECT_EQ(get(NM, NM_PATH, NM, "Nonsense"), dbus + "InvalidArgs");
+    EXPECT_THAT(call(NM, NM_PATH, NM, "GetPermissions"),
+                HasSubstr("'org.freedesktop.NetworkManager.network-control': 'yes'"));
+    EXPECT_EQ(call(MM, "/org/freedesktop/ModemManager1", MM, "SetLogging", "('DEBUG',)"), "()");
     EXPECT_EQ(call(MM, MODEM, modem, "Command", "('AT', uint32 1)"),
               "org.freedesktop.ModemManager1.Error.Core.Unsupported");
     EXPECT_EQ(call(NM, NM_PATH, NM, "GetDeviceByIpIface", "('eth9',)"),
@@ -291,7 +293,7 @@ TEST_F(PlayedServices, KeepTheLastGoodStateOfAFileThatBreaks)
     played_.become("schema = 1\nnonsense = 1\n");
     EXPECT_EQ(get(NM, NM_PATH, NM, "WirelessEnabled"), "(<true>,)");
     EXPECT_THAT(played_.problems(), ElementsAre(HasSubstr("unknown key \"nonsense\"")));
-    // What cannot be written is refused.
+    // A change that cannot be written is refused.
     EXPECT_EQ(set(NM, NM_PATH, NM, "WirelessEnabled", "false"), "()");
     played_.become(PHONE);
     EXPECT_EQ(get(NM, NM_PATH, NM, "WirelessEnabled"), "(<true>,)");

@@ -8,6 +8,7 @@
 
 #include "linux/ModemManager.h"
 #include "linux/NetworkManager.h"
+#include "support/Answer.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
@@ -47,12 +48,6 @@ int millisecondsOf(Work work)
     work();
     const auto time = std::chrono::steady_clock::now() - begin;
     return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
-}
-
-template <typename T>
-T valueOf(const Result<Sourced<T>>& answer)
-{
-    return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
 }
 
 template <typename T>
@@ -434,6 +429,108 @@ TEST_F(ScriptedModemsTest, FirstNumberThatCanBeDialledIsTheOwnOne)
     }
 }
 
+template <typename T>
+std::string wordOf(const Result<Sourced<T>>& answer)
+{
+    if (!answer)
+        return answer.error().reason;
+    if constexpr (std::is_same_v<T, std::string>)
+        return answer.value().value;
+    else
+        return std::to_string(static_cast<int>(answer.value().value));
+}
+
+TEST_F(ScriptedModemsTest, ReportTellsWhatTheModemKnows)
+{
+    const struct {
+        Entries modem;
+        Entries network;
+        std::vector<const char*> told; // name, MCC, MNC, technology, signal, power, PIN tries
+    } rows[] = {
+        {{{"AccessTechnologies", "<uint32 16384>"}, {"SignalQuality", "<(uint32 62, true)>"}},
+         {{"OperatorName", "<'R\u00e9seau'>"}, {"OperatorCode", "<'20801'>"}},
+         {"R\u00e9seau", "208", "01", "14", "62", "2", "3"}},
+        {{{"AccessTechnologies", "<uint32 49152>"}, // LTE, and 5G on it
+          {"SignalQuality", "<(uint32 0, true)>"},
+          {"PowerState", "<uint32 2>"},
+          {"UnlockRetries", "<{uint32 2: uint32 0}>"}},
+         {{"OperatorName", "<''>"}, {"OperatorCode", "<'310260'>"}},
+         {"OperatorName is empty", "310", "260", "15", "0", "1", "0"}},
+        {{{"AccessTechnologies", "<uint32 131072>"},
+          {"SignalQuality", "<(uint32 0, false)>"},
+          {"PowerState", "<uint32 1>"},
+          {"UnlockRetries", "<{uint32 2: uint32 999}>"}},
+         {{"OperatorCode", "<'2080'>"}},
+         {"OperatorName is missing", "OperatorCode is no MCC and MNC",
+          "OperatorCode is no MCC and MNC", "17", "the signal is not known", "0",
+          "the tries left for the PIN are not known"}},
+        {{{"AccessTechnologies", "<uint32 4294967295>"},
+          {"SignalQuality", "<(uint32 101, true)>"},
+          {"PowerState", "<uint32 0>"},
+          {"UnlockRetries", "<@a{uu} {}>"}},
+         {{"OperatorCode", "<5>"}},
+         {"OperatorName is missing", "OperatorCode is no text", "OperatorCode is no text",
+          "the access technology is not known", "the signal is not known",
+          "the modem's power state is not known", "UnlockRetries lacks an entry"}},
+        {{{"AccessTechnologies", "<uint32 0>"},
+          {"SignalQuality", "<uint32 50>"},
+          {"Sim", "<objectpath '/'>"}},
+         {},
+         {"OperatorName is missing", "OperatorCode is missing", "OperatorCode is missing",
+          "the access technology is not known", "SignalQuality is no number with a truth value",
+          "2", "there is no SIM card"}},
+        {{{"State", "<7>"}, {"SignalQuality", "<(uint32 62, true)>"}},
+         {{"OperatorCode", "<'20801'>"}},
+         {"the modem is not registered with a network",
+          "the modem is not registered with a network",
+          "the modem is not registered with a network",
+          "the modem is not registered with a network",
+          "the modem is not registered with a network", "2", "3"}},
+    };
+    for (const auto& row : rows) {
+        FakeModem modem;
+        for (const auto& [name, value] : row.modem)
+            modem.modem[name] = value;
+        modem.network = row.network;
+        tell(modem);
+        const auto reports = telephony.reports();
+        ASSERT_TRUE(reports);
+        const port::ModemReport& report = reports.value().at(0);
+        EXPECT_THAT((std::vector<std::string>{
+                        wordOf(report.operatorName), wordOf(report.operatorMcc),
+                        wordOf(report.operatorMnc), wordOf(report.accessTechnology),
+                        wordOf(report.signal), wordOf(report.power), wordOf(report.pinTries)}),
+                    testing::ElementsAreArray(row.told));
+        if (report.operatorMcc) {
+            EXPECT_EQ("org.freedesktop.ModemManager1 " + HOME, report.operatorMcc.value().source);
+        }
+    }
+}
+
+TEST_F(ScriptedModemsTest, IccidIsToldAlsoOfALockedCard)
+{
+    FakeModem locked;
+    locked.modem["State"] = "<2>";
+    locked.modem["UnlockRequired"] = "<uint32 2>";
+    tell(locked);
+    const std::pair<const char*, const char*> rows[] = {
+        {"<'8999900000000000010'>", "8999900000000000010"},
+        {"<'89999000000000001'>", "SimIdentifier is no ICCID"},
+        {"<'89999000000000000100A'>", "SimIdentifier is no ICCID"},
+        {"<''>", "SimIdentifier is empty"},
+        {"", "SimIdentifier is missing"},
+    };
+    telephony.slots();
+    for (const auto& [identifier, answer] : rows) {
+        service->answer("(" + propertiesText({{"SimIdentifier", identifier}}) + ",)");
+        const int before = service->timesAsked();
+        EXPECT_EQ(answer, wordOf(telephony.iccid(HOME)));
+        EXPECT_EQ(1, service->timesAsked() - before);
+    }
+    tellChanged("Sim", "<objectpath '/'>");
+    EXPECT_EQ("there is no SIM card", wordOf(telephony.iccid(HOME)));
+}
+
 TEST_F(ScriptedModemsTest, ImsiIsDividedByTheOperatorsIdentifier)
 {
     const std::string noFit = "error: Imsi does not fit OperatorIdentifier";
@@ -644,6 +741,15 @@ TEST_F(ScriptedModemsTest, EveryQuestionIsOneRoundTrip)
         EXPECT_EQ(std::nullopt, question.ask(telephony, HOME)) << question.name;
         EXPECT_EQ(1, service->timesAsked() - before) << question.name;
     }
+}
+
+TEST_F(ScriptedModemsTest, AnswerIsWhatTheModemSaysWhenItIsAsked)
+{
+    telephony.slots(); // reads everything; no signal tells of what changes then
+    service->answerTo("Get", "(<['+15559876543']>,)");
+    EXPECT_EQ("+15559876543", valueOf(telephony.number(HOME)));
+    service->answerTo("Get", "(<'004999010640000'>,)");
+    EXPECT_EQ("004999010640000", valueOf(telephony.imei(HOME)));
 }
 
 class SubscriptionsTest : public ScriptedModemsTest {

@@ -64,6 +64,11 @@ protected:
 TEST_F(SimCommandTest, TwoModemsAreShownEachForItself)
 {
     addTwo();
+    const std::string network = "slot  operator  its MCC  its MNC  technology  signal %\n"
+                                "0     45005     450      05       lte         64\n"
+                                "1     45005     450      05       lte         64\n";
+    EXPECT_TRUE(modems->waitUntil(
+        [&] { return outputOfCommand("sim").find(network) != std::string::npos; }));
     EXPECT_EQ("backend: linux (this machine's services)\n"
               "\n"
               "slot  modem       SIM    MCC  MNC  MSIN        number         country              "
@@ -72,17 +77,23 @@ TEST_F(SimCommandTest, TwoModemsAreShownEachForItself)
               "     home     ready\n"
               "1     /virtual/b  ready  310  260  *******89   -              United States of "
               "America  roaming  ready\n"
-              "\n"
-              "Not available\n"
-              "  slot 1  number  the SIM card holds no number\n"
-              "\n"
-              "Default slots\n"
-              "  network  unknown\n"
-              "  data     unknown\n"
-              "  calls    unknown\n"
-              "\n"
-              "What identifies the subscriber is masked; --reveal shows it.\n"
-              "[0]\n",
+              "\n" +
+                  network +
+                  "\n"
+                  "slot  power  PIN tries  ICCID\n"
+                  "0     on     3          *****************12\n"
+                  "1     on     3          *****************12\n"
+                  "\n"
+                  "Not available\n"
+                  "  slot 1  number  the SIM card holds no number\n"
+                  "\n"
+                  "Default slots\n"
+                  "  network  unknown\n"
+                  "  data     unknown\n"
+                  "  calls    unknown\n"
+                  "\n"
+                  "What identifies the subscriber is masked; --reveal shows it.\n"
+                  "[0]\n",
               outputOfCommand("sim"));
     EXPECT_THAT(outputOfCommand("sim --reveal"),
                 HasSubstr("  450  05   0123456789  +821055500100  "));

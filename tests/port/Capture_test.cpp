@@ -43,6 +43,14 @@ number = "+12025550143"
 imei = "356938035643809"
 service = "in_service"
 roaming = true
+operator = "R\u00e9seau"
+operator_mcc = "208"
+operator_mnc = "01"
+access_technology = "lte"
+signal = 0
+power = "low"
+iccid = "8999900000000000010"
+pin_retries = 2
 sms = true
 cp_name = "modem"
 [[slot]]
@@ -50,6 +58,7 @@ init_status = "sim_spck_required"
 imei = "490154203237518"
 service = "emergency_only"
 roaming = false
+pin_retries = 3
 sms = false
 [[slot]]
 denied = true
@@ -59,6 +68,7 @@ mcc = "262"
 mnc = "01"
 msin = "0123456789"
 number = "null"
+pin_retries = 0
 [subscriptions]
 network = 0
 data = 1
@@ -67,6 +77,7 @@ voice = "ask_always"
 cellular = "call_only_available"
 wifi = "connected"
 wifi_connection = "configuration"
+ssid = "Caf\u00e9"
 bluetooth = "not_supported"
 ethernet = "connected"
 connectivity = "portal"
@@ -217,7 +228,8 @@ TEST_F(CaptureTest, BadTextsStayReadable)
     fake.fakeTelephony.slotsAnswer =
         port::Sourced<FakeTelephony::Names>{{"a\xff\x01\n\"b"}, std::string(2000, 'x')};
     fake.fakeTelephony.imeiAnswer = port::notAvailable("\x1b[31m" + std::string(2000, '\xfe'));
-    captured(fake);
+    fake.fontSizeAnswer = answered(static_cast<port::FontSize>(77));
+    EXPECT_THAT(captured(fake), HasSubstr("font_size: a device file cannot say what test tells"));
 }
 
 } // namespace

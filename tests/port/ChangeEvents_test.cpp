@@ -81,7 +81,7 @@ protected:
         network.change([on](Answers& answers) { answers.flightMode = answered(on); });
     }
 
-    // What was told since.
+    // The events since.
     std::vector<std::string> taken()
     {
         context.run();

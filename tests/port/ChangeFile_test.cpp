@@ -51,7 +51,7 @@ protected:
         return text.str();
     }
 
-    // What lies in the folder: a file left behind would be told.
+    // Lists the folder: a file left behind would show.
     std::vector<std::string> names() const
     {
         std::vector<std::string> found;

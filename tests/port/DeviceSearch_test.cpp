@@ -33,7 +33,7 @@ protected:
         tree.write("/here/" + name, "schema = 1\n");
     }
 
-    // What is answered there: the path, or the path and where else it was looked for.
+    // The answer there: the path, or the path and where else it was looked for.
     std::string found(const std::string& name, const std::string& config = "/config") const
     {
         return inChild([&] {

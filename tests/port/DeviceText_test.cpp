@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What becomes of a device file's text when single values change.
+// A device file's text when single values change.
 #include <gmock/gmock.h>
 
 #include "devicefile/DevicePath.h"

@@ -193,7 +193,7 @@ protected:
         return std::string(record, size > 0 ? static_cast<std::size_t>(size) : 0);
     }
 
-    // What a process with this /run writes to standard error.
+    // The standard error of a process with this /run.
     std::string standardErrorOf(int priority, const std::string& text, LogSink sink)
     {
         return inChild([&]() -> std::string {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the linux backend says of the services that it asks.
+// The linux backend's report on the services that it asks.
 #include <algorithm>
 #include <cstdlib>
 

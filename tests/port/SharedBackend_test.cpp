@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Which backend a process gets.
+// The backend that a process gets.
 #include <filesystem>
 
 #include <gmock/gmock.h>

@@ -135,6 +135,18 @@ TEST_F(SimulatorNetworkTest, ConnectivityFollowsTheLinksWhenNothingIsSaid)
                 network.connectivity());
 }
 
+TEST_F(SimulatorNetworkTest, SsidIsThatOfAWifiThatIsConnected)
+{
+    describe("[network]\nssid = 'Home'\nwifi = 'connected'\n");
+    expectAnswer("Home", line(3), network.ssid());
+    describe("[network]\nssid = 'Home'\nwifi = 'disconnected'\n");
+    expectError(Kind::NotAvailable, line(4) + ": Wi-Fi is not connected", network.ssid());
+    describe("[network]\nwifi = 'connected'\n");
+    expectError(Kind::NotAvailable, line(2) + ": [network] has no ssid", network.ssid());
+    describe("[network]\nssid = 'Home'\nwifi = 'not_supported'\n");
+    expectError(Kind::NotSupported, line(4) + ": this device has no wifi", network.ssid());
+}
+
 TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
 {
     describe("[network]\nwifi = 'on'\n");

@@ -98,6 +98,41 @@ TEST_F(SimulatorTelephonyTest, AbsentKeysOfASlotAreNotAvailable)
                 telephony.imsi("cp0"));
 }
 
+TEST_F(SimulatorTelephonyTest, ReportIsWhatTheFileSaysOfASlotInService)
+{
+    const std::string network = "operator = 'Net'\noperator_mcc = '208'\noperator_mnc = '01'\n"
+                                "access_technology = '5gnr'\nsignal = 7\n";
+    describe("[[slot]]\nservice = 'in_service'\nsim = 'pin'\niccid = '899990000000000001'\n"
+             "power = 'low'\npin_retries = 2\n" +
+             network + "[[slot]]\nservice = 'out_of_service'\nsim = 'blocked'\n" + network +
+             "[[slot]]\nsim = 'powered_off'\n[[slot]]\ndenied = true\n" +
+             "[network]\ncellular = 'connected'\n[subscriptions]\ndata = 0\n");
+    const auto reports = telephony.reports();
+    ASSERT_TRUE(reports);
+    ASSERT_EQ(4U, reports.value().size());
+    const auto& served = reports.value()[0];
+    EXPECT_EQ(port::ModemReport::Use::Data, served.use);
+    expectAnswer("899990000000000001", line(5), telephony.iccid("cp0"));
+    expectAnswer(port::PowerState::Low, line(6), served.power);
+    expectAnswer(2, line(7), served.pinTries);
+    expectAnswer("Net", line(8), served.operatorName);
+    expectAnswer("208", line(9), served.operatorMcc);
+    expectAnswer("01", line(10), served.operatorMnc);
+    expectAnswer(port::AccessTechnology::FiveGNr, line(11), served.accessTechnology);
+    expectAnswer(7, line(12), served.signal);
+    const auto& blocked = reports.value()[1];
+    const std::string reason = line(14) + ": the slot is not in service";
+    EXPECT_EQ(port::ModemReport::Use::None, blocked.use);
+    expectError(Error::Kind::NotAvailable, reason, blocked.operatorName);
+    expectError(Error::Kind::NotAvailable, reason, blocked.signal);
+    expectAnswer(0, line(15), blocked.pinTries);
+    expectError(Error::Kind::NotAvailable, line(13) + ": [[slot]] does not say", blocked.power);
+    const auto& off = reports.value()[2];
+    expectAnswer(port::PowerState::Off, line(22), off.power);
+    expectError(Error::Kind::NoSim, line(22) + ": the SIM card is switched off", off.pinTries);
+    expectError(Error::Kind::Denied, line(24) + ": this slot is private", reports.value()[3].power);
+}
+
 TEST_F(SimulatorTelephonyTest, ImsiIsWholeOrNotAvailable)
 {
     const std::string parts[] = {"mcc = '450'\n", "mnc = '05'\n", "msin = '1'\n"};

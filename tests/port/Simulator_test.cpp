@@ -41,7 +41,7 @@ protected:
         tree.write("/d.toml", text);
     }
 
-    // What is wrong with the device file, without its own path; every answer must name it.
+    // The mistake in the device file, without its own path; every answer must name it.
     std::string problem()
     {
         const Result<Fact> answer = backend->get<port::Question::ModelName>();

@@ -31,15 +31,15 @@ namespace {
 const char TREE[] = "GetManagedObjects";
 
 // A device that one backend shows.
-class Stage {
+class TelephonyStage {
 public:
-    virtual ~Stage() = default;
+    virtual ~TelephonyStage() = default;
     // The text of a device file.
     virtual void show(const std::string& device) = 0;
     virtual Telephony& telephony() = 0;
 };
 
-class SimulatorStage : public Stage {
+class SimulatorTelephonyStage : public TelephonyStage {
 public:
     void show(const std::string& device) override
     {
@@ -78,9 +78,9 @@ constexpr CardRow CARDS[] = {
     {"powered_off", MM_MODEM_STATE_DISABLED, 0, 0, MM_MODEM_POWER_STATE_OFF},
 };
 
-class LinuxStage : public Stage {
+class LinuxTelephonyStage : public TelephonyStage {
 public:
-    LinuxStage()
+    LinuxTelephonyStage()
     {
         bus_.start();
         modems_ =
@@ -179,7 +179,7 @@ private:
     port::linux_backend::LinuxTelephony telephony_{client_};
 };
 
-// What went wrong, or the value in words.
+// The error, or the value in words.
 template <typename T, typename Show>
 std::string told(const port::Result<port::Sourced<T>>& answer, Show show)
 {
@@ -256,15 +256,15 @@ protected:
     Backend stage;
 };
 
-using Backends = testing::Types<SimulatorStage, LinuxStage>;
-struct BackendName {
+using TelephonyBackends = testing::Types<SimulatorTelephonyStage, LinuxTelephonyStage>;
+struct TelephonyBackendName {
     template <typename Backend>
     static std::string GetName(int)
     {
-        return std::is_same_v<Backend, LinuxStage> ? "Linux" : "Simulator";
+        return std::is_same_v<Backend, LinuxTelephonyStage> ? "Linux" : "Simulator";
     }
 };
-TYPED_TEST_SUITE(TelephonyContractTest, Backends, BackendName);
+TYPED_TEST_SUITE(TelephonyContractTest, TelephonyBackends, TelephonyBackendName);
 
 TYPED_TEST(TelephonyContractTest, TwoCardsAreReadEachForItself)
 {

@@ -59,7 +59,7 @@ private:
     {
         switch (type.kind) {
         case Type::Kind::Text:
-            return {{"type", "string"}, {"minLength", type.least}, {"pattern", NO_NUL}};
+            return textOf(type);
         case Type::Kind::Digits:
             return {{"type", "string"},
                     {"pattern", "^[0-9]{" + std::to_string(type.least) + "," +
@@ -82,6 +82,15 @@ private:
             break;
         }
         return faultOf(errorsOf(key, type));
+    }
+
+    // A schema counts characters, which may be several bytes each.
+    static Json textOf(const Type& type)
+    {
+        Json text = {{"type", "string"}, {"minLength", type.least}, {"pattern", NO_NUL}};
+        if (type.most >= type.least)
+            text["maxLength"] = type.most;
+        return text;
     }
 
     static Json wholeNumber(const Type& type)

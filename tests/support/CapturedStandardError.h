@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What this process writes to standard error while the object lives.
+// Captures what this process writes to standard error while the object lives.
 #ifndef TESTS_SUPPORT_CAPTURED_STANDARD_ERROR_H
 #define TESTS_SUPPORT_CAPTURED_STANDARD_ERROR_H
 

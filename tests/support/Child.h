@@ -6,7 +6,7 @@
 #include <functional>
 #include <string>
 
-/// What the work returned; runs in a forked child.
+/// Runs the work in a forked child and returns its result.
 std::string inChild(const std::function<std::string()>& work);
 
 /// For a child only: a mount namespace of its own, in which no change reaches the machine. False

@@ -79,4 +79,14 @@ struct CoreSystemInternals {
     static constexpr StateRead GET_BT_STATE = &CoreSystem::GetBTNetworkState;
 };
 
+inline CoreSystem& coreSystem()
+{
+    return *CoreSystemInternals::instance<CoreSystem>();
+}
+
+inline SimManager& simManager()
+{
+    return *CoreSystemInternals::instance<SimManager>();
+}
+
 #endif

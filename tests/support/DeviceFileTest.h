@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the tests of the simulator share: a device file and the backend that reads it.
+// Shared by the tests of the simulator: a device file and the backend that reads it.
 #ifndef TESTS_SUPPORT_DEVICE_FILE_TEST_H
 #define TESTS_SUPPORT_DEVICE_FILE_TEST_H
 
@@ -25,7 +25,7 @@ protected:
         tree.write("/d.toml", "schema = 1\n" + facts);
     }
 
-    // What is wrong with such a file, without its path; empty when it is good.
+    // The mistakes in such a file, without its path; empty when it is good.
     std::string problemOf(const std::string& facts)
     {
         describe(facts);

@@ -17,7 +17,7 @@ public:
     using Names = std::vector<port::SlotName>;
     using Number = std::optional<std::string>;
 
-    // What every slot answers.
+    // The answers of every slot.
     Answer<Names> slotsAnswer = answered(Names{"modem0", "modem1"});
     Answer<port::Card> cardAnswer = answered(port::Card{port::CardStatus::Ready, false});
     Answer<port::Imsi> imsiAnswer = answered(port::Imsi{"001", "01", "0123456789"});

@@ -64,7 +64,7 @@ void unrefVariant(GVariant* variant)
         g_variant_unref(variant);
 }
 
-// What GLib finds wrong with its arguments fails the test.
+// Fails the test when GLib finds its arguments wrong.
 void onGLibMessage(const char* domain, GLogLevelFlags level, const char* message, void*)
 {
     ADD_FAILURE() << (domain != nullptr ? domain : "") << " level " << level << ": " << message;

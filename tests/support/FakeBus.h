@@ -40,7 +40,7 @@ public:
 
     bool producesErrors = true; // of an error reply
 
-    // What the library holds now, sorted, each as often as it holds it: "connection", "call",
+    // Lists what the library holds now, sorted, each as often as it is held: "connection", "call",
     // "reply", "error".
     std::vector<std::string> held() const;
 

@@ -85,7 +85,7 @@ LogLine readLine(log_id_t id, int priority, const char* tag, const char* format,
     return line;
 }
 
-// What holds for every line.
+// Checks that hold for every line.
 void checkLine(const LogLine& line)
 {
     EXPECT_EQ(line.id, LOG_ID_MAIN);

@@ -2,7 +2,7 @@
 // A recording fake of everything the library imports: the platform's C functions and the utility
 // library. It is linked with the library's objects in place of both.
 //
-// What happens is recorded as one ordered sequence of events; what the platform answers is set by
+// Records all calls as one ordered sequence of events; the platform's answers are set by
 // the test. A call whose answer was not set fails the test, and so does a log line that breaks the
 // rules that hold for every line.
 //
@@ -91,7 +91,7 @@ public:
     // Called after each event outside LOGGER and CIPHER, on the thread of the event.
     std::function<void(const Event&)> onEvent;
 
-    // What is registered now; null for nothing.
+    // The callback that is registered now; null for none.
     struct Callbacks {
         wifi_device_state_changed_cb wifiDevice = nullptr;
         void* wifiDeviceData = nullptr;
@@ -153,7 +153,7 @@ FakePlatform& platform();
 bool isInFormatBuffer(const std::string& text);
 void clearFormatBuffers();
 
-// What the fake cipher makes of a text, and back.
+// The fake cipher, and its inverse.
 std::string encipher(const std::string& plain);
 std::string decipher(const std::string& enciphered);
 

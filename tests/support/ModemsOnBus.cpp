@@ -177,9 +177,17 @@ AtModem& ModemsOnBus::plugIn(const std::string& id, const AtModem::State& state)
 AtModem& ModemsOnBus::add(const std::string& id, const AtModem::State& state)
 {
     AtModem& modem = plugIn(id, state);
-    if (!waitUntil([&] { return !settledModem("/virtual/" + id).empty(); }))
-        throw std::runtime_error("ModemManager does not take the modem " + id);
+    pathOf(id);
     return modem;
+}
+
+// Waits for it: on a busy machine a look may find no answer in time.
+std::string ModemsOnBus::pathOf(const std::string& id) const
+{
+    std::string path;
+    if (!waitUntil([&] { return !(path = settledModem("/virtual/" + id)).empty(); }))
+        throw std::runtime_error("ModemManager does not take the modem " + id);
+    return path;
 }
 
 void ModemsOnBus::unplug(const std::string& id)
@@ -189,15 +197,14 @@ void ModemsOnBus::unplug(const std::string& id)
 
 void ModemsOnBus::enable(const std::string& id) const
 {
-    g_variant_unref(call(MODEM_MANAGER.name, settledModem("/virtual/" + id),
-                         MM_DBUS_INTERFACE_MODEM, "Enable", g_variant_new("(b)", TRUE)));
+    g_variant_unref(call(MODEM_MANAGER.name, pathOf(id), MM_DBUS_INTERFACE_MODEM, "Enable",
+                         g_variant_new("(b)", TRUE)));
 }
 
 int ModemsOnBus::stateOf(const std::string& id) const
 {
-    GVariant* const reply =
-        call(MODEM_MANAGER.name, settledModem("/virtual/" + id), "org.freedesktop.DBus.Properties",
-             "Get", g_variant_new("(ss)", MM_DBUS_INTERFACE_MODEM, "State"));
+    GVariant* const reply = call(MODEM_MANAGER.name, pathOf(id), "org.freedesktop.DBus.Properties",
+                                 "Get", g_variant_new("(ss)", MM_DBUS_INTERFACE_MODEM, "State"));
     GVariant* value = nullptr;
     g_variant_get(reply, "(v)", &value);
     const int state = g_variant_get_int32(value);

@@ -54,6 +54,7 @@ public:
 private:
     [[noreturn]] void run() const;
     bool hasName() const;
+    std::string pathOf(const std::string& id) const;
     GVariant* call(const std::string& name, const std::string& path, const char* interface,
                    const char* method, GVariant* arguments) const;
     void setProfile(const std::string& id, const std::string& port) const;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the tests over the fake platform share.
+// Shared by the tests over the fake platform.
 #ifndef CORESYSTEM_TESTS_SUPPORT_PLATFORM_TEST_H
 #define CORESYSTEM_TESTS_SUPPORT_PLATFORM_TEST_H
 

@@ -41,8 +41,8 @@ const char CONFIGURATION[] =
 const char ALLOW_ALL[] = R"(<policy context="default">
     <allow user="*"/>
     <allow own="*"/>
-    <allow send_destination="*" eavesdrop="true"/>
-    <allow eavesdrop="true"/>
+    <allow send_destination="*" eavesdrop="true" send_requested_reply="false"/>
+    <allow eavesdrop="true" receive_requested_reply="false"/>
   </policy>)";
 
 // The beginning of a machine's own: whatever is not allowed is forbidden.

@@ -11,7 +11,7 @@
 
 #include "support/TemporaryTree.h"
 
-// Of a connection to a bus.
+// Releases a connection to a bus.
 constexpr auto BUS_CLIENT = static_cast<GDBusConnectionFlags>(
     G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
 

@@ -31,7 +31,7 @@ struct Identity {
     }
 };
 
-// What an out-parameter points to before the call, where null is an answer.
+// The content of an out-parameter before the call, where null is an answer.
 inline char UNTOUCHED[] = "untouched";
 
 template <typename Result, typename... Arguments>
@@ -48,7 +48,7 @@ auto callingModem(bool (CoreSystem::*method)(char*, Answer*))
     };
 }
 
-// What a list of handles is used for, and whether it was filled.
+// Uses a list of handles, and says whether it was filled.
 template <typename Use>
 auto withHandles(Use use)
 {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What ModemManager and NetworkManager say of modems, in GVariant text form, for ScriptedService.
+// ModemManager's and NetworkManager's objects of modems, as GVariant texts, for ScriptedService.
 #ifndef TESTS_SUPPORT_SCRIPTED_MODEMS_H
 #define TESTS_SUPPORT_SCRIPTED_MODEMS_H
 

@@ -7,7 +7,7 @@
 
 namespace {
 
-constexpr int PATIENCE_MS = 5000;
+constexpr int BUS_PATIENCE_MS = 5000;
 const char BUS_NAME[] = "org.freedesktop.DBus"; // of its interface too
 const char BUS_PATH[] = "/org/freedesktop/DBus";
 constexpr guint32 PRIMARY_OWNER = 1;
@@ -28,10 +28,10 @@ GDBusConnection* connectTo(const std::string& address)
 
 void ownName(GDBusConnection* connection, const std::string& name)
 {
-    GVariant* const reply =
-        g_dbus_connection_call_sync(connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
-                                    g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE),
-                                    nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
+    GVariant* const reply = g_dbus_connection_call_sync(
+        connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
+        g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE), nullptr,
+        G_DBUS_CALL_FLAGS_NONE, BUS_PATIENCE_MS, nullptr, nullptr);
     guint32 result = 0;
     if (reply != nullptr)
         g_variant_get(reply, "(u)", &result);
@@ -127,7 +127,7 @@ ScriptedService::ScriptedService(const std::string& address, const std::string& 
 ScriptedService::~ScriptedService()
 {
     {
-        // What a script refers to may end before the connection's thread does.
+        // The objects that a script refers to may end before the connection's thread does.
         const std::lock_guard<std::mutex> lock(state_->mutex);
         for (auto& [key, script] : state_->scripts)
             script = [](GDBusMessage*) -> GDBusMessage* { return nullptr; };
@@ -233,7 +233,7 @@ void ScriptedService::startAgain()
     GVariant* const released =
         g_dbus_connection_call_sync(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
                                     g_variant_new("(s)", name_.c_str()), nullptr,
-                                    G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
+                                    G_DBUS_CALL_FLAGS_NONE, BUS_PATIENCE_MS, nullptr, nullptr);
     if (released != nullptr)
         g_variant_unref(released);
     ownName(connection_, name_);
@@ -295,7 +295,7 @@ void ScriptedService::releaseName()
 {
     g_dbus_connection_call(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
                            g_variant_new("(s)", name_.c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE,
-                           PATIENCE_MS, nullptr, nullptr, nullptr);
+                           BUS_PATIENCE_MS, nullptr, nullptr, nullptr);
 }
 
 void ScriptedService::answerLate(std::chrono::milliseconds delay)

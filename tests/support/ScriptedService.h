@@ -17,7 +17,7 @@
 /// for; at first every GetAll, with no properties.
 class ScriptedService {
 public:
-    /// What to answer to a question; null: nothing. It runs on the service's own thread.
+    /// The answer to a question; null for none. It runs on the service's own thread.
     using Script = std::function<GDBusMessage*(GDBusMessage* question)>;
 
     /// Takes the name over from a scripted service that has it.

@@ -44,6 +44,7 @@ inline const std::vector<TelephonyQuestion>& telephonyQuestions()
     static const std::vector<TelephonyQuestion> all = {
         aboutDevice("slots", &Telephony::slots),
         aboutDevice("subscriptions", &Telephony::subscriptions),
+        aboutDevice("reports", &Telephony::reports),
         aboutSlot("card", &Telephony::card),
         aboutSlot("imsi", &Telephony::imsi),
         aboutSlot("number", &Telephony::number),

@@ -8,7 +8,7 @@
 #include <iterator>
 #include <string>
 
-// What this process has now.
+// The resources of this process now.
 struct Usage {
     long memory = statusLine("VmRSS:"); // kB
     long threads = statusLine("Threads:");

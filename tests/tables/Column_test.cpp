@@ -157,7 +157,7 @@ TEST(ColumnSearch, FirstAndLastOfSharedCells)
     EXPECT_EQ(longestChain(ALL), 3u);
 }
 
-// What makes the time of a search constant. Rows that make it longer ask for another multiplier.
+// Keeps the time of a search constant. Rows that make it longer ask for another multiplier.
 TEST(ColumnSearch, ComparesFewRows)
 {
     for (const Search& search : searches())

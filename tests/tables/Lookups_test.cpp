@@ -85,8 +85,6 @@ std::string lastOf(const std::vector<std::string>& cells)
     return cells.empty() ? NONE : cells.back();
 }
 
-} // namespace
-
 class LookupTest : public PlatformTest, public testing::WithParamInterface<Lookup> {
 protected:
     const Lookup& lookup = GetParam();
@@ -178,3 +176,5 @@ TEST_F(OtherLookupTest, LanguageIsConvertedAsPlainScanDoes)
             << key;
     }
 }
+
+} // namespace

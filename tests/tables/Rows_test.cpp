@@ -150,7 +150,7 @@ TEST(TableRows, CellsArePaddedWithNul)
     expectPadded(LanguageCodeTable::UPPER_CASE);
 }
 
-// What is true of the rows.
+// Properties that hold for all rows.
 
 TEST(TableFacts, RowCounts)
 {

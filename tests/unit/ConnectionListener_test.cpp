@@ -78,11 +78,12 @@ const Texts UNSET_CALLS = {"wifi_initialize()",
                            "runtime_info_unset_changed_cb(1)",
                            "runtime_info_unset_changed_cb(9)",
                            "runtime_info_unset_changed_cb(0)"};
-const std::string METHOD = "SetConnectionEventListener";
+const std::string LISTENER_METHOD = "SetConnectionEventListener";
 const Texts SET_TRACE =
-    SET_CALLS + Texts{CONNECTION_MANAGER.notice(METHOD, "Set Connection Change Callback")};
+    SET_CALLS + Texts{CONNECTION_MANAGER.notice(LISTENER_METHOD, "Set Connection Change Callback")};
 const Texts UNSET_TRACE =
-    UNSET_CALLS + Texts{CONNECTION_MANAGER.notice(METHOD, "Unset Connection Change Callback")};
+    UNSET_CALLS +
+    Texts{CONNECTION_MANAGER.notice(LISTENER_METHOD, "Unset Connection Change Callback")};
 
 void answerRegistration(int code = 0)
 {
@@ -106,7 +107,7 @@ void callWithNumbers(Callback* callback, Arguments... arguments)
     reinterpret_cast<void (*)(Arguments...)>(untyped)(arguments...);
 }
 
-// What the platform calls, as registered.
+// The callbacks that are registered with the platform.
 void wifiDeviceEvent(int state)
 {
     callWithNumbers(platform().callbacks.wifiDevice, state, platform().callbacks.wifiDeviceData);
@@ -245,10 +246,9 @@ LoggedCall facadeCall(const std::string& name, IConnectionStateListener* listene
     return {name,
             [listener] {
                 answerRegistration();
-                CoreSystemInternals::instance<CoreSystem>()->SetConnectionEventListener(listener,
-                                                                                        &firstData);
+                coreSystem().SetConnectionEventListener(listener, &firstData);
             },
-            Texts{CORE_SYSTEM.debug(METHOD, "CoreSystem SetConnectionEventListener")} +
+            Texts{CORE_SYSTEM.debug(LISTENER_METHOD, "CoreSystem SetConnectionEventListener")} +
                 CONNECTION_MANAGER.access() + trace};
 }
 
@@ -261,8 +261,6 @@ std::vector<LoggedCall> registrationCalls()
         facadeCall("FacadeListenerUnset", nullptr, UNSET_TRACE),
     };
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(ConnectionEvents, LoggedCallTest, testing::ValuesIn(eventCalls()),
                          rowName<LoggedCall>);
@@ -615,3 +613,5 @@ TEST_F(ConnectionListenerTest, QueriesLeaveTheListenerAlone)
     allEvents();
     EXPECT_EQ(recorder.calls, allTold("first"));
 }
+
+} // namespace

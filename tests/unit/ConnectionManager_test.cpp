@@ -32,7 +32,7 @@ struct Network {
     {
         return state >= 0 && static_cast<std::size_t>(state) < states.size();
     }
-    // What one read does, with a handle of its own.
+    // The calls of one read, with a handle of its own.
     Texts trace(int state, const std::string& handle = "connection") const
     {
         return Texts{"connection_create()", readCall(handle)} +
@@ -76,16 +76,11 @@ const Network NETWORKS[] = {CELLULAR, WIFI, BLUETOOTH};
 
 // Every state that the platform lists, and some that it does not.
 const int STATES[] = {0, 1, 2, 3, 4, 5, 6, 7, -1, INT32_MAX, INT32_MIN};
-const int FAILURES[] = {-22, -12, -13, -29294591, -1, 1, INT32_MIN};
+const int CONNECTION_FAILURES[] = {-22, -12, -13, -29294591, -1, 1, INT32_MIN};
 
 ConnectionManager& manager()
 {
     return *CoreSystemInternals::instance<ConnectionManager>();
-}
-
-CoreSystem& facade()
-{
-    return *CoreSystemInternals::instance<CoreSystem>();
 }
 
 Texts facadeTrace(const std::string& method)
@@ -110,7 +105,7 @@ std::vector<LoggedCall> stateCalls()
         calls.push_back({"Facade" + network.name,
                          [network] {
                              network.answer(1);
-                             EXPECT_EQ((facade().*network.ask)(), 1);
+                             EXPECT_EQ((coreSystem().*network.ask)(), 1);
                          },
                          facadeTrace(network.name) + network.trace(1)});
     }
@@ -161,19 +156,17 @@ std::vector<LoggedCall> connectedCalls()
         {"FacadeIsNetworkConnectedWifi",
          [] {
              answerAll(0, 2, 0);
-             EXPECT_TRUE(facade().IsNetworkConnected(true, false));
+             EXPECT_TRUE(coreSystem().IsNetworkConnected(true, false));
          },
          facadeTrace("IsNetworkConnected") + connectedTrace("[WIFI]", 0) + WIFI.trace(2)},
         {"FacadeIsNetworkConnectedBluetooth",
          [] {
              answerAll(0, 0, 2);
-             EXPECT_TRUE(facade().IsNetworkConnected(false, true));
+             EXPECT_TRUE(coreSystem().IsNetworkConnected(false, true));
          },
          facadeTrace("IsNetworkConnected") + connectedTrace("[BT]", 0) + BLUETOOTH.trace(2)},
     };
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(NetworkStates, LoggedCallTest, testing::ValuesIn(stateCalls()),
                          rowName<LoggedCall>);
@@ -202,7 +195,7 @@ TEST_P(NetworkTest, FailedCreationReadsWithNoHandle)
     platform().debugMode = 1;
     platform().answer(network.readCall("no connection"), -22);
     platform().answer("connection_destroy(no connection)", -22);
-    for (const int code : FAILURES) {
+    for (const int code : CONNECTION_FAILURES) {
         platform().forgetEvents();
         platform().answer("connection_create()", code);
         EXPECT_EQ(state(), 0);
@@ -214,7 +207,7 @@ TEST_P(NetworkTest, FailedReadIsZero)
 {
     platform().debugMode = 1;
     network.answer(0);
-    for (const int code : FAILURES) {
+    for (const int code : CONNECTION_FAILURES) {
         platform().forgetEvents();
         platform().answer(network.readCall(), code);
         EXPECT_EQ(state(), 0);
@@ -225,7 +218,7 @@ TEST_P(NetworkTest, FailedReadIsZero)
 TEST_P(NetworkTest, ResultCodesPlayNoPart)
 {
     platform().debugMode = 1;
-    for (const int code : FAILURES) {
+    for (const int code : CONNECTION_FAILURES) {
         platform().forgetEvents();
         network.answer(network.connected(), code);
         platform().answer("connection_destroy(connection)", code);
@@ -296,3 +289,5 @@ TEST_F(NetworkConnectedTest, ManyThreadsMayAskAtOnce)
     });
     EXPECT_THAT(platform().liveHandles(), IsEmpty());
 }
+
+} // namespace

@@ -60,7 +60,7 @@ inline const std::vector<Converter>& converters()
 
 #undef CONVERTER
 
-// What SimManager writes for a key that it finds, and for one that it does not.
+// The log lines of SimManager for a key that it finds, and for one that it does not.
 inline fake::Texts foundTrace(const Converter& row, const std::string& key,
                               const std::string& value)
 {

@@ -14,16 +14,11 @@ namespace {
 
 typedef void (CoreSystem::*Question)(const char* key, char** slot);
 
-CoreSystem& facade()
-{
-    return *CoreSystemInternals::instance<CoreSystem>();
-}
-
-// What the slot holds after a question that begins with `preset` in it.
+// The slot's content after a question that begins with `preset` in it.
 char* ask(Question question, const char* key, char* preset = nullptr)
 {
     char* slot = preset;
-    (facade().*question)(key, &slot);
+    (coreSystem().*question)(key, &slot);
     return slot;
 }
 
@@ -127,17 +122,17 @@ std::vector<LoggedCall> chainedCalls()
 
 bool isValidMcc(const char* mcc)
 {
-    return facade().IsValidMcc(mcc);
+    return coreSystem().IsValidMcc(mcc);
 }
 
 bool isValidMutableMcc(const char* mcc)
 {
-    return facade().IsValidMcc(const_cast<char*>(mcc));
+    return coreSystem().IsValidMcc(const_cast<char*>(mcc));
 }
 
 bool isMoSupportMcc(const char* mcc)
 {
-    return facade().IsMoSupportMcc(mcc);
+    return coreSystem().IsMoSupportMcc(mcc);
 }
 
 LoggedCall predicateCall(const std::string& name, bool (*ask)(const char*), const char* mcc,
@@ -176,8 +171,6 @@ std::vector<LoggedCall> moSupportCalls()
                       emptyKeyError(method, "mcc")),
     };
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(CountryConverters, LoggedCallTest, testing::ValuesIn(converterCalls()),
                          rowName<LoggedCall>);
@@ -229,7 +222,7 @@ TEST_P(CountryQuestionTest, SlotIsWrittenAfterTheSearch)
         if (event.text == foundTrace(row, row.key, row.value).back())
             seen = slot;
     };
-    (facade().*question)(row.key.c_str(), &slot);
+    (coreSystem().*question)(row.key.c_str(), &slot);
     EXPECT_EQ(seen, &preset);
     std::free(slot);
 }
@@ -361,3 +354,5 @@ TEST_F(CountryThreadTest, ManyThreadsMayAskAtOnce)
         thread.join();
     EXPECT_EQ(good, 8 * static_cast<int>(converters().size()));
 }
+
+} // namespace

@@ -41,7 +41,8 @@ const DeviceQuestion QUESTIONS[] = {
 };
 
 // Every code that the platform documents, and some that it does not.
-const int FAILURES[] = {-22, -12, -5, -13, -1073741822, -38141953, -1, 1, 4, INT32_MAX, INT32_MIN};
+const int DEVICE_FAILURES[] = {-22, -12, -5, -13,       -1073741822, -38141953,
+                               -1,  1,   4,  INT32_MAX, INT32_MIN};
 
 std::string resultLine(const DeviceQuestion& question, const std::string& value, int code)
 {
@@ -54,7 +55,7 @@ std::string resultLine(const DeviceQuestion& question, const std::string& value,
 char* ask(const DeviceQuestion& question, int expectedCode, char* preset = nullptr)
 {
     char* slot = preset;
-    EXPECT_EQ((CoreSystemInternals::instance<CoreSystem>()->*question.ask)(&slot), expectedCode);
+    EXPECT_EQ((coreSystem().*question.ask)(&slot), expectedCode);
     return slot;
 }
 
@@ -101,8 +102,6 @@ std::vector<LoggedCall> loggedCalls()
     return calls;
 }
 
-} // namespace
-
 INSTANTIATE_TEST_SUITE_P(Device, LoggedCallTest, testing::ValuesIn(loggedCalls()),
                          rowName<LoggedCall>);
 
@@ -143,7 +142,7 @@ TEST_P(DeviceQuestionTest, OddValuesPassThroughUnchanged)
 
 TEST_P(DeviceQuestionTest, EveryFailureCodeIsReturnedUnchanged)
 {
-    for (const int code : FAILURES) {
+    for (const int code : DEVICE_FAILURES) {
         platform().forgetEvents();
         platform().debugMode = 1;
         platform().answer(question.call, code);
@@ -207,3 +206,5 @@ TEST_F(TizenIdTest, TagAndModeMayChangeDuringTheCall)
     EXPECT_EQ(lines[0].tag, "CoreSystem");
     EXPECT_EQ(lines[1].tag, "Late");
 }
+
+} // namespace

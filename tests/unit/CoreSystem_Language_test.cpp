@@ -10,7 +10,7 @@ using testing::IsEmpty;
 namespace {
 
 const std::string READ = "system_settings_get_value_string(13)";
-const std::string METHOD = "GetDeviceLanguageCode";
+const std::string LANGUAGE_METHOD = "GetDeviceLanguageCode";
 const char* const UNTOUCHED = "untouched";
 
 // The language code, or UNTOUCHED; everything else must be freed again.
@@ -18,9 +18,7 @@ std::string languageCode(bool convertToISO639, int expectedResult)
 {
     char preset[] = "untouched";
     char* slot = preset;
-    EXPECT_EQ(
-        CoreSystemInternals::instance<CoreSystem>()->GetDeviceLanguageCode(&slot, convertToISO639),
-        expectedResult);
+    EXPECT_EQ(coreSystem().GetDeviceLanguageCode(&slot, convertToISO639), expectedResult);
     const std::string code(slot);
     if (slot != preset) {
         EXPECT_EQ(ledger().live(), Texts{"copy: " + code});
@@ -40,9 +38,9 @@ std::string languageCodeOf(const std::string& setting, bool convertToISO639)
 Texts readingTrace(int result, int position)
 {
     return {
-        CORE_SYSTEM.debug(METHOD, "CoreSystem::GetDeviceLanguageCode"),
+        CORE_SYSTEM.debug(LANGUAGE_METHOD, "CoreSystem::GetDeviceLanguageCode"),
         READ,
-        CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode ret : " + std::to_string(result)),
+        CORE_SYSTEM.debug(LANGUAGE_METHOD, "GetDeviceLanguageCode ret : " + std::to_string(result)),
         CORE_SYSTEM.debug("GetTagStartPosition", "CoreSystem::GetTagStartPosition"),
         CORE_SYSTEM.debug("GetTagStartPosition", "[TAG: _] tag pos " + std::to_string(position)),
         CORE_SYSTEM.debug("GetValueFromPosition", "CoreSystem::GetValueFromPosition")};
@@ -57,15 +55,15 @@ Texts capital(const std::string& text)
 Texts converted(const std::string& text, const std::string& code)
 {
     return capital(text) +
-           Texts{
-               CORE_SYSTEM.debug("GetISO639LangCodeFromDeviceLang",
-                                 "success to get ISO639Lang : " + code),
-               CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode[convertToISO639] : " + code + " ")};
+           Texts{CORE_SYSTEM.debug("GetISO639LangCodeFromDeviceLang",
+                                   "success to get ISO639Lang : " + code),
+                 CORE_SYSTEM.debug(LANGUAGE_METHOD,
+                                   "GetDeviceLanguageCode[convertToISO639] : " + code + " ")};
 }
 
 Texts notConverted(const std::string& text)
 {
-    return {CORE_SYSTEM.debug(METHOD, "GetDeviceLanguageCode[notconvert] : " + text)};
+    return {CORE_SYSTEM.debug(LANGUAGE_METHOD, "GetDeviceLanguageCode[notconvert] : " + text)};
 }
 
 // An empty setting stands for a read that gives nothing.
@@ -80,7 +78,7 @@ LoggedCall call(const std::string& name, int result, const std::string& setting,
             trace};
 }
 
-const LoggedCall CALLS[] = {
+const LoggedCall LANGUAGE_CALLS[] = {
     call("LanguageAsItIs", 0, "en_US.UTF-8", false, readingTrace(0, 2) + notConverted("EN")),
     call("LanguageConverted", 0, "ko_KR.UTF-8", true, readingTrace(0, 2) + converted("KO", "kor")),
     call("LanguageNotInTable", 0, "de_DE.UTF-8", true, readingTrace(0, 2) + capital("DE")),
@@ -94,9 +92,8 @@ const LoggedCall CALLS[] = {
     call("LanguageReadGaveNull", 0, "", false, readingTrace(0, 2) + notConverted("EN")),
 };
 
-} // namespace
-
-INSTANTIATE_TEST_SUITE_P(Language, LoggedCallTest, testing::ValuesIn(CALLS), rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(Language, LoggedCallTest, testing::ValuesIn(LANGUAGE_CALLS),
+                         rowName<LoggedCall>);
 
 class LanguageTest : public PlatformTest {};
 
@@ -304,3 +301,5 @@ TEST_F(LanguageTest, ConversionAnswersWithTheTablesOwnText)
     EXPECT_EQ(CoreSystemInternals::iso639("EN", nullptr), first);
     EXPECT_THAT(ledger().live(), IsEmpty());
 }
+
+} // namespace

@@ -11,11 +11,6 @@ using testing::IsEmpty;
 
 namespace {
 
-CoreSystem& coreSystem()
-{
-    return *CoreSystemInternals::instance<CoreSystem>();
-}
-
 // While it lives, the process is in this time zone.
 class TimeZone {
 public:
@@ -355,9 +350,7 @@ void askRoaming(Target& target, const RoamingCase& row)
 
 void addRoamingCalls(std::vector<LoggedCall>& calls, const RoamingCase& row, const Texts& trace)
 {
-    calls.push_back({"Sim" + row.name,
-                     [=] { askRoaming(*CoreSystemInternals::instance<SimManager>(), row); },
-                     trace});
+    calls.push_back({"Sim" + row.name, [=] { askRoaming(simManager(), row); }, trace});
     calls.push_back({row.name, [=] { askRoaming(coreSystem(), row); }, facadeTrace(row, trace)});
 }
 
@@ -397,8 +390,6 @@ std::vector<LoggedCall> roamingCalls()
                                      Texts{deinitCall(2)}));
     return calls;
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(Imei, LoggedCallTest, testing::ValuesIn(imeiCalls()), rowName<LoggedCall>);
 INSTANTIATE_TEST_SUITE_P(Roaming, LoggedCallTest, testing::ValuesIn(roamingCalls()),
@@ -558,3 +549,5 @@ TEST_F(RoamingTest, NothingIsCached)
         EXPECT_EQ(flag, roaming);
     }
 }
+
+} // namespace

@@ -12,8 +12,8 @@ namespace {
 const int NO_SUCH_PACKAGE = -18153359;
 
 // Codes that the platform documents, and some that it does not.
-const int FAILURES[] = {-22,       -12, -5, -13, NO_SUCH_PACKAGE, NO_SUCH_PACKAGE + 1,
-                        -18153358, -1,  1,  4,   INT32_MAX,       INT32_MIN};
+const int PACKAGE_FAILURES[] = {-22,       -12, -5, -13, NO_SUCH_PACKAGE, NO_SUCH_PACKAGE + 1,
+                                -18153358, -1,  1,  4,   INT32_MAX,       INT32_MIN};
 
 // Nothing is read into a name: what it says is the platform's affair.
 std::vector<std::string> oddNames()
@@ -71,12 +71,11 @@ void install(const Package& package, char* version)
     platform().answer(package.destroy, 0);
 }
 
-// What the slot holds after a question that begins with `preset` in it.
+// The slot's content after a question that begins with `preset` in it.
 char* versionOf(const char* name, int expectedCode, char* preset = nullptr)
 {
     char* slot = preset;
-    EXPECT_EQ(CoreSystemInternals::instance<CoreSystem>()->GetPackageVersion(name, &slot),
-              expectedCode);
+    EXPECT_EQ(coreSystem().GetPackageVersion(name, &slot), expectedCode);
     return slot;
 }
 
@@ -186,8 +185,6 @@ const std::vector<LoggedCall> INSTALLED_CALLS = {
     installedCall("IsPackageInstalledFailed", -22, otherErrorLine(-22)),
 };
 
-} // namespace
-
 INSTANTIATE_TEST_SUITE_P(PackageVersions, LoggedCallTest, testing::ValuesIn(VERSION_CALLS),
                          rowName<LoggedCall>);
 INSTANTIATE_TEST_SUITE_P(InstalledPackages, LoggedCallTest, testing::ValuesIn(INSTALLED_CALLS),
@@ -266,7 +263,7 @@ TEST_F(PackagesTest, FailedReleaseOfTheHandleIsIgnored)
 
 TEST_F(PackagesTest, EveryCodeOfUnknownPackageIsReturned)
 {
-    for (const int code : FAILURES) {
+    for (const int code : PACKAGE_FAILURES) {
         platform().forgetEvents();
         platform().answer(APP.create, code);
         expectUntouchedSlot("org.example.app", code);
@@ -279,7 +276,7 @@ TEST_F(PackagesTest, EveryCodeOfUnknownPackageIsReturned)
 TEST_F(PackagesTest, HandleIsKeptWhenTheVersionCannotBeRead)
 {
     Texts kept;
-    for (const int code : FAILURES) {
+    for (const int code : PACKAGE_FAILURES) {
         platform().forgetEvents();
         platform().answer(APP.create, 0);
         platform().answer(APP.getVersion, code);
@@ -315,7 +312,7 @@ TEST_F(PackagesTest, OddNamesReachThePlatformUnchanged)
 
 TEST_F(PackagesTest, OnlyResultZeroIsInstalled)
 {
-    for (const int code : FAILURES) {
+    for (const int code : PACKAGE_FAILURES) {
         platform().forgetEvents();
         platform().answer(APP.size, code);
         EXPECT_FALSE(isInstalled("org.example.app"));
@@ -355,3 +352,5 @@ TEST_F(PackagesTest, ErrorFormatsAreConstants)
     EXPECT_EQ(line.format, "%s: %s(%d) > No Such Package [%s]");
     EXPECT_EQ(line.text, "No Such Package [%s%n]");
 }
+
+} // namespace

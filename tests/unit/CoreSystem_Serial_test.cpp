@@ -8,13 +8,13 @@ using testing::StrEq;
 
 namespace {
 
-const std::string METHOD = "GetDeviceUniqueID";
+const std::string SERIAL_METHOD = "GetDeviceUniqueID";
 
-// What the slot holds after a question that begins with `preset` in it.
+// The slot's content after a question that begins with `preset` in it.
 const char* ask(int expectedCode, const char* preset = nullptr)
 {
     const char* slot = preset;
-    EXPECT_EQ(CoreSystemInternals::instance<CoreSystem>()->GetDeviceUniqueID(&slot), expectedCode);
+    EXPECT_EQ(coreSystem().GetDeviceUniqueID(&slot), expectedCode);
     return slot;
 }
 
@@ -31,7 +31,7 @@ struct FacadeCall {
     std::string result;
 };
 
-const FacadeCall CALLS[] = {
+const FacadeCall SERIAL_CALLS[] = {
     {"Answered", 0, [] { bus().answerText("R38N50A4ZB"); }, "R38N50A4ZB"},
     {"Refused", 1, [] { bus().refuseConnection({}); }, "(null)"},
     {"Unanswered", 2, [] { bus().answerNothing({}); }, "(null)"},
@@ -41,8 +41,6 @@ const FacadeCall CALLS[] = {
      },
      "(null)"},
 };
-
-} // namespace
 
 class SerialTest : public PlatformTest {
 protected:
@@ -59,10 +57,10 @@ protected:
 
 TEST_F(SerialTest, FacadeWritesItsLinesAroundTheManagers)
 {
-    const Texts entry = Texts{CORE_SYSTEM.debug(METHOD, "CoreSystem::GetDeviceUniqueID")} +
+    const Texts entry = Texts{CORE_SYSTEM.debug(SERIAL_METHOD, "CoreSystem::GetDeviceUniqueID")} +
                         D_BUS_MANAGER.access() +
-                        Texts{D_BUS_MANAGER.debug(METHOD, "DBusManager::GetDeviceUniqueID")};
-    for (const FacadeCall& call : CALLS) {
+                        Texts{D_BUS_MANAGER.debug(SERIAL_METHOD, "DBusManager::GetDeviceUniqueID")};
+    for (const FacadeCall& call : SERIAL_CALLS) {
         bus().reset();
         platform().forgetEvents();
         call.arrange();
@@ -70,7 +68,8 @@ TEST_F(SerialTest, FacadeWritesItsLinesAroundTheManagers)
         const Texts trace = platform().trace();
         ASSERT_GT(trace.size(), entry.size()) << call.name;
         EXPECT_EQ(Texts(trace.begin(), trace.begin() + static_cast<long>(entry.size())), entry);
-        EXPECT_EQ(trace.back(), CORE_SYSTEM.debug(METHOD, "DeviceUniqueID : " + call.result));
+        EXPECT_EQ(trace.back(),
+                  CORE_SYSTEM.debug(SERIAL_METHOD, "DeviceUniqueID : " + call.result));
     }
 }
 
@@ -95,10 +94,12 @@ TEST_F(SerialTest, SerialIsTheManagersCopy)
 
 TEST_F(SerialTest, EveryFailureGivesNull)
 {
-    for (const FacadeCall& call : CALLS)
+    for (const FacadeCall& call : SERIAL_CALLS)
         if (call.code != 0) {
             bus().reset();
             call.arrange();
             EXPECT_EQ(ask(call.code, "preset"), nullptr) << call.name;
         }
 }
+
+} // namespace

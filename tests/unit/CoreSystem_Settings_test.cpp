@@ -11,7 +11,7 @@ using testing::StrEq;
 namespace {
 
 // Codes that the platform documents, and some that it does not.
-const int FAILURES[] = {-22, -12, -5, -13, -38, -1073741822, -1, 1, INT32_MAX, INT32_MIN};
+const int SETTING_FAILURES[] = {-22, -12, -5, -13, -38, -1073741822, -1, 1, INT32_MAX, INT32_MIN};
 
 struct Switch {
     std::string name;
@@ -29,7 +29,7 @@ struct Switch {
     }
     bool answer() const
     {
-        return (CoreSystemInternals::instance<CoreSystem>()->*ask)();
+        return (coreSystem().*ask)();
     }
 };
 
@@ -71,7 +71,7 @@ const Texts SALES_CODE_TRACE = {CORE_SYSTEM.debug("GetCSC", "CoreSystem::GetCSC"
 
 char* salesCode()
 {
-    return CoreSystemInternals::instance<CoreSystem>()->GetCSC();
+    return coreSystem().GetCSC();
 }
 
 const std::vector<LoggedCall> SALES_CODE_CALLS = {
@@ -115,7 +115,7 @@ Texts fontSizeTrace(const FontSize& row)
     return trace;
 }
 
-// What a slot holds that held something else before.
+// The content of a slot that held something else before.
 int fontSize(int expectedCode)
 {
     int slot = 99;
@@ -175,7 +175,7 @@ void expectSame(const std::tm& time, const std::tm& expected)
     EXPECT_EQ(time.tm_zone, expected.tm_zone); // the pointer, not the text
 }
 
-// What a slot holds that held something else before.
+// The content of a slot that held something else before.
 std::tm currentTime(int expectedCode)
 {
     std::tm slot;
@@ -205,8 +205,6 @@ const std::vector<LoggedCall> TIME_CALLS = {
      timeTrace("day 0,  0:0:0")},
 };
 
-} // namespace
-
 INSTANTIATE_TEST_SUITE_P(Switches, LoggedCallTest, testing::ValuesIn(switchCalls()),
                          rowName<LoggedCall>);
 INSTANTIATE_TEST_SUITE_P(SalesCode, LoggedCallTest, testing::ValuesIn(SALES_CODE_CALLS),
@@ -225,7 +223,7 @@ INSTANTIATE_TEST_SUITE_P(Every, SwitchTest, testing::ValuesIn(SWITCHES), rowName
 
 TEST_P(SwitchTest, FailedReadIsOff)
 {
-    for (const int code : FAILURES) {
+    for (const int code : SETTING_FAILURES) {
         platform().answer(row.call, code);
         EXPECT_FALSE(row.answer()) << code;
     }
@@ -233,7 +231,7 @@ TEST_P(SwitchTest, FailedReadIsOff)
 
 TEST_P(SwitchTest, ResultCodePlaysNoPart)
 {
-    for (const int code : FAILURES)
+    for (const int code : SETTING_FAILURES)
         for (const bool value : {true, false}) {
             platform().answer(row.call, code, value);
             EXPECT_EQ(row.answer(), value) << code;
@@ -275,7 +273,7 @@ TEST_F(SettingsTest, OddSalesCodesPassThroughUnchanged)
 TEST_F(SettingsTest, FontSizeThatCannotBeReadIsZero)
 {
     platform().debugMode = 1;
-    for (const int code : FAILURES) {
+    for (const int code : SETTING_FAILURES) {
         platform().forgetEvents();
         platform().answer(FONT_SIZE_CALL, code);
         EXPECT_EQ(fontSize(code), 0);
@@ -285,7 +283,7 @@ TEST_F(SettingsTest, FontSizeThatCannotBeReadIsZero)
 
 TEST_F(SettingsTest, FontSizeIsStoredWhateverTheResult)
 {
-    for (const int code : FAILURES) {
+    for (const int code : SETTING_FAILURES) {
         platform().answer(FONT_SIZE_CALL, code, 3);
         EXPECT_EQ(fontSize(code), 3);
     }
@@ -293,7 +291,7 @@ TEST_F(SettingsTest, FontSizeIsStoredWhateverTheResult)
 
 TEST_F(SettingsTest, TimeIsCopiedWholeWhateverTheResult)
 {
-    for (const int code : FAILURES) {
+    for (const int code : SETTING_FAILURES) {
         platform().answer(TIME_CALL, code, brokenDown());
         expectSame(currentTime(code), brokenDown());
     }
@@ -301,7 +299,7 @@ TEST_F(SettingsTest, TimeIsCopiedWholeWhateverTheResult)
 
 TEST_F(SettingsTest, TimeThatCannotBeReadIsCleared)
 {
-    for (const int code : FAILURES) {
+    for (const int code : SETTING_FAILURES) {
         platform().answer(TIME_CALL, code);
         expectSame(currentTime(code), std::tm());
     }
@@ -321,3 +319,5 @@ TEST_F(SettingsTest, TimeOutOfRangePassesThrough)
     expectSame(currentTime(0), odd);
     EXPECT_EQ(platform().trace(), timeTrace("day -1,  2147483647:60:-2147483648"));
 }
+
+} // namespace

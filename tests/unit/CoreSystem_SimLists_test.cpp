@@ -32,7 +32,7 @@ struct Answers {
 
 void ask(const IdentityRead& read, Answers& answers)
 {
-    (CoreSystemInternals::instance<CoreSystem>()->*read.readAll)(answers.values, &answers.count);
+    (coreSystem().*read.readAll)(answers.values, &answers.count);
 }
 
 Texts valuesOf(const IdentityRead& read, const std::vector<Card>& cards)
@@ -43,7 +43,7 @@ Texts valuesOf(const IdentityRead& read, const std::vector<Card>& cards)
     return values;
 }
 
-Texts entryOf(const IdentityRead& read)
+Texts listEntryOf(const IdentityRead& read)
 {
     return {CORE_SYSTEM.debug(read.name, read.allEntry)};
 }
@@ -59,7 +59,7 @@ LoggedCall listCall(const IdentityRead& read, const std::string& name,
                     const std::vector<std::optional<Card>>& slots)
 {
     const auto count = static_cast<unsigned int>(slots.size());
-    Texts trace = entryOf(read) + accessed(listTaken(count));
+    Texts trace = listEntryOf(read) + accessed(listTaken(count));
     std::vector<Card> cards;
     for (int slot = 0; static_cast<unsigned int>(slot) < count; ++slot) {
         const std::optional<Card>& card = slots[static_cast<std::size_t>(slot)];
@@ -96,7 +96,7 @@ LoggedCall noListCall(const IdentityRead& read)
                 EXPECT_EQ(answers.count, UNTOUCHED);
                 EXPECT_THAT(answers.values, IsEmpty());
             },
-            entryOf(read) + accessed(noListTaken())};
+            listEntryOf(read) + accessed(noListTaken())};
 }
 
 LoggedCall unreadableCall(const IdentityRead& read)
@@ -111,7 +111,7 @@ LoggedCall unreadableCall(const IdentityRead& read)
                 EXPECT_EQ(answers.take(), valuesOf(read, {AMERICAN_CARD}));
                 ledger().freeAll();
             },
-            entryOf(read) + accessed(listTaken(2)) + accessed(slotFailed(read, 0, 2)) +
+            listEntryOf(read) + accessed(listTaken(2)) + accessed(slotFailed(read, 0, 2)) +
                 accessed(slotRead(read, 1, 2, read.valueOf(AMERICAN_CARD))) +
                 addedOf(read, read.valueOf(AMERICAN_CARD), 1) + accessed(listReleased(2))};
 }
@@ -130,8 +130,6 @@ std::vector<LoggedCall> listCalls()
             calls.push_back(call);
     return calls;
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(SimLists, LoggedCallTest, testing::ValuesIn(listCalls()),
                          rowName<LoggedCall>);
@@ -257,3 +255,5 @@ TEST_P(SimListTest, SecretsAreNeverFormatted)
         platform().reset();
     }
 }
+
+} // namespace

@@ -84,8 +84,6 @@ void askLegacy(CoreSystem& system)
     EXPECT_EQ(parts[0] + parts[1] + parts[2], AMERICAN_CARD.imsi());
 }
 
-} // namespace
-
 class SimThreadsTest : public PlatformTest {};
 
 TEST_F(SimThreadsTest, EveryQuestionMayBeAskedOnAnyThread)
@@ -141,3 +139,5 @@ TEST_F(SimThreadsTest, LockedQuestionIsNotInterrupted)
     }
     EXPECT_EQ(questions, 2 * THREADS * ROUNDS);
 }
+
+} // namespace

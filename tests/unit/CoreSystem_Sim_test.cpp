@@ -13,11 +13,6 @@ const int AVAILABLE = TELEPHONY_SIM_STATE_AVAILABLE;
 const int LOCKED = TELEPHONY_SIM_STATE_LOCKED;
 const int ABSENT = TELEPHONY_SIM_STATE_UNAVAILABLE;
 
-CoreSystem& coreSystem()
-{
-    return *CoreSystemInternals::instance<CoreSystem>();
-}
-
 bool isSimAvailable()
 {
     return coreSystem().IsSimAvailable();
@@ -241,8 +236,6 @@ std::vector<LoggedCall> firstReadCalls()
     return calls;
 }
 
-} // namespace
-
 INSTANTIATE_TEST_SUITE_P(Sim, LoggedCallTest, testing::ValuesIn(simCalls()), rowName<LoggedCall>);
 INSTANTIATE_TEST_SUITE_P(FirstRead, LoggedCallTest, testing::ValuesIn(firstReadCalls()),
                          rowName<LoggedCall>);
@@ -418,3 +411,5 @@ TEST_P(FirstReadTest, EveryQuestionKeepsWhatItKeeps)
     }
     EXPECT_EQ(ledger().freeAll(), expected);
 }
+
+} // namespace

@@ -12,7 +12,7 @@ using namespace fake;
 namespace {
 
 const std::string CALL = "storage_get_internal_memory_size()";
-const std::string METHOD = "IsSystemMemoryAvailable";
+const std::string STORAGE_METHOD = "IsSystemMemoryAvailable";
 const double NAN_VALUE = std::numeric_limits<double>::quiet_NaN();
 const double INFINITE = std::numeric_limits<double>::infinity();
 const double LARGEST = std::numeric_limits<double>::max();
@@ -35,7 +35,7 @@ const struct statvfs SMALL = volume(4096, 1280, 768);
 
 bool ask(double requiredMegabytes)
 {
-    return CoreSystemInternals::instance<CoreSystem>()->IsSystemMemoryAvailable(requiredMegabytes);
+    return coreSystem().IsSystemMemoryAvailable(requiredMegabytes);
 }
 
 bool isAvailable(const struct statvfs& fs, double requiredMegabytes)
@@ -44,13 +44,13 @@ bool isAvailable(const struct statvfs& fs, double requiredMegabytes)
     return ask(requiredMegabytes);
 }
 
-const std::string ENTRY = CORE_SYSTEM.debug(METHOD, "CoreSystem IsSystemMemoryAvailable");
+const std::string ENTRY = CORE_SYSTEM.debug(STORAGE_METHOD, "CoreSystem IsSystemMemoryAvailable");
 
 Texts trace(const std::string& bytes, const std::string& converted, const std::string& result)
 {
-    return {ENTRY, CALL, CORE_SYSTEM.debug(METHOD, bytes),
-            CORE_SYSTEM.debug(METHOD, "[convert] Avail Memory : " + converted + " "),
-            CORE_SYSTEM.debug(METHOD, result)};
+    return {ENTRY, CALL, CORE_SYSTEM.debug(STORAGE_METHOD, bytes),
+            CORE_SYSTEM.debug(STORAGE_METHOD, "[convert] Avail Memory : " + converted + " "),
+            CORE_SYSTEM.debug(STORAGE_METHOD, result)};
 }
 
 const std::string SMALL_BYTES =
@@ -64,7 +64,7 @@ LoggedCall smallCall(const std::string& name, double required, bool answer,
             trace(SMALL_BYTES, SMALL_CONVERTED, result)};
 }
 
-const std::vector<LoggedCall> CALLS = {
+const std::vector<LoggedCall> STORAGE_CALLS = {
     smallCall("StorageIsEnough", 2.5, true, "Avail Memory is upper 2.500000"),
     smallCall("StorageIsExactlyThat", 3, false, "Total mem under 3.000000"),
     smallCall("StorageIsTooSmall", 3.25, false, "Total mem under 3.250000"),
@@ -86,12 +86,11 @@ const std::vector<LoggedCall> CALLS = {
          platform().answer(CALL, -1);
          EXPECT_FALSE(ask(0));
      },
-     {ENTRY, CALL, CORE_SYSTEM.error(METHOD, "Fail to get internal memory size")}},
+     {ENTRY, CALL, CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size")}},
 };
 
-} // namespace
-
-INSTANTIATE_TEST_SUITE_P(Storage, LoggedCallTest, testing::ValuesIn(CALLS), rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(Storage, LoggedCallTest, testing::ValuesIn(STORAGE_CALLS),
+                         rowName<LoggedCall>);
 
 class StorageTest : public PlatformTest {};
 
@@ -185,8 +184,9 @@ TEST_F(StorageTest, EveryNegativeResultIsFailure)
         platform().forgetEvents();
         platform().answer(CALL, code, SMALL);
         EXPECT_FALSE(ask(-INFINITE));
-        EXPECT_EQ(platform().trace(),
-                  (Texts{CALL, CORE_SYSTEM.error(METHOD, "Fail to get internal memory size")}));
+        EXPECT_EQ(
+            platform().trace(),
+            (Texts{CALL, CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size")}));
     }
 }
 
@@ -206,3 +206,5 @@ TEST_F(StorageTest, NothingIsCached)
     EXPECT_FALSE(isAvailable(volume(1 << 20, 10, 1), 1));
     EXPECT_TRUE(isAvailable(volume(1 << 20, 10, 5), 1));
 }
+
+} // namespace

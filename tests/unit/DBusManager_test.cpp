@@ -63,7 +63,7 @@ Texts answeredTrace(const std::string& serial)
                            debugLine(QUESTION, "deviceUniqueID : " + serial)};
 }
 
-// What the slot holds after a question that begins with `preset` in it.
+// The slot's content after a question that begins with `preset` in it.
 char* ask(int expectedCode, char* preset = nullptr)
 {
     char* slot = preset;
@@ -95,7 +95,7 @@ LoggedCall failedCall(const std::string& name, int code, const std::function<voi
             trace};
 }
 
-const std::vector<LoggedCall> CALLS = {
+const std::vector<LoggedCall> READ_CALLS = {
     {"SerialAnswered",
      [] {
          bus().reset();
@@ -142,9 +142,8 @@ const std::vector<LoggedCall> CALLS = {
         "SerialReplyWithNumber", 2, [] { bus().answer(g_variant_new("(i)", 7)); }, REPLIED),
 };
 
-} // namespace
-
-INSTANTIATE_TEST_SUITE_P(Serial, LoggedCallTest, testing::ValuesIn(CALLS), rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(Serial, LoggedCallTest, testing::ValuesIn(READ_CALLS),
+                         rowName<LoggedCall>);
 
 class DBusManagerTest : public PlatformTest {
 protected:
@@ -424,3 +423,5 @@ TEST_F(DBusManagerTest, EveryLineCarriesItsOwnTagUnlessTheApplicationHasOne)
     expectFailure(3);
     EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, "MyApplication")));
 }
+
+} // namespace

@@ -182,7 +182,7 @@ inline fake::Texts slotFailed(const IdentityRead& read, int slot, unsigned int c
     return readBegun(read, slot, count) + readEnded(read, slot) + failureLogged(read);
 }
 
-// What the library keeps of reads of these cards by the facade: the intermediate copies of MCC and
+// The copies that the library keeps once the facade has read these cards: those of MCC and
 // MNC, and the platform's own numbers.
 inline fake::Texts kept(const IdentityRead& read, const std::vector<Card>& cards)
 {

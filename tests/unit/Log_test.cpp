@@ -29,8 +29,6 @@ std::string loggedBody(const std::string& message)
     return platform().lines().at(0).plain;
 }
 
-} // namespace
-
 TEST_F(LogTest, ErrorLineIsPlainTextInOneFormat)
 {
     const int line = __LINE__ + 1;
@@ -181,3 +179,5 @@ TEST_F(LogTest, FailedAllocationLosesTheLineOnly)
     }
     EXPECT_EQ(platform().trace(), Texts());
 }
+
+} // namespace

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What holds for every call of the library, over the rows that the other files supply.
+// Checks every call of the library, over the rows that the other files supply.
 #include "support/PlatformTest.h"
 
 using namespace fake;
@@ -43,8 +43,6 @@ Texts quietLoggerCalls(const Texts& trace)
     return calls;
 }
 
-} // namespace
-
 TEST_P(LoggedCallTest, DebugModeShowsEveryStepInOrder)
 {
     platform().debugMode = 1;
@@ -85,3 +83,5 @@ TEST_P(LoggedCallTest, FailingLogChangesNothing)
 
 // Each file has its rows under a name of its own; a build may leave some of them out.
 GTEST_ALLOW_UNINSTANTIATED_PARAMETERIZED_TEST(LoggedCallTest);
+
+} // namespace

@@ -11,7 +11,7 @@ namespace {
 
 int askSlot(const IdentityRead& read, unsigned int count, int slot, char** value)
 {
-    SimManager& sim = *CoreSystemInternals::instance<SimManager>();
+    SimManager& sim = simManager();
     return (sim.*read.read)(openList(count), slot, value);
 }
 
@@ -113,8 +113,6 @@ std::vector<LoggedCall> identityCalls()
     }
     return calls;
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(SimIdentity, LoggedCallTest, testing::ValuesIn(identityCalls()),
                          rowName<LoggedCall>);
@@ -302,3 +300,5 @@ TEST_F(NumberReadTest, FailureIsThePlatformsCode)
     EXPECT_EQ(static_cast<unsigned int>(SIM_NOT_AVAILABLE), 0xFDA01001u);
     EXPECT_EQ(read.failure, SIM_NOT_AVAILABLE);
 }
+
+} // namespace

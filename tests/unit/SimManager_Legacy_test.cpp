@@ -23,9 +23,8 @@ template <class Ask>
 void addCalls(std::vector<LoggedCall>& calls, const std::string& name, Ask ask, const Texts& trace)
 {
     const Texts locked = lockedThroughout(trace);
-    calls.push_back({name, [=] { ask(*CoreSystemInternals::instance<SimManager>()); }, locked});
-    calls.push_back({"CoreSystem" + name,
-                     [=] { ask(*CoreSystemInternals::instance<CoreSystem>()); }, accessed(locked)});
+    calls.push_back({name, [=] { ask(simManager()); }, locked});
+    calls.push_back({"CoreSystem" + name, [=] { ask(coreSystem()); }, accessed(locked)});
 }
 
 void addListCalls(std::vector<LoggedCall>& calls)
@@ -362,8 +361,6 @@ std::vector<LoggedCall> legacyCalls()
 // Every status of the platform.
 const int STATUSES[] = {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 255};
 
-} // namespace
-
 INSTANTIATE_TEST_SUITE_P(Legacy, LoggedCallTest, testing::ValuesIn(legacyCalls()),
                          rowName<LoggedCall>);
 
@@ -435,3 +432,5 @@ TEST_F(LegacyTest, IdentityIsNeverFormatted)
         platform().reset();
     }
 }
+
+} // namespace

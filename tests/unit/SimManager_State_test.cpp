@@ -8,11 +8,6 @@ using testing::IsEmpty;
 
 namespace {
 
-SimManager& sim()
-{
-    return *CoreSystemInternals::instance<SimManager>();
-}
-
 const int AVAILABLE = TELEPHONY_SIM_STATE_AVAILABLE;
 
 struct StateName {
@@ -36,7 +31,7 @@ const StateName STATES[] = {
 void expectTaken(unsigned int count)
 {
     telephony_handle_list_s list = {7, nullptr};
-    EXPECT_TRUE(sim().SuccessToInitTelephonyHandle(&list));
+    EXPECT_TRUE(simManager().SuccessToInitTelephonyHandle(&list));
     EXPECT_EQ(list.count, count);
     EXPECT_NE(list.handle, nullptr);
     EXPECT_EQ(callText("", list.handle[count - 1]), slotCall("", static_cast<int>(count) - 1));
@@ -47,7 +42,7 @@ void expectNotTaken(const Texts& live)
 {
     telephony_h preset = nullptr;
     telephony_handle_list_s list = {7, &preset};
-    EXPECT_FALSE(sim().SuccessToInitTelephonyHandle(&list));
+    EXPECT_FALSE(simManager().SuccessToInitTelephonyHandle(&list));
     EXPECT_EQ(list.count, 7u);
     EXPECT_EQ(list.handle, &preset);
     EXPECT_EQ(platform().liveHandles(), live);
@@ -91,7 +86,7 @@ std::vector<LoggedCall> listCalls()
          [] {
              setSlotCount(2);
              const telephony_handle_list_s list = openList(2);
-             sim().DeleteTelephonyHandle(list);
+             simManager().DeleteTelephonyHandle(list);
              EXPECT_EQ(list.count, 2u);
              EXPECT_THAT(platform().liveHandles(), IsEmpty());
          },
@@ -99,13 +94,13 @@ std::vector<LoggedCall> listCalls()
         {"ListReleaseRefused",
          [] {
              platform().answer("telephony_deinit(list of 2)", -22);
-             sim().DeleteTelephonyHandle(openList(2));
+             simManager().DeleteTelephonyHandle(openList(2));
          },
          listReleased(2)},
         {"NoListReleased",
          [] {
              setNoTelephony();
-             sim().DeleteTelephonyHandle({0, nullptr});
+             simManager().DeleteTelephonyHandle({0, nullptr});
          },
          {SIM_MANAGER.debug("DeleteTelephonyHandle", "DeleteTelephonyHandle"),
           "telephony_deinit(no list)"}},
@@ -118,7 +113,7 @@ LoggedCall availabilityCall(const std::string& name, int slot, int state, int co
     return {name,
             [=] {
                 setState(slot, state, code);
-                EXPECT_EQ(sim().IsSimAvailable(openList(3), slot), available);
+                EXPECT_EQ(simManager().IsSimAvailable(openList(3), slot), available);
                 EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 3"));
             },
             availabilityAsked(slot, 3, available)};
@@ -149,7 +144,7 @@ LoggedCall stateCallOf(const std::string& name, int state, int code)
                 telephony_handle_list_s list = openList(1);
                 int read = 99;
                 telephony_sim_state_e slot = TELEPHONY_SIM_STATE_UNKNOWN;
-                EXPECT_EQ(sim().GetSimState(list.handle, &slot), code != 0);
+                EXPECT_EQ(simManager().GetSimState(list.handle, &slot), code != 0);
                 std::memcpy(&read, &slot, sizeof read);
                 EXPECT_EQ(read, state);
             },
@@ -204,7 +199,7 @@ LoggedCall existenceCall(const std::string& name, const std::vector<SlotAnswer>&
                 setSlotCount(count);
                 for (std::size_t slot = 0; slot < slots.size(); ++slot)
                     setState(static_cast<int>(slot), slots[slot].state, slots[slot].code);
-                EXPECT_EQ(sim().IsSimExist(), exists);
+                EXPECT_EQ(simManager().IsSimExist(), exists);
                 EXPECT_THAT(platform().liveHandles(), IsEmpty());
             },
             lockedThroughout(trace)};
@@ -231,14 +226,14 @@ std::vector<LoggedCall> existenceCalls()
     calls.push_back({"ExistsWithoutTelephony",
                      [] {
                          setNoTelephony();
-                         EXPECT_FALSE(sim().IsSimExist());
+                         EXPECT_FALSE(simManager().IsSimExist());
                      },
                      lockedThroughout({"telephony_init()", "telephony_deinit(no list)"})});
     calls.push_back({"ExistsWithListOfFailedCall",
                      [] {
                          setSlotCount(2);
                          platform().answer("telephony_init()", 1, 2u);
-                         EXPECT_FALSE(sim().IsSimExist());
+                         EXPECT_FALSE(simManager().IsSimExist());
                          EXPECT_THAT(platform().liveHandles(), IsEmpty());
                      },
                      lockedThroughout({"telephony_init()", deinitCall(2)})});
@@ -247,15 +242,13 @@ std::vector<LoggedCall> existenceCalls()
                          setSlotCount(1);
                          setState(0, AVAILABLE);
                          platform().answer(deinitCall(1), -22);
-                         EXPECT_TRUE(sim().IsSimExist());
+                         EXPECT_TRUE(simManager().IsSimExist());
                      },
                      lockedThroughout(Texts{"telephony_init()"} +
                                       existenceSlotAsked(0, 0, "TELEPHONY_SIM_STATE_AVAILABLE") +
                                       Texts{deinitCall(1)})});
     return calls;
 }
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(SimList, LoggedCallTest, testing::ValuesIn(listCalls()),
                          rowName<LoggedCall>);
@@ -341,3 +334,5 @@ TEST_F(SimStateTest, NothingIsCached)
         EXPECT_EQ(sim.IsSimAvailable(openList(1), 0), state == AVAILABLE);
     }
 }
+
+} // namespace

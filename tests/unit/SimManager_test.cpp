@@ -8,23 +8,18 @@ using testing::StrEq;
 
 namespace {
 
-SimManager& sim()
-{
-    return *CoreSystemInternals::instance<SimManager>();
-}
-
-// What the slot holds after a search that begins with `preset` in it.
+// The slot's content after a search that begins with `preset` in it.
 char* search(const Converter& row, const std::string& key, char* preset = nullptr)
 {
     char* slot = preset;
-    (sim().*row.search)(key.c_str(), &slot);
+    (simManager().*row.search)(key.c_str(), &slot);
     return slot;
 }
 
 LoggedCall predicateCall(const std::string& name, bool (SimManager::*ask)(const char*),
                          const std::string& key, bool answer, const Texts& trace)
 {
-    return {name, [=] { EXPECT_EQ((sim().*ask)(key.c_str()), answer); }, trace};
+    return {name, [=] { EXPECT_EQ((simManager().*ask)(key.c_str()), answer); }, trace};
 }
 
 std::vector<LoggedCall> converterCalls()
@@ -55,8 +50,6 @@ const LoggedCall PREDICATE_CALLS[] = {
                   {SIM_MANAGER.debug("IsMoSupportMcc", "IsMoSupportMcc [mcc : 505]"),
                    SIM_MANAGER.debug("IsMoSupportMcc", "IsMOSupportMcc? : true")}),
 };
-
-} // namespace
 
 INSTANTIATE_TEST_SUITE_P(SimConverters, LoggedCallTest, testing::ValuesIn(converterCalls()),
                          rowName<LoggedCall>);
@@ -111,7 +104,7 @@ protected:
     static std::string answer(void (SimManager::*question)(const char*, char**), const char* key)
     {
         char* slot = nullptr;
-        (::sim().*question)(key, &slot);
+        (::simManager().*question)(key, &slot);
         const std::string text = slot != nullptr ? slot : "null";
         std::free(slot);
         return text;
@@ -191,3 +184,5 @@ TEST_F(SimManagerTest, EveryMccSupportsMo)
     for (const std::string& key : strangeKeys("505"))
         EXPECT_TRUE(sim.IsMoSupportMcc(key.c_str()));
 }
+
+} // namespace

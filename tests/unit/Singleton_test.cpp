@@ -70,8 +70,6 @@ bool LoadTime::nothingHappened = false;
 
 testing::Environment* const loadTime = testing::AddGlobalTestEnvironment(new LoadTime);
 
-} // namespace
-
 // As after loading: there is no instance, and nothing is recorded.
 template <class Singleton>
 class SingletonTest : public testing::Test {
@@ -213,3 +211,5 @@ TYPED_TEST(SingletonTest, ManyThreadsGetOneInstanceConstructedOnce)
     EXPECT_EQ(times(this->source.lock()), THREADS);
     EXPECT_EQ(times("un" + this->source.lock()), THREADS);
 }
+
+} // namespace

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What AESCrypto loads when the first text is enciphered, so that a process that never switches
+// AESCrypto loads this module when it enciphers the first text: a process that never switches
 // debug mode on does not load a cryptography library at start.
 #ifndef COREUTIL_CIPHER_MODULE_H
 #define COREUTIL_CIPHER_MODULE_H

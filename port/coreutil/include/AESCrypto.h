@@ -39,8 +39,8 @@ public:
     /// Why there is no usable key or cipher; empty when there is.
     std::string GetProblem();
 
-    /// What is unsafe about the key file in use, such as that every user may read it; empty when
-    /// nothing is. It is also written to the log, once for each key file that is taken.
+    /// Why the key file in use is unsafe, such as that every user may read it; empty when
+    /// it is safe. It is also written to the log, once for each key file that is taken.
     std::string GetWarning();
 
     /// Whether a key was set or named, so that another process can read what this one enciphers.
