@@ -12,8 +12,9 @@ namespace {
 
 std::string factsOf(const std::string& environment)
 {
-    return outputOf("for fact in $(" COMMAND " get --list); do value=$(env " + environment +
-                    " " COMMAND " get $fact 2>/dev/null); echo \"$fact $value $?\"; done; env " +
+    return outputOf("env " + environment +
+                    " " COMMAND " info --reveal --json | "
+                    "sed '/\"backend\"/d; /\"device_file\"/d; /\"sources\"/,$d'; env " +
                     environment +
                     " " COMMAND " sim --reveal --json 2>/dev/null | sed -n '/\"slots\"/,$p' | "
                     "sed '/\"reasons\": {/,/}/d; /\"reason\"/d' || true");

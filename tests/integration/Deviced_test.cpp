@@ -29,7 +29,6 @@ namespace {
 const char NAME[] = "org.tizen.system.deviced";
 const char PATH[] = "/Org/Tizen/System/DeviceD/Board";
 const char INTERFACE[] = "org.tizen.system.deviced.Board";
-constexpr int PATIENCE_MS = 10000;
 
 // A connection that is closed with the object.
 class Client {

@@ -147,6 +147,7 @@ TEST_F(PlayedServices, HaveEveryPropertyOfEveryInterfaceInItsType)
                         << face.interface << " " << (*each)->name;
                     ++count;
                 }
+                EXPECT_EQ(face.all().size(), face.defaults.size()) << face.interface;
             }
     EXPECT_GT(count, 300U);
     for (const auto* const role : port::played::allServices())

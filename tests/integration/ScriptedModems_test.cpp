@@ -36,7 +36,6 @@ namespace {
 
 constexpr int SLACK_MS = 1000; // for slow machines and sanitizers
 
-const SlotName HOME = "/virtual/home";
 const char TREE[] = "GetManagedObjects";
 const char SIM_0[] = "/org/freedesktop/ModemManager1/SIM/0";
 const char SIM_1[] = "/org/freedesktop/ModemManager1/SIM/1";

@@ -29,8 +29,6 @@ using testing::StartsWith;
 
 namespace {
 
-const SlotName HOME_MODEM = "/virtual/home";
-
 class TelephonyTest : public testing::Test {
 protected:
     void SetUp() override
@@ -64,7 +62,7 @@ void expectNoSim(const Result<T>& answer, const std::string& reason)
 TEST_F(TelephonyTest, NoModemIsNoSlot)
 {
     EXPECT_THAT(valueOf(telephony.slots()), IsEmpty());
-    const auto imei = telephony.imei(HOME_MODEM);
+    const auto imei = telephony.imei(HOME);
     ASSERT_FALSE(imei);
     EXPECT_EQ(Error::Kind::NotAvailable, imei.error().kind);
     EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home", imei.error().reason);
@@ -76,23 +74,23 @@ TEST_F(TelephonyTest, ModemAtHomeTellsEverything)
     german.imsi = "262011234567890";
     german.number = "+4915112345678";
     modems->add("home", german);
-    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME_MODEM));
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
     EXPECT_EQ("org.freedesktop.ModemManager1", telephony.slots().value().source);
-    EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME_MODEM)).status);
-    const auto imsi = telephony.imsi(HOME_MODEM);
+    EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status);
+    const auto imsi = telephony.imsi(HOME);
     EXPECT_EQ("262", valueOf(imsi).mcc);
     EXPECT_EQ("01", valueOf(imsi).mnc);
     EXPECT_EQ("1234567890", valueOf(imsi).msin);
     EXPECT_EQ("org.freedesktop.ModemManager1 /virtual/home", imsi.value().source);
-    EXPECT_EQ("+4915112345678", valueOf(telephony.number(HOME_MODEM)));
-    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME_MODEM)));
+    EXPECT_EQ("+4915112345678", valueOf(telephony.number(HOME)));
+    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
 
-    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.smsReady(HOME_MODEM)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
     modems->enable("home");
-    EXPECT_TRUE(comesIntoService(HOME_MODEM));
-    EXPECT_FALSE(valueOf(telephony.roaming(HOME_MODEM)));
-    EXPECT_TRUE(modems->waitUntil([&] { return valueOf(telephony.smsReady(HOME_MODEM)); }));
+    EXPECT_TRUE(comesIntoService(HOME));
+    EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
+    EXPECT_TRUE(modems->waitUntil([&] { return valueOf(telephony.smsReady(HOME)); }));
     EXPECT_EQ(std::nullopt, valueOf(telephony.subscriptions()).data);
     EXPECT_EQ(std::nullopt, valueOf(telephony.subscriptions()).network);
     EXPECT_EQ(port::Subscriptions::Voice::Unknown, valueOf(telephony.subscriptions()).voice);
@@ -104,11 +102,11 @@ TEST_F(TelephonyTest, RoamingBeginsAndEnds)
     abroad.registration = 5;
     AtModem& modem = modems->add("home", abroad);
     modems->enable("home");
-    EXPECT_TRUE(comesIntoService(HOME_MODEM));
-    EXPECT_TRUE(valueOf(telephony.roaming(HOME_MODEM)));
+    EXPECT_TRUE(comesIntoService(HOME));
+    EXPECT_TRUE(valueOf(telephony.roaming(HOME)));
     modem.change([](AtModem::State& state) { state.registration = 1; });
-    EXPECT_TRUE(modems->waitUntil([&] { return !valueOf(telephony.roaming(HOME_MODEM)); }));
-    EXPECT_EQ(ServiceState::InService, valueOf(telephony.service(HOME_MODEM)));
+    EXPECT_TRUE(modems->waitUntil([&] { return !valueOf(telephony.roaming(HOME)); }));
+    EXPECT_EQ(ServiceState::InService, valueOf(telephony.service(HOME)));
 }
 
 TEST_F(TelephonyTest, SearchingModemIsOutOfServiceUntilItFindsItsNetwork)
@@ -117,11 +115,11 @@ TEST_F(TelephonyTest, SearchingModemIsOutOfServiceUntilItFindsItsNetwork)
     searching.registration = 2;
     AtModem& modem = modems->add("home", searching);
     modems->enable("home");
-    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.roaming(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.smsReady(HOME_MODEM)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
     modem.change([](AtModem::State& state) { state.registration = 1; });
-    EXPECT_TRUE(comesIntoService(HOME_MODEM));
+    EXPECT_TRUE(comesIntoService(HOME));
 }
 
 TEST_F(TelephonyTest, DeniedRegistrationIsOutOfService)
@@ -130,10 +128,10 @@ TEST_F(TelephonyTest, DeniedRegistrationIsOutOfService)
     refused.registration = 3;
     modems->add("home", refused);
     modems->enable("home");
-    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.roaming(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.smsReady(HOME_MODEM)));
-    EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME_MODEM)).status);
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
+    EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status);
 }
 
 TEST_F(TelephonyTest, MissingCardIsNoSim)
@@ -141,13 +139,13 @@ TEST_F(TelephonyTest, MissingCardIsNoSim)
     AtModem::State empty;
     empty.hasSim = false;
     modems->add("home", empty);
-    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME_MODEM)).status);
-    expectNoSim(telephony.imsi(HOME_MODEM), "there is no SIM card");
-    expectNoSim(telephony.number(HOME_MODEM), "there is no SIM card");
-    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME_MODEM)));
-    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.roaming(HOME_MODEM)));
-    EXPECT_FALSE(valueOf(telephony.smsReady(HOME_MODEM)));
+    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME)).status);
+    expectNoSim(telephony.imsi(HOME), "there is no SIM card");
+    expectNoSim(telephony.number(HOME), "there is no SIM card");
+    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
+    EXPECT_FALSE(valueOf(telephony.roaming(HOME)));
+    EXPECT_FALSE(valueOf(telephony.smsReady(HOME)));
 }
 
 TEST_F(TelephonyTest, CardThatWantsItsPinIsNoSim)
@@ -155,11 +153,11 @@ TEST_F(TelephonyTest, CardThatWantsItsPinIsNoSim)
     AtModem::State locked;
     locked.pin = "1234";
     modems->add("home", locked);
-    EXPECT_EQ(CardStatus::PinRequired, valueOf(telephony.card(HOME_MODEM)).status);
-    expectNoSim(telephony.imsi(HOME_MODEM), "the SIM card is locked: it wants a PIN");
-    expectNoSim(telephony.number(HOME_MODEM), "the SIM card is locked: it wants a PIN");
-    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME_MODEM)));
-    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME_MODEM)));
+    EXPECT_EQ(CardStatus::PinRequired, valueOf(telephony.card(HOME)).status);
+    expectNoSim(telephony.imsi(HOME), "the SIM card is locked: it wants a PIN");
+    expectNoSim(telephony.number(HOME), "the SIM card is locked: it wants a PIN");
+    EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
+    EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME)));
 }
 
 TEST_F(TelephonyTest, CardThatWantsItsPukIsToldFromABlockedOne)
@@ -168,8 +166,8 @@ TEST_F(TelephonyTest, CardThatWantsItsPukIsToldFromABlockedOne)
     locked.pin = "1234";
     locked.pinRetries = 0;
     modems->add("home", locked);
-    EXPECT_EQ(CardStatus::PukRequired, valueOf(telephony.card(HOME_MODEM)).status);
-    expectNoSim(telephony.imsi(HOME_MODEM), "the SIM card is locked: it wants a PUK");
+    EXPECT_EQ(CardStatus::PukRequired, valueOf(telephony.card(HOME)).status);
+    expectNoSim(telephony.imsi(HOME), "the SIM card is locked: it wants a PUK");
     locked.pukRetries = 0;
     modems->add("blocked", locked);
     EXPECT_EQ(CardStatus::Blocked, valueOf(telephony.card("/virtual/blocked")).status);
@@ -182,7 +180,7 @@ TEST_F(TelephonyTest, MncOfThreeDigitsIsKeptWhole)
     american.imsi = "310260987654321";
     american.mncLength = 3;
     modems->add("home", american);
-    const port::Imsi imsi = valueOf(telephony.imsi(HOME_MODEM));
+    const port::Imsi imsi = valueOf(telephony.imsi(HOME));
     EXPECT_EQ("310 260 987654321", imsi.mcc + " " + imsi.mnc + " " + imsi.msin);
 }
 
@@ -191,7 +189,7 @@ TEST_F(TelephonyTest, CardWithoutANumberIsNoError)
     AtModem::State numberless;
     numberless.number = "";
     modems->add("home", numberless);
-    EXPECT_EQ(std::nullopt, valueOf(telephony.number(HOME_MODEM)));
+    EXPECT_EQ(std::nullopt, valueOf(telephony.number(HOME)));
 }
 
 TEST_F(TelephonyTest, TwoModemsAreTwoSlotsInTheOrderOfTheirDevices)
@@ -232,7 +230,7 @@ private:
     {
         while (!done_)
             for (const auto& question : telephonyQuestions()) {
-                const auto error = question.ask(telephony_, HOME_MODEM);
+                const auto error = question.ask(telephony_, HOME);
                 EXPECT_TRUE(!error || !error->reason.empty()) << question.name;
                 begun_ = true;
             }
@@ -255,7 +253,7 @@ TEST_F(TelephonyTest, ModemMayBeRemovedWhileAsked)
     for (const auto& question : telephonyQuestions())
         if (question.aboutASlot) {
             EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
-                      question.ask(telephony, HOME_MODEM)->reason)
+                      question.ask(telephony, HOME)->reason)
                 << question.name;
         }
 }
@@ -269,7 +267,7 @@ TEST_F(TelephonyTest, DaemonMayBeKilledWhileAsked)
         EXPECT_TRUE(modems->waitUntil([&] { return !telephony.slots(); }));
     }
     for (const auto& question : telephonyQuestions()) {
-        const auto error = question.ask(telephony, HOME_MODEM);
+        const auto error = question.ask(telephony, HOME);
         ASSERT_TRUE(error) << question.name;
         EXPECT_EQ(Error::Kind::NotAvailable, error->kind) << question.name;
         EXPECT_EQ("org.freedesktop.ModemManager1 is not on the system bus", error->reason);
@@ -279,17 +277,17 @@ TEST_F(TelephonyTest, DaemonMayBeKilledWhileAsked)
 TEST_F(TelephonyTest, RestartedDaemonGivesItsOldObjectsToOtherCards)
 {
     modems->add("home");
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME_MODEM)).mcc);
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
     modems->kill();
     modems->start();
     AtModem::State other;
     other.imsi = "262011234567890";
     modems->add("other", other);
     EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
-              telephony.imsi(HOME_MODEM).error().reason);
+              telephony.imsi(HOME).error().reason);
     EXPECT_EQ("262", valueOf(telephony.imsi("/virtual/other")).mcc);
     modems->add("home");
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME_MODEM)).mcc);
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
 }
 
 TEST_F(TelephonyTest, CardPutInLaterIsSeen)
@@ -297,25 +295,24 @@ TEST_F(TelephonyTest, CardPutInLaterIsSeen)
     AtModem::State empty;
     empty.hasSim = false;
     modems->add("home", empty);
-    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME_MODEM)).status);
+    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME)).status);
     modems->plugIn("home"); // as a modem that starts anew does
     EXPECT_TRUE(modems->waitUntil([&] {
-        const auto card = telephony.card(HOME_MODEM);
+        const auto card = telephony.card(HOME);
         return card && card.value().value.status == CardStatus::Ready;
     }));
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME_MODEM)).mcc);
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
 }
 
 TEST_F(TelephonyTest, FrozenDaemonIsBoundedAndAnswersLater)
 {
     modems->add("home");
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME_MODEM)).mcc);
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
     modems->freeze();
     const Pauses pauses;
     const auto begin = std::chrono::steady_clock::now();
     together(static_cast<int>(telephonyQuestions().size()), [&](int i) {
-        const auto error =
-            telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME_MODEM);
+        const auto error = telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
         ASSERT_TRUE(error);
         EXPECT_EQ(Error::Kind::NotAvailable, error->kind);
         EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
@@ -325,9 +322,9 @@ TEST_F(TelephonyTest, FrozenDaemonIsBoundedAndAnswersLater)
     EXPECT_GE(time, std::chrono::milliseconds(Bus::CALL_TIMEOUT_MS - 1));
     EXPECT_LT(time, std::chrono::milliseconds(2000 + pauses.ofAnAnswer()));
     // A busy machine may not let it answer within the first question's time.
-    for (int i = 0; i < 10 && !telephony.imsi(HOME_MODEM); ++i)
+    for (int i = 0; i < 10 && !telephony.imsi(HOME); ++i)
         continue;
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME_MODEM)).mcc);
+    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
 }
 
 TEST_F(TelephonyTest, DaemonIsFoundOnceItRuns)
@@ -336,7 +333,7 @@ TEST_F(TelephonyTest, DaemonIsFoundOnceItRuns)
     EXPECT_FALSE(telephony.slots());
     modems->start();
     modems->add("home");
-    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME_MODEM));
+    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
 }
 
 TEST(TelephonyWithoutABusTest, EveryQuestionIsNotAvailableAtOnce)
@@ -347,7 +344,7 @@ TEST(TelephonyWithoutABusTest, EveryQuestionIsNotAvailableAtOnce)
     LinuxTelephony telephony(bus);
     const auto begin = std::chrono::steady_clock::now();
     for (const auto& question : telephonyQuestions()) {
-        const auto error = question.ask(telephony, HOME_MODEM);
+        const auto error = question.ask(telephony, HOME);
         ASSERT_TRUE(error) << question.name;
         EXPECT_EQ(Error::Kind::NotAvailable, error->kind) << question.name;
         EXPECT_THAT(error->reason, StartsWith("no system bus: ")) << question.name;

@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include "linux/ModemManager.h"
+#include "support/Wait.h"
 
 using port::linux_backend::Bus;
 using port::linux_backend::Modem;
@@ -19,7 +20,6 @@ namespace {
 
 const char DAEMON[] = "/usr/sbin/ModemManager";
 const char POLICY_DAEMON[] = "/usr/lib/polkit-1/polkitd";
-constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
 constexpr int AGAIN_MS = 500;
 
 GDBusConnection* connectTo(const std::string& address)

@@ -22,7 +22,6 @@ namespace {
 const char DAEMON[] = "/usr/sbin/NetworkManager";
 const char NAME[] = "org.freedesktop.NetworkManager";
 const char PATH[] = "/org/freedesktop/NetworkManager";
-constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
 
 // Nothing of the machine is configured, nobody but root is asked for, no lease is taken.
 const char CONFIGURATION[] = R"([main]

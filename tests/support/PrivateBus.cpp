@@ -16,6 +16,7 @@
 #include <unistd.h>
 
 #include "support/Child.h"
+#include "support/Wait.h"
 
 extern "C" { // which the header of glibc 2.36 forgets
 #include <sys/pidfd.h>
@@ -24,7 +25,6 @@ extern "C" { // which the header of glibc 2.36 forgets
 namespace {
 
 constexpr int ADDRESS_DESCRIPTOR = 9;
-constexpr int PATIENCE_MS = 5000;
 
 const char CONFIGURATION[] =
     R"(<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-BUS Bus Configuration 1.0//EN"

@@ -5,9 +5,10 @@
 #include <thread>
 #include <utility>
 
+#include "support/Wait.h"
+
 namespace {
 
-constexpr int BUS_PATIENCE_MS = 5000;
 const char BUS_NAME[] = "org.freedesktop.DBus"; // of its interface too
 const char BUS_PATH[] = "/org/freedesktop/DBus";
 constexpr guint32 PRIMARY_OWNER = 1;
@@ -28,10 +29,10 @@ GDBusConnection* connectTo(const std::string& address)
 
 void ownName(GDBusConnection* connection, const std::string& name)
 {
-    GVariant* const reply = g_dbus_connection_call_sync(
-        connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
-        g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE), nullptr,
-        G_DBUS_CALL_FLAGS_NONE, BUS_PATIENCE_MS, nullptr, nullptr);
+    GVariant* const reply =
+        g_dbus_connection_call_sync(connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
+                                    g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE),
+                                    nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
     guint32 result = 0;
     if (reply != nullptr)
         g_variant_get(reply, "(u)", &result);
@@ -233,7 +234,7 @@ void ScriptedService::startAgain()
     GVariant* const released =
         g_dbus_connection_call_sync(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
                                     g_variant_new("(s)", name_.c_str()), nullptr,
-                                    G_DBUS_CALL_FLAGS_NONE, BUS_PATIENCE_MS, nullptr, nullptr);
+                                    G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
     if (released != nullptr)
         g_variant_unref(released);
     ownName(connection_, name_);
@@ -295,7 +296,7 @@ void ScriptedService::releaseName()
 {
     g_dbus_connection_call(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
                            g_variant_new("(s)", name_.c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE,
-                           BUS_PATIENCE_MS, nullptr, nullptr, nullptr);
+                           PATIENCE_MS, nullptr, nullptr, nullptr);
 }
 
 void ScriptedService::answerLate(std::chrono::milliseconds delay)

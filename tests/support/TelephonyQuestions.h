@@ -9,6 +9,8 @@
 
 #include "backend/Telephony.h"
 
+inline const port::SlotName HOME = "/virtual/home";
+
 struct TelephonyQuestion {
     const char* name;
     bool aboutASlot;

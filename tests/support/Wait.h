@@ -5,14 +5,16 @@
 
 #include <gio/gio.h>
 
-/// Runs the loop of the thread's default context until a condition holds; false after ten seconds
-/// without it.
+constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
+
+/// Runs the loop of the thread's default context until a condition holds; false when it does not
+/// come to hold in time.
 template <typename Condition>
 bool runUntil(Condition condition)
 {
     bool late = false;
     GMainContext* const context = g_main_context_ref_thread_default();
-    GSource* const limit = g_timeout_source_new_seconds(10);
+    GSource* const limit = g_timeout_source_new(PATIENCE_MS);
     const auto end = [](gpointer flag) -> gboolean {
         *static_cast<bool*>(flag) = true;
         return G_SOURCE_CONTINUE;
