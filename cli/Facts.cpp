@@ -225,7 +225,7 @@ Ask alone(Question question)
     return [question](const Origins&) {
         const auto told = coresystem_port::ask(question);
         const auto& origin = told.origin;
-        const cli::ValueOrReason value = cli::answerOf(question, told);
+        const cli::ValueOrReason value = cli::answerOf(told);
         if (value.value.is_null())
             return noAnswer(origin.reason);
         return Fact{"", value.value, origin.available ? origin.source : origin.reason, ""};

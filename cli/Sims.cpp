@@ -150,7 +150,7 @@ void askModem(SimSlot& slot)
         questions.push_back(fact.question);
     const auto answers = coresystem_port::askModem(slot.modem, questions);
     for (std::size_t i = 0; i < answers.size(); ++i)
-        slot.*MODEM_FACTS[i].answer = answerOf(questions[i], answers[i]);
+        slot.*MODEM_FACTS[i].answer = answerOf(answers[i]);
 }
 
 SimSlot askSlot(int number, char* modem, telephony_h& handle)
@@ -217,13 +217,19 @@ cli::Sims cli::askSims()
     return sims;
 }
 
-cli::ValueOrReason cli::answerOf(Question question, const coresystem_port::Answer& told)
+cli::ValueOrReason cli::answerOf(const coresystem_port::Answer& told)
 {
+    using Kind = coresystem_port::Answer::Kind;
     if (told.word.empty())
         return {nullptr, told.origin.reason};
-    const bool isNumber = told.origin.available &&
-                          (question == Question::SignalStrength || question == Question::PinTries);
-    return {isNumber ? Json(std::stoi(told.word)) : Json(told.word), ""};
+    switch (told.kind) {
+    case Kind::Number:
+        return {std::stoll(told.word), ""};
+    case Kind::Switch:
+        return {told.word == "true", ""};
+    default:
+        return {told.word, ""};
+    }
 }
 
 std::string cli::whyNoSlotAnswers(const Origins& origins, Question question)

@@ -54,8 +54,8 @@ struct Sims {
 
 Sims askSims();
 
-/// What the port tells, as a text or a number.
-ValueOrReason answerOf(coresystem_port::Question question, const coresystem_port::Answer& told);
+/// What the port tells, as a text, a number or a switch.
+ValueOrReason answerOf(const coresystem_port::Answer& told);
 
 /// Why no slot answered a question whose origins are these: no telephony, no usable card, or the
 /// question's own reason.

@@ -11,71 +11,79 @@ namespace {
 using coresystem_port::Answer;
 using coresystem_port::Question;
 using port::Error;
+using port::FactAnswer;
+using port::FactRow;
+using port::FactValue;
 using port::ModemReport;
-using port::Result;
-using port::Sourced;
 using port::devicefile::Meaning;
 
-struct Key {
-    const char* section;
-    const char* name;
-};
-
-std::string nameOf(const Key& key, Meaning meaning)
+std::string nameOf(const FactRow& row, Meaning meaning)
 {
-    const auto& section = *port::devicefile::findSection(key.section);
-    for (const auto& name : port::devicefile::findKey(section, key.name)->names)
+    const auto& section = *port::devicefile::findSection(row.section);
+    for (const auto& name : port::devicefile::findKey(section, row.key)->names)
         if (name.meaning == meaning)
             return std::string(name.name);
     return {};
 }
 
-template <typename T>
-std::string wordOf(const Key& key, const T& value)
+// The word of a value, and its kind.
+Answer said(const FactRow& row, const FactValue& value)
 {
-    if constexpr (std::is_enum_v<T>)
-        return nameOf(key, static_cast<std::int64_t>(value));
-    else if constexpr (std::is_same_v<T, std::string>)
-        return value;
-    else
-        return std::to_string(value);
+    if (const auto* const text = std::get_if<std::string>(&value))
+        return {*text, {}, Answer::Kind::Text};
+    if (const bool* const isOn = std::get_if<bool>(&value))
+        return {*isOn ? "true" : "false", {}, Answer::Kind::Switch};
+    const auto number = std::get<std::int64_t>(value);
+    const std::string name = nameOf(row, number);
+    if (!name.empty())
+        return {name, {}, Answer::Kind::Text};
+    return {std::to_string(number), {}, Answer::Kind::Number};
 }
 
-template <typename T>
-Answer answer(const Key& key, const Result<Sourced<T>>& found)
+Answer answer(const FactRow& row, const FactAnswer& found)
 {
-    const coresystem_port::Origin origin = port::originOf(found);
+    Answer told;
     if (found)
-        return {wordOf(key, found.value().value), origin};
-    return {origin.isMissing ? nameOf(key, Meaning::Kind::NotSupported) : "", origin};
+        told = said(row, found.value().value);
+    told.origin = port::originOf(found);
+    if (told.origin.isMissing)
+        told.word = nameOf(row, Meaning::Kind::NotSupported);
+    return told;
+}
+
+// Of a key that has no question of its own.
+template <typename T>
+Answer answer(const char* section, const char* key, const port::Result<port::Sourced<T>>& found)
+{
+    return answer(*port::findFact(section, key), port::factAnswer(found));
 }
 
 Answer noAnswer(const Error& error)
 {
-    return {"", port::originOf(Result<port::Fact>(error))};
+    return {"", port::originOf(FactAnswer(error))};
 }
 
 Answer answerIn(const ModemReport& report, Question question)
 {
     switch (question) {
     case Question::OperatorName:
-        return answer({"slot", "operator"}, report.operatorName);
+        return answer("slot", "operator", report.operatorName);
     case Question::OperatorMcc:
-        return answer({"slot", "operator_mcc"}, report.operatorMcc);
+        return answer("slot", "operator_mcc", report.operatorMcc);
     case Question::OperatorMnc:
-        return answer({"slot", "operator_mnc"}, report.operatorMnc);
+        return answer("slot", "operator_mnc", report.operatorMnc);
     case Question::AccessTechnology:
-        return answer({"slot", "access_technology"}, report.accessTechnology);
+        return answer("slot", "access_technology", report.accessTechnology);
     case Question::SignalStrength:
-        return answer({"slot", "signal"}, report.signal);
+        return answer("slot", "signal", report.signal);
     case Question::PowerState:
-        return answer({"slot", "power"}, report.power);
+        return answer("slot", "power", report.power);
     case Question::PinTries:
-        return answer({"slot", "pin_retries"}, report.pinTries);
+        return answer("slot", "pin_retries", report.pinTries);
     case Question::Iccid:
-        return answer({"slot", "iccid"}, port::backend().telephony().iccid(report.slot));
+        return answer("slot", "iccid", port::backend().telephony().iccid(report.slot));
     default:
-        return noAnswer(port::notAvailable("no question of a link or a modem"));
+        return noAnswer(port::notAvailable("the port has no answer of its own to this question"));
     }
 }
 
@@ -109,20 +117,23 @@ Answer coresystem_port::ask(Question question)
     port::Network& network = port::backend().network();
     switch (question) {
     case Question::Cellular:
-        return answer({"network", "cellular"}, network.cellular());
+        return answer("network", "cellular", network.cellular());
     case Question::Wifi:
-        return answer({"network", "wifi"}, network.wifi());
+        return answer("network", "wifi", network.wifi());
     case Question::Bluetooth:
-        return answer({"network", "bluetooth"}, network.bluetooth());
+        return answer("network", "bluetooth", network.bluetooth());
     case Question::Ethernet:
-        return answer({"network", "ethernet"}, network.ethernet());
+        return answer("network", "ethernet", network.ethernet());
     case Question::Connectivity:
-        return answer({"network", "connectivity"}, network.connectivity());
+        return answer("network", "connectivity", network.connectivity());
     case Question::Ssid:
-        return answer({"network", "ssid"}, network.ssid());
+        return answer("network", "ssid", network.ssid());
     default:
-        return answerOfModemInUse(question);
+        break;
     }
+    const FactRow* const plain = port::rowOf(question);
+    return plain != nullptr ? answer(*plain, port::backend().read(question))
+                            : answerOfModemInUse(question);
 }
 
 std::vector<Answer> coresystem_port::askModem(const std::string& modem,

@@ -124,15 +124,19 @@ CORESYSTEM_PORT_API std::string deviceFileProblem();
 
 /// An answer of the backend itself.
 struct Answer {
-    std::string word; ///< as a device file says it: "connected", "75"; "not_supported" where this
-                      ///< device has no such thing; empty when there is no answer
+    enum class Kind { Text, Number, Switch };
+
+    std::string word; ///< as a device file says it: "connected", "75", "true"; "not_supported"
+                      ///< where this device has no such thing; empty when there is no answer
     Origin origin;    ///< "not_supported" has a reason, and no source
+    Kind kind = Kind::Text; ///< of the word of an answer
 };
 
 /// Asks the backend, and not CoreSystem, which puts several of them together or knows none of them:
-/// for Cellular, Wifi, Bluetooth, Ethernet, Connectivity or Ssid; for what askModem() tells, of the
-/// modem over which data goes, else of the first one with service, else of the first one. Waits at
-/// most 2 seconds. Other questions have no answer here.
+/// for a plain fact (docs/facts.md); for Cellular, Wifi, Bluetooth, Ethernet, Connectivity or Ssid;
+/// for what askModem() tells, of the modem over which data goes, else of the first one with
+/// service, else of the first one. Waits at most 2 seconds. Other questions have no answer
+/// here.
 CORESYSTEM_PORT_API Answer ask(Question question);
 
 /// Asks the backend about the modem of one SIM slot, for OperatorName, OperatorMcc, OperatorMnc,

@@ -269,4 +269,34 @@ TYPED_TEST(ContractTest, ThreadsMayAskAtOnce)
     });
 }
 
+using Kind = coresystem_port::Answer::Kind;
+
+// A value of a device file as the port tells it.
+std::pair<std::string, Kind> told(const toml::node_view<const toml::node>& value)
+{
+    if (value.is_boolean())
+        return {*value.value<bool>() ? "true" : "false", Kind::Switch};
+    if (value.is_integer())
+        return {std::to_string(*value.value<int>()), Kind::Number};
+    return {value.value_or("no value"), Kind::Text};
+}
+
+TEST(PortsOwnAnswersTest, EveryPlainFactIsToldInTheWordsOfTheDeviceFile)
+{
+    const auto device = port::makeSimulatorBackend(DEVICE_FILES "/dual_sim.toml");
+    port::substituteBackend(device.get());
+    const toml::table file = toml::parse_file(DEVICE_FILES "/dual_sim.toml");
+    const auto expectAnswer = [&](Question question, const char* section, const char* key) {
+        const auto answer = coresystem_port::ask(question);
+        EXPECT_EQ(told(file[section][key]), std::make_pair(answer.word, answer.kind)) << key;
+        EXPECT_THAT(answer.origin.source, Not(IsEmpty())) << key;
+    };
+#define FACT(number, question, section, key, ...) expectAnswer(Question::question, section, key);
+#include "facts/facts.def"
+    const auto other = coresystem_port::ask(Question::Storage);
+    port::substituteBackend(nullptr);
+    EXPECT_EQ("", other.word);
+    EXPECT_EQ("the port has no answer of its own to this question", other.origin.reason);
+}
+
 } // namespace
