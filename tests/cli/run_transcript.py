@@ -63,7 +63,7 @@ def lines_of(output, mark=""):
 
 def run(shell_command, directory, variables):
     done = subprocess.run(["bash", "-c", shell_command], cwd=directory, env=variables,
-                          stdin=subprocess.DEVNULL, capture_output=True, timeout=240, umask=0o077)
+                          stdin=subprocess.DEVNULL, capture_output=True, timeout=140, umask=0o077)
     code = [f"[{done.returncode}]"] if done.returncode != 0 else []
     return lines_of(done.stdout) + lines_of(done.stderr, "! ") + code
 

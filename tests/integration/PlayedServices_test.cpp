@@ -307,8 +307,15 @@ TEST_F(PlayedServices, MisbehaveAsTheFileSays)
                     "('org.freedesktop.ModemManager1.Modem', 'State')", timeoutMs);
     };
     const char* const gone = "org.freedesktop.DBus.Error.NameHasNoOwner";
+    const char* const died = "org.freedesktop.DBus.Error.NoReply"; // with the call
+    const auto askWhileIt = [&](const char* other) {
+        std::string answer = other;
+        while (answer == other)
+            answer = askModem(5000);
+        return answer;
+    };
     played_.become(with(PHONE, {{"service.ModemManager", "absent"}}));
-    EXPECT_EQ(askModem(5000), gone);
+    EXPECT_EQ(askWhileIt(died), gone); // the bus may pass a call on before it knows
     played_.become(with(PHONE, {{"service.ModemManager", "silent"}}));
     EXPECT_EQ(askModem(50), "Timeout was reached");
     EXPECT_EQ(get(NM, NM_PATH, NM, "WirelessEnabled"), "(<true>,)"); // the others go on
@@ -318,13 +325,10 @@ TEST_F(PlayedServices, MisbehaveAsTheFileSays)
     played_.become(with(
         PHONE, {{"service.ModemManager", "{ error = \"crashing\", call = 2, delay_ms = 1 }"}}));
     EXPECT_EQ(askModem(5000), "(<8>,)");
-    EXPECT_EQ(askModem(5000), "org.freedesktop.DBus.Error.NoReply"); // it died with the call
-    std::string answer = gone;
-    while (answer == gone) // until it came back
-        answer = askModem(5000);
-    EXPECT_EQ(answer, "(<8>,)");
+    EXPECT_EQ(askModem(5000), died);
+    EXPECT_EQ(askWhileIt(gone), "(<8>,)"); // it came back
     played_.become(with(PHONE, {{"service.ModemManager", "crashing"}}));
-    EXPECT_EQ(askModem(5000), gone);
+    EXPECT_EQ(askWhileIt(died), gone);
     played_.become(PHONE);
     EXPECT_EQ(askModem(5000), "(<8>,)");
 }

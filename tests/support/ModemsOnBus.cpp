@@ -90,10 +90,11 @@ std::string ModemsOnBus::obstacle()
     return geteuid() == 0 ? "" : "needs root, whom polkitd lets switch a modem on";
 }
 
-void ModemsOnBus::run() const
+// In a forked child, where another thread may hold the allocator's lock for good.
+void ModemsOnBus::run(const char* logFile) const
 {
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    const int log = open(tree_.path("/log").c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+    const int log = open(logFile, O_WRONLY | O_CREAT | O_APPEND, 0600);
     if (log >= 0 && dup2(log, STDOUT_FILENO) >= 0 && dup2(log, STDERR_FILENO) >= 0)
         execl(DAEMON, DAEMON, "--test-enable", "--test-no-udev", "--test-no-qrtr",
               "--test-no-suspend-resume", "--log-level=WARN", static_cast<char*>(nullptr));
@@ -105,9 +106,10 @@ void ModemsOnBus::start()
     // The bus may not have noticed yet that the one before was killed.
     if (!waitUntil([this] { return !hasName(); }))
         throw std::runtime_error("ModemManager does not leave the bus");
+    const std::string logFile = tree_.path("/log");
     process_ = fork();
     if (process_ == 0)
-        run();
+        run(logFile.c_str());
     if (!waitUntil([this] { return hasName(); }))
         throw std::runtime_error("ModemManager does not start");
 }

@@ -52,7 +52,7 @@ public:
     }
 
 private:
-    [[noreturn]] void run() const;
+    [[noreturn]] void run(const char* logFile) const;
     bool hasName() const;
     std::string pathOf(const std::string& id) const;
     GVariant* call(const std::string& name, const std::string& path, const char* interface,

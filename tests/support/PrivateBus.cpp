@@ -143,18 +143,17 @@ void PrivateBus::useEtc(const std::string& folder)
     tree_.write("/run/systemd/why", "Where its services put their sockets.\n");
 }
 
-void PrivateBus::run(int addressPipe) const
+// In a forked child, where another thread may hold the allocator's lock for good.
+void PrivateBus::run(const char* configuration, int addressPipe) const
 {
     // A test that ends before its time leaves no bus behind.
     prctl(PR_SET_PDEATHSIG, SIGKILL);
     const bool ready =
         etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
                          bindFolder(etc_, "/etc") && bindFolder(tree_.path("/run"), "/run"));
-    if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0) {
-        const std::string configuration = "--config-file=" + tree_.path("/bus.conf");
-        execlp("dbus-daemon", "dbus-daemon", configuration.c_str(), "--nofork", "--nopidfile",
+    if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0)
+        execlp("dbus-daemon", "dbus-daemon", configuration, "--nofork", "--nopidfile",
                "--print-address=9", static_cast<char*>(nullptr));
-    }
     _exit(127);
 }
 
@@ -163,9 +162,10 @@ void PrivateBus::start()
     int ends[2];
     if (pipe(ends) != 0)
         throw std::runtime_error("no pipe");
+    const std::string configuration = "--config-file=" + tree_.path("/bus.conf");
     process_ = fork();
     if (process_ == 0)
-        run(ends[1]);
+        run(configuration.c_str(), ends[1]);
     close(ends[1]);
     char first = 0;
     const bool ready = read(ends[0], &first, 1) == 1; // it prints its address once it listens

@@ -45,7 +45,7 @@ public:
     std::string address() const;
 
 private:
-    [[noreturn]] void run(int addressPipe) const;
+    [[noreturn]] void run(const char* configuration, int addressPipe) const;
     std::vector<int> daemons() const;
     void stop();
 
