@@ -271,11 +271,7 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
 // Answers in a service's place, before it does.
 class Stranger {
 public:
-    explicit Stranger(const std::string& address)
-        : connection_(g_dbus_connection_new_for_address_sync(address.c_str(), BUS_CLIENT, nullptr,
-                                                             nullptr, nullptr))
-    {
-    }
+    explicit Stranger(const std::string& address) : connection_(connectToBus(address)) {}
     ~Stranger()
     {
         g_dbus_connection_close_sync(connection_, nullptr, nullptr);

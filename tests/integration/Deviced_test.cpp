@@ -33,11 +33,7 @@ const char INTERFACE[] = "org.tizen.system.deviced.Board";
 // A connection that is closed with the object.
 class Client {
 public:
-    explicit Client(const std::string& address)
-        : connection_(g_dbus_connection_new_for_address_sync(address.c_str(), BUS_CLIENT, nullptr,
-                                                             nullptr, nullptr))
-    {
-    }
+    explicit Client(const std::string& address) : connection_(connectToBus(address)) {}
 
     // The text of the reply, or "error: " and its name and message.
     std::string call(const char* name, const char* path, const char* interface, const char* method,

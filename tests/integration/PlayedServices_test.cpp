@@ -54,11 +54,7 @@ class PlayedServices : public testing::Test {
 protected:
     PlayedServices()
     {
-        constexpr int CLIENT = G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                               G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION;
-        bus_.reset(g_dbus_connection_new_for_address_sync(played_.address().c_str(),
-                                                          static_cast<GDBusConnectionFlags>(CLIENT),
-                                                          nullptr, nullptr, nullptr));
+        bus_.reset(connectToBus(played_.address()));
     }
 
     // The reply as text, or the name of the error.

@@ -91,12 +91,7 @@ TEST_F(SystemdServicesTest, PrettyNameComesBeforeTheStaticOne)
 TEST_F(SystemdServicesTest, NameSetThroughTheServiceIsSeen)
 {
     deviceName();
-    GDBusConnection* const setter = g_dbus_connection_new_for_address_sync(
-        bus.address().c_str(),
-        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-        nullptr, nullptr, nullptr);
-    ASSERT_NE(nullptr, setter);
+    GDBusConnection* const setter = connectToBus(bus.address());
     GVariant* const reply =
         g_dbus_connection_call_sync(setter, HOSTNAME1.name, HOSTNAME1.path, HOSTNAME1.interface,
                                     "SetPrettyHostname", g_variant_new("(sb)", "Pocket", FALSE),

@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include "linux/ModemManager.h"
+#include "support/PrivateBus.h"
 #include "support/Wait.h"
 
 using port::linux_backend::Bus;
@@ -21,19 +22,6 @@ namespace {
 const char DAEMON[] = "/usr/sbin/ModemManager";
 const char POLICY_DAEMON[] = "/usr/lib/polkit-1/polkitd";
 constexpr int AGAIN_MS = 500;
-
-GDBusConnection* connectTo(const std::string& address)
-{
-    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
-        address.c_str(),
-        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-        nullptr, nullptr, nullptr);
-    if (connection == nullptr)
-        throw std::runtime_error("no bus at " + address);
-    g_dbus_connection_set_exit_on_close(connection, FALSE);
-    return connection;
-}
 
 // The object of the modem on a device; empty while its state is not known yet.
 std::string settledModem(const std::string& device)
@@ -71,7 +59,7 @@ ModemsOnBus::ModemsOnBus() : context_(g_main_context_new())
     // Only the policy daemon may let somebody switch a modem on.
     bus_.addActivatable("org.freedesktop.PolicyKit1", std::string(POLICY_DAEMON) + " --no-debug");
     bus_.start();
-    connection_ = connectTo(bus_.address());
+    connection_ = connectToBus(bus_.address());
     start();
 }
 

@@ -49,15 +49,6 @@ bool enterEmptyNetwork()
     return mkdir("/run/NetworkManager", 0755) == 0 && mkdir("/var/lib/NetworkManager", 0755) == 0;
 }
 
-GDBusConnection* connectTo(const std::string& address)
-{
-    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
-        address.c_str(), BUS_CLIENT, nullptr, nullptr, nullptr);
-    if (connection == nullptr)
-        throw std::runtime_error("no bus at " + address);
-    return connection;
-}
-
 } // namespace
 
 std::string NetworkManagerOnBus::obstacle()
@@ -70,7 +61,7 @@ std::string NetworkManagerOnBus::obstacle()
 }
 
 NetworkManagerOnBus::NetworkManagerOnBus(const std::string& address)
-    : connection_(connectTo(address))
+    : connection_(connectToBus(address))
 {
     writeConfiguration();
     process_ = fork();

@@ -108,6 +108,18 @@ void endDaemon(int processDescriptor)
 
 } // namespace
 
+GDBusConnection* connectToBus(const std::string& address)
+{
+    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
+        address.c_str(),
+        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+        nullptr, nullptr, nullptr);
+    if (connection == nullptr)
+        throw std::runtime_error("no bus at " + address);
+    return connection;
+}
+
 PrivateBus::PrivateBus()
 {
     tree_.write("/bus.conf", configurationFor(tree_.root(), ALLOW_ALL));
@@ -195,14 +207,10 @@ void PrivateBus::thaw() const
 
 // The processes on the bus besides this one: the daemons that it started.
 std::vector<int> PrivateBus::daemons() const
-{
+try {
     std::vector<int> found;
-    const Connection bus(g_dbus_connection_new_for_address_sync(
-        address().c_str(),
-        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-        nullptr, nullptr, nullptr));
-    const Variant names = bus ? askBus(bus, "ListNames", nullptr) : nullptr;
+    const Connection bus(connectToBus(address()));
+    const Variant names = askBus(bus, "ListNames", nullptr);
     if (!names)
         return found;
     std::set<pid_t> seen = {getpid(), process_};
@@ -219,6 +227,8 @@ std::vector<int> PrivateBus::daemons() const
     }
     g_variant_iter_free(each);
     return found;
+} catch (const std::runtime_error&) { // the bus died before
+    return {};
 }
 
 void PrivateBus::stop()

@@ -11,9 +11,8 @@
 
 #include "support/TemporaryTree.h"
 
-// Releases a connection to a bus.
-constexpr auto BUS_CLIENT = static_cast<GDBusConnectionFlags>(
-    G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
+/// A connection of the test's own to a bus; throws when there is none.
+GDBusConnection* connectToBus(const std::string& address);
 
 /// A dbus-daemon of type system on a private socket. It is ready when start() returns. While it
 /// lives, DBUS_SYSTEM_BUS_ADDRESS of this process names it. At the end it is stopped, and so is

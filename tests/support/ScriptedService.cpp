@@ -5,6 +5,7 @@
 #include <thread>
 #include <utility>
 
+#include "support/PrivateBus.h"
 #include "support/Wait.h"
 
 namespace {
@@ -14,18 +15,6 @@ const char BUS_PATH[] = "/org/freedesktop/DBus";
 constexpr guint32 PRIMARY_OWNER = 1;
 constexpr guint32 MAY_BE_REPLACED = 1;
 constexpr guint32 REPLACE = 2;
-
-GDBusConnection* connectTo(const std::string& address)
-{
-    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
-        address.c_str(),
-        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-        nullptr, nullptr, nullptr);
-    if (connection == nullptr)
-        throw std::runtime_error("no bus at " + address);
-    return connection;
-}
 
 void ownName(GDBusConnection* connection, const std::string& name)
 {
@@ -117,7 +106,7 @@ GDBusMessage* replyWith(GDBusMessage* question, GVariant* body)
 } // namespace
 
 ScriptedService::ScriptedService(const std::string& address, const std::string& name)
-    : name_(name), connection_(connectTo(address)),
+    : name_(name), connection_(connectToBus(address)),
       filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage,
                                            handedOn(state_), &ScriptedService::releaseState))
 {
