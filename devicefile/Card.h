@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What follows of a card's state in a device file.
+// Conclusions from the state of a card in a device file.
 #ifndef DEVICEFILE_CARD_H
 #define DEVICEFILE_CARD_H
 

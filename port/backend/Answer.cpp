@@ -4,6 +4,7 @@
 
 #include "../../devicefile/Schema.h"
 #include "Backend.h"
+#include "ModemAnswers.h"
 #include "Origin.h"
 
 namespace {
@@ -51,7 +52,7 @@ Answer answer(const FactRow& row, const FactAnswer& found)
     return told;
 }
 
-// Of a key that has no question of its own.
+// The same for an answer that has a method of its own in the backend.
 template <typename T>
 Answer answer(const char* section, const char* key, const port::Result<port::Sourced<T>>& found)
 {
@@ -65,26 +66,15 @@ Answer noAnswer(const Error& error)
 
 Answer answerIn(const ModemReport& report, Question question)
 {
-    switch (question) {
-    case Question::OperatorName:
-        return answer("slot", "operator", report.operatorName);
-    case Question::OperatorMcc:
-        return answer("slot", "operator_mcc", report.operatorMcc);
-    case Question::OperatorMnc:
-        return answer("slot", "operator_mnc", report.operatorMnc);
-    case Question::AccessTechnology:
-        return answer("slot", "access_technology", report.accessTechnology);
-    case Question::SignalStrength:
-        return answer("slot", "signal", report.signal);
-    case Question::PowerState:
-        return answer("slot", "power", report.power);
-    case Question::PinTries:
-        return answer("slot", "pin_retries", report.pinTries);
-    case Question::Iccid:
+    if (question == Question::Iccid)
         return answer("slot", "iccid", port::backend().telephony().iccid(report.slot));
-    default:
-        return noAnswer(port::notAvailable("the port has no answer of its own to this question"));
-    }
+    Answer found =
+        noAnswer(port::notAvailable("the port has no answer of its own to this question"));
+    port::eachAnswer(report, [&](Question each, const char* key, const auto& said) {
+        if (each == question)
+            found = answer("slot", key, said);
+    });
+    return found;
 }
 
 // The first of those that are used for most.

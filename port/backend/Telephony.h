@@ -73,10 +73,9 @@ enum class PowerState { Off, Low, On };
 
 enum class ServiceState { InService, OutOfService, EmergencyOnly };
 
-// What a slot's modem tells of itself and of the network that it is registered with, each for
-// itself.
+// The answers of a slot's modem about itself and its network, each with a source or reason of its own.
 struct ModemReport {
-    // What the modem is used for; more of it comes later.
+    // Later ones are used for more.
     enum class Use { None, Service, Data };
 
     SlotName slot;

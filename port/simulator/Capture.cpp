@@ -8,6 +8,7 @@
 
 #include "../../devicefile/Schema.h"
 #include "../../devicefile/Toml.h"
+#include "../backend/ModemAnswers.h"
 #include "../common/GLibTypes.h"
 #include "../facts/Facts.h"
 #include "../facts/Privacy.h"
@@ -232,22 +233,12 @@ private:
         lines.add("imei", telephony.imei(name));
         lines.add("service", telephony.service(name));
         lines.add("roaming", telephony.roaming(name));
-        addReport(lines, name);
+        eachAnswer(
+            reportOf(telephony, name),
+            [&lines](Question, const char* key, const auto& answer) { lines.add(key, answer); });
         lines.add("iccid", telephony.iccid(name));
         lines.add("sms", telephony.smsReady(name));
         return lines.text();
-    }
-
-    void addReport(Lines& lines, const SlotName& name)
-    {
-        const ModemReport report = reportOf(backend_.telephony(), name);
-        lines.add("operator", report.operatorName);
-        lines.add("operator_mcc", report.operatorMcc);
-        lines.add("operator_mnc", report.operatorMnc);
-        lines.add("access_technology", report.accessTechnology);
-        lines.add("signal", report.signal);
-        lines.add("power", report.power);
-        lines.add("pin_retries", report.pinTries);
     }
 
     // The states that have no name of their own have one of the older interface.

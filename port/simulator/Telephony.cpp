@@ -70,12 +70,12 @@ std::optional<Error> obstacleOf(const Section& slot, bool (*isReadable)(CardStat
     return std::nullopt;
 }
 
-Error isPrivate(const Section& slot)
+Error deniedBy(const Section& slot)
 {
     return denied(slot.find("denied")->source + ": this slot is private");
 }
 
-// What a file may say or not; why not is the same for each.
+// Reads a key that a file may leave out.
 template <typename T>
 Result<Sourced<T>> optional(const Section& slot, const char* key)
 {
@@ -126,7 +126,7 @@ ModemReport reportOf(const Section& slot, bool carriesData)
 {
     const SlotName name = slot.get<std::string>("cp_name").value().value;
     if (isOn(slot, "denied"))
-        return emptyReport(name, isPrivate(slot));
+        return emptyReport(name, deniedBy(slot));
     return {name,
             useOf(slot, carriesData),
             ofNetwork<std::string>(slot, "operator"),
@@ -167,7 +167,7 @@ Result<Section> SimulatedTelephony::slot(const SlotName& name)
         if (slot.get<std::string>("cp_name").value().value != name)
             continue;
         if (isOn(slot, "denied"))
-            return isPrivate(slot);
+            return deniedBy(slot);
         return slot;
     }
     return notAvailable(file_.path() + ": no slot " + name);
