@@ -136,6 +136,51 @@ constexpr Name WIFI_ERRORS[] = {
     {"WIFI_ERROR_NOT_SUPPORTED", WIFI_ERROR_NOT_SUPPORTED},
 };
 
+// The functions of the platform, with the lists of what each may be made to answer.
+#define PLATFORM_FAULTS(FAULT) \
+    FAULT(__dlog_print, DLOG_ERRORS) \
+    FAULT(alarm_get_current_time, ALARM_ERRORS) \
+    FAULT(connection_create, CONNECTION_ERRORS) \
+    FAULT(connection_destroy, CONNECTION_ERRORS) \
+    FAULT(connection_get_bt_state, CONNECTION_ERRORS) \
+    FAULT(connection_get_cellular_state, CONNECTION_ERRORS) \
+    FAULT(connection_get_wifi_state, CONNECTION_ERRORS) \
+    FAULT(package_info_create, PACKAGE_MANAGER_ERRORS) \
+    FAULT(package_info_destroy, PACKAGE_MANAGER_ERRORS) \
+    FAULT(package_info_get_version, PACKAGE_MANAGER_ERRORS, OR_NULL) \
+    FAULT(package_manager_get_package_size_info, PACKAGE_MANAGER_ERRORS) \
+    FAULT(runtime_info_get_value_bool, RUNTIME_INFO_ERRORS) \
+    FAULT(runtime_info_get_value_int, RUNTIME_INFO_ERRORS) \
+    FAULT(runtime_info_set_changed_cb, RUNTIME_INFO_ERRORS) \
+    FAULT(runtime_info_unset_changed_cb, RUNTIME_INFO_ERRORS) \
+    FAULT(storage_get_internal_memory_size, STORAGE_ERRORS) \
+    FAULT(system_info_get_platform_string, SYSTEM_INFO_ERRORS, OR_NULL) \
+    FAULT(system_settings_get_value_bool, SYSTEM_SETTINGS_ERRORS) \
+    FAULT(system_settings_get_value_int, SYSTEM_SETTINGS_ERRORS) \
+    FAULT(system_settings_get_value_string, SYSTEM_SETTINGS_ERRORS, OR_NULL) \
+    FAULT(tel_check_sms_device_status, TAPI_ERRORS) \
+    FAULT(tel_deinit, TAPI_ERRORS) \
+    FAULT(tel_get_call_preferred_voice_subscription, TAPI_ERRORS) \
+    FAULT(tel_get_cp_name_list, OR_NULL) \
+    FAULT(tel_get_network_default_data_subscription, TAPI_ERRORS) \
+    FAULT(tel_get_network_default_subscription, TAPI_ERRORS) \
+    FAULT(tel_get_sim_imsi, TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS) \
+    FAULT(tel_get_sim_init_info, TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS) \
+    FAULT(tel_init, OR_NULL) \
+    FAULT(telephony_deinit, TELEPHONY_ERRORS) \
+    FAULT(telephony_init, TELEPHONY_ERRORS, OR_EMPTY) \
+    FAULT(telephony_modem_get_imei, TELEPHONY_ERRORS, OR_NULL) \
+    FAULT(telephony_network_get_roaming_status, TELEPHONY_ERRORS) \
+    FAULT(telephony_network_get_service_state, TELEPHONY_ERRORS) \
+    FAULT(telephony_sim_get_state, TELEPHONY_ERRORS) \
+    FAULT(telephony_sim_get_subscriber_number, TELEPHONY_ERRORS, OR_NULL) \
+    FAULT(vconf_get_str, OR_NULL) \
+    FAULT(wifi_initialize, WIFI_ERRORS) \
+    FAULT(wifi_set_connection_state_changed_cb, WIFI_ERRORS) \
+    FAULT(wifi_set_device_state_changed_cb, WIFI_ERRORS) \
+    FAULT(wifi_unset_connection_state_changed_cb, WIFI_ERRORS) \
+    FAULT(wifi_unset_device_state_changed_cb, WIFI_ERRORS)
+
 } // namespace port::devicefile
 
 #endif

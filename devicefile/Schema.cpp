@@ -142,25 +142,22 @@ constexpr Name CONNECTIVITIES[] = {
 constexpr Name OR_NULL[] = {{"null", Meaning::Kind::Nothing}};
 constexpr Name OR_EMPTY[] = {{"empty", Meaning::Kind::Nothing}};
 
-// The rows of two lists, one after the other.
-template <std::size_t First, std::size_t Second>
-constexpr std::array<Name, First + Second> joined(const Name (&first)[First],
-                                                  const Name (&second)[Second])
+// The rows of several lists, one after the other.
+template <std::size_t... Counts>
+constexpr auto joined(const Name (&... lists)[Counts])
 {
-    std::array<Name, First + Second> all{};
-    for (std::size_t i = 0; i < First; ++i)
-        all[i] = first[i];
-    for (std::size_t i = 0; i < Second; ++i)
-        all[First + i] = second[i];
+    std::array<Name, (Counts + ...)> all{};
+    std::size_t count = 0;
+    const auto append = [&](const auto& list) {
+        for (const Name& name : list)
+            all[count++] = name;
+    };
+    (append(lists), ...);
     return all;
 }
 
-constexpr auto PACKAGE_MANAGER_ERRORS_OR_NULL = joined(PACKAGE_MANAGER_ERRORS, OR_NULL);
-constexpr auto SYSTEM_INFO_ERRORS_OR_NULL = joined(SYSTEM_INFO_ERRORS, OR_NULL);
-constexpr auto SYSTEM_SETTINGS_ERRORS_OR_NULL = joined(SYSTEM_SETTINGS_ERRORS, OR_NULL);
-constexpr auto TAPI_SIM_ERRORS = joined(TAPI_ERRORS, TAPI_SIM_ACCESS_ERRORS);
-constexpr auto TELEPHONY_ERRORS_OR_EMPTY = joined(TELEPHONY_ERRORS, OR_EMPTY);
-constexpr auto TELEPHONY_ERRORS_OR_NULL = joined(TELEPHONY_ERRORS, OR_NULL);
+template <const auto&... Lists>
+constexpr auto JOINED = joined(Lists...);
 
 constexpr Name SERIAL_FAULTS[] = {{"not_a_string", Meaning::Kind::NotAString}};
 constexpr Name SERVICE_FAULTS[] = {
@@ -233,50 +230,9 @@ constexpr KeyRow KEYS[] = {
     {"step", "set", {Type::Kind::Changes}},
     {"step", "unset", {Type::Kind::Paths}},
 
-    // The calls of the platform by their own names, and what is asked over the bus.
-    {"fault", "__dlog_print", fault(DLOG_ERRORS)},
-    {"fault", "alarm_get_current_time", fault(ALARM_ERRORS)},
-    {"fault", "connection_create", fault(CONNECTION_ERRORS)},
-    {"fault", "connection_destroy", fault(CONNECTION_ERRORS)},
-    {"fault", "connection_get_bt_state", fault(CONNECTION_ERRORS)},
-    {"fault", "connection_get_cellular_state", fault(CONNECTION_ERRORS)},
-    {"fault", "connection_get_wifi_state", fault(CONNECTION_ERRORS)},
-    {"fault", "package_info_create", fault(PACKAGE_MANAGER_ERRORS)},
-    {"fault", "package_info_destroy", fault(PACKAGE_MANAGER_ERRORS)},
-    {"fault", "package_info_get_version", fault(PACKAGE_MANAGER_ERRORS_OR_NULL)},
-    {"fault", "package_manager_get_package_size_info", fault(PACKAGE_MANAGER_ERRORS)},
-    {"fault", "runtime_info_get_value_bool", fault(RUNTIME_INFO_ERRORS)},
-    {"fault", "runtime_info_get_value_int", fault(RUNTIME_INFO_ERRORS)},
-    {"fault", "runtime_info_set_changed_cb", fault(RUNTIME_INFO_ERRORS)},
-    {"fault", "runtime_info_unset_changed_cb", fault(RUNTIME_INFO_ERRORS)},
-    {"fault", "storage_get_internal_memory_size", fault(STORAGE_ERRORS)},
-    {"fault", "system_info_get_platform_string", fault(SYSTEM_INFO_ERRORS_OR_NULL)},
-    {"fault", "system_settings_get_value_bool", fault(SYSTEM_SETTINGS_ERRORS)},
-    {"fault", "system_settings_get_value_int", fault(SYSTEM_SETTINGS_ERRORS)},
-    {"fault", "system_settings_get_value_string", fault(SYSTEM_SETTINGS_ERRORS_OR_NULL)},
-    {"fault", "tel_check_sms_device_status", fault(TAPI_ERRORS)},
-    {"fault", "tel_deinit", fault(TAPI_ERRORS)},
-    {"fault", "tel_get_call_preferred_voice_subscription", fault(TAPI_ERRORS)},
-    {"fault", "tel_get_cp_name_list", fault(OR_NULL)},
-    {"fault", "tel_get_network_default_data_subscription", fault(TAPI_ERRORS)},
-    {"fault", "tel_get_network_default_subscription", fault(TAPI_ERRORS)},
-    {"fault", "tel_get_sim_imsi", fault(TAPI_SIM_ERRORS)},
-    {"fault", "tel_get_sim_init_info", fault(TAPI_SIM_ERRORS)},
-    {"fault", "tel_init", fault(OR_NULL)},
-    {"fault", "telephony_deinit", fault(TELEPHONY_ERRORS)},
-    {"fault", "telephony_init", fault(TELEPHONY_ERRORS_OR_EMPTY)},
-    {"fault", "telephony_modem_get_imei", fault(TELEPHONY_ERRORS_OR_NULL)},
-    {"fault", "telephony_network_get_roaming_status", fault(TELEPHONY_ERRORS)},
-    {"fault", "telephony_network_get_service_state", fault(TELEPHONY_ERRORS)},
-    {"fault", "telephony_sim_get_state", fault(TELEPHONY_ERRORS)},
-    {"fault", "telephony_sim_get_subscriber_number", fault(TELEPHONY_ERRORS_OR_NULL)},
-    {"fault", "vconf_get_str", fault(OR_NULL)},
-    {"fault", "wifi_initialize", fault(WIFI_ERRORS)},
-    {"fault", "wifi_set_connection_state_changed_cb", fault(WIFI_ERRORS)},
-    {"fault", "wifi_set_device_state_changed_cb", fault(WIFI_ERRORS)},
-    {"fault", "wifi_unset_connection_state_changed_cb", fault(WIFI_ERRORS)},
-    {"fault", "wifi_unset_device_state_changed_cb", fault(WIFI_ERRORS)},
-    {"fault", "GetSerial", fault(SERIAL_FAULTS, Type::Kind::BusFault)},
+// The calls of the platform by their own names, and what is asked over the bus.
+#define FAULT(call, ...) {"fault", #call, fault(JOINED<__VA_ARGS__>)},
+    PLATFORM_FAULTS(FAULT){"fault", "GetSerial", fault(SERIAL_FAULTS, Type::Kind::BusFault)},
     {"fault", "g_bus_get_sync", oneOf(BUS_FAULTS)}, // of who starts the application
 };
 
