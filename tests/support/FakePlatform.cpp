@@ -170,6 +170,11 @@ void fake::writeArgument(std::ostream& out, telephony_h handle)
     out << (handle != nullptr ? "slot " + std::to_string(handle->slot) : "no slot");
 }
 
+void fake::writeArgument(std::ostream& out, connection_h connection)
+{
+    out << nameOf(connection);
+}
+
 void fake::writeArgument(std::ostream& out, package_info_h handle)
 {
     out << "package " << handle->name;
@@ -385,15 +390,12 @@ int __dlog_print(log_id_t id, int priority, const char* tag, const char* format,
     return platform().logResult;
 }
 
-int system_info_get_platform_string(const char* key, char** value)
-{
-    return platform().reply(value, "system_info_get_platform_string", key);
-}
-
-int system_settings_get_value_string(system_settings_key_e key, char** value)
-{
-    return platform().reply(value, "system_settings_get_value_string", key);
-}
+#define REPLY(name, parameters, ...)                 \
+    int name parameters                              \
+    {                                                \
+        return platform().reply(#name, __VA_ARGS__); \
+    }
+#include "platform_replies.def"
 
 int telephony_init(telephony_handle_list_s* list)
 {
@@ -415,32 +417,6 @@ int telephony_deinit(telephony_handle_list_s* list)
         platform().closeList(*list);
     *list = {0, nullptr};
     return result;
-}
-
-int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
-{
-    return platform().reply(state, "telephony_sim_get_state", handle);
-}
-
-int telephony_sim_get_subscriber_number(telephony_h handle, char** number)
-{
-    return platform().reply(number, "telephony_sim_get_subscriber_number", handle);
-}
-
-int telephony_modem_get_imei(telephony_h handle, char** imei)
-{
-    return platform().reply(imei, "telephony_modem_get_imei", handle);
-}
-
-int telephony_network_get_service_state(telephony_h handle,
-                                        telephony_network_service_state_e* state)
-{
-    return platform().reply(state, "telephony_network_get_service_state", handle);
-}
-
-int telephony_network_get_roaming_status(telephony_h handle, bool* roaming)
-{
-    return platform().reply(roaming, "telephony_network_get_roaming_status", handle);
 }
 
 char** tel_get_cp_name_list(void)
@@ -469,57 +445,12 @@ int tel_deinit(TapiHandle* handle)
     return result;
 }
 
-int tel_get_sim_imsi(TapiHandle* handle, TelSimImsiInfo_t* imsi)
-{
-    return platform().reply(imsi, "tel_get_sim_imsi", handle);
-}
-
 int tel_get_sim_init_info(TapiHandle* handle, TelSimCardStatus_t* status, int* card_changed)
 {
     const AllocationPause pause;
-    const int result = platform().reply(status, "tel_get_sim_init_info", handle);
+    const int result = platform().reply("tel_get_sim_init_info", status, handle);
     *card_changed = platform().cardChanged;
     return result;
-}
-
-int tel_get_network_default_subscription(TapiHandle* handle, TelNetworkDefaultSubs_t* subs)
-{
-    return platform().reply(subs, "tel_get_network_default_subscription", handle);
-}
-
-int tel_get_network_default_data_subscription(TapiHandle* handle, TelNetworkDefaultDataSubs_t* subs)
-{
-    return platform().reply(subs, "tel_get_network_default_data_subscription", handle);
-}
-
-int tel_get_call_preferred_voice_subscription(TapiHandle* handle, TelCallPreferredVoiceSubs_t* subs)
-{
-    return platform().reply(subs, "tel_get_call_preferred_voice_subscription", handle);
-}
-
-int tel_check_sms_device_status(TapiHandle* handle, int* ready)
-{
-    return platform().reply(ready, "tel_check_sms_device_status", handle);
-}
-
-int system_settings_get_value_bool(system_settings_key_e key, bool* value)
-{
-    return platform().reply(value, "system_settings_get_value_bool", key);
-}
-
-int system_settings_get_value_int(system_settings_key_e key, int* value)
-{
-    return platform().reply(value, "system_settings_get_value_int", key);
-}
-
-int runtime_info_get_value_bool(runtime_info_key_e key, bool* value)
-{
-    return platform().reply(value, "runtime_info_get_value_bool", key);
-}
-
-int runtime_info_get_value_int(runtime_info_key_e key, int* value)
-{
-    return platform().reply(value, "runtime_info_get_value_int", key);
 }
 
 int runtime_info_set_changed_cb(runtime_info_key_e key, runtime_info_changed_cb callback,
@@ -583,39 +514,14 @@ int connection_destroy(connection_h connection)
     const AllocationPause pause;
     if (connection == &connectionHandle)
         platform().removeHandle(nameOf(connection));
-    return platform().call("connection_destroy", nameOf(connection));
-}
-
-int connection_get_cellular_state(connection_h connection, connection_cellular_state_e* state)
-{
-    return platform().reply(state, "connection_get_cellular_state", nameOf(connection));
-}
-
-int connection_get_wifi_state(connection_h connection, connection_wifi_state_e* state)
-{
-    return platform().reply(state, "connection_get_wifi_state", nameOf(connection));
-}
-
-int connection_get_bt_state(connection_h connection, connection_bt_state_e* state)
-{
-    return platform().reply(state, "connection_get_bt_state", nameOf(connection));
+    return platform().call("connection_destroy", connection);
 }
 
 char* vconf_get_str(const char* key)
 {
     char* value = nullptr;
-    platform().reply(&value, "vconf_get_str", key);
+    platform().reply("vconf_get_str", &value, key);
     return value;
-}
-
-int alarm_get_current_time(struct tm* date)
-{
-    return platform().reply(date, "alarm_get_current_time");
-}
-
-int storage_get_internal_memory_size(struct statvfs* buf)
-{
-    return platform().reply(buf, "storage_get_internal_memory_size");
 }
 
 // The answer says whether there is such a package: 0 makes a handle.
@@ -628,11 +534,6 @@ int package_info_create(const char* package_id, package_info_h* info)
         platform().addHandle("package " + (*info)->name);
     }
     return result;
-}
-
-int package_info_get_version(package_info_h info, char** version)
-{
-    return platform().reply(version, "package_info_get_version", info);
 }
 
 int package_info_destroy(package_info_h info)

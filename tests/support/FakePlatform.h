@@ -6,12 +6,8 @@
 // the test. A call whose answer was not set fails the test, and so does a log line that breaks the
 // rules that hold for every line.
 //
-// A new platform function takes one definition in FakePlatform.cpp:
-//
-//     int telephony_sim_get_state(telephony_h handle, telephony_sim_state_e* state)
-//     {
-//         return platform().reply(state, "telephony_sim_get_state", handle);
-//     }
+// A new platform function takes one row in platform_replies.def, or, where it does more than answer, a
+// definition in FakePlatform.cpp.
 #ifndef CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
 #define CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
 
@@ -29,6 +25,7 @@
 #include <string>
 #include <vector>
 
+#include <net_connection.h>
 #include <package_info.h>
 #include <runtime_info.h>
 #include <tapi_common.h>
@@ -122,7 +119,7 @@ public:
     int call(const char* function, const Arguments&... arguments);
     // The same for a function that hands a value out through `slot`.
     template <class Value, class... Arguments>
-    int reply(Value* slot, const char* function, const Arguments&... arguments);
+    int reply(const char* function, Value* slot, const Arguments&... arguments);
     std::any valueOf(const std::string& call);
     telephony_handle_list_s openList(unsigned int count);
     void closeList(const telephony_handle_list_s& list);
@@ -166,6 +163,8 @@ inline void writeArgument(std::ostream& out, const char* text)
 // and "no modem" of null.
 void writeArgument(std::ostream& out, telephony_h handle);
 void writeArgument(std::ostream& out, TapiHandle* handle);
+// "connection" of a handle of connection_create().
+void writeArgument(std::ostream& out, connection_h connection);
 // "package NAME" of a handle of package_info_create().
 void writeArgument(std::ostream& out, package_info_h handle);
 template <class Value>
@@ -218,7 +217,7 @@ bool store(const std::any& value, Value* slot)
 }
 
 template <class Value, class... Arguments>
-int FakePlatform::reply(Value* slot, const char* function, const Arguments&... arguments)
+int FakePlatform::reply(const char* function, Value* slot, const Arguments&... arguments)
 {
     const AllocationPause pause;
     const std::string call = callText(function, arguments...);
