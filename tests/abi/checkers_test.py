@@ -76,60 +76,31 @@ class Layers(CheckerTest):
     def test_GoodTreePasses(self):
         self.assert_passes(self.check())
 
-    def test_LibraryIncludingTheBackendFails(self):
-        self.write("src/Bad.cpp", "#include \"../port/backend/Backend.h\"\n")
-        self.assert_fails(self.check(), "src/Bad.cpp: port/backend/Backend.h lies below")
-
-    def test_LibraryIncludingThePortsOwnHeaderFails(self):
+    def test_TreeWithOneWrongLineFails(self):
+        backend, file = '#include "../port/backend/Backend.h"\n', '#include "../simulator/File.h"\n'
         self.write("port/include/port_facts.h", "")
-        self.write("include/Bad.h", "# include <port_facts.h>\n")
-        self.assert_fails(self.check(), "include/Bad.h: port/include/port_facts.h lies below")
-
-    def test_LibraryIncludingALaterStandardHeaderFails(self):
-        self.write("src/Bad.h", "#include <optional>\n")
-        self.assert_fails(self.check(), "src/Bad.h: <optional> is not for the library")
-
-    def test_LibraryIncludingASystemHeaderFails(self):
-        self.write("src/Bad.cpp", "#include <unistd.h>\n")
-        self.assert_fails(self.check(), "src/Bad.cpp: <unistd.h> is not for the library")
-
-    def test_LibraryAskingForThePlatformFails(self):
-        for line, macro in (("#ifdef __linux__", "__linux__"), ("  # if FOO > 1", "FOO"),
-                            ("#elif defined(CORESYSTEM_PORT)", "CORESYSTEM_PORT")):
-            self.write("src/Bad.cpp", f"{line}\n#endif\n")
-            self.assert_fails(self.check(), f"src/Bad.cpp: asks the preprocessor for {macro}")
-
-    def test_PlatformHeaderIncludingTheBackendFails(self):
-        self.write("port/api/bad.h", "#include \"../backend/Backend.h\"\n")
-        self.assert_fails(self.check(), "port/api/bad.h: includes port/backend/Backend.h")
-
-    def test_ShimReachingGLibFails(self):
-        self.write("port/shim/bad.cpp", "#include <glib.h>\n")
-        self.assert_fails(self.check(), "port/shim/bad.cpp: a shim reaches <glib.h>")
-
-    def test_ShimReachingTomlThroughAHeaderFails(self):
         self.write("port/backend/Bad.h", "#include <toml++/toml.h>\n")
-        self.write("port/shim/bad.cpp", "#include \"../backend/Bad.h\"\n")
-        self.assert_fails(self.check(), "port/shim/bad.cpp: a shim reaches <toml++/toml.h>")
-
-    def test_ShimReachingOpenSslFails(self):
-        self.write("port/shim/bad.cpp", "#include <openssl/evp.h>\n")
-        self.assert_fails(self.check(), "port/shim/bad.cpp: a shim reaches <openssl/evp.h>")
-
-    def test_ShimReachingABackendsInsideFails(self):
-        self.write("port/shim/bad.cpp", "#include \"../simulator/File.h\"\n")
-        self.assert_fails(self.check(), "port/shim/bad.cpp: a shim reaches port/simulator/File.h")
-
-    def test_BackendsReachingEachOtherFail(self):
-        self.write("port/linux/bad.cpp", "#include \"../simulator/File.h\"\n")
-        self.assert_fails(self.check(), "port/linux/bad.cpp: reaches port/simulator/File.h")
-        self.write("port/simulator/bad.cpp", "#include \"../linux/Bus.h\"\n")
-        self.assert_fails(self.check(), "port/simulator/bad.cpp: reaches port/linux/Bus.h")
-
-    def test_DeviceFilesAndTheCommandReachingABackendFail(self):
-        for folder in ("devicefile", "cli"):
-            self.write(f"{folder}/bad.cpp", "#include \"../port/simulator/File.h\"\n")
-            self.assert_fails(self.check(), f"{folder}/bad.cpp: includes port/simulator/File.h")
+        for path, text, message in (
+                ("src/Bad.cpp", backend, "port/backend/Backend.h lies below"),
+                ("include/Bad.h", "# include <port_facts.h>\n", "port/include/port_facts.h lies below"),
+                ("src/Bad.h", "#include <optional>\n", "<optional> is not for the library"),
+                ("src/Bad.cpp", "#include <unistd.h>\n", "<unistd.h> is not for the library"),
+                ("src/Bad.cpp", "#ifdef __linux__\n#endif\n", "asks the preprocessor for __linux__"),
+                ("src/Bad.cpp", "  # if FOO > 1\n#endif\n", "asks the preprocessor for FOO"),
+                ("src/Bad.cpp", "#elif defined(PORT)\n#endif\n", "asks the preprocessor for PORT"),
+                ("port/api/bad.h", '#include "../backend/Backend.h"\n', "includes port/backend/Backend.h"),
+                ("port/shim/bad.cpp", "#include <glib.h>\n", "a shim reaches <glib.h>"),
+                ("port/shim/bad.cpp", '#include "../backend/Bad.h"\n', "a shim reaches <toml++/toml.h>"),
+                ("port/shim/bad.cpp", "#include <openssl/evp.h>\n", "a shim reaches <openssl/evp.h>"),
+                ("port/shim/bad.cpp", file, "a shim reaches port/simulator/File.h"),
+                ("port/linux/bad.cpp", file, "reaches port/simulator/File.h"),
+                ("port/simulator/bad.cpp", '#include "../linux/Bus.h"\n', "reaches port/linux/Bus.h"),
+                ("devicefile/bad.cpp", '#include "../port/simulator/File.h"\n', "includes port/simulator/File.h"),
+                ("cli/bad.cpp", '#include "../port/simulator/File.h"\n', "includes port/simulator/File.h")):
+            with self.subTest(path=path, text=text):
+                self.write(path, text)
+                self.assert_fails(self.check(), f"{path}: {message}")
+                (self.root / path).unlink()
 
 
 class Symbols(CheckerTest):
@@ -288,9 +259,6 @@ class Baseline(CheckerTest):
     def test_SameInterfacePasses(self):
         self.assert_passes(self.check("", ""))
 
-    def test_ChangeInsidePasses(self):
-        self.assert_passes(self.check("megabytes > ++count_", "megabytes > 1 + count_"))
-
     def test_RecordedBaselineHoldsNoFolder(self):
         self.assertNotIn(str(self.root), pathlib.Path(self.baseline).read_text())
 
@@ -298,24 +266,10 @@ class Baseline(CheckerTest):
         self.assert_told(self.check("API bool IsEnough", "bool IsEnough"),
                          "Removed function", "Library::IsEnough(double)")
 
-    def test_ChangedParameterIsNamed(self):
-        self.assert_told(self.check("IsEnough(double megabytes)", "IsEnough(float megabytes)"),
-                         "Library::IsEnough(double)", "Library::IsEnough(float)")
-
-
-    def test_NewVirtualFunctionOfTheListenerIsNamed(self):
-        self.assert_told(self.check("virtual void OnSecond", "virtual void OnNew() = 0;\n"
-                                    "    virtual void OnSecond"),
-                         "Listener::OnNew()", "vtable")
-
     def test_OtherOrderOfTheListenerIsNamed(self):
         first, second = "virtual void OnFirst(int state) = 0;", "virtual void OnSecond(bool enabled) = 0;"
         self.assert_told(self.check(f"{first}\n    {second}", f"{second}\n    {first}"),
                          "Listener::OnFirst(int)", "vtable")
-
-    def test_GrownClassIsNamed(self):
-        self.assert_told(self.check("int count_ = 0;", "int count_ = 0; int more_ = 0;"),
-                         "type size changed")
 
 
 if __name__ == "__main__":
