@@ -106,6 +106,11 @@ struct Subscriptions {
 /// The most slots that a device may have. Who was told of a slot may look it up in any later list.
 constexpr std::size_t SLOT_LIMIT = 64;
 
+inline Error noTelephony()
+{
+    return notSupported("no telephony");
+}
+
 class Telephony {
 public:
     virtual ~Telephony() = default;
@@ -114,44 +119,44 @@ public:
     /// NotSupported: this device has no telephony; NotAvailable: no service answers.
     virtual Result<Sourced<std::vector<SlotName>>> slots()
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     virtual Result<Sourced<Card>> card(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     /// NoSim: there is no card, or it is locked or not ready; the reason says which.
     virtual Result<Sourced<Imsi>> imsi(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     /// The card's own number; nothing when the card holds none, empty where a device file wants
     /// the platform to succeed without one. NoSim as imsi().
     virtual Result<Sourced<std::optional<std::string>>> number(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     /// The modem's IMEI (3GPP TS 23.003), with or without a card.
     virtual Result<Fact> imei(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     virtual Result<Sourced<ServiceState>> service(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     virtual Result<Sourced<bool>> roaming(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     virtual Result<Sourced<Subscriptions>> subscriptions()
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     /// Whether text messages can be sent and received.
     virtual Result<Sourced<bool>> smsReady(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
 
     // No call of the platform asks for what follows.
@@ -159,12 +164,12 @@ public:
     /// Of every slot, in the order of slots(), all of one moment.
     virtual Result<std::vector<ModemReport>> reports()
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
     /// The ICCID of the card (ITU-T E.118), also while it is locked. NoSim: there is none.
     virtual Result<Fact> iccid(const SlotName&)
     {
-        return notSupported("no telephony");
+        return noTelephony();
     }
 };
 

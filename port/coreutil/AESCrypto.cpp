@@ -159,6 +159,7 @@ bool currentKey(Key& key, std::string& problem)
 } // namespace
 
 const unsigned AESCrypto::KEY_SIZE;
+static_assert(AESCrypto::KEY_SIZE == std::tuple_size<Key>::value, "what callers are told");
 
 AESCrypto::AESCrypto() = default;
 

@@ -13,14 +13,14 @@ namespace port {
 // A key and what reads it; no device of the port has what a key without a reader stands for.
 template <typename T>
 struct KeyRow {
-    int key;
+    int key = 0; // none where the keys are texts
     Question question{};
     Result<Sourced<T>> (*read)() = nullptr;
 };
 
 // The row of a plain fact.
 template <Question question>
-constexpr KeyRow<typename PlainFact<question>::Value> fact(int key)
+constexpr KeyRow<typename PlainFact<question>::Value> fact(int key = 0)
 {
     return {key, question, [] { return backend().get<question>(); }};
 }

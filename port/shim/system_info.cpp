@@ -20,10 +20,10 @@ struct Key {
 };
 
 constexpr Key KEYS[] = {
-    {"tizen.org/system/tizenid", fact<Question::PlatformId>(0)},
-    {"tizen.org/system/platform.name", fact<Question::PlatformName>(0)},
-    {"tizen.org/feature/platform.version", fact<Question::PlatformVersion>(0)},
-    {"tizen.org/system/model_name", fact<Question::ModelName>(0)},
+    {"tizen.org/system/tizenid", fact<Question::PlatformId>()},
+    {"tizen.org/system/platform.name", fact<Question::PlatformName>()},
+    {"tizen.org/feature/platform.version", fact<Question::PlatformVersion>()},
+    {"tizen.org/system/model_name", fact<Question::ModelName>()},
 };
 
 const port::KeyRow<std::string>* findRow(const char* name)

@@ -189,6 +189,14 @@ TEST_F(PlayedServices, TellInTheOrderOfTheRealOnes)
     EXPECT_THAT(heard("org.bluez", text), ElementsAre("bluez/hci0 PropertiesChanged"));
 }
 
+TEST_F(PlayedServices, EndAConnectionOverBluetoothWhenTheyAreAsked)
+{
+    const std::string peer = std::string(ADAPTER) + "/dev_00_00_5E_00_53_03";
+    played_.become(with(PHONE, {{"network.bluetooth", "connected"}}));
+    EXPECT_EQ(call("org.bluez", peer, "org.bluez.Device1", "Disconnect"), "()");
+    EXPECT_EQ(value("network.bluetooth"), "disconnected");
+}
+
 TEST_F(PlayedServices, WriteWhatAClientChangesIntoTheFile)
 {
     EXPECT_EQ(set(NM, NM_PATH, NM, "WirelessEnabled", "false"), "()");

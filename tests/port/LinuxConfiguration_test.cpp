@@ -65,9 +65,16 @@ TEST_F(LinuxConfigurationTest, ReasonNamesEveryFile)
     EXPECT_EQ("error: " + user + ": No such file or directory; " + machine +
                   ": No such file or directory",
               ask(KEY));
-    tree.write("/user.ini", "[db/csc]\nsalescode=\n");
-    EXPECT_EQ("error: " + user + ": it is empty; " + machine + ": No such file or directory",
-              ask(KEY));
+    for (const auto& [text, reason] :
+         {std::pair("[db/csc]\nsalescode=\n", "it is empty"),
+          {"[db/csc]\n", "it has no such key"},
+          {"[other]\n", "it has no such key"},
+          {"[db/csc]\nsalescode=\xff\n", "it has no readable text for the key"},
+          {"[db/csc\n", "it is no file of groups and keys"}}) {
+        tree.write("/user.ini", text);
+        EXPECT_EQ("error: " + user + ": " + reason + "; " + machine + ": No such file or directory",
+                  ask(KEY));
+    }
 }
 
 // The file may be one that the asker must not read, as a link of a set-user-ID program's caller.
