@@ -170,11 +170,6 @@ void fake::writeArgument(std::ostream& out, telephony_h handle)
     out << (handle != nullptr ? "slot " + std::to_string(handle->slot) : "no slot");
 }
 
-void fake::writeArgument(std::ostream& out, connection_h connection)
-{
-    out << nameOf(connection);
-}
-
 void fake::writeArgument(std::ostream& out, package_info_h handle)
 {
     out << "package " << handle->name;
@@ -514,7 +509,7 @@ int connection_destroy(connection_h connection)
     const AllocationPause pause;
     if (connection == &connectionHandle)
         platform().removeHandle(nameOf(connection));
-    return platform().call("connection_destroy", connection);
+    return platform().call("connection_destroy", nameOf(connection));
 }
 
 char* vconf_get_str(const char* key)

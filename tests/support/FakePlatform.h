@@ -25,7 +25,6 @@
 #include <string>
 #include <vector>
 
-#include <net_connection.h>
 #include <package_info.h>
 #include <runtime_info.h>
 #include <tapi_common.h>
@@ -163,8 +162,6 @@ inline void writeArgument(std::ostream& out, const char* text)
 // and "no modem" of null.
 void writeArgument(std::ostream& out, telephony_h handle);
 void writeArgument(std::ostream& out, TapiHandle* handle);
-// "connection" of a handle of connection_create().
-void writeArgument(std::ostream& out, connection_h connection);
 // "package NAME" of a handle of package_info_create().
 void writeArgument(std::ostream& out, package_info_h handle);
 template <class Value>

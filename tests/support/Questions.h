@@ -63,7 +63,8 @@ auto withHandles(Use use)
 /// Gives each question to `rows`, by one of its methods:
 ///   plain(name, ask)          ask() gives the answer: a truth, a text to free, a list to keep
 ///   text(name, ask)           ask(slot) gives a code, and in *slot a text to free
-///   ofSlot(name, other, ask)  ask(slot, &answer) tells whether there is an answer; `other` is none
+///   ofSlot(name, other, ask)  ask(slot, &answer) tells whether there is an answer; `other` is none. Also for a
+///                             number of the whole device, which leaves the slot alone
 /// The listener is the caller's own.
 template <typename Rows>
 void listTo(Rows& rows)
