@@ -354,6 +354,12 @@ TEST_F(TelephonyListTest, NoExceptionLeaves)
     EXPECT_EQ(nullptr, other.handle);
 }
 
+TEST_F(TelephonyTest, WhatABackendDoesNotAnswerIsNoTelephony)
+{
+    EXPECT_EQ("no telephony", telephony.iccid("modem0").error().reason);
+    EXPECT_EQ("no telephony", telephony.reports().error().reason);
+}
+
 TEST_F(TelephonyTest, ThreadsMayOpenAskAndReleaseAtOnce)
 {
     together(8, [](int) {
