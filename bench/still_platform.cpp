@@ -63,13 +63,8 @@ int answer(Value* slot, const Arguments&... /*arguments*/)
 template <class... Arguments>
 int answer(char** slot, const Arguments&... /*arguments*/)
 {
-    *slot = strdup("ko_KR.UTF-8"); // the library keeps some for good
+    *slot = strdup("ko_KR.UTF-8");
     return 0;
-}
-
-connection_h nameOf(connection_h connection)
-{
-    return connection;
 }
 
 int answer(struct statvfs* slot)
@@ -80,6 +75,19 @@ int answer(struct statvfs* slot)
     return 0;
 }
 
+template <class Handle>
+int answerKept(char** slot, Handle /*handle*/)
+{
+    static char text[] = "+15551230001";
+    *slot = text;
+    return 0;
+}
+
+connection_h nameOf(connection_h connection)
+{
+    return connection;
+}
+
 } // namespace
 
 extern "C" {
@@ -88,6 +96,11 @@ extern "C" {
     int name parameters              \
     {                                \
         return answer(__VA_ARGS__);  \
+    }
+#define KEPT(name, parameters, ...)     \
+    int name parameters                 \
+    {                                   \
+        return answerKept(__VA_ARGS__); \
     }
 #include "support/platform_replies.def"
 

@@ -3,6 +3,7 @@
 // application then gets is looked at: the library, the port and the simulator as they are.
 #include <CoreSystem.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <fstream>
@@ -90,6 +91,9 @@ available_blocks = 500000
 [packages]
 app = "1.2"
 )";
+
+// The line of a fault that is described behind it.
+const auto FIRST_FAULT = std::count(std::begin(HEALTHY), std::end(HEALTHY), '\n') + 2;
 
 // Every switch and radio the other way round.
 const char CHANGED[] = R"(schema = 1
@@ -767,12 +771,12 @@ std::string serial()
 TEST_F(FaultsTest, SerialNumberFailsOverTheBus)
 {
     EXPECT_THAT(observe("", serial), StartsWith("0 SN-4711"));
-    EXPECT_THAT(observe("GetSerial = \"org.freedesktop.DBus.Error.AccessDenied\"\n", serial),
-                AllOf(StartsWith("2 null"),
-                      HasSubstr(" | g_dbus_message_to_gerror() failed:[9:GDBus.Error:org."
-                                "freedesktop.DBus.Error.AccessDenied: " +
-                                path + ":"),
-                      HasSubstr(": GetSerial fails with ")));
+    EXPECT_THAT(
+        observe("GetSerial = \"org.freedesktop.DBus.Error.AccessDenied\"\n", serial),
+        AllOf(StartsWith("2 null"),
+              HasSubstr(" | g_dbus_message_to_gerror() failed:[9:GDBus.Error:org."
+                        "freedesktop.DBus.Error.AccessDenied: " +
+                        path + ":" + std::to_string(FIRST_FAULT) + ": GetSerial fails with ")));
     EXPECT_THAT(observe("GetSerial = \"not_a_string\"\n", serial), StartsWith("2 null"));
     EXPECT_EQ("0 SN-4711, maybe late", observe("GetSerial = { delay_ms = 700 }\n", serial));
 }
