@@ -23,6 +23,7 @@
 #include "support/HostileBus.h"
 #include "support/Pauses.h"
 #include "support/PrivateBus.h"
+#include "support/Questions.h"
 #include "support/ScriptedService.h"
 #include "support/TemporaryTree.h"
 #include "support/Usage.h"
@@ -50,21 +51,6 @@ public:
     void OnWifiStatusChanged(bool, void*) override {}
 };
 
-void release(char* text)
-{
-    std::free(text);
-}
-
-template <class... Arguments>
-std::function<void()> text(int (CoreSystem::*ask)(char**, Arguments...), Arguments... arguments)
-{
-    return [=] {
-        char* answer = nullptr;
-        (CoreSystem::GetInstance()->*ask)(&answer, arguments...);
-        release(answer);
-    };
-}
-
 // A slot that was told of is looked up in whatever list there is by then.
 void askSlots()
 {
@@ -80,29 +66,23 @@ void askSlots()
     CoreSystem::GetInstance()->DeinitHandleList(&list);
 }
 
-const std::vector<std::function<void()>>& questions()
+// All but the serial number, which a dead bus keeps for as long as it likes.
+const std::vector<std::function<void()>>& allQuestions()
 {
-    static NoListener& listener = *new NoListener;
-    static const auto& all = *new std::vector<std::function<void()>>{
-        text(&CoreSystem::GetDeviceName),
-        text(&CoreSystem::GetTizenIdN),
-        text(&CoreSystem::GetSWVersion),
-        text(&CoreSystem::GetModelName),
-        text(&CoreSystem::GetDeviceLanguageCode, true),
-        text(&CoreSystem::GetMCCFromSim),
-        text(&CoreSystem::GetMNCFromSim),
-        text(&CoreSystem::GetPhoneNumberFromSim),
-        text(&CoreSystem::GetIMEI),
-        askSlots,
-        [] { CoreSystem::GetInstance()->IsSimExist(); },
-        [] { CoreSystem::GetInstance()->IsNetworkConnected(true, true); },
-        [] { CoreSystem::GetInstance()->IsFlightMode(); },
-        [] { CoreSystem::GetInstance()->IsMobileData(); },
-        [] { CoreSystem::GetInstance()->IsDataRoamingEnabled(); },
-        [] { release(CoreSystem::GetInstance()->GetCSC()); },
-        [] { CoreSystem::GetInstance()->SetConnectionEventListener(&listener, nullptr); },
-        [] { CoreSystem::GetInstance()->SetConnectionEventListener(nullptr, nullptr); },
-    };
+    static const auto& all = *new auto([] {
+        static NoListener listener;
+        auto* const library = CoreSystem::GetInstance();
+        std::vector<std::function<void()>> rows{
+            askSlots, [=] { library->SetConnectionEventListener(&listener, nullptr); },
+            [=] { library->SetConnectionEventListener(nullptr, nullptr); }};
+        const auto add = [&](const std::string& name, const std::function<void()>& ask) {
+            if (name != "GetDeviceUniqueID")
+                rows.push_back(ask);
+        };
+        questions::Unanswered<decltype(add)> unanswered(add);
+        questions::listTo(unanswered);
+        return rows;
+    }());
     return all;
 }
 
@@ -155,7 +135,7 @@ private:
         std::minstd_rand random(number + 1);
         while (!done_) {
             const auto start = Clock::now();
-            questions()[random() % questions().size()]();
+            allQuestions()[random() % allQuestions().size()]();
             const long took = millisecondsSince(start);
             for (long worst = worst_; took > worst && !worst_.compare_exchange_weak(worst, took);)
                 continue;
@@ -180,7 +160,7 @@ protected:
     // After the first questions: what is made once is there.
     static Usage usageAtStart()
     {
-        for (const auto& question : questions())
+        for (const auto& question : allQuestions())
             question();
         return {};
     }

@@ -3,6 +3,7 @@
 #ifndef TESTS_SUPPORT_QUESTIONS_H
 #define TESTS_SUPPORT_QUESTIONS_H
 
+#include <cstdlib>
 #include <string>
 
 #include <CoreSystem.h>
@@ -133,6 +134,49 @@ void listTo(Rows& rows)
         return library().GetSimInfo(slot.modem, &identity->mcc, &identity->mnc, &identity->msin);
     });
 }
+
+// Rows for whoever asks and does not look at the answers: add(name, ask) gets each question, whose answer is released.
+template <typename Add>
+class Unanswered {
+public:
+    explicit Unanswered(Add add) : add_(add) {}
+
+    template <typename Plain>
+    void plain(const char* name, Plain ask)
+    {
+        add_(name, [ask] { release(ask()); });
+    }
+    template <typename Text>
+    void text(const char* name, Text ask)
+    {
+        add_(name, [ask] {
+            char* answer = nullptr;
+            ask(&answer);
+            release(answer);
+        });
+    }
+    template <typename Answer, typename OfSlot>
+    void ofSlot(const char* name, const Answer& /*other*/, OfSlot ask)
+    {
+        add_(name, [ask] {
+            static char modem[] = "modem0";
+            Answer answer = {};
+            ask({0, modem}, &answer); // a text is the platform's own here
+        });
+    }
+
+private:
+    static void release(char* text)
+    {
+        std::free(text);
+    }
+    template <typename Answer>
+    static void release(const Answer& /*kept*/)
+    {
+    }
+
+    Add add_;
+};
 
 } // namespace questions
 
