@@ -7,11 +7,9 @@
 #include <condition_variable>
 #include <cstdlib>
 #include <exception>
-#include <functional>
 #include <memory>
 #include <mutex>
 #include <optional>
-#include <stdexcept>
 #include <thread>
 #include <utility>
 
@@ -35,7 +33,7 @@ using coresystem_port::Origins;
 using coresystem_port::Question;
 
 // Asks the library; the origins are those of what it asks.
-using Ask = std::function<Fact(const Origins&)>;
+using Ask = Fact (*)(const Origins&);
 
 // A text that the library handed out, which is released; nothing for null.
 std::optional<std::string> taken(char* slot)
@@ -93,18 +91,16 @@ std::string reasonOfNull(const Origins& origins, Question question)
 }
 
 // A question that fails with a code of the platform.
-Ask text(Question question, int (CoreSystem::*read)(char**))
+template <Question question, int (CoreSystem::*read)(char**)>
+Fact text(const Origins& origins)
 {
-    return [=](const Origins& origins) {
-        char* slot = nullptr;
-        const int code = (library().*read)(&slot);
-        const auto value = taken(slot);
-        // After a failed read the slot holds nothing that the device said.
-        if (code != 0)
-            return noAnswer(reasonOf(origins, question, code));
-        return value ? answer(origins, question, *value)
-                     : noAnswer(reasonOfNull(origins, question));
-    };
+    char* slot = nullptr;
+    const int code = (library().*read)(&slot);
+    const auto value = taken(slot);
+    // After a failed read the slot holds nothing that the device said.
+    if (code != 0)
+        return noAnswer(reasonOf(origins, question, code));
+    return value ? answer(origins, question, *value) : noAnswer(reasonOfNull(origins, question));
 }
 
 std::optional<std::string> readLanguage(bool asIso639, int& code)
@@ -132,20 +128,18 @@ Fact withErrata(Fact fact, const std::string& language)
 }
 
 // English when the platform does not say, which is not the device's language.
-Ask language(bool asIso639)
+template <bool asIso639>
+Fact language(const Origins& origins)
 {
-    return [=](const Origins& origins) {
-        int code = 0;
-        const auto value = readLanguage(asIso639, code);
-        if (code != 0 || !origins.of(Question::Language).available)
-            return noAnswer(
-                butTold(reasonOf(origins, Question::Language, code), value.value_or("nothing")));
-        if (!asIso639)
-            return value ? answer(origins, Question::Language, *value) : noAnswer("out of memory");
-        const std::string own = readLanguage(false, code).value_or("");
-        return withErrata(value ? answer(origins, Question::Language, *value) : noIso639Code(own),
-                          own);
-    };
+    int code = 0;
+    const auto value = readLanguage(asIso639, code);
+    if (code != 0 || !origins.of(Question::Language).available)
+        return noAnswer(
+            butTold(reasonOf(origins, Question::Language, code), value.value_or("nothing")));
+    if (!asIso639)
+        return value ? answer(origins, Question::Language, *value) : noAnswer("out of memory");
+    const std::string own = readLanguage(false, code).value_or("");
+    return withErrata(value ? answer(origins, Question::Language, *value) : noIso639Code(own), own);
 }
 
 Fact askSimAvailable(const Origins& origins)
@@ -161,21 +155,20 @@ Fact askSimAvailable(const Origins& origins)
 }
 
 // The first slot's that has one.
-Ask ofSim(Question question, int (CoreSystem::*read)(char**))
+template <Question question, int (CoreSystem::*read)(char**)>
+Fact ofSim(const Origins& origins)
 {
-    return [=](const Origins& origins) {
-        char* slot = nullptr;
-        const int code = (library().*read)(&slot);
-        const auto value = taken(slot); // success without telephony leaves it empty
-        return code == 0 && value ? answer(origins, question, *value)
-                                  : noAnswer(cli::whyNoSlotAnswers(origins, question));
-    };
+    char* slot = nullptr;
+    const int code = (library().*read)(&slot);
+    const auto value = taken(slot); // success without telephony leaves it empty
+    return code == 0 && value ? answer(origins, question, *value)
+                              : noAnswer(cli::whyNoSlotAnswers(origins, question));
 }
 
 // The country that issued the SIM, not the one where it is.
 Fact askSimCountry(const Origins& origins)
 {
-    const Fact mcc = ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)(origins);
+    const Fact mcc = ofSim<Question::SimIdentity, &CoreSystem::GetMCCFromSim>(origins);
     if (mcc.value.is_null())
         return mcc;
     const cli::ValueOrReason country = cli::askCountryOf(mcc.value.get<std::string>());
@@ -201,67 +194,67 @@ Fact askRoamingOfFirstSlot(const Origins& origins)
 }
 
 // A switch that cannot be read is told to applications as off.
-Ask yesOrNo(std::vector<Question> questions, std::function<bool()> read)
+Fact yesOrNo(const Origins& origins, Question question, bool isOn)
 {
-    return [questions = std::move(questions), read = std::move(read)](const Origins& origins) {
-        const bool isOn = read();
-        std::vector<std::string> sources;
-        std::vector<std::string> reasons;
-        for (const Question question : questions) {
-            const auto origin = origins.of(question);
-            (origin.available ? sources : reasons)
-                .push_back(origin.available ? origin.source : origin.reason);
-        }
-        if (!isOn && !reasons.empty())
-            return noAnswer(butTold(joined(reasons), "no"));
-        return Fact{"", isOn, joined(sources), ""};
-    };
+    const auto origin = origins.of(question);
+    if (!isOn && !origin.available)
+        return noAnswer(butTold(joined({origin.reason}), "no"));
+    return {"", isOn, origin.available ? joined({origin.source}) : "", ""};
+}
+
+template <Question question, bool (CoreSystem::*read)()>
+Fact switchState(const Origins& origins)
+{
+    return yesOrNo(origins, question, (library().*read)());
+}
+
+Fact askStorage(const Origins& origins)
+{
+    return yesOrNo(origins, Question::Storage, library().IsSystemMemoryAvailable(0));
 }
 
 // The state of a link or of a modem's network, which only the port knows; where there is none, the
 // reason stands for a source.
-Ask alone(Question question)
+template <Question question>
+Fact alone(const Origins& /*ofTheLibrary*/)
 {
-    return [question](const Origins&) {
-        const auto told = coresystem_port::ask(question);
-        const auto& origin = told.origin;
-        const cli::ValueOrReason value = cli::answerOf(told);
-        if (value.value.is_null())
-            return noAnswer(origin.reason);
-        return Fact{"", value.value, origin.available ? origin.source : origin.reason, ""};
-    };
+    const auto told = coresystem_port::ask(question);
+    const auto& origin = told.origin;
+    const cli::ValueOrReason value = cli::answerOf(told);
+    if (value.value.is_null())
+        return noAnswer(origin.reason);
+    return {"", value.value, origin.available ? origin.source : origin.reason, ""};
 }
 
 // Treats a link that is not there as not connected; one that cannot be asked may be.
-Ask connected(bool overWifi, bool overBluetooth)
+template <bool overWifi, bool overBluetooth>
+Fact connected(const Origins& origins)
 {
     std::vector<Question> counted = {Question::Cellular};
     if (overWifi)
         counted.push_back(Question::Wifi);
     if (overBluetooth)
         counted.push_back(Question::Bluetooth);
-    return [=](const Origins& origins) {
-        const bool isOn = library().IsNetworkConnected(overWifi, overBluetooth);
-        std::vector<std::string> sources;
-        std::vector<std::string> missing;
-        std::vector<std::string> unknown;
-        for (const Question question : counted) {
-            const auto origin = origins.of(question);
-            if (origin.available)
-                sources.push_back(origin.source);
-            else
-                (isOn || origin.isMissing ? missing : unknown).push_back(origin.reason);
-        }
-        if (!unknown.empty())
-            return noAnswer(butTold(joined(unknown), "no"));
-        return Fact{"", isOn, joined(sources.empty() ? missing : sources), ""};
-    };
+    const bool isOn = library().IsNetworkConnected(overWifi, overBluetooth);
+    std::vector<std::string> sources;
+    std::vector<std::string> missing;
+    std::vector<std::string> unknown;
+    for (const Question question : counted) {
+        const auto origin = origins.of(question);
+        if (origin.available)
+            sources.push_back(origin.source);
+        else
+            (isOn || origin.isMissing ? missing : unknown).push_back(origin.reason);
+    }
+    if (!unknown.empty())
+        return noAnswer(butTold(joined(unknown), "no"));
+    return Fact{"", isOn, joined(sources.empty() ? missing : sources), ""};
 }
 
 // As a person means it: also by cable, and by what only the network's manager knows.
 Fact askConnectedAny(const Origins& origins)
 {
-    const Fact told = connected(true, true)(origins);
+    const Fact told = connected<true, true>(origins);
     if (told.value == true)
         return told;
     const auto ethernet = coresystem_port::ask(Question::Ethernet);
@@ -272,7 +265,7 @@ Fact askConnectedAny(const Origins& origins)
         return {"", true, connectivity.origin.source, ""};
     // A connection over Bluetooth is made by who tells of the connectivity.
     if (told.value.is_null() && connectivity.word == "none" &&
-        connected(true, false)(origins).value == false)
+        connected<true, false>(origins).value == false)
         return {"", false, connectivity.origin.source, ""};
     return ethernet.word.empty() ? noAnswer(joined({ethernet.origin.reason, told.reason})) : told;
 }
@@ -307,123 +300,87 @@ Fact askSerial(const Origins&)
     return serial ? Fact{"", *serial, DAEMON, ""} : noAnswer(cli::whyNoSerial(code));
 }
 
+// The facts by the names that the command has for them, with the place in a device file of those in facts.def.
 struct FactRow {
-    const char* name;
-    Ask ask;
-};
-
-// The facts of facts.def, by their places in a device file, that a name of the command stands for.
-struct Place {
-    const char* name;
+    std::string_view name;
     std::string_view section;
     std::string_view key;
+    Ask ask;
 };
-constexpr Place PLACES[] = {
-    {"device_name", "settings", "device_name"},
-    {"tizen_id", "device", "platform_id"},
-    {"platform_name", "device", "platform_name"},
-    {"sw_version", "device", "platform_version"},
-    {"model_name", "device", "model_name"},
-    {"language_code", "settings", "language"},
-    {"sim_mcc", "slot", "mcc"},
-    {"sim_mnc", "slot", "mnc"},
-    {"phone_number", "slot", "number"},
-    {"imei", "slot", "imei"},
-    {"roaming", "slot", "roaming"},
-    {"flight_mode", "settings", "flight_mode"},
-    {"data_roaming", "settings", "data_roaming"},
-    {"mobile_data", "settings", "mobile_data"},
-    {"sales_code", "settings", "sales_code"},
-    {"device_serial", "device", "serial"},
-    // No public question of the library's is about these alone.
-    {"", "settings", "font_size"},
-    {"", "settings", "packet_data"},
+constexpr FactRow ROWS[] = {
+    {"device_name", "settings", "device_name",
+     text<Question::DeviceName, &CoreSystem::GetDeviceName>},
+    {"tizen_id", "device", "platform_id", text<Question::PlatformId, &CoreSystem::GetTizenIdN>},
+    {"platform_name", "device", "platform_name",
+     text<Question::PlatformName, &CoreSystem::GetPlatformName>},
+    {"sw_version", "device", "platform_version",
+     text<Question::PlatformVersion, &CoreSystem::GetSWVersion>},
+    {"model_name", "device", "model_name", text<Question::ModelName, &CoreSystem::GetModelName>},
+    {"language_code", "settings", "language", language<false>},
+    {"language_code_iso639_2", "", "", language<true>},
+    {"sim_available", "", "", askSimAvailable},
+    {"sim_mcc", "slot", "mcc", ofSim<Question::SimIdentity, &CoreSystem::GetMCCFromSim>},
+    {"sim_mnc", "slot", "mnc", ofSim<Question::SimIdentity, &CoreSystem::GetMNCFromSim>},
+    {"sim_country", "", "", askSimCountry},
+    {"phone_number", "slot", "number",
+     ofSim<Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim>},
+    {"imei", "slot", "imei", askImei},
+    {"roaming", "slot", "roaming", askRoamingOfFirstSlot},
+    {"flight_mode", "settings", "flight_mode",
+     switchState<Question::FlightMode, &CoreSystem::IsFlightMode>},
+    {"data_roaming", "settings", "data_roaming",
+     switchState<Question::DataRoaming, &CoreSystem::IsDataRoamingEnabled>},
+    {"mobile_data", "settings", "mobile_data",
+     switchState<Question::MobileData, &CoreSystem::IsMobileData>},
+    {"cellular", "", "", alone<Question::Cellular>},
+    {"operator", "", "", alone<Question::OperatorName>},
+    {"operator_mcc", "", "", alone<Question::OperatorMcc>},
+    {"operator_mnc", "", "", alone<Question::OperatorMnc>},
+    {"access_technology", "", "", alone<Question::AccessTechnology>},
+    {"signal", "", "", alone<Question::SignalStrength>},
+    {"wifi", "", "", alone<Question::Wifi>},
+    {"ssid", "", "", alone<Question::Ssid>},
+    {"bluetooth", "", "", alone<Question::Bluetooth>},
+    {"ethernet", "", "", alone<Question::Ethernet>},
+    {"connectivity", "", "", alone<Question::Connectivity>},
+    {"connected_cellular", "", "", connected<false, false>},
+    {"connected_cellular_or_wifi", "", "", connected<true, false>},
+    {"connected_cellular_or_bluetooth", "", "", connected<false, true>},
+    {"connected_any", "", "", askConnectedAny},
+    {"sales_code", "settings", "sales_code", askSalesCode},
+    {"storage_available", "", "", askStorage},
+    {"device_serial", "device", "serial", askSerial},
 };
 
-constexpr bool hasPlace(const port::FactRow& row)
+// No public question of the library's is about these alone.
+constexpr const char* NOT_SHOWN[] = {"font_size", "packet_data"};
+
+constexpr bool isShownOrNotMeantToBe(const port::FactRow& fact)
 {
-    for (const Place& place : PLACES)
-        if (place.section == row.section && place.key == row.key)
+    for (const FactRow& row : ROWS)
+        if (row.section == fact.section && row.key == fact.key)
+            return true;
+    for (const std::string_view key : NOT_SHOWN)
+        if (key == fact.key)
             return true;
     return false;
 }
-#define FACT(number, question, ...)                                   \
-    static_assert(hasPlace(port::PlainFact<Question::question>::row), \
+#define FACT(number, question, ...)                                                \
+    static_assert(isShownOrNotMeantToBe(port::PlainFact<Question::question>::row), \
                   "the command shows every plain fact, or says that it does not");
 #include "port/facts/facts.def"
-
-bool isIdentity(const std::string& name)
-{
-    for (const Place& place : PLACES)
-        if (place.name == name)
-            return port::isPrivate(place.section, place.key);
-    return false;
-}
-
-std::vector<FactRow> allFacts()
-{
-    return {
-        {"device_name", text(Question::DeviceName, &CoreSystem::GetDeviceName)},
-        {"tizen_id", text(Question::PlatformId, &CoreSystem::GetTizenIdN)},
-        {"platform_name", text(Question::PlatformName, &CoreSystem::GetPlatformName)},
-        {"sw_version", text(Question::PlatformVersion, &CoreSystem::GetSWVersion)},
-        {"model_name", text(Question::ModelName, &CoreSystem::GetModelName)},
-        {"language_code", language(false)},
-        {"language_code_iso639_2", language(true)},
-        {"sim_available", askSimAvailable},
-        {"sim_mcc", ofSim(Question::SimIdentity, &CoreSystem::GetMCCFromSim)},
-        {"sim_mnc", ofSim(Question::SimIdentity, &CoreSystem::GetMNCFromSim)},
-        {"sim_country", askSimCountry},
-        {"phone_number", ofSim(Question::PhoneNumber, &CoreSystem::GetPhoneNumberFromSim)},
-        {"imei", askImei},
-        {"roaming", askRoamingOfFirstSlot},
-        {"flight_mode", yesOrNo({Question::FlightMode}, [] { return library().IsFlightMode(); })},
-        {"data_roaming",
-         yesOrNo({Question::DataRoaming}, [] { return library().IsDataRoamingEnabled(); })},
-        {"mobile_data", yesOrNo({Question::MobileData}, [] { return library().IsMobileData(); })},
-        {"cellular", alone(Question::Cellular)},
-        {"operator", alone(Question::OperatorName)},
-        {"operator_mcc", alone(Question::OperatorMcc)},
-        {"operator_mnc", alone(Question::OperatorMnc)},
-        {"access_technology", alone(Question::AccessTechnology)},
-        {"signal", alone(Question::SignalStrength)},
-        {"wifi", alone(Question::Wifi)},
-        {"ssid", alone(Question::Ssid)},
-        {"bluetooth", alone(Question::Bluetooth)},
-        {"ethernet", alone(Question::Ethernet)},
-        {"connectivity", alone(Question::Connectivity)},
-        {"connected_cellular", connected(false, false)},
-        {"connected_cellular_or_wifi", connected(true, false)},
-        {"connected_cellular_or_bluetooth", connected(false, true)},
-        {"connected_any", askConnectedAny},
-        {"sales_code", askSalesCode},
-        {"storage_available",
-         yesOrNo({Question::Storage}, [] { return library().IsSystemMemoryAvailable(0); })},
-        {"device_serial", askSerial},
-    };
-}
-
-// Every place of a fact has a row: the first question tells of one that was forgotten.
-const std::vector<FactRow>& facts()
-{
-    static const std::vector<FactRow> all = [] {
-        std::vector<FactRow> rows = allFacts();
-        for (const Place& place : PLACES)
-            if (*place.name != '\0' &&
-                std::none_of(rows.begin(), rows.end(), [&](const FactRow& row) {
-                    return std::string(row.name) == place.name;
-                }))
-                throw std::logic_error(std::string("no row asks for ") + place.name);
-        return rows;
-    }();
-    return all;
-} // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks): what the rows hold is theirs
 
 const FactRow& rowOf(const std::string& name)
 {
     const std::string meant = cli::factNameOf(name);
-    return *std::find_if(facts().begin(), facts().end(),
+    return *std::find_if(std::begin(ROWS), std::end(ROWS),
                          [&](const FactRow& each) { return each.name == meant; });
+}
+
+bool isIdentity(const std::string& name)
+{
+    const FactRow& row = rowOf(name);
+    return port::isPrivate(row.section, row.key);
 }
 
 bool isDaemons(const std::string& name)
@@ -546,7 +503,7 @@ void askOneByOne(Answers& answers, bool ofDaemon)
 std::vector<std::string> cli::factNames()
 {
     std::vector<std::string> names;
-    for (const FactRow& row : facts())
+    for (const FactRow& row : ROWS)
         names.emplace_back(row.name);
     return names;
 }
