@@ -27,6 +27,14 @@ LIBRARY_MAY_TEST = re.compile(r"defined|CORESYSTEM_\w+_H|CORESYSTEM_DEFAULT_TAG|
 
 LIBRARY = ("src/", "include/")
 OF_THE_PORT = ("port/api/", "port/coreutil/include/")
+# Folders, what of this tree they may include, and why no more.
+MAY_INCLUDE = (
+    ("port/api", ("port/api/",), ", which no device has"),
+    ("devicefile", ("devicefile/", "port/api/", "port/common/", "port/backend/", "port/facts/"),
+     "; device files know none of the backends"),
+    ("cli", ("cli/", "devicefile/", "include/", *OF_THE_PORT, "port/facts/", "port/include/"),
+     "; the command asks as any application does"),
+)
 THIRD_PARTY = re.compile(r"(glib|gio|gobject|gmodule|toml\+\+|openssl|systemd)([/.-].*)?")
 
 
@@ -85,13 +93,6 @@ def check_conditions(tree):
                     yield f"{file}: asks the preprocessor for {macro}"
 
 
-def check_platform_headers(tree):
-    for file in tree.files("port/api"):
-        for _, target in tree.includes(file):
-            if target is not None and not target.startswith("port/api/"):
-                yield f"{file}: includes {target}, which no device has"
-
-
 def check_shims(tree):
     for file in tree.files("port/shim"):
         for name, target in tree.all_includes(file):
@@ -109,21 +110,12 @@ def check_backends(tree):
                     yield f"{file}: reaches {target} of the other backend"
 
 
-def check_device_files(tree):
-    allowed = ("devicefile/", "port/api/", "port/common/", "port/backend/", "port/facts/")
-    for file in tree.files("devicefile"):
-        for _, target in tree.includes(file):
-            if target is not None and not target.startswith(allowed):
-                yield f"{file}: includes {target}; device files know none of the backends"
-
-
-def check_command(tree):
-    allowed = ("cli/", "devicefile/", "include/", "port/api/", "port/coreutil/include/", "port/facts/",
-               "port/include/")
-    for file in tree.files("cli"):
-        for _, target in tree.includes(file):
-            if target is not None and not target.startswith(allowed):
-                yield f"{file}: includes {target}; the command asks as any application does"
+def check_reach(tree):
+    for folder, allowed, why in MAY_INCLUDE:
+        for file in tree.files(folder):
+            for _, target in tree.includes(file):
+                if target is not None and not target.startswith(allowed):
+                    yield f"{file}: includes {target}{why}"
 
 
 def main():
@@ -133,8 +125,7 @@ def main():
     if not any(tree.files(*LIBRARY)):
         sys.exit(f"{tree.root}: no source file of the library is here")
     problems = [problem
-                for check in (check_library, check_conditions, check_platform_headers, check_shims,
-                              check_backends, check_device_files, check_command)
+                for check in (check_library, check_conditions, check_shims, check_backends, check_reach)
                 for problem in check(tree)]
     for problem in problems:
         print(problem)

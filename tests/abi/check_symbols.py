@@ -68,20 +68,21 @@ def check_exports(library, listed, strings):
             yield f"must never be exported: {name}"
 
 
+def defined(library):
+    return {line.split()[2] for line in run("nm", "-D", "--defined-only", library).splitlines()}
+
+
 def check_debian(library, symbols_file):
-    lines = run("nm", "-D", "--defined-only", library).splitlines()
-    found = {line.split()[2] for line in lines}
     listed = {line.split("@")[0].strip() for line in symbols_file.read_text().splitlines()
               if line.startswith(" ")}
-    for problem in compare("exported", found, listed, readable):
+    for problem in compare("exported", defined(library), listed, readable):
         yield f"{problem} ({symbols_file.name})"
 
 
 def refresh_debian(library, symbols_file, version):
     """Adds what the library exports and the file lacks; a name that is gone is left to the check."""
-    lines = run("nm", "-D", "--defined-only", library).splitlines()
     text = symbols_file.read_text()
-    new = sorted(name for name in {line.split()[2] for line in lines} if f"\n {name}@" not in text)
+    new = sorted(name for name in defined(library) if f"\n {name}@" not in text)
     symbols_file.write_text(text + "".join(f" {name}@Base {version}\n" for name in new))
 
 
@@ -110,17 +111,9 @@ def dynamic_section(library, tag):
     return {line.rsplit("[")[1].rstrip("]") for line in lines if f"({tag})" in line}
 
 
-def check_needed(library, needed):
-    yield from compare("asked of the loader", dynamic_section(library, "NEEDED"), needed)
-
-
-def check_place(library):
-    for tag in ("RPATH", "RUNPATH"):
-        for path in dynamic_section(library, tag):
-            yield f"looks for libraries in a place of its own: {path}"
-
-
 def check_start(library):
+    for path in dynamic_section(library, "RPATH") | dynamic_section(library, "RUNPATH"):
+        yield f"looks for libraries in a place of its own: {path}"
     section = run("readelf", "-W", "-d", library)
     if "TEXTREL" in section:
         yield "its code is changed at start"
@@ -141,8 +134,7 @@ def check_versions(library):
 def check_device(library, libraries, strings):
     """What holds for a library that a device loads."""
     sonames = {one.soname for one in libraries if one.symbols_of(strings)}
-    yield from check_needed(library, sonames | RUNTIME_LIBRARIES)
-    yield from check_place(library)
+    yield from compare("asked of the loader", dynamic_section(library, "NEEDED"), sonames | RUNTIME_LIBRARIES)
     yield from check_start(library)
     if strings == "old":
         yield from check_versions(library)
@@ -179,7 +171,6 @@ def main():
     parser.add_argument("--runtime", type=pathlib.Path, help="... but those of the C and C++ runtime")
     parser.add_argument("--strings", choices=("new", "old"), default="new",
                         help="the layout of std::string")
-    parser.add_argument("--needed", nargs="+", metavar="SONAME", help="all libraries it asks for")
     parser.add_argument("--device", action="store_true",
                         help="it asks for those of the imports, and suits a device")
     parser.add_argument("--vtable", type=int, metavar="WORD", help="check them; bytes of a pointer")
@@ -199,8 +190,6 @@ def main():
     if arguments.runtime:
         problems += check_imports(library, libraries, arguments.strings,
                                   read_list(arguments.runtime))
-    if arguments.needed:
-        problems += check_needed(library, set(arguments.needed))
     if arguments.device:
         problems += check_device(library, libraries, arguments.strings)
     if arguments.vtable:

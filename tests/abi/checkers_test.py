@@ -108,110 +108,79 @@ class Symbols(CheckerTest):
         super().setUp()
         self.exports = self.write("exports.txt", "# all\nExported::Ask(char const*)\n")
         self.list_imports("platform_call")
-        self.runtime = str(HERE / "runtime.txt")
 
     def list_imports(self, symbols):
         self.imports = self.write("imports.txt", f"[all]\nsoname = liball.so.1\nsymbols = {symbols}\n")
 
-    def check_lists(self, source):
-        return self.run_checker("check_symbols.py", self.build(source), "--exports", self.exports,
-                                "--imports", self.imports, "--runtime", self.runtime)
+    def check(self, source, *options, built_with=()):
+        return self.run_checker("check_symbols.py", self.build(source, *built_with), *options)
 
-    def lone_destructor(self, name):
-        return f"struct {name} {{ virtual ~{name}(); }}; {name}::~{name}() {{}}\n"
-
-    def check_vtable(self, source):
-        return self.run_checker("check_symbols.py", self.build(source), "--vtable",
-                                str(8 if sys.maxsize > 2**32 else 4))
+    def check_lists(self, source=LIBRARY_SOURCE):
+        return self.check(source, "--exports", self.exports, "--imports", self.imports,
+                          "--runtime", str(HERE / "runtime.txt"))
 
     def test_GoodLibraryPasses(self):
-        self.assert_passes(self.check_lists(LIBRARY_SOURCE))
+        self.assert_passes(self.check_lists())
 
-    def test_NewExportFails(self):
-        source = LIBRARY_SOURCE + "__attribute__((visibility(\"default\"))) void leaked() {}\n"
-        self.assert_fails(self.check_lists(source), "exported but not in the list: leaked()")
+    def test_WhatIsNotListedFails(self):
+        for source, message in (
+                ('__attribute__((visibility("default"))) void leaked() {}', "exported but not in the list: leaked()"),
+                ('extern "C" int more(); int user() { return more(); }', "imported but not in the list: more"),
+                ('#include <cstdlib>\nchar* user() { return getenv("A"); }', "imported but not in the list: getenv@")):
+            with self.subTest(message):
+                self.assert_fails(self.check_lists(LIBRARY_SOURCE + source + "\n"), message)
 
-    def test_MissingExportFails(self):
+    def test_WhatIsListedAndMissingFails(self):
         self.write("exports.txt", "Exported::Ask(char const*)\nExported::Gone()\n")
-        self.assert_fails(self.check_lists(LIBRARY_SOURCE),
-                          "in the list but not exported: Exported::Gone()")
-
-    def test_NewPlatformCallFails(self):
-        source = LIBRARY_SOURCE + "extern \"C\" int more(); int user() { return more(); }\n"
-        self.assert_fails(self.check_lists(source), "imported but not in the list: more")
-
-    def test_MissingPlatformCallFails(self):
         self.list_imports("platform_call other_call")
-        self.assert_fails(self.check_lists(LIBRARY_SOURCE),
-                          "in the list but not imported: other_call")
-
-    def test_ReadingTheEnvironmentFails(self):
-        source = LIBRARY_SOURCE + "#include <cstdlib>\nchar* user() { return getenv(\"A\"); }\n"
-        self.assert_fails(self.check_lists(source), "imported but not in the list: getenv@")
+        result = self.check_lists()
+        self.assert_fails(result, "in the list but not exported: Exported::Gone()")
+        self.assert_fails(result, "in the list but not imported: other_call")
 
     def test_ExportedInsideOfTheClassFailsAlsoWhenListed(self):
-        source = """struct __attribute__((visibility("default"))) CoreSystem {
-                        CoreSystem();
-                        virtual ~CoreSystem();
-                    };
-                    CoreSystem::CoreSystem() {}
-                    CoreSystem::~CoreSystem() {}"""
         names = ("CoreSystem::CoreSystem()", "CoreSystem::~CoreSystem()", "vtable for CoreSystem",
                  "typeinfo for CoreSystem", "typeinfo name for CoreSystem")
         self.write("exports.txt", "\n".join(names))
         self.list_imports("")
-        result = self.check_lists(source)
+        result = self.check_lists("""struct __attribute__((visibility("default"))) CoreSystem {
+                                         CoreSystem();
+                                         virtual ~CoreSystem();
+                                     };
+                                     CoreSystem::CoreSystem() {}
+                                     CoreSystem::~CoreSystem() {}""")
         for name in names:
             self.assert_fails(result, f"must never be exported: {name}")
 
-    def test_VirtualTableOfALoneDestructorPasses(self):
-        self.assert_passes(self.check_vtable("".join(map(self.lone_destructor, SINGLETONS))))
+    def check_vtables(self, longer=None):
+        sources = [f"struct {name} {{ virtual ~{name}(); {'virtual void More() {}' if name == longer else ''} }};"
+                   f"{name}::~{name}() {{}}\n" for name in SINGLETONS]
+        return self.check("".join(sources), "--vtable", str(8 if sys.maxsize > 2**32 else 4))
 
-    def test_OneMoreVirtualMethodFails(self):
+    def test_VirtualTableHoldsALoneDestructor(self):
+        self.assert_passes(self.check_vtables())
         for name in SINGLETONS:
-            others = "".join(self.lone_destructor(other) for other in SINGLETONS if other != name)
-            self.assert_fails(
-                self.check_vtable(others + f"""
-                    struct {name} {{ virtual ~{name}(); virtual void More(); }};
-                    {name}::~{name}() {{}}
-                    void {name}::More() {{}}"""),
-                f"the virtual table of {name} holds 5 words, not the 4")
+            self.assert_fails(self.check_vtables(longer=name),
+                              f"the virtual table of {name} holds 5 words, not the 4")
+        self.assert_fails(self.check("int nothing;", "--vtable", "8"), "was not found")
 
-    def test_NoVirtualTableAtAllFails(self):
-        self.assert_fails(self.check_vtable("int nothing;"), "was not found")
-
-    def check_device(self, *options):
-        return self.run_checker("check_symbols.py",
-                                self.build(LIBRARY_SOURCE, "-Wl,-z,now", "-nostdlib", *options),
-                                "--imports", self.imports, "--device", "--strings", "old")
-
-    def platform_library(self, soname):
-        path = str(self.root / soname)
+    def test_LibraryThatSuitsNoDeviceFails(self):
+        other = str(self.root / "libother.so.1")
         source = self.write("platform.c", "int platform_call(const char* key) { return !key; }")
-        subprocess.run(["cc", "-shared", "-fPIC", f"-Wl,-soname,{soname}", "-o", path, source],
-                       check=True)
-        return path
-
-    def test_LibraryOfTheWrongNameFails(self):
-        other = self.platform_library("libother.so.1")
-        self.assert_fails(self.check_device("-Wl,--no-as-needed", other), "asked of the loader but not in the list: libother.so.1")
-
-    def test_LibraryThatNobodyAsksForFails(self):
-        self.assert_fails(self.check_device(), "in the list but not asked of the loader: liball.so.1")
-
-    def test_PlaceOfItsOwnFails(self):
-        for option in ("--enable-new-dtags", "--disable-new-dtags"):
-            self.assert_fails(self.check_device(f"-Wl,{option},-rpath,/here"),
-                              "looks for libraries in a place of its own: /here")
-
-    def test_LateBindingFails(self):
-        self.assert_fails(self.check_device("-Wl,-z,lazy"), "not everything is bound at start")
-
-    def test_NewRuntimeFails(self):
-        source = "#include <string>\nvoid user(std::string& text) { text.append(\"a\"); }\n"
-        self.assert_fails(self.run_checker("check_symbols.py", self.build(source), "--device",
-                                           "--strings", "old", "--imports", self.imports),
-                          "too new for a device: _ZNSt7__cxx11")
+        subprocess.run(["cc", "-shared", "-fPIC", "-Wl,-soname,libother.so.1", "-o", other, source], check=True)
+        new = "#include <string>\nvoid user(std::string& text) { text.append(\"a\"); }\n"
+        place = "looks for libraries in a place of its own: /here"
+        for source, options, message in (
+                ("", ["-Wl,--no-as-needed", other], "asked of the loader but not in the list: libother.so.1"),
+                ("", [], "in the list but not asked of the loader: liball.so.1"),
+                ("", ["-Wl,--enable-new-dtags,-rpath,/here"], place),
+                ("", ["-Wl,--disable-new-dtags,-rpath,/here"], place),
+                ("", ["-Wl,-z,lazy"], "not everything is bound at start"),
+                ("", ["-Wl,-z,norelro"], "its table of addresses stays writable"),
+                (new, [], "too new for a device: _ZNSt7__cxx11")):
+            with self.subTest(message, options=options):
+                bare = [] if source else ["-nostdlib"]
+                self.assert_fails(self.check(source or LIBRARY_SOURCE, "--imports", self.imports, "--device",
+                                             "--strings", "old", built_with=["-Wl,-z,now", *bare, *options]), message)
 
 
 INTERFACE_SOURCE = """
