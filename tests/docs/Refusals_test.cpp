@@ -3,14 +3,13 @@
 // refuses the call of the row.
 #include <CoreSystem.h>
 
-#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <functional>
 #include <map>
+#include <regex>
 #include <set>
-#include <sstream>
 
 #include <gio/gio.h>
 #include <gmock/gmock.h>
@@ -22,23 +21,20 @@
 #include "support/ScriptedService.h"
 #include "support/TemporaryTree.h"
 
-using testing::HasSubstr;
-
 namespace {
 
 const char DEVICE[] = R"(schema = 1
-[device]
-platform_id = "id"
-platform_name = "Tizen"
-platform_version = "2.4"
-model_name = "model"
-[settings]
-device_name = "name"
-language = "ko_KR.UTF-8"
-sales_code = "KOO"
-flight_mode = true
-data_roaming = true
-mobile_data = true
+device = { platform_id = "id", platform_name = "Tizen", platform_version = "2.4", model_name = "model" }
+settings.device_name = "name"
+settings.language = "ko_KR.UTF-8"
+settings.sales_code = "KOO"
+settings.flight_mode = true
+settings.data_roaming = true
+settings.mobile_data = true
+subscriptions = { network = 0, data = 0, voice = "slot0" }
+network = { cellular = "available", wifi = "connected", bluetooth = "disconnected" }
+storage = { block_size = 4096, fragment_size = 4096, blocks = 409600, available_blocks = 409600 }
+packages."org.example.clock" = "1.2.3"
 [[slot]]
 sim = "available"
 mcc = "450"
@@ -49,40 +45,12 @@ imei = "490154203237518"
 service = "in_service"
 roaming = true
 sms = true
-[subscriptions]
-network = 0
-data = 0
-voice = "slot0"
-[network]
-cellular = "available"
-wifi = "connected"
-bluetooth = "disconnected"
-[storage]
-block_size = 4096
-fragment_size = 4096
-blocks = 409600
-available_blocks = 409600
-[packages]
-"org.example.clock" = "1.2.3"
 )";
 const char TIME_ZONE[] = "UTC-9"; // nine hours east
-const char MADE_UP_IMEI[] = "324000000000000";
+const char MADE_UP_IMEI[] = "\"324000000000000\"";
 
-// The application's view, in the words of the document.
-struct Answer {
-    std::string returned;
-    std::string output;
-
-    bool operator==(const Answer& other) const
-    {
-        return returned == other.returned && output == other.output;
-    }
-};
-
-std::ostream& operator<<(std::ostream& out, const Answer& answer)
-{
-    return out << answer.returned << " | " << answer.output;
-}
+// What is returned and what becomes of the output, in the words of the document.
+using Answer = std::pair<std::string, std::string>;
 
 std::string shown(bool value)
 {
@@ -109,8 +77,7 @@ std::string shown(char** names)
     return names == nullptr ? "null" : "names";
 }
 
-using Ask = std::function<Answer()>;
-using Questions = std::map<std::string, Ask>;
+using Questions = std::map<std::string, std::function<Answer()>>;
 
 // The questions in the words of the document.
 class Rows {
@@ -190,34 +157,25 @@ public:
     // Refuses calls, each with its error.
     void refuse(const std::map<std::string, std::string>& calls)
     {
-        faults_.clear();
+        faults_ = calls.empty() ? "" : "[fault]\n";
         for (const auto& [call, error] : calls)
             if (call != "GetSerial") // which is asked over the bus
                 faults_ += call + " = \"" + error + "\"\n";
-        describe();
-    }
-
-    void describe()
-    {
         write(DEVICE);
     }
 
     // The same without flight mode, and with Wi-Fi on or off.
     void describeOutOfFlightMode(bool wifi)
     {
-        std::string facts = replaced(DEVICE, "flight_mode = true", "flight_mode = false");
-        if (!wifi)
-            facts = replaced(facts, "wifi = \"connected\"", "wifi = \"deactivated\"");
-        write(facts);
+        const std::string facts = replaced(DEVICE, "flight_mode = true", "flight_mode = false");
+        write(wifi ? facts : replaced(facts, "wifi = \"connected\"", "wifi = \"deactivated\""));
     }
 
 private:
     void write(const std::string& facts)
     {
         // As a whole: who reads meanwhile finds the one before, never half of it.
-        const std::string next =
-            tree_.write("/next.toml", facts + (faults_.empty() ? "" : "[fault]\n" + faults_));
-        std::filesystem::rename(next, tree_.path("/d.toml"));
+        std::filesystem::rename(tree_.write("/next.toml", facts + faults_), tree_.path("/d.toml"));
     }
 
     const TemporaryTree tree_;
@@ -230,12 +188,6 @@ DeviceFile& deviceFile()
     return file;
 }
 
-void waitUntil(const std::function<bool()>& isDone)
-{
-    while (!isDone())
-        g_main_context_iteration(nullptr, TRUE);
-}
-
 // One change is told after the other, and within a change flight mode after Wi-Fi: once Wi-Fi was
 // told of twice more, flight mode has been told, or never is.
 Answer listen()
@@ -244,27 +196,21 @@ Answer listen()
     questions::library().SetConnectionEventListener(&listener, nullptr);
     for (const bool wifi : {false, true, false}) {
         deviceFile().describeOutOfFlightMode(wifi);
-        waitUntil([&] { return listener.wifi == (wifi ? 1 : 0); });
+        while (listener.wifi != (wifi ? 1 : 0))
+            g_main_context_iteration(nullptr, TRUE);
     }
     questions::library().SetConnectionEventListener(nullptr, nullptr);
     return {"nothing", listener.wasToldOfFlightMode ? "told" : "never told of flight mode"};
 }
 
-// Where the document has words of its own.
-void tellApart(Questions& all)
+// Where the document has words of its own, these.
+template <typename Words>
+void tellApart(Questions& all, const char* question, Words words)
 {
-    all["GetIMEI"] = [ask = all.at("GetIMEI")] {
-        Answer answer = ask();
-        if (answer.output == std::string("\"") + MADE_UP_IMEI + "\"")
-            answer.output = "made up";
-        return answer;
+    all[question] = [ask = all.at(question), words] {
+        const auto [returned, output] = ask();
+        return Answer(returned, words(output));
     };
-    all["InitHandleList"] = [ask = all.at("InitHandleList")] {
-        Answer answer = ask();
-        answer.output = answer.output == "written" ? "filled" : "empty";
-        return answer;
-    };
-    all["SetConnectionEventListener"] = listen;
 }
 
 const Questions& allQuestions()
@@ -272,7 +218,12 @@ const Questions& allQuestions()
     static const Questions all = [] {
         Rows rows;
         questions::listTo(rows);
-        tellApart(rows.all);
+        tellApart(rows.all, "GetIMEI",
+                  [](const std::string& imei) { return imei == MADE_UP_IMEI ? "made up" : imei; });
+        tellApart(rows.all, "InitHandleList", [](const std::string& output) {
+            return output == "written" ? "filled" : "empty";
+        });
+        rows.all["SetConnectionEventListener"] = listen;
         return rows.all;
     }();
     return all;
@@ -286,52 +237,27 @@ struct Refusal {
     Answer answer;
 };
 
-std::string trimmed(std::string cell)
+std::vector<Refusal> readRows()
 {
-    cell.erase(0, cell.find_first_not_of(' '));
-    cell.erase(cell.find_last_not_of(' ') + 1);
-    return cell;
-}
-
-std::vector<std::string> cellsOf(const std::string& line)
-{
-    std::istringstream in(line.substr(1));
-    std::vector<std::string> cells;
-    for (std::string cell; std::getline(in, cell, '|');)
-        cells.push_back(trimmed(cell));
-    return cells;
-}
-
-std::string unquoted(std::string words)
-{
-    words.erase(std::remove(words.begin(), words.end(), '`'), words.end());
-    return words;
-}
-
-std::vector<Refusal> readRows(const char* path)
-{
-    std::ifstream document(path);
+    const std::regex pattern(
+        R"(\| `(\w+)` \|[^|]*\| `?(\w+)`?(?: `([\w.]+)`)? \| (.*?) ?\| (.*?) ?\|)");
+    std::ifstream document(DOCUMENT);
     std::vector<Refusal> rows;
     bool isInTable = false;
     for (std::string line; std::getline(document, line);) {
-        if (line.rfind("| question |", 0) == 0)
-            isInTable = true;
-        else if (line.empty())
-            isInTable = false;
-        else if (isInTable && line.rfind("| `", 0) == 0) {
-            const std::vector<std::string> cells = cellsOf(line);
-            std::istringstream refused(unquoted(cells.at(2)));
-            Refusal row = {unquoted(cells.at(0)), "", "", {cells.at(3), cells.at(4)}};
-            refused >> row.call >> row.error;
-            rows.push_back(row);
-        }
+        isInTable = !line.empty() && (isInTable || line.rfind("| question |", 0) == 0);
+        std::smatch cells;
+        if (isInTable && std::regex_match(line, cells, pattern))
+            rows.push_back({cells[1], cells[2], cells[3], {cells[4], cells[5]}});
+        else
+            EXPECT_FALSE(isInTable && line.rfind("| `", 0) == 0) << line;
     }
     return rows;
 }
 
 const std::vector<Refusal>& rows()
 {
-    static const std::vector<Refusal> all = readRows(DOCUMENT);
+    static const std::vector<Refusal> all = readRows();
     return all;
 }
 
@@ -387,7 +313,8 @@ TEST_F(RefusalsTest, WithoutARefusalEachAnswersOtherwise)
 {
     for (const Refusal& row : rows()) {
         const Answer undisturbed = answer(row.question, {});
-        EXPECT_EQ(row.call == "none", undisturbed == row.answer) << row.question << undisturbed;
+        EXPECT_EQ(row.call == "none", undisturbed == row.answer)
+            << row.question << testing::PrintToString(undisturbed);
     }
 }
 
