@@ -10,7 +10,8 @@ standard output, those of standard error behind "! ", and the exit code in brack
 output did not end in one; the number of a line in a device file may be a "#". Other lines, up to the first command, are comments.
 
 The commands run in an empty directory with links to the device files (devices/), the completion
-(completion/) and the tests' tools (support/), and in an environment that hides this machine's own services.
+(completion/) and the tests' tools (support/), and in an environment that hides this machine's own services. The
+shell function "filled" fills lines with what was one value a line.
 """
 import argparse
 import os
@@ -50,6 +51,7 @@ def environment(command, directory):
         "PATH": ":".join(map(str, path)),
         "HOME": str(directory),
         "LANG": "C",
+        "BASH_FUNC_filled%%": """() { tr -s ' \n' ' ' | fold -sw 118 | sed 's/ $//'; echo; }""",
         "DBUS_SYSTEM_BUS_ADDRESS": "unix:path=/nonexistent",
     }
 
