@@ -4,14 +4,14 @@
     $ coresystem get device_name --device devices/dual_sim.toml
     My dual phone
 
-A line that begins with "$ " is a command for bash, with "> " it goes on. Under it stand the lines of
-standard output, those of standard error behind "! ", and the exit code in brackets unless it is 0.
-"%" before a line of output is a regular expression for the whole line; "\\ no newline" says that the
-output did not end in one; the number of a line in a device file may be a "#". Other lines, up to the first command, are comments.
+A line that begins with "$ " is a command for bash, with "> " it goes on. Under it stand the lines of standard output,
+those of standard error behind "! ", and the exit code in brackets unless it is 0. "%" before a line of output is a
+regular expression for the whole line; "\\ no newline" says that the output did not end in one; the number of a line in
+a device file may be a "#". Other lines, up to the first command, are comments.
 
-The commands run in an empty directory with links to the device files (devices/), the completion
-(completion/) and the tests' tools (support/), and in an environment that hides this machine's own services. The
-shell function "filled" fills lines with what was one value a line.
+The commands run in an empty directory with links to the device files (devices/), the completion (completion/) and the
+tests' tools (support/), and in an environment that hides this machine's own services. The shell function "filled"
+fills lines with what was one value a line, as JSON is.
 """
 import argparse
 import os

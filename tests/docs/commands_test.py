@@ -5,8 +5,9 @@
 
 A block ```console is a transcript, as those of tests/cli; a block ```sh is a script that must succeed.
 A block behind "<!-- not run: why -->" is not run, one behind "<!-- run: installed -->" only with
---prefix, the folder of an installed package, which PREFIX stands for; "<!-- file: NAME -->" makes a file of it. A command line in any other block is a mistake. The
-blocks of a document run one after the other in a folder with copies of the sample devices.
+--prefix, the folder of an installed package, which PREFIX stands for; "<!-- file: NAME -->" makes a file of it. A
+command line in any other block is a mistake. The blocks of a document run one after the other in a folder with copies
+of the sample devices.
 """
 import argparse
 import re
@@ -30,8 +31,7 @@ INSTALLED = "/usr/share/coresystem"
 
 class Document:
     def __init__(self, path, program, folder, prefix):
-        self.prefix, self.installed = prefix, 0
-        self.path, self.program, self.folder = path, program, folder
+        self.prefix, self.folder = prefix, folder
         self.text = path.read_text("utf-8")
         self.share = str(program.parent.parent / "share/coresystem")
         link = folder / ".installed"  # whose name needs no quotation marks
@@ -47,11 +47,10 @@ class Document:
         shown = []
         for command, expected in run_transcript.parse(text)[1]:
             self.run_lines += 1
-            actual = [line.replace(self.share, INSTALLED).replace(self.link, INSTALLED) for line in run_transcript.run(
-                command.replace(INSTALLED, self.link), self.folder, self.variables)]
-            fits = run_transcript.matches(expected, [re.sub("^! ", "", line) for line in actual
-                                                     if not re.fullmatch(r"\[\d+\]", line)])
-            actual = [re.sub("^! ", "", line) for line in actual if not re.fullmatch(r"\[\d+\]", line)]
+            lines = run_transcript.run(command.replace(INSTALLED, self.link), self.folder, self.variables)
+            actual = [re.sub("^! ", "", line).replace(self.share, INSTALLED).replace(self.link, INSTALLED)
+                      for line in lines if not re.fullmatch(r"\[\d+\]", line)]
+            fits = run_transcript.matches(expected, actual)
             if not fits:
                 self.problems.append(run_transcript.shown(command, ["printed:", *actual]))
             shown.append(run_transcript.shown(command, expected if fits else actual))
@@ -61,10 +60,9 @@ class Document:
         self.run_lines += len([line for line in text.splitlines() if line.strip() and line[0] != "#"])
         script = self.exports + text
         self.exports += "".join(re.findall(r"^export .*\n", text, re.MULTILINE))
-        done = subprocess.run(["bash", "-ec", script.replace(INSTALLED, self.link).replace(
-            "PREFIX", str(self.prefix))], cwd=self.folder,
-                              env=self.variables, stdin=subprocess.DEVNULL, capture_output=True,
-                              text=True, timeout=100, check=False)
+        script = script.replace(INSTALLED, self.link).replace("PREFIX", str(self.prefix))
+        done = subprocess.run(["bash", "-ec", script], cwd=self.folder, env=self.variables, stdin=subprocess.DEVNULL,
+                              capture_output=True, text=True, timeout=100, check=False)
         if done.returncode != 0:
             self.problems.append(f"{text}ended with {done.returncode}:\n{done.stderr}")
 
@@ -99,7 +97,6 @@ def main():
     arguments.add_argument("command", type=Path)
     arguments.add_argument("documents", type=Path, nargs="+")
     options = arguments.parse_args()
-    update = options.update
     good = True
     for path in options.documents:
         with tempfile.TemporaryDirectory() as folder:
@@ -112,11 +109,11 @@ def main():
             text = document.check()
         left = "".join(f"; {count} not run: {why}" for count, why in document.exempt if count)
         print(f"{path.name}: {document.run_lines} command lines run{left}")
-        if update:
+        if options.update:
             path.write_text(text, "utf-8")
         good = good and not document.problems
         print("\n".join(document.problems))
-    sys.exit(0 if good or update else 1)
+    sys.exit(0 if good or options.update else 1)
 
 
 main()

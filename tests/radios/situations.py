@@ -329,10 +329,6 @@ def kill_all(*names):
     return lambda: [kill(name) for name in names]
 
 
-def start_all(*names):
-    return lambda: [start(name) for name in names]
-
-
 def connect():
     """The access point is heard some time after it came."""
     wait_for(lambda: "success" in said("nmcli", "connection", "up", "home", seconds=PATIENCE))
