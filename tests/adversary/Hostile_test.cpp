@@ -250,10 +250,8 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
     };
     const Pauses pauses;
     for (const auto& row : rows) {
-        const std::shared_ptr<GVariant> body(
-            g_variant_ref_sink(
-                g_variant_parse(nullptr, row.body.c_str(), nullptr, nullptr, nullptr)),
-            g_variant_unref);
+        const auto body = port::share(g_variant_ref_sink(
+            g_variant_parse(nullptr, row.body.c_str(), nullptr, nullptr, nullptr)));
         modems.follow(TREE, [body](GDBusMessage* question) {
             GDBusMessage* const reply = g_dbus_message_new_method_reply(question);
             g_dbus_message_set_body(reply, body.get());
@@ -268,58 +266,30 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
     }
 }
 
-// Answers in a service's place, before it does.
-class Stranger {
-public:
-    explicit Stranger(const std::string& address) : connection_(connectToBus(address)) {}
-    ~Stranger()
-    {
-        g_dbus_connection_close_sync(connection_, nullptr, nullptr);
-        g_object_unref(connection_);
-    }
-    Stranger(const Stranger&) = delete;
-    Stranger& operator=(const Stranger&) = delete;
-
-    void answer(GDBusMessage* question, const std::string& body) const
-    {
-        GDBusMessage* const reply = ScriptedService::reply(question, body);
-        g_dbus_connection_send_message(connection_, reply, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                       nullptr);
-        g_object_unref(reply);
-    }
-    // Waits for the reply, before which all that was sent has been passed on.
-    void ask(const char* name, const char* method) const
-    {
-        GVariant* const reply = g_dbus_connection_call_sync(
-            connection_, name, "/", "org.freedesktop.DBus.ObjectManager", method, nullptr, nullptr,
-            G_DBUS_CALL_FLAGS_NONE, QUESTION_MS, nullptr, nullptr);
-        if (reply != nullptr)
-            g_variant_unref(reply);
-    }
-
-private:
-    GDBusConnection* const connection_;
-};
-
 TEST_F(HostileTest, StrangerIsNotBelieved)
 {
     bus.start();
     ScriptedService modems(bus.address(), MODEM_MANAGER);
-    const Stranger stranger(bus.address());
+    const BusClient stranger(bus.address());
     FakeModem other;
     other.path += "1";
-    std::promise<std::shared_ptr<GDBusMessage>> asked;
+    std::promise<port::Owned<GDBusMessage>> asked;
     modems.follow(TREE, [&asked, isFirst = true](GDBusMessage* question) mutable {
         if (std::exchange(isFirst, false))
-            asked.set_value({G_DBUS_MESSAGE(g_object_ref(question)), g_object_unref});
+            asked.set_value(port::Owned<GDBusMessage>(G_DBUS_MESSAGE(g_object_ref(question))));
         return ScriptedService::reply(question, treeOf({FakeModem().text()}));
     });
     modems.answerOnlyTogether(2); // the backend's question and the stranger's
     const auto backend = port::makeLinuxBackend();
     auto asking = std::async([&] { return backend->telephony().slots(); });
     const auto question = asked.get_future().get();
-    stranger.answer(question.get(), treeOf({FakeModem().text(), other.text()}));
-    stranger.ask(MODEM_MANAGER, TREE);
+    // In the service's place, before it does.
+    const port::Owned<GDBusMessage> lie(
+        ScriptedService::reply(question.get(), treeOf({FakeModem().text(), other.text()})));
+    g_dbus_connection_send_message(stranger.connection(), lie.get(), G_DBUS_SEND_MESSAGE_FLAGS_NONE,
+                                   nullptr, nullptr);
+    // Waits for the reply, before which all that was sent has been passed on.
+    stranger.call(MODEM_MANAGER, "/", "org.freedesktop.DBus.ObjectManager", TREE);
     const auto answer = asking.get();
     ASSERT_TRUE(answer) << reasonOf(answer);
     EXPECT_EQ(std::vector<std::string>{"/virtual/home"}, answer.value().value);

@@ -19,6 +19,7 @@
 #include "linux/Hostname1.h"
 #include "linux/Settings.h"
 #include "support/Child.h"
+#include "support/Pauses.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedService.h"
 #include "support/Together.h"
@@ -38,15 +39,6 @@ namespace {
 
 // Slow machines and sanitizers are given this much more than the port's own bounds.
 constexpr int SLACK_MS = 1000;
-
-template <typename Work>
-int millisecondsOf(Work work)
-{
-    const auto begin = std::chrono::steady_clock::now();
-    work();
-    const auto time = std::chrono::steady_clock::now() - begin;
-    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
-}
 
 std::string show(const Result<Fact>& answer)
 {

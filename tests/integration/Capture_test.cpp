@@ -2,11 +2,8 @@
 // A machine that was captured answers like the machine: every fact that an application may ask.
 #include <gmock/gmock.h>
 
-#include "linux/Telephony.h"
 #include "support/ModemsOnBus.h"
 #include "support/Program.h"
-
-using port::ServiceState;
 
 namespace {
 
@@ -20,27 +17,8 @@ std::string factsOf(const std::string& environment)
                     "sed '/\"reasons\": {/,/}/d; /\"reason\"/d' || true");
 }
 
-class CaptureOnBusTest : public testing::Test {
+class CaptureOnBusTest : public ModemsOnBusTest {
 protected:
-    void SetUp() override
-    {
-        if (!ModemsOnBus::obstacle().empty())
-            GTEST_SKIP() << ModemsOnBus::obstacle();
-        modems = std::make_unique<ModemsOnBus>();
-    }
-
-    void add(const std::string& id, const AtModem::State& state, bool reachesNetwork = true)
-    {
-        modems->add(id, state);
-        if (!reachesNetwork)
-            return;
-        modems->enable(id);
-        ASSERT_TRUE(modems->waitUntil([&] {
-            const auto service = telephony.service("/virtual/" + id);
-            return service && service.value().value == ServiceState::InService;
-        }));
-    }
-
     void expectAgreement() const
     {
         const std::string file = tree.path("/captured.toml");
@@ -51,9 +29,6 @@ protected:
     }
 
     const TemporaryTree tree;
-    std::unique_ptr<ModemsOnBus> modems;
-    port::linux_backend::Bus bus;
-    port::linux_backend::LinuxTelephony telephony{bus};
 };
 
 TEST_F(CaptureOnBusTest, ModemsAnswerAlikeFromTheFile)
@@ -63,11 +38,11 @@ TEST_F(CaptureOnBusTest, ModemsAnswerAlikeFromTheFile)
     roaming.imsi = "310260123456789";
     roaming.mncLength = 3;
     roaming.registration = 5;
-    add("a", roaming);
+    addInService("a", roaming);
     AtModem::State locked;
     locked.imei = "356938035643809";
     locked.pin = "1234";
-    add("b", locked, false);
+    modems->add("b", locked);
     expectAgreement();
     modems->kill();
     expectAgreement(); // no service

@@ -1,22 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 // The service that stands in for the device daemon, started by a private system bus.
+#include <array>
 #include <csignal>
 #include <cstdlib>
-#include <fstream>
 
 #include <gmock/gmock.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include "backend/Backend.h"
-#include "common/GLibTypes.h"
 #include "linux/Bus.h"
-#include "support/PrivateBus.h"
 #include "support/Program.h"
 #include "support/ScriptedService.h"
-#include "support/TemporaryTree.h"
 #include "support/Together.h"
-#include "support/Wait.h"
+#include "support/Usage.h"
 
 using port::Out;
 using port::Owned;
@@ -30,47 +26,31 @@ const char NAME[] = "org.tizen.system.deviced";
 const char PATH[] = "/Org/Tizen/System/DeviceD/Board";
 const char INTERFACE[] = "org.tizen.system.deviced.Board";
 
-// A connection that is closed with the object.
-class Client {
+class Client : public BusClient {
 public:
-    explicit Client(const std::string& address) : connection_(connectToBus(address)) {}
+    using BusClient::BusClient;
 
     // The text of the reply, or "error: " and its name and message.
-    std::string call(const char* name, const char* path, const char* interface, const char* method,
-                     GVariant* arguments = nullptr) const
+    std::string ask(const char* path, const char* interface, const char* method,
+                    GVariant* arguments = nullptr) const
     {
         Owned<GError> error;
-        const Owned<GVariant> reply(g_dbus_connection_call_sync(
-            connection_.get(), name, path, interface, method, arguments, nullptr,
-            G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, Out(error)));
+        const auto reply = call(NAME, path, interface, method, arguments, Out(error));
         if (!reply)
             return std::string("error: ") + error->message;
         return Owned<char>(g_variant_print(reply.get(), FALSE)).get();
     }
     std::string serial() const
     {
-        return call(NAME, PATH, INTERFACE, "GetSerial");
+        return ask(PATH, INTERFACE, "GetSerial");
     }
-    std::string askBus(const char* method, GVariant* arguments) const
-    {
-        return call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
-                    arguments);
-    }
-
-    GDBusConnection* connection() const
-    {
-        return connection_.get();
-    }
-
-private:
-    const Owned<GDBusConnection> connection_;
 };
 
 class DevicedTest : public testing::Test {
 protected:
     DevicedTest()
     {
-        useSerial("serial = \"SN-4711\"");
+        useFault("");
         setenv("CORESYSTEM_DEVICE", tree.path("/device.toml").c_str(), 1);
         bus.addActivatable(NAME, "'" PROGRAM "'"); // a command line
     }
@@ -83,15 +63,23 @@ protected:
     {
         tree.write("/device.toml", "schema = 1\n[device]\n" + line + "\n");
     }
+    // The serial number, and how it fails.
+    void useFault(const std::string& fault) const
+    {
+        useSerial("serial = \"SN-4711\"" +
+                  (fault.empty() ? "" : "\n[fault]\nGetSerial = " + fault));
+    }
     std::string serial() const
     {
         return Client(bus.address()).serial();
     }
     pid_t processOfService() const
     {
-        const std::string reply =
+        const auto reply =
             Client(bus.address()).askBus("GetConnectionUnixProcessID", g_variant_new("(s)", NAME));
-        return static_cast<pid_t>(std::strtol(reply.c_str() + 1, nullptr, 10));
+        guint32 process = 0;
+        g_variant_get(reply.get(), "(u)", &process);
+        return static_cast<pid_t>(process);
     }
 
     const TemporaryTree tree;
@@ -130,15 +118,14 @@ TEST_F(DevicedTest, MissingSerialIsAnErrorAndNeverInvented)
 TEST_F(DevicedTest, FaultOfTheDeviceFileIsTheAnswer)
 {
     bus.start();
-    useSerial("serial = \"SN-4711\"\n[fault]\n"
-              "GetSerial = \"org.freedesktop.DBus.Error.AccessDenied\"");
+    useFault("\"org.freedesktop.DBus.Error.AccessDenied\"");
     EXPECT_EQ(
         "error: GDBus.Error:org.freedesktop.DBus.Error.AccessDenied: " + tree.path("/device.toml") +
             ":5: GetSerial fails with org.freedesktop.DBus.Error.AccessDenied",
         serial());
-    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = \"not_a_string\"");
+    useFault("\"not_a_string\"");
     EXPECT_EQ("(0,)", serial());
-    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { error = \"not_a_string\", call = 2 }");
+    useFault("{ error = \"not_a_string\", call = 2 }");
     EXPECT_EQ("('SN-4711',)", serial());
     EXPECT_EQ("(0,)", serial());
     EXPECT_EQ("('SN-4711',)", serial());
@@ -148,7 +135,7 @@ TEST_F(DevicedTest, FaultOfTheDeviceFileIsTheAnswer)
 TEST_F(DevicedTest, LateAnswerKeepsNobodyElseWaiting)
 {
     bus.start();
-    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { delay_ms = 60000, call = 2 }");
+    useFault("{ delay_ms = 60000, call = 2 }");
     EXPECT_EQ("('SN-4711',)", serial());
     const Client late(bus.address());
     send(late, 1, G_DBUS_MESSAGE_FLAGS_NONE);
@@ -172,20 +159,16 @@ TEST_F(DevicedTest, OtherCallsAreErrors)
 {
     bus.start();
     const Client client(bus.address());
-    const struct {
-        const char* path;
-        const char* interface;
-        const char* method;
-    } rows[] = {
+    const std::array<const char*, 3> rows[] = {
+        // path, interface, method
         {"/", INTERFACE, "GetSerial"},
         {"/Org/Tizen/System/DeviceD", INTERFACE, "GetSerial"},
         {PATH, "org.tizen.system.deviced.board", "GetSerial"},
         {PATH, INTERFACE, "SetSerial"},
     };
-    for (const auto& row : rows)
-        EXPECT_THAT(client.call(NAME, row.path, row.interface, row.method), StartsWith("error: "))
-            << row.path << row.method;
-    EXPECT_THAT(client.call(NAME, PATH, INTERFACE, "GetSerial", g_variant_new("(s)", "x")),
+    for (const auto& [path, interface, method] : rows)
+        EXPECT_THAT(client.ask(path, interface, method), StartsWith("error: ")) << path << method;
+    EXPECT_THAT(client.ask(PATH, INTERFACE, "GetSerial", g_variant_new("(s)", "x")),
                 StartsWith("error: "));
     EXPECT_EQ("('SN-4711',)", client.serial());
 }
@@ -229,119 +212,82 @@ TEST_F(DevicedTest, EveryUserMayAskAndOnlyRootMayOwnTheName)
                 HasSubstr("is not allowed to own the service"));
 }
 
-// In kB, the most that a process ever had.
-long peakMemoryOf(pid_t process)
-{
-    std::ifstream status("/proc/" + std::to_string(process) + "/status");
-    for (std::string line; std::getline(status, line);)
-        if (line.rfind("VmHWM:", 0) == 0)
-            return std::strtol(line.c_str() + 6, nullptr, 10);
-    return 0;
-}
-
 TEST_F(DevicedTest, CallerWhoFloodsItHarmsNobodyAndItsNextCallIsAnswered)
 {
     bus.start();
     const Client other(bus.address());
     ASSERT_EQ("('SN-4711',)", other.serial());
     const pid_t service = processOfService();
-    const long before = peakMemoryOf(service);
+    const long before = Usage::statusLine("VmHWM:", service);
     const Client flooding(bus.address());
     send(flooding, 40000, G_DBUS_MESSAGE_FLAGS_NO_REPLY_EXPECTED);
     EXPECT_EQ("('SN-4711',)", other.serial());
     EXPECT_EQ("('SN-4711',)", flooding.serial());
-#ifndef WITH_SANITIZERS // they keep what is released
-    EXPECT_LT(peakMemoryOf(service) - before, 16 * 1024);
+#ifdef WITH_SANITIZERS // they keep what is released
+    constexpr long MOST_KB = 512 * 1024;
 #else
-    EXPECT_LT(peakMemoryOf(service) - before, 512 * 1024);
+    constexpr long MOST_KB = 16 * 1024;
 #endif
+    EXPECT_LT(Usage::statusLine("VmHWM:", service) - before, MOST_KB);
 }
 
 TEST_F(DevicedTest, CallerHasALimitedNumberOfCallsUnderWay)
 {
     bus.start();
-    useSerial("serial = \"SN-4711\"\n[fault]\nGetSerial = { delay_ms = 60000 }");
+    useFault("{ delay_ms = 60000 }");
     const Client many(bus.address());
     send(many, 64, G_DBUS_MESSAGE_FLAGS_NONE);
     EXPECT_THAT(many.serial(), HasSubstr("LimitsExceeded: too many calls under way"));
-    useSerial("serial = \"SN-4711\"");
+    useFault("");
     EXPECT_EQ("('SN-4711',)", serial()); // another caller
 }
 
 // Runs the service by hand.
-class Program {
+class Service : public Process {
 public:
-    Program() : process_(fork())
+    Service()
     {
-        if (process_ == 0) {
-            execl(PROGRAM, PROGRAM, static_cast<char*>(nullptr));
-            _exit(127);
-        }
+        start([] { execl(PROGRAM, PROGRAM, static_cast<char*>(nullptr)); });
     }
-    void tell(int signal) const
+    void expectOn(const PrivateBus& bus) const
     {
-        kill(process_, signal);
+        const BusClient client(bus.address());
+        ASSERT_TRUE(client.waitUntil([&] { return client.isThere(NAME); }));
     }
-    // Its exit code, or minus the signal that ended it.
-    int end() const
-    {
-        int status = 0;
-        waitpid(process_, &status, 0);
-        return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
-    }
-
-private:
-    const pid_t process_;
 };
-
-// Waits until the service is on the bus, without starting it.
-bool comesToBus(const PrivateBus& bus)
-{
-    const Client client(bus.address());
-    bool isThere = false;
-    const guint watch = g_bus_watch_name_on_connection(
-        client.connection(), NAME, G_BUS_NAME_WATCHER_FLAGS_NONE,
-        [](GDBusConnection*, const char*, const char*, gpointer flag) {
-            *static_cast<bool*>(flag) = true;
-        },
-        nullptr, &isThere, nullptr);
-    const bool came = runUntil([&isThere] { return isThere; });
-    g_bus_unwatch_name(watch);
-    return came;
-}
 
 TEST_F(DevicedTest, EndsCleanlyWhenItIsToldTo)
 {
     bus.start();
     for (const int signal : {SIGTERM, SIGINT}) {
-        const Program program;
-        ASSERT_TRUE(comesToBus(bus));
-        program.tell(signal);
-        EXPECT_EQ(0, program.end()) << signal;
+        Service service;
+        service.expectOn(bus);
+        service.tell(signal);
+        EXPECT_EQ(0, service.end()) << signal;
     }
 }
 
 TEST_F(DevicedTest, EndsCleanlyWithTheBus)
 {
     bus.start();
-    const Program program;
-    ASSERT_TRUE(comesToBus(bus));
+    Service service;
+    service.expectOn(bus);
     bus.kill();
-    EXPECT_EQ(0, program.end());
+    EXPECT_EQ(0, service.end());
 }
 
 TEST_F(DevicedTest, FailsWithoutABus)
 {
     bus.start();
     bus.kill();
-    EXPECT_EQ(1, Program().end());
+    EXPECT_EQ(1, Service().end());
 }
 
 TEST_F(DevicedTest, FailsWhenTheNameIsTaken)
 {
     bus.start();
     const ScriptedService other(bus.address(), NAME);
-    EXPECT_EQ(1, Program().end());
+    EXPECT_EQ(1, Service().end());
 }
 
 } // namespace

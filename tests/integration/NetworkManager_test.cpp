@@ -14,23 +14,19 @@
 
 using port::CellularState;
 using port::Error;
-using port::Result;
-using port::Sourced;
-using port::linux_backend::Bus;
 using port::linux_backend::LinuxNetwork;
 
 namespace {
 
-class NetworkManagerTest : public testing::Test {
+class NetworkManagerTest : public ModemsOnBusTest {
 protected:
     void SetUp() override
     {
-        for (const std::string& obstacle :
-             {ModemsOnBus::obstacle(), NetworkManagerOnBus::obstacle()})
-            if (!obstacle.empty())
-                GTEST_SKIP() << obstacle;
-        modems = std::make_unique<ModemsOnBus>();
-        networks = std::make_unique<NetworkManagerOnBus>(modems->bus().address());
+        if (!NetworkManagerOnBus::obstacle().empty())
+            GTEST_SKIP() << NetworkManagerOnBus::obstacle();
+        ModemsOnBusTest::SetUp();
+        if (modems != nullptr)
+            networks = std::make_unique<NetworkManagerOnBus>(modems->bus().address());
     }
 
     // A modem that is on the air, and known to NetworkManager.
@@ -49,10 +45,8 @@ protected:
         });
     }
 
-    std::unique_ptr<ModemsOnBus> modems;
     std::unique_ptr<NetworkManagerOnBus> networks;
     const TemporaryTree root;
-    Bus bus;
     LinuxNetwork network{bus, root.root()};
 };
 

@@ -18,9 +18,9 @@
 #include <sys/socket.h>
 
 #include "devicefile/Descriptor.h"
-#include "support/PrivateBus.h"
+#include "support/Pauses.h"
+#include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
-#include "support/TemporaryTree.h"
 
 using port::CellularState;
 using port::Error;
@@ -36,26 +36,19 @@ using testing::StartsWith;
 
 namespace {
 
-const char NM[] = "org.freedesktop.NetworkManager";
-const char NM_PATH[] = "/org/freedesktop/NetworkManager";
-const char MM[] = "org.freedesktop.ModemManager1";
-const char BLUEZ[] = "org.bluez";
+const std::string NM = "org.freedesktop.NetworkManager";
+const std::string NM_PATH = "/org/freedesktop/NetworkManager";
+const std::string NM_DEVICE = NM + ".Device";
+const std::string NM_CONNECTION = NM + ".Settings.Connection";
+const std::string MM = "org.freedesktop.ModemManager1";
+const std::string MM_MODEM = MM + ".Modem";
+const std::string MODEM_PATH = "/org/freedesktop/ModemManager1/Modem/";
 
 // The text of an object for a reply of GetManagedObjects.
 std::string object(const std::string& path, const std::string& interface,
                    const std::string& properties)
 {
     return "@o '" + path + "': {'" + interface + "': {" + properties + "}}";
-}
-
-std::string reply(const std::vector<std::string>& objects)
-{
-    if (objects.empty())
-        return "(@a{oa{sa{sv}}} {},)";
-    std::string text;
-    for (const std::string& one : objects)
-        text += (text.empty() ? "" : ", ") + one;
-    return "({" + text + "},)";
 }
 
 // The state that NetworkManager is made to show.
@@ -87,7 +80,7 @@ std::string number(const char* name, unsigned value)
 
 std::string connectionPath(std::size_t index)
 {
-    return std::string(NM_PATH) + "/Settings/" + std::to_string(index);
+    return NM_PATH + "/Settings/" + std::to_string(index);
 }
 
 std::string managerObject(const Networks& networks)
@@ -103,48 +96,48 @@ std::string managerObject(const Networks& networks)
 std::string objectsOf(const Networks& networks)
 {
     std::vector<std::string> objects = {managerObject(networks)};
-    for (std::size_t i = 0; i < networks.devices.size(); ++i)
-        objects.push_back(object(std::string(NM_PATH) + "/Devices/" + std::to_string(i),
-                                 std::string(NM) + ".Device",
-                                 number("DeviceType", networks.devices[i].first) + ", " +
-                                     number("State", networks.devices[i].second) +
-                                     (i < networks.interfaces.size()
-                                          ? ", 'Interface': <'" + networks.interfaces[i] + "'>"
-                                          : "")));
+    for (std::size_t i = 0; i < networks.devices.size(); ++i) {
+        const auto& [type, state] = networks.devices[i];
+        std::string properties = number("DeviceType", type) + ", " + number("State", state);
+        if (i < networks.interfaces.size())
+            properties += ", 'Interface': <'" + networks.interfaces[i] + "'>";
+        objects.push_back(object(NM_PATH + "/Devices/" + std::to_string(i), NM_DEVICE, properties));
+    }
     for (std::size_t i = 0; i < networks.connections.size(); ++i)
-        objects.push_back(object(connectionPath(i), std::string(NM) + ".Settings.Connection",
-                                 "'Unsaved': <false>"));
+        objects.push_back(object(connectionPath(i), NM_CONNECTION, "'Unsaved': <false>"));
     if (networks.active >= 0)
-        objects.push_back(object(std::string(NM_PATH) + "/ActiveConnection/1",
-                                 std::string(NM) + ".Connection.Active",
+        objects.push_back(object(NM_PATH + "/ActiveConnection/1", NM + ".Connection.Active",
                                  "'Type': <'gsm'>, 'Connection': <@o '" +
                                      connectionPath(static_cast<std::size_t>(networks.active)) +
                                      "'>, " + number("State", 2)));
-    return reply(objects);
+    return treeOf(objects);
 }
 
 template <typename T>
 std::string show(const Result<Sourced<T>>& answer)
 {
-    if (answer)
+    if constexpr (std::is_same_v<T, std::string>) {
+        if (answer)
+            return answer.value().value + " <" + answer.value().source + ">";
+    } else if (answer) {
         return std::to_string(static_cast<int>(answer.value().value)) + " <" +
                answer.value().source + ">";
+    }
     return (answer.error().kind == Error::Kind::NotSupported ? "not supported: " : "error: ") +
            answer.error().reason;
 }
 
 template <typename T>
-std::string shown(T value, const char* source)
+std::string shown(T value, const std::string& source)
 {
     return show(Result<Sourced<T>>(Sourced<T>{value, source}));
 }
 
-// The source of what a modem tells.
-const char MODEM_0[] = "org.freedesktop.ModemManager1 /org/freedesktop/ModemManager1/Modem/0";
-const char MODEM_2[] = "org.freedesktop.ModemManager1 /org/freedesktop/ModemManager1/Modem/2";
-
-const char HCI_0[] = "org.bluez hci0";
-const char HCI_1[] = "org.bluez hci1";
+// The sources of what a modem and an adapter tell.
+const std::string MODEM_0 = MM + " " + MODEM_PATH + "0";
+const std::string MODEM_2 = MM + " " + MODEM_PATH + "2";
+const std::string HCI_0 = "org.bluez hci0";
+const std::string HCI_1 = "org.bluez hci1";
 
 const std::string ON = "1 <org.freedesktop.NetworkManager>";
 const std::string OFF = "0 <org.freedesktop.NetworkManager>";
@@ -156,7 +149,7 @@ protected:
         daemon.start();
     }
 
-    ScriptedService& serve(std::unique_ptr<ScriptedService>& service, const char* name,
+    ScriptedService& serve(std::unique_ptr<ScriptedService>& service, const std::string& name,
                            const std::string& objects)
     {
         if (!service)
@@ -164,15 +157,20 @@ protected:
         service->answerTo("GetManagedObjects", objects);
         return *service;
     }
-    void serve(const Networks& networks)
+    // What `networks` says.
+    void serve()
     {
         serve(networkManager, NM, objectsOf(networks));
         for (std::size_t i = 0; i < networks.connections.size(); ++i) {
             networkManager->answerTo("GetSettings", "({" + networks.connections[i] + "},)",
                                      connectionPath(i));
-            networkManager->emit(connectionPath(i), std::string(NM) + ".Settings.Connection",
-                                 "Updated", "()");
+            networkManager->emit(connectionPath(i), NM_CONNECTION, "Updated", "()");
         }
+    }
+    void serveDevices(const std::vector<std::pair<unsigned, unsigned>>& devices)
+    {
+        networks.devices = devices;
+        serve();
     }
     // One modem for each text of properties; "|" begins those of Modem3gpp.
     void serveModems(const std::vector<std::string>& modems)
@@ -181,14 +179,13 @@ protected:
         for (const std::string& text : modems) {
             const std::size_t bar = text.find('|');
             std::string one =
-                object("/org/freedesktop/ModemManager1/Modem/" + std::to_string(objects.size()),
-                       std::string(MM) + ".Modem", text.substr(0, bar));
+                object(MODEM_PATH + std::to_string(objects.size()), MM_MODEM, text.substr(0, bar));
             if (bar != std::string::npos)
-                one.insert(one.size() - 1, ", '" + std::string(MM) + ".Modem.Modem3gpp': {" +
-                                               text.substr(bar + 1) + "}");
+                one.insert(one.size() - 1,
+                           ", '" + MM + ".Modem.Modem3gpp': {" + text.substr(bar + 1) + "}");
             objects.push_back(one);
         }
-        serve(modemManager, MM, reply(objects));
+        serve(modemManager, MM, treeOf(objects));
     }
     void serveAdapters(const std::vector<std::string>& adapters)
     {
@@ -197,10 +194,19 @@ protected:
         for (std::size_t i = 0; i < adapters.size(); ++i)
             objects.push_back(
                 object("/org/bluez/hci" + std::to_string(i), "org.bluez.Adapter1", adapters[i]));
-        serve(bluez, BLUEZ, reply(objects));
+        serve(bluez, "org.bluez", treeOf(objects));
+    }
+
+    // The kernel's switch of a radio; 1 has it off.
+    void writeSwitch(int index, const std::string& type, int soft)
+    {
+        const std::string folder = "/sys/class/rfkill/rfkill" + std::to_string(index);
+        root.write(folder + "/type", type + "\n");
+        root.write(folder + "/soft", std::to_string(soft) + "\n");
     }
 
     PrivateBus daemon;
+    Networks networks;
     std::unique_ptr<ScriptedService> networkManager;
     std::unique_ptr<ScriptedService> modemManager;
     std::unique_ptr<ScriptedService> bluez;
@@ -229,9 +235,7 @@ TEST_F(NetworkTest, WifiFollowsItsDevice)
         {120, LinkState::Disconnected, WifiConnection::Failure},
     };
     for (const auto& row : rows) {
-        Networks networks;
-        networks.devices = {{1, 100}, {WIFI, row.device}};
-        serve(networks);
+        serveDevices({{1, 100}, {WIFI, row.device}});
         EXPECT_EQ(shown(row.link, NM), show(network.wifi())) << row.device;
         EXPECT_EQ(shown(row.connection, NM), show(network.wifiConnection())) << row.device;
     }
@@ -239,9 +243,7 @@ TEST_F(NetworkTest, WifiFollowsItsDevice)
 
 TEST_F(NetworkTest, WifiDeviceThatIsFurthestCounts)
 {
-    Networks networks;
-    networks.devices = {{WIFI, 30}, {WIFI, 100}, {WIFI, 10}};
-    serve(networks);
+    serveDevices({{WIFI, 30}, {WIFI, 100}, {WIFI, 10}});
     EXPECT_EQ(shown(LinkState::Connected, NM), show(network.wifi()));
     EXPECT_EQ(shown(WifiConnection::Connected, NM), show(network.wifiConnection()));
 }
@@ -249,12 +251,11 @@ TEST_F(NetworkTest, WifiDeviceThatIsFurthestCounts)
 TEST_F(NetworkTest, WifiThatIsSwitchedOffIsDeactivated)
 {
     for (const int which : {0, 1, 2}) {
-        Networks networks;
         networks.devices = {{WIFI, 100}};
         networks.wifiOn = which != 0;
         networks.wifiHardwareOn = which != 1;
         networks.networking = which != 2;
-        serve(networks);
+        serve();
         EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi())) << which;
         EXPECT_EQ(shown(WifiConnection::Disconnected, NM), show(network.wifiConnection()));
     }
@@ -262,31 +263,27 @@ TEST_F(NetworkTest, WifiThatIsSwitchedOffIsDeactivated)
 
 TEST_F(NetworkTest, MachineWithoutWifiHasNone)
 {
-    Networks networks;
     networks.radioFlags = 2;
-    networks.devices = {{1, 100}, {MODEM, 100}};
-    serve(networks);
+    serveDevices({{1, 100}, {MODEM, 100}});
     EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device", show(network.wifi()));
     EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device",
               show(network.wifiConnection()));
     networks.radioFlags = 1; // there is a radio, and its device has gone
-    serve(networks);
+    serve();
     EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi()));
 }
 
 TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
 {
-    Networks networks;
-    networks.devices = {{WIFI, 10}};
-    serve(networks);
+    serveDevices({{WIFI, 10}});
     EXPECT_EQ("not supported: NetworkManager leaves the Wi-Fi device to others; "
               "no Wi-Fi interface in /sys/class/net",
               show(network.wifi()));
-    root.write("/sys/class/net/wlan0/phy80211/name", "phy0\n");
-    root.write("/sys/class/net/wlan0/flags", "0x1003\n");
-    root.write("/sys/class/net/wlan0/carrier", "1\n");
-    root.write("/sys/class/net/wlan0/operstate", "up\n");
-    const char wlan[] = "/sys/class/net/wlan0";
+    const std::string wlan = "/sys/class/net/wlan0";
+    root.write(wlan + "/phy80211/name", "phy0\n");
+    root.write(wlan + "/flags", "0x1003\n");
+    root.write(wlan + "/carrier", "1\n");
+    root.write(wlan + "/operstate", "up\n");
     EXPECT_EQ(shown(LinkState::Connected, wlan), show(network.wifi()));
     EXPECT_EQ(shown(WifiConnection::Connected, wlan), show(network.wifiConnection()));
 }
@@ -299,24 +296,20 @@ TEST_F(NetworkTest, KernelAnswersWithoutNetworkManager)
     EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus; "
               "no switch of a radio in /sys/class/rfkill",
               show(network.flightMode()));
-    root.write("/sys/class/rfkill/rfkill0/type", "wlan\n");
-    root.write("/sys/class/rfkill/rfkill0/soft", "1\n");
+    writeSwitch(0, "wlan", 1);
     EXPECT_EQ("1 </sys/class/rfkill>", show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
 {
-    serve(Networks());
+    serve();
     serveAdapters({"'Powered': <false>"});
     EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
     serveAdapters({"'Powered': <false>", "'Powered': <true>"});
     EXPECT_EQ(shown(LinkState::Disconnected, HCI_1), show(network.bluetooth()));
-    Networks networks;
-    networks.devices = {{BLUETOOTH, 30}};
-    serve(networks);
+    serveDevices({{BLUETOOTH, 30}});
     EXPECT_EQ(shown(LinkState::Disconnected, HCI_1), show(network.bluetooth()));
-    networks.devices = {{BLUETOOTH, 30}, {BLUETOOTH, 100}};
-    serve(networks);
+    serveDevices({{BLUETOOTH, 30}, {BLUETOOTH, 100}});
     EXPECT_EQ(shown(LinkState::Connected, HCI_1), show(network.bluetooth()));
     serveAdapters({"'Powered': <false>"});
     EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
@@ -359,25 +352,27 @@ TEST_F(NetworkTest, FlightModeIsEveryRadioSwitchedOff)
         {0, false, false, true},
     };
     for (const auto& row : rows) {
-        Networks networks;
         networks.radioFlags = row.radios;
         networks.wifiOn = row.wifiOn;
         networks.cellularOn = row.cellularOn;
-        serve(networks);
+        serve();
         EXPECT_EQ(row.flightMode ? ON : OFF, show(network.flightMode()))
             << row.radios << row.wifiOn << row.cellularOn;
     }
+    networks = {};
+    networks.radioFlags = 1;
+    networks.wifiHardwareOn = false; // the switch on the case
+    serve();
+    EXPECT_EQ(OFF, show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, BluetoothThatIsOnIsNoFlightMode)
 {
-    Networks networks;
     networks.radioFlags = 1;
     networks.wifiOn = false;
-    serve(networks);
+    serve();
     EXPECT_EQ(ON, show(network.flightMode()));
-    root.write("/sys/class/rfkill/rfkill0/type", "bluetooth\n");
-    root.write("/sys/class/rfkill/rfkill0/soft", "0\n");
+    writeSwitch(0, "bluetooth", 0);
     EXPECT_EQ("0 </sys/class/rfkill>", show(network.flightMode()));
     serveAdapters({"'Powered': <false>"}); // BlueZ knows better
     EXPECT_EQ(ON, show(network.flightMode()));
@@ -388,56 +383,42 @@ TEST_F(NetworkTest, BluetoothThatIsOnIsNoFlightMode)
     serveModems({"'State': <3>"});
     EXPECT_EQ(shown(CellularState::OutOfService, MODEM_0), show(network.cellular()));
     networkManager.reset(); // the kernel's switches count
-    root.write("/sys/class/rfkill/rfkill1/type", "wlan\n");
-    root.write("/sys/class/rfkill/rfkill1/soft", "1\n");
+    writeSwitch(1, "wlan", 1);
     EXPECT_EQ("0 <org.bluez hci1>", show(network.flightMode()));
-}
-
-TEST_F(NetworkTest, SwitchOnTheCaseIsNoFlightMode)
-{
-    Networks networks;
-    networks.radioFlags = 1;
-    networks.wifiHardwareOn = false;
-    serve(networks);
-    EXPECT_EQ(OFF, show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, DataIsOnWhenAConnectionWouldComeUp)
 {
-    Networks networks;
-    networks.devices = {{MODEM, 30}};
-    serve(networks);
+    serveDevices({{MODEM, 30}});
     EXPECT_EQ(OFF, show(network.packetData()));
     networks.connections = {"'connection': {'type': <'802-11-wireless'>}",
                             "'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
-    serve(networks);
+    serve();
     EXPECT_EQ(OFF, show(network.packetData()));
     EXPECT_EQ(OFF, show(network.mobileData()));
     networks.active = 1;
-    serve(networks);
+    serve();
     EXPECT_EQ(ON, show(network.packetData()));
     EXPECT_EQ(ON, show(network.mobileData()));
     networks.active = -1;
     networks.connections[1] = "'connection': {'type': <'cdma'>}";
-    serve(networks);
+    serve();
     EXPECT_EQ(ON, show(network.packetData()));
     networks.cellularOn = false;
-    serve(networks);
+    serve();
     EXPECT_EQ(OFF, show(network.packetData()));
 }
 
 TEST_F(NetworkTest, DataIsOnWhileAModemIsConnectedWhoeverHadItConnect)
 {
     const std::string on = "1 <org.freedesktop.ModemManager1>";
-    Networks networks;
-    networks.devices = {{MODEM, 30}};
-    serve(networks);
+    serveDevices({{MODEM, 30}});
     serveModems({"'State': <8>", "'State': <11>"});
     EXPECT_EQ(on, show(network.packetData()));
     EXPECT_EQ(on, show(network.mobileData()));
     networkManager.reset();
     EXPECT_EQ(on, show(network.mobileData()));
-    serve(networks);
+    serve();
     serveModems({"'State': <8>"});
     EXPECT_EQ(OFF, show(network.mobileData()));
 }
@@ -453,11 +434,10 @@ TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
                 {100, true, LinkState::Connected},
                 {100, false, LinkState::Deactivated}};
     for (const auto& row : rows) {
-        Networks networks;
         networks.networking = row.networking;
         networks.devices = {{1, 10}, {1, row.device}, {WIFI, 100}};
         networks.interfaces = {"eth0", "eth1", "wlan0"};
-        serve(networks);
+        serve();
         EXPECT_EQ(shown(row.state, "org.freedesktop.NetworkManager eth1"), show(network.ethernet()))
             << row.device;
         if (row.networking) {
@@ -465,9 +445,8 @@ TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
                       show(network.wifi()));
         }
     }
-    Networks networks;
-    networks.devices = {{1, 10}};
-    serve(networks);
+    networks = {};
+    serveDevices({{1, 10}});
     EXPECT_EQ("not supported: NetworkManager manages no Ethernet device; "
               "no Ethernet interface in /sys/class/net",
               show(network.ethernet()));
@@ -479,94 +458,80 @@ TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
 
 TEST_F(NetworkTest, ConnectivityIsWhatNetworkManagerSays)
 {
-    const std::pair<unsigned, const char*> rows[] = {
-        {0, "error: NetworkManager does not know the connectivity"},
-        {1, "1 <org.freedesktop.NetworkManager>"},
-        {2, "2 <org.freedesktop.NetworkManager>"},
-        {3, "3 <org.freedesktop.NetworkManager>"},
-        {4, "4 <org.freedesktop.NetworkManager>"},
-    };
-    for (const auto& [number, answer] : rows) {
+    for (unsigned known = 0; known <= 4; ++known) {
         serve(networkManager, NM,
-              reply({object(NM_PATH, NM,
-                            "'WirelessEnabled': <true>, " + ::number("Connectivity", number))}));
-        EXPECT_EQ(answer, show(network.connectivity()));
+              treeOf({object(NM_PATH, NM,
+                             flag("WirelessEnabled", true) + number("Connectivity", known))}));
+        EXPECT_EQ(known == 0 ? "error: NetworkManager does not know the connectivity"
+                             : std::to_string(known) + " <org.freedesktop.NetworkManager>",
+                  show(network.connectivity()));
     }
 }
 
 // What NetworkManager tells of a Wi-Fi device at an access point.
 std::string wifiAt(unsigned state, const std::string& point, const std::string& name)
 {
-    const std::string device = std::string(NM) + ".Device";
-    return reply({object(NM_PATH, NM, flag("WirelessEnabled", true) + number("RadioFlags", 1)),
-                  "@o '/Devices/1': {'" + device + "': {" + number("DeviceType", WIFI) + ", " +
-                      number("State", state) + ", 'Interface': <'wlan0'>}, '" + device +
-                      ".Wireless': {'ActiveAccessPoint': <@o '" + point +
-                      "'>, 'Bitrate': <uint32 1>}}",
-                  object("/AccessPoint/7", std::string(NM) + ".AccessPoint", name)});
+    const std::string device = NM_DEVICE;
+    return treeOf({object(NM_PATH, NM, flag("WirelessEnabled", true) + number("RadioFlags", 1)),
+                   "@o '/Devices/1': {'" + device + "': {" + number("DeviceType", WIFI) + ", " +
+                       number("State", state) + ", 'Interface': <'wlan0'>}, '" + device +
+                       ".Wireless': {'ActiveAccessPoint': <@o '" + point +
+                       "'>, 'Bitrate': <uint32 1>}}",
+                   object("/AccessPoint/7", NM + ".AccessPoint", "'Ssid': <" + name + ">")});
 }
 
 TEST_F(NetworkTest, SsidIsThatOfTheAccessPointThatIsUsed)
 {
-    const auto ssid = [this] {
-        const auto answer = network.ssid();
-        return answer ? answer.value().value + " <" + answer.value().source + ">"
-                      : answer.error().reason;
-    };
+    const char* const point = "/AccessPoint/7";
+    const char* const noText = "error: the name of the Wi-Fi network is no text";
     const struct {
         unsigned state;
         const char* point;
         const char* name;
         const char* answer;
     } rows[] = {
-        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0x00]>",
-         "the name of the Wi-Fi network is no text"},
-        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0xc3, 0xa9]>",
-         "C\u00e9 <org.freedesktop.NetworkManager wlan0>"},
-        {100, "/AccessPoint/7", "'Ssid': <[byte 0x43, 0xe9]>",
-         "the name of the Wi-Fi network is no text"},
-        {100, "/AccessPoint/7", "'Ssid': <@ay []>", "the Wi-Fi network hides its name"},
-        {100, "/AccessPoint/7", "'Ssid': <'C'>", "NetworkManager: Ssid is no list of bytes"},
-        {100, "/", "'Ssid': <[byte 0x43]>", "NetworkManager: / is not there"},
-        {70, "/AccessPoint/7", "'Ssid': <[byte 0x43]>", "Wi-Fi is not connected"},
+        {100, point, "[byte 0x43, 0x00]", noText},
+        {100, point, "[byte 0x43, 0xc3, 0xa9]", "C\u00e9 <org.freedesktop.NetworkManager wlan0>"},
+        {100, point, "[byte 0x43, 0xe9]", noText},
+        {100, point, "@ay []", "error: the Wi-Fi network hides its name"},
+        {100, point, "'C'", "error: NetworkManager: Ssid is no list of bytes"},
+        {100, "/", "[byte 0x43]", "error: NetworkManager: / is not there"},
+        {70, point, "[byte 0x43]", "error: Wi-Fi is not connected"},
     };
     for (const auto& row : rows) {
         serve(networkManager, NM, wifiAt(row.state, row.point, row.name));
-        EXPECT_EQ(row.answer, ssid());
+        EXPECT_EQ(row.answer, show(network.ssid()));
     }
     const int before = networkManager->timesAsked();
     network.ssid();
     EXPECT_EQ(1, networkManager->timesAsked() - before);
-    serve(Networks{});
-    EXPECT_EQ("Wi-Fi is not connected", ssid());
+    serve();
+    EXPECT_EQ("error: Wi-Fi is not connected", show(network.ssid()));
 }
 
 TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
 {
-    Networks networks;
-    networks.devices = {{MODEM, 30}};
-    serve(networks);
+    serveDevices({{MODEM, 30}});
     EXPECT_EQ("error: NetworkManager has no cellular connection", show(network.dataRoaming()));
     networks.connections = {
         "'connection': {'type': <'gsm'>, 'autoconnect': <false>}, 'gsm': {'apn': <'a'>}",
         "'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
-    serve(networks);
+    serve();
     EXPECT_EQ(OFF, show(network.dataRoaming())); // the one that connects itself
     networks.active = 0;
-    serve(networks);
+    serve();
     EXPECT_EQ(ON, show(network.dataRoaming())); // the one that is up
     networks.active = -1;
     networks.connections.push_back("'connection': {'type': <'gsm'>, 'autoconnect-priority': <5>}");
-    serve(networks);
+    serve();
     EXPECT_EQ(ON, show(network.dataRoaming())); // the one that connects itself first
 }
 
 TEST_F(NetworkTest, MachineWithoutAModemHasNoCellularSettings)
 {
-    Networks networks;
     networks.radioFlags = 1;
     networks.connections = {"'connection': {'type': <'gsm'>}"};
-    serve(networks);
+    serve();
     for (const auto& answer : {network.packetData(), network.mobileData(), network.dataRoaming()})
         EXPECT_EQ("not supported: NetworkManager knows no modem", show(answer));
     networkManager.reset();
@@ -576,41 +541,39 @@ TEST_F(NetworkTest, MachineWithoutAModemHasNoCellularSettings)
 
 TEST_F(NetworkTest, CellularFollowsTheModem)
 {
-    Networks networks;
-    networks.devices = {{MODEM, 30}};
-    serve(networks);
-    const struct {
-        const char* modem;
-        CellularState state;
-    } rows[] = {
-        {"'State': <-1>", CellularState::OutOfService},
-        {"'State': <2>", CellularState::OutOfService},
-        {"'State': <3>|'RegistrationState': <uint32 4>", CellularState::OutOfService},
-        {"'State': <7>|'RegistrationState': <uint32 2>", CellularState::OutOfService},
+    serveDevices({{MODEM, 30}});
+    using State = CellularState;
+    const std::pair<const char*, State> rows[] = {
+        {"'State': <-1>", State::OutOfService},
+        {"'State': <2>", State::OutOfService},
+        {"'State': <3>|'RegistrationState': <uint32 4>", State::OutOfService},
+        {"'State': <7>|'RegistrationState': <uint32 2>", State::OutOfService},
         {"'State': <8>|'RegistrationState': <uint32 1>, 'PacketServiceState': <uint32 2>",
-         CellularState::Available},
+         State::Available},
         {"'State': <8>|'RegistrationState': <uint32 1>, 'PacketServiceState': <uint32 1>",
-         CellularState::CallOnlyAvailable},
+         State::CallOnlyAvailable},
         {"'State': <8>|'RegistrationState': <uint32 6>, 'PacketServiceState': <uint32 2>",
-         CellularState::CallOnlyAvailable},
-        {"'State': <8>|'RegistrationState': <uint32 1>", CellularState::Available},
-        {"'State': <8>", CellularState::Available},
-        {"'State': <10>|'RegistrationState': <uint32 1>", CellularState::Available},
-        {"'State': <11>|'RegistrationState': <uint32 5>", CellularState::Connected},
-        {"'State': <8>|'RegistrationState': <uint32 5>", CellularState::Available},
+         State::CallOnlyAvailable},
+        {"'State': <8>|'RegistrationState': <uint32 1>", State::Available},
+        {"'State': <8>", State::Available},
+        {"'State': <10>|'RegistrationState': <uint32 1>", State::Available},
+        {"'State': <11>|'RegistrationState': <uint32 5>", State::Connected},
+        {"'State': <8>|'RegistrationState': <uint32 5>", State::Available},
     };
-    for (const auto& row : rows) {
-        serveModems({row.modem});
-        EXPECT_EQ(shown(row.state, MODEM_0), show(network.cellular())) << row.modem;
+    for (const auto& [modem, state] : rows) {
+        serveModems({modem});
+        EXPECT_EQ(shown(state, MODEM_0), show(network.cellular())) << modem;
     }
+    serveDevices({{MODEM, 100}}); // up
+    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
+    EXPECT_EQ(shown(State::Connected, MODEM_0), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, EitherNetworkOfACdmaModemMayBeAbroad)
 {
-    Networks networks;
     networks.devices = {{MODEM, 30}};
     networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
-    serve(networks);
+    serve();
     const struct {
         const char* registrations;
         CellularState state;
@@ -618,23 +581,14 @@ TEST_F(NetworkTest, EitherNetworkOfACdmaModemMayBeAbroad)
                 {"3>, 'EvdoRegistrationState': <uint32 2", CellularState::RoamingOff},
                 {"2>, 'EvdoRegistrationState': <uint32 3", CellularState::RoamingOff}};
     for (const auto& row : rows) {
-        const std::string modem = std::string(MM) + ".Modem";
+        const std::string modem = MM_MODEM;
         serve(modemManager, MM,
-              reply({object("/org/freedesktop/ModemManager1/Modem/0", modem,
-                            "'State': <8>}, '" + modem +
-                                ".ModemCdma': {'Cdma1xRegistrationState': <uint32 " +
-                                row.registrations + ">")}));
+              treeOf({object(MODEM_PATH + "0", modem,
+                             "'State': <8>}, '" + modem +
+                                 ".ModemCdma': {'Cdma1xRegistrationState': <uint32 " +
+                                 row.registrations + ">")}));
         EXPECT_EQ(shown(row.state, MODEM_0), show(network.cellular())) << row.registrations;
     }
-}
-
-TEST_F(NetworkTest, ModemDeviceThatIsUpIsConnected)
-{
-    Networks networks;
-    networks.devices = {{MODEM, 100}};
-    serve(networks);
-    serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
-    EXPECT_EQ(shown(CellularState::Connected, MODEM_0), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, ModemThatIsFurthestCounts)
@@ -651,9 +605,7 @@ TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
     root.write("/sys/class/wwan/wwan0/uevent", "");
     EXPECT_EQ("error: " + reason, show(network.cellular()));
     std::filesystem::remove_all(root.path("/sys/class/wwan"));
-    Networks networks;
-    networks.devices = {{MODEM, 30}};
-    serve(networks);
+    serveDevices({{MODEM, 30}});
     EXPECT_EQ("error: " + reason, show(network.cellular()));
     serveModems({});
     EXPECT_EQ("not supported: ModemManager knows no modem", show(network.cellular()));
@@ -661,24 +613,22 @@ TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
 
 TEST_F(NetworkTest, MalformedPropertiesAreTold)
 {
-    serve(networkManager, NM, reply({}));
+    serve(networkManager, NM, treeOf({}));
     EXPECT_THAT(show(network.flightMode()),
                 StartsWith("error: NetworkManager: /org/freedesktop/NetworkManager is not there"));
-    serve(networkManager, NM, reply({object(NM_PATH, "com.example.Other", "'x': <1>")}));
+    serve(networkManager, NM, treeOf({object(NM_PATH, "com.example.Other", "'x': <1>")}));
     EXPECT_THAT(show(network.wifi()), HasSubstr("/org/freedesktop/NetworkManager has no "));
     serve(networkManager, NM,
-          reply({object(NM_PATH, NM, "'WirelessEnabled': <'yes'>, 'WwanEnabled': <true>")}));
+          treeOf({object(NM_PATH, NM, "'WirelessEnabled': <'yes'>, 'WwanEnabled': <true>")}));
     EXPECT_THAT(show(network.flightMode()),
                 StartsWith("error: NetworkManager: WirelessEnabled is no truth value"));
     serve(networkManager, NM,
-          reply({managerObject(Networks()),
-                 object(std::string(NM_PATH) + "/Devices/1", std::string(NM) + ".Device",
-                        "'DeviceType': <uint32 2>, 'State': <'up'>")}));
+          treeOf({managerObject(Networks()), object(NM_PATH + "/Devices/1", NM_DEVICE,
+                                                    "'DeviceType': <uint32 2>, 'State': <'up'>")}));
     EXPECT_THAT(show(network.wifi()), HasSubstr("NetworkManager: State is no number"));
 
-    Networks networks;
     networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <'no'>}"};
-    serve(networks);
+    serve();
     EXPECT_EQ("error: NetworkManager: a cellular connection has malformed settings",
               show(network.dataRoaming()));
     serveAdapters({"'Powered': <'on'>"});
@@ -695,18 +645,8 @@ TEST_F(NetworkTest, MalformedPropertiesAreTold)
     }
 }
 
-template <typename Work>
-int millisecondsOf(Work work)
-{
-    const auto begin = std::chrono::steady_clock::now();
-    work();
-    const auto time = std::chrono::steady_clock::now() - begin;
-    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
-}
-
 TEST_F(NetworkTest, ServiceThatKeepsSilentIsNotWaitedForLong)
 {
-    Networks networks;
     networks.devices = {{MODEM, 30}};
     networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
     serve(networkManager, NM, objectsOf(networks)).whenAsked([] {}, "GetSettings");
@@ -739,7 +679,7 @@ TEST_F(NetworkTest, AbsentServicesAreToldAtOnce)
 
 TEST_F(NetworkTest, SilentServicesAreNotWaitedForLong)
 {
-    serve(Networks());
+    serve();
     serveModems({});
     serveAdapters({});
     for (const auto* const service : {&networkManager, &modemManager, &bluez})
@@ -780,6 +720,13 @@ private:
 
 class WatchTest : public NetworkTest {
 protected:
+    static void tellChanged(ScriptedService& service, const std::string& path,
+                            const std::string& interface,
+                            const std::string& changes = "'X': <uint32 1>")
+    {
+        service.emit(path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
+                     "('" + interface + "', {" + changes + "}, @as [])");
+    }
     void begin()
     {
         watch = network.watch([this] { calls.note(); });
@@ -800,39 +747,30 @@ protected:
 
 TEST_F(WatchTest, EveryKindOfChangeIsTold)
 {
-    Networks networks;
     networks.devices = {{WIFI, 30}};
     networks.connections = {"'connection': {'type': <'vpn'>}", "'connection': {'type': <'gsm'>}"};
     networks.active = 1;
-    serve(networks);
+    serve();
     serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
     serveAdapters({"'Powered': <true>"});
     begin();
     const struct {
-        std::unique_ptr<ScriptedService>& service;
-        const char* path;
-        const char* interface;
+        ScriptedService& service;
+        std::string path;
+        std::string interface;
     } rows[] = {
-        {networkManager, NM_PATH, "org.freedesktop.NetworkManager"},
-        {networkManager, "/org/freedesktop/NetworkManager/Devices/0",
-         "org.freedesktop.NetworkManager.Device"},
-        {networkManager, "/org/freedesktop/NetworkManager/ActiveConnection/1",
-         "org.freedesktop.NetworkManager.Connection.Active"},
-        {modemManager, "/org/freedesktop/ModemManager1/Modem/0",
-         "org.freedesktop.ModemManager1.Modem"},
-        {modemManager, "/org/freedesktop/ModemManager1/Modem/0",
-         "org.freedesktop.ModemManager1.Modem.Modem3gpp"},
-        {bluez, "/org/bluez/hci0", "org.bluez.Adapter1"},
+        {*networkManager, NM_PATH, NM},
+        {*networkManager, NM_PATH + "/Devices/0", NM_DEVICE},
+        {*networkManager, NM_PATH + "/ActiveConnection/1", NM + ".Connection.Active"},
+        {*modemManager, MODEM_PATH + "0", MM_MODEM},
+        {*modemManager, MODEM_PATH + "0", MM_MODEM + ".Modem3gpp"},
+        {*bluez, "/org/bluez/hci0", "org.bluez.Adapter1"},
     };
     for (const auto& row : rows)
-        EXPECT_TRUE(isTold([&row] {
-            row.service->emit(row.path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                              std::string("('") + row.interface + "', {'X': <uint32 1>}, @as [])");
-        })) << row.interface;
-    EXPECT_TRUE(isTold([this] {
-        networkManager->emit(connectionPath(1), std::string(NM) + ".Settings.Connection", "Updated",
-                             "()");
-    }));
+        EXPECT_TRUE(isTold([&row] { tellChanged(row.service, row.path, row.interface); }))
+            << row.interface;
+    EXPECT_TRUE(isTold(
+        [this] { networkManager->emit(connectionPath(1), NM_CONNECTION, "Updated", "()"); }));
     EXPECT_TRUE(isTold([this] { serveModems({}); }));
     EXPECT_TRUE(isTold([this] { serveAdapters({}); }));
 }
@@ -841,14 +779,12 @@ TEST_F(WatchTest, EveryKindOfChangeIsTold)
 TEST_F(WatchTest, NoiseOfARadioIsNotTold)
 {
     constexpr int TIMES = 100;
-    serve(networkManager, NM, wifiAt(100, "/AccessPoint/7", "'Ssid': <[byte 0x43]>"));
+    serve(networkManager, NM, wifiAt(100, "/AccessPoint/7", "[byte 0x43]"));
     Calls ends; // seen by who is told
     watch = network.watch([&] { network.ssid() ? calls.note() : ends.note(); });
     ASSERT_TRUE(calls.waitFor(1));
-    const auto emit = [this](const char* path, const char* interface, const std::string& changes) {
-        networkManager->emit(path, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                             std::string("('org.freedesktop.NetworkManager.") + interface + "', {" +
-                                 changes + "}, @as [])");
+    const auto emit = [this](const char* path, const char* face, const std::string& changes) {
+        tellChanged(*networkManager, path, NM + "." + face, changes);
     };
     const int before = calls.count();
     for (int i = 0; i < TIMES; ++i) {
@@ -863,9 +799,7 @@ TEST_F(WatchTest, NoiseOfARadioIsNotTold)
 
 TEST_F(WatchTest, FailureThatDoesNotLastIsTold)
 {
-    Networks networks;
-    networks.devices = {{WIFI, 50}};
-    serve(networks);
+    serveDevices({{WIFI, 50}});
     std::vector<WifiConnection> told;
     watch = network.watch([&] {
         const auto now = network.wifiConnection();
@@ -875,11 +809,10 @@ TEST_F(WatchTest, FailureThatDoesNotLastIsTold)
         }
     });
     ASSERT_TRUE(calls.waitFor(1));
-    const std::string device = std::string(NM_PATH) + "/Devices/0";
-    const std::string interface = std::string(NM) + ".Device";
+    const std::string device = NM_PATH + "/Devices/0";
+    const std::string interface = NM_DEVICE;
     networkManager->emit(device, interface, "StateChanged", "(uint32 120, uint32 50, uint32 7)");
-    networkManager->emit(device, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                         "('" + interface + "', {'State': <uint32 30>}, @as [])");
+    tellChanged(*networkManager, device, interface, "'State': <uint32 30>");
     EXPECT_TRUE(calls.waitFor(3));
     watch.reset();
     EXPECT_THAT(told, testing::ElementsAre(WifiConnection::Association, WifiConnection::Failure,
@@ -928,24 +861,21 @@ TEST_F(WatchTest, KernelTellsOfALinkWhileNetworkManagerIsGone)
 
 TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)
 {
-    serve(Networks());
+    serve();
     begin();
     EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
-    EXPECT_TRUE(isTold([this] { serve(Networks()); }));
-    EXPECT_TRUE(isTold([this] {
-        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                             "('org.freedesktop.NetworkManager', {'X': <uint32 1>}, @as [])");
-    }));
+    EXPECT_TRUE(isTold([this] { serve(); }));
+    EXPECT_TRUE(isTold([this] { tellChanged(*networkManager, NM_PATH, NM); }));
 }
 
 TEST_F(WatchTest, BusThatGoesAndComesIsTold)
 {
-    serve(Networks());
+    serve();
     begin();
     networkManager.reset();
     EXPECT_TRUE(isTold([this] { daemon.kill(); }));
     EXPECT_TRUE(isTold([this] { daemon.start(); }));
-    EXPECT_TRUE(isTold([this] { serve(Networks()); }));
+    EXPECT_TRUE(isTold([this] { serve(); }));
 }
 
 TEST_F(WatchTest, BusThatIsNotThereYetIsFound)
@@ -957,13 +887,12 @@ TEST_F(WatchTest, BusThatIsNotThereYetIsFound)
 
 TEST_F(WatchTest, BurstIsToldInFewCalls)
 {
-    serve(Networks());
+    serve();
     begin();
     const int before = calls.count();
     constexpr int SIGNALS = 1000;
     for (int i = 0; i < SIGNALS; ++i)
-        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+        tellChanged(*networkManager, NM_PATH, NM);
     EXPECT_TRUE(calls.waitFor(before + 1));
     EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
     EXPECT_LT(calls.count() - before, SIGNALS / 2);
@@ -971,11 +900,10 @@ TEST_F(WatchTest, BurstIsToldInFewCalls)
 
 TEST_F(WatchTest, NothingIsToldAfterItsEnd)
 {
-    serve(Networks());
+    serve();
     begin();
     for (int i = 0; i < 50; ++i)
-        networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                             "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+        tellChanged(*networkManager, NM_PATH, NM);
     watch.reset();
     const int atTheEnd = calls.count();
     // A second watch has seen what came after.
@@ -989,12 +917,11 @@ TEST_F(WatchTest, NothingIsToldAfterItsEnd)
 
 TEST_F(WatchTest, WatchesBeginAndEndWhileSignalsArrive)
 {
-    serve(Networks());
+    serve();
     std::atomic<bool> isOver{false};
     std::thread sender([&] {
         while (!isOver)
-            networkManager->emit(NM_PATH, "org.freedesktop.DBus.Properties", "PropertiesChanged",
-                                 "('org.freedesktop.NetworkManager', {'X': <1>}, @as [])");
+            tellChanged(*networkManager, NM_PATH, NM);
     });
     constexpr int WATCHES = 200;
     for (int i = 0; i < WATCHES; ++i) {

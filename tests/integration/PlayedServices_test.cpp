@@ -37,6 +37,7 @@ bluetooth = "disconnected"
 constexpr char NM[] = "org.freedesktop.NetworkManager";
 constexpr char NM_PATH[] = "/org/freedesktop/NetworkManager";
 constexpr char MM[] = "org.freedesktop.ModemManager1";
+constexpr char MM_MODEM[] = "org.freedesktop.ModemManager1.Modem";
 constexpr char MODEM[] = "/org/freedesktop/ModemManager1/Modem/0";
 constexpr char SIM[] = "/org/freedesktop/ModemManager1/SIM/0";
 constexpr char HOSTNAME[] = "org.freedesktop.hostname1";
@@ -52,20 +53,13 @@ std::string with(const std::string& text, const std::vector<port::devicefile::Ed
 
 class PlayedServices : public testing::Test {
 protected:
-    PlayedServices()
-    {
-        bus_.reset(connectToBus(played_.address()));
-    }
-
     // The reply as text, or the name of the error.
     std::string call(const char* service, const std::string& path, const std::string& interface,
                      const char* member, const char* arguments = "()", int timeoutMs = 5000)
     {
         port::Owned<GError> error;
-        const port::Owned<GVariant> reply(g_dbus_connection_call_sync(
-            bus_.get(), service, path.c_str(), interface.c_str(), member,
-            g_variant_new_parsed(arguments), nullptr, G_DBUS_CALL_FLAGS_NO_AUTO_START, timeoutMs,
-            nullptr, port::Out(error)));
+        const auto reply = bus_.call(service, path, interface, member,
+                                     g_variant_new_parsed(arguments), port::Out(error), timeoutMs);
         if (reply)
             return port::Owned<char>(g_variant_print(reply.get(), FALSE)).get();
         if (g_dbus_error_is_remote_error(error.get()) == FALSE)
@@ -90,25 +84,24 @@ protected:
     {
         std::vector<std::string> told;
         const guint id = g_dbus_connection_signal_subscribe(
-            bus_.get(), service, nullptr, nullptr, nullptr, nullptr, G_DBUS_SIGNAL_FLAGS_NONE,
-            &PlayedServices::onSignal, &told, nullptr);
+            bus_.connection(), service, nullptr, nullptr, nullptr, nullptr,
+            G_DBUS_SIGNAL_FLAGS_NONE, &PlayedServices::onSignal, &told, nullptr);
         call(service, "/", "org.freedesktop.DBus.Peer", "Ping");
         played_.become(text);
         call(service, "/", "org.freedesktop.DBus.Peer", "Ping"); // behind every signal
         while (g_main_context_iteration(nullptr, FALSE) != FALSE) {}
-        g_dbus_connection_signal_unsubscribe(bus_.get(), id);
+        g_dbus_connection_signal_unsubscribe(bus_.connection(), id);
         return told;
     }
     static void onSignal(GDBusConnection*, const char*, const char* path, const char*,
                          const char* signal, GVariant* arguments, gpointer told)
     {
-        const std::string whole = path;
-        std::string subject = whole.substr(whole.rfind('/', whole.rfind('/') - 1) + 1);
+        std::string subject = path;
         if (std::string(signal).rfind("Interfaces", 0) == 0) {
             const port::Owned<GVariant> object(g_variant_get_child_value(arguments, 0));
             subject = g_variant_get_string(object.get(), nullptr);
-            subject = subject.substr(subject.rfind('/', subject.rfind('/') - 1) + 1);
         }
+        subject.erase(0, subject.rfind('/', subject.rfind('/') - 1) + 1);
         static_cast<std::vector<std::string>*>(told)->push_back(subject + " " + signal);
     }
 
@@ -121,7 +114,7 @@ protected:
     }
 
     PlayedDevice played_{PHONE};
-    port::Owned<GDBusConnection> bus_;
+    const BusClient bus_{played_.address()};
 };
 
 TEST_F(PlayedServices, HaveEveryPropertyOfEveryInterfaceInItsType)
@@ -223,14 +216,14 @@ TEST_F(PlayedServices, WriteWhatAClientChangesIntoTheFile)
                    "objectpath '/')"),
               "('/org/freedesktop/NetworkManager/ActiveConnection/2',)");
     EXPECT_EQ(value("network.cellular"), "connected");
-    EXPECT_EQ(get(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "State"), "(<11>,)");
+    EXPECT_EQ(get(MM, MODEM, MM_MODEM, "State"), "(<11>,)");
 
-    EXPECT_EQ(call(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "Enable", "(false,)"), "()");
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Enable", "(false,)"), "()");
     EXPECT_EQ(value("slot[0].enabled"), "false");
-    EXPECT_EQ(get(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "State"), "(<3>,)");
-    EXPECT_EQ(call(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "Enable", "(true,)"), "()");
+    EXPECT_EQ(get(MM, MODEM, MM_MODEM, "State"), "(<3>,)");
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Enable", "(true,)"), "()");
     EXPECT_EQ(value("slot[0].enabled"), "none");
-    EXPECT_EQ(get(MM, MODEM, "org.freedesktop.ModemManager1.Modem", "State"), "(<8>,)");
+    EXPECT_EQ(get(MM, MODEM, MM_MODEM, "State"), "(<8>,)");
 
     const std::string host = "/org/freedesktop/hostname1";
     EXPECT_EQ(call(HOSTNAME, host, HOSTNAME, "SetStaticHostname", "('my-phone', false)"), "()");
@@ -268,17 +261,16 @@ TEST_F(PlayedServices, CountDownWrongPins)
 TEST_F(PlayedServices, RefuseTheRest)
 {
     const std::string dbus = "org.freedesktop.DBus.Error.";
-    const std::string modem = "org.freedesktop.ModemManager1.Modem";
-    EXPECT_EQ(call(MM, MODEM, modem, "Enable", "('x',)"), dbus + "InvalidArgs");
-    EXPECT_EQ(call(MM, MODEM, modem, "Nonsense"), dbus + "UnknownMethod");
-    EXPECT_EQ(call(MM, "/nowhere", modem, "Enable", "(true,)"), dbus + "UnknownMethod");
-    EXPECT_EQ(set(MM, MODEM, modem, "State", "3"), dbus + "InvalidArgs");
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Enable", "('x',)"), dbus + "InvalidArgs");
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Nonsense"), dbus + "UnknownMethod");
+    EXPECT_EQ(call(MM, "/nowhere", MM_MODEM, "Enable", "(true,)"), dbus + "UnknownMethod");
+    EXPECT_EQ(set(MM, MODEM, MM_MODEM, "State", "3"), dbus + "InvalidArgs");
     EXPECT_EQ(set(NM, NM_PATH, NM, "WirelessEnabled", "'x'"), dbus + "InvalidArgs");
     EXPECT_EQ(get(NM, NM_PATH, NM, "Nonsense"), dbus + "InvalidArgs");
     EXPECT_THAT(call(NM, NM_PATH, NM, "GetPermissions"),
                 HasSubstr("'org.freedesktop.NetworkManager.network-control': 'yes'"));
     EXPECT_EQ(call(MM, "/org/freedesktop/ModemManager1", MM, "SetLogging", "('DEBUG',)"), "()");
-    EXPECT_EQ(call(MM, MODEM, modem, "Command", "('AT', uint32 1)"),
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Command", "('AT', uint32 1)"),
               "org.freedesktop.ModemManager1.Error.Core.Unsupported");
     EXPECT_EQ(call(NM, NM_PATH, NM, "GetDeviceByIpIface", "('eth9',)"),
               "org.freedesktop.NetworkManager.UnknownDevice");
@@ -310,7 +302,7 @@ TEST_F(PlayedServices, MisbehaveAsTheFileSays)
         return call(MM, MODEM, PROPERTIES, "Get",
                     "('org.freedesktop.ModemManager1.Modem', 'State')", timeoutMs);
     };
-    const char* const gone = "org.freedesktop.DBus.Error.NameHasNoOwner";
+    const char* const gone = "org.freedesktop.DBus.Error.ServiceUnknown";
     const char* const died = "org.freedesktop.DBus.Error.NoReply"; // with the call
     const auto askWhileIt = [&](const char* other) {
         std::string answer = other;

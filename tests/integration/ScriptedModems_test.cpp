@@ -9,6 +9,7 @@
 #include "linux/ModemManager.h"
 #include "linux/NetworkManager.h"
 #include "support/Answer.h"
+#include "support/Pauses.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
@@ -39,15 +40,6 @@ constexpr int SLACK_MS = 1000; // for slow machines and sanitizers
 const char TREE[] = "GetManagedObjects";
 const char SIM_0[] = "/org/freedesktop/ModemManager1/SIM/0";
 const char SIM_1[] = "/org/freedesktop/ModemManager1/SIM/1";
-
-template <typename Work>
-int millisecondsOf(Work work)
-{
-    const auto begin = std::chrono::steady_clock::now();
-    work();
-    const auto time = std::chrono::steady_clock::now() - begin;
-    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
-}
 
 template <typename T>
 std::string reasonOf(const Result<T>& answer)

@@ -3,36 +3,16 @@
 // away.
 #include <gmock/gmock.h>
 
-#include "linux/Telephony.h"
 #include "support/ModemsOnBus.h"
 #include "support/Program.h"
 
-using port::ServiceState;
 using testing::HasSubstr;
 using testing::Not;
 
 namespace {
 
-class SimCommandTest : public testing::Test {
+class SimCommandTest : public ModemsOnBusTest {
 protected:
-    void SetUp() override
-    {
-        if (!ModemsOnBus::obstacle().empty())
-            GTEST_SKIP() << ModemsOnBus::obstacle();
-        modems = std::make_unique<ModemsOnBus>();
-    }
-
-    // Plugs a modem in, switches it on and waits until it is in service.
-    void addInService(const std::string& id, const AtModem::State& state)
-    {
-        modems->add(id, state);
-        modems->enable(id);
-        ASSERT_TRUE(modems->waitUntil([&] {
-            const auto service = telephony.service("/virtual/" + id);
-            return service && service.value().value == ServiceState::InService;
-        }));
-    }
-
     void addTwo()
     {
         AtModem::State korean;
@@ -55,10 +35,6 @@ protected:
         return outputOf("env -u CORESYSTEM_DEVICE TZ=UTC0 " COMMAND " " + arguments +
                         "; echo \"[$?]\"");
     }
-
-    std::unique_ptr<ModemsOnBus> modems;
-    port::linux_backend::Bus bus;
-    port::linux_backend::LinuxTelephony telephony{bus};
 };
 
 TEST_F(SimCommandTest, TwoModemsAreShownEachForItself)

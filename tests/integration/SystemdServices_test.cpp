@@ -91,14 +91,9 @@ TEST_F(SystemdServicesTest, PrettyNameComesBeforeTheStaticOne)
 TEST_F(SystemdServicesTest, NameSetThroughTheServiceIsSeen)
 {
     deviceName();
-    GDBusConnection* const setter = connectToBus(bus.address());
-    GVariant* const reply =
-        g_dbus_connection_call_sync(setter, HOSTNAME1.name, HOSTNAME1.path, HOSTNAME1.interface,
-                                    "SetPrettyHostname", g_variant_new("(sb)", "Pocket", FALSE),
-                                    nullptr, G_DBUS_CALL_FLAGS_NONE, 5000, nullptr, nullptr);
-    ASSERT_NE(nullptr, reply);
-    g_variant_unref(reply);
-    g_object_unref(setter);
+    BusClient(bus.address())
+        .mustCall(HOSTNAME1.name, HOSTNAME1.path, HOSTNAME1.interface, "SetPrettyHostname",
+                  g_variant_new("(sb)", "Pocket", FALSE));
     EXPECT_EQ("Pocket <hostname1 PrettyHostname>", deviceName());
 }
 

@@ -6,6 +6,8 @@
 #include <stdexcept>
 #include <utility>
 
+#include <gmock/gmock.h>
+
 #include "backend/Result.h"
 
 template <typename T>
@@ -22,6 +24,24 @@ template <typename T>
 T valueOf(const Answer<T>& answer)
 {
     return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
+}
+
+/// Expects a value, and where it is from.
+template <typename T, typename Value>
+void expectAnswer(const Value& expected, const std::string& source, const Answer<T>& answer)
+{
+    ASSERT_TRUE(answer) << answer.error().reason;
+    EXPECT_EQ(expected, answer.value().value);
+    EXPECT_EQ(source, answer.value().source);
+}
+
+/// Expects an error of a kind with its reason.
+template <typename T>
+void expectError(port::Error::Kind kind, const std::string& reason, const Answer<T>& answer)
+{
+    ASSERT_FALSE(answer);
+    EXPECT_EQ(kind, answer.error().kind);
+    EXPECT_EQ(reason, answer.error().reason);
 }
 
 #endif

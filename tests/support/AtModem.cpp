@@ -86,7 +86,7 @@ std::vector<std::string> commandsOf(const std::string& line)
 struct AtModem::Row {
     const char* command;
     const char* text; // the whole answer; null: the handler's
-    Handler handler = nullptr;
+    std::string (*handler)(AtModem& modem, const std::string& argument) = nullptr;
 };
 
 const AtModem::Row AtModem::ROWS[] = {
@@ -95,7 +95,7 @@ const AtModem::Row AtModem::ROWS[] = {
     {"+CGMI", "Simulations\nOK"},
     {"+CGMM", "AT modem\nOK"},
     {"+CGMR", "1.0\nOK"},
-    {"+CGSN", nullptr, &AtModem::imei},
+    {"+CGSN", nullptr, [](AtModem& modem, const auto&) { return information(modem.state_.imei); }},
     {"+WS46=?", "+WS46: (12,22,28,25,29)\nOK"},
     {"+IFC=?", "+IFC: (0-2),(0-2)\nOK"},
     {"+CSCS=?", "+CSCS: (\"IRA\")\nOK"},
@@ -103,14 +103,66 @@ const AtModem::Row AtModem::ROWS[] = {
     {"+CFUN=?", "+CFUN: (0,1,4),(0,1)\nOK"},
     {"+CFUN?", "+CFUN: 1\nOK"},
     // the card
-    {"+CPIN?", nullptr, &AtModem::lock},
-    {"+CPIN=", nullptr, &AtModem::unlock},
+    {"+CPIN?", nullptr,
+     [](AtModem& modem, const auto&) {
+         if (modem.cardError().empty())
+             return information("+CPIN: READY");
+         if (!modem.state_.hasSim)
+             return modem.cardError();
+         return information(modem.state_.pinRetries > 0 ? "+CPIN: SIM PIN" : "+CPIN: SIM PUK");
+     }},
+    {"+CPIN=", nullptr,
+     [](AtModem& modem, const auto& argument) -> std::string {
+         State& state = modem.state_;
+         if (state.pinRetries > 0 && argument == "\"" + state.pin + "\"") {
+             state.pin.clear();
+             return OK;
+         }
+         state.pinRetries = std::max(0, state.pinRetries - 1);
+         return INCORRECT_PASSWORD;
+     }},
     {"+CLCK=?", "+CLCK: (\"SC\")\nOK"},
-    {"+CLCK=", nullptr, &AtModem::facility},
-    {"+CSIM=", nullptr, &AtModem::retries},
-    {"+CRSM=", nullptr, &AtModem::file},
-    {"+CIMI", nullptr, &AtModem::imsi},
-    {"+CNUM", nullptr, &AtModem::number},
+    {"+CLCK=", nullptr,
+     [](AtModem& modem, const auto& argument) {
+         if (argument.compare(0, 6, "\"SC\",2") != 0)
+             return std::string(ERROR);
+         return information(modem.state_.pin.empty() ? "+CLCK: 0" : "+CLCK: 1");
+     }},
+    // VERIFY and UNBLOCK CHV without data (51.011, 9.2.9 and 9.2.13): the card tells the retries
+    // left.
+    {"+CSIM=", nullptr,
+     [](AtModem& modem, const auto& argument) {
+         const bool unblock = argument.find("\"002C") != std::string::npos;
+         const int left = unblock ? modem.state_.pukRetries : modem.state_.pinRetries;
+         return information(std::string("+CSIM: 4,\"63C") + "0123456789ABCDEF"[left] + "\"");
+     }},
+    // READ BINARY of the card's number, of the length of its MNC, and of its operator's name
+    // (51.011, 10.1.1, 10.3.18 and 10.3.11); no other file is there.
+    {"+CRSM=", nullptr,
+     [](AtModem& modem, const auto& argument) {
+         const std::pair<const char*, std::string> files[] = {
+             {"176,12258", swapped("8901010123456789012")},
+             {"176,28589", "0000000" + std::to_string(modem.state_.mncLength)},
+             {"176,28486", "0153494D" + std::string(26, 'F')}};
+         if (!modem.cardError().empty())
+             return modem.cardError();
+         for (const auto& [file, content] : files)
+             if (argument.compare(0, 9, file) == 0)
+                 return information("+CRSM: 144,0,\"" + content + "\"");
+         return information("+CRSM: 148,4");
+     }},
+    {"+CIMI", nullptr,
+     [](AtModem& modem, const auto&) {
+         return modem.cardError().empty() ? information(modem.state_.imsi) : modem.cardError();
+     }},
+    {"+CNUM", nullptr,
+     [](AtModem& modem, const auto&) {
+         const std::string& number = modem.state_.number;
+         if (!modem.cardError().empty() || number.empty())
+             return modem.cardError().empty() ? OK : modem.cardError();
+         return information("+CNUM: \"\",\"" + number + "\"," +
+                            (number.front() == '+' ? "145" : "129"));
+     }},
     // the network
     {"+CREG=?", "+CREG: (0-2)\nOK"},
     {"+CGREG=?", "+CGREG: (0-2)\nOK"},
@@ -121,40 +173,33 @@ const AtModem::Row AtModem::ROWS[] = {
     {"+CREG=", nullptr, &AtModem::reportRegistration<0>},
     {"+CGREG=", nullptr, &AtModem::reportRegistration<1>},
     {"+CEREG=", nullptr, &AtModem::reportRegistration<2>},
-    {"+COPS?", nullptr, &AtModem::operatorName},
+    {"+COPS?", nullptr,
+     [](AtModem& modem, const auto&) {
+         return information(modem.isRegistered() ? "+COPS: 0,2,\"" + modem.state_.network + "\",7"
+                                                 : "+COPS: 0");
+     }},
     {"+CSQ", "+CSQ: 20,99\nOK"},
-    {"+CGATT?", nullptr, &AtModem::attached},
+    {"+CGATT?", nullptr,
+     [](AtModem& modem, const auto&) {
+         return information(modem.isRegistered() ? "+CGATT: 1" : "+CGATT: 0");
+     }},
     {"+CGDCONT=?", "+CGDCONT: (1-11),\"IP\",,,(0-2),(0-3)\nOK"},
     {"+CGDCONT?", "+CGDCONT: 1,\"IP\",\"internet\",\"\",0,0\nOK"},
     {"+CGACT?", "+CGACT: 1,0\nOK"},
     // messages
-    {"+CNMI=?", nullptr, &AtModem::messageFormats},
+    {"+CNMI=?", "+CNMI: (0-2),(0-3),(0,2),(0-2),(0,1)\nOK"},
     {"+CMGF=?", "+CMGF: (0,1)\nOK"},
     {"+CPMS=?", "+CPMS: (\"SM\",\"ME\"),(\"SM\",\"ME\"),(\"SM\",\"ME\")\nOK"},
     {"+CPMS?", "+CPMS: \"ME\",0,10,\"ME\",0,10,\"ME\",0,10\nOK"},
     {"+CPMS=", "+CPMS: 0,10,0,10,0,10\nOK"},
     {"+CMGL=", OK},
-    // settings that change nothing that is asked for
-    {"E", OK},
-    {"V", OK},
-    {"X", OK},
-    {"Z", OK},
-    {"&", OK},
-    {"+CMEE=", OK},
-    {"+CSCS=", OK},
-    {"+IFC=", OK},
-    {"+CFUN=", OK},
-    {"+COPS=", OK},
-    {"+CGEREP=", OK},
-    {"+CTZR=", OK},
-    {"+CTZU=", OK},
-    {"+CNMI=", OK},
-    {"+CMGF=", OK},
-    {"+CLIP=", OK},
-    {"+CRC=", OK},
-    {"+CCWA=", OK},
-    {"+CUSD=", OK},
 };
+
+// Settings that change nothing that is asked for.
+const std::string SETTINGS[] = {"E",        "V",      "X",      "Z",      "&",
+                                "+CMEE=",   "+CSCS=", "+IFC=",  "+CFUN=", "+COPS=",
+                                "+CGEREP=", "+CTZR=", "+CTZU=", "+CNMI=", "+CMGF=",
+                                "+CLIP=",   "+CRC=",  "+CCWA=", "+CUSD="};
 
 AtModem::AtModem(const std::string& name, const State& state)
     : port_("abstract:at-modem-" + std::to_string(getpid()) + "-" + name), socket_(listenAt(port_)),
@@ -180,8 +225,9 @@ void AtModem::change(const std::function<void(State&)>& edit)
     if (registration() == before)
         return;
     for (const auto& [command, mode] : reports_)
-        if (mode != "0")
-            say("\r\n" + registrationLine(command, "") + "\r\n");
+        for (const Caller& caller : callers_)
+            if (const std::string line = framed(registrationLine(command, "")); mode != "0")
+                send(caller.descriptor, line.data(), line.size(), MSG_NOSIGNAL);
 }
 
 void AtModem::serve()
@@ -197,16 +243,11 @@ void AtModem::serve()
         for (std::size_t i = watched.size(); i > 2; --i)
             if (watched[i - 1].revents != 0 && !hear(callers_[i - 3]))
                 callers_.erase(callers_.begin() + static_cast<std::ptrdiff_t>(i - 3));
-        if (watched[1].revents != 0)
-            acceptCaller();
+        const int caller =
+            watched[1].revents != 0 ? accept4(socket_, nullptr, nullptr, SOCK_CLOEXEC) : -1;
+        if (caller >= 0)
+            callers_.push_back({caller, ""});
     }
-}
-
-void AtModem::acceptCaller()
-{
-    const int descriptor = accept4(socket_, nullptr, nullptr, SOCK_CLOEXEC);
-    if (descriptor >= 0)
-        callers_.push_back({descriptor, ""});
 }
 
 // False when the caller hung up.
@@ -225,12 +266,6 @@ bool AtModem::hear(Caller& caller)
         send(caller.descriptor, reply.data(), reply.size(), MSG_NOSIGNAL);
     }
     return true;
-}
-
-void AtModem::say(const std::string& text) const
-{
-    for (const Caller& caller : callers_)
-        send(caller.descriptor, text.data(), text.size(), MSG_NOSIGNAL);
 }
 
 // The answer to a line is that to its commands, up to the first that fails.
@@ -258,24 +293,19 @@ std::string AtModem::answerTo(const std::string& command)
         return OK;
     for (const Row& row : ROWS) {
         const std::string known = row.command;
-        const bool takesArgument = known.back() == '=' || (known.size() == 1 && known != "I");
-        if (takesArgument ? command.compare(0, known.size(), known) != 0 : command != known)
-            continue;
-        return row.text != nullptr ? row.text : (this->*row.handler)(command.substr(known.size()));
+        if (known.back() == '=' ? command.compare(0, known.size(), known) == 0 : command == known)
+            return row.text != nullptr ? row.text
+                                       : row.handler(*this, command.substr(known.size()));
     }
-    return ERROR;
-}
-
-bool AtModem::isLocked() const
-{
-    return !state_.pin.empty();
+    const auto begins = [&](const std::string& name) { return command.rfind(name, 0) == 0; };
+    return std::any_of(std::begin(SETTINGS), std::end(SETTINGS), begins) ? OK : ERROR;
 }
 
 std::string AtModem::cardError() const
 {
     if (!state_.hasSim)
         return SIM_NOT_INSERTED;
-    if (!isLocked())
+    if (state_.pin.empty())
         return "";
     return state_.pinRetries > 0 ? SIM_PIN_REQUIRED : SIM_PUK_REQUIRED;
 }
@@ -285,114 +315,30 @@ int AtModem::registration() const
     return cardError().empty() ? state_.registration : 0;
 }
 
+bool AtModem::isRegistered() const
+{
+    return registration() == 1 || registration() == 5;
+}
+
 std::string AtModem::registrationLine(const std::string& command, const std::string& mode) const
 {
-    const int stat = registration();
-    const bool isRegistered = stat == 1 || stat == 5;
     const auto asked = reports_.find(command);
-    const bool hasPlace = isRegistered && asked != reports_.end() && asked->second == "2";
-    return command + ": " + mode + std::to_string(stat) +
+    const bool hasPlace = isRegistered() && asked != reports_.end() && asked->second == "2";
+    return command + ": " + mode + std::to_string(registration()) +
            (hasPlace ? ",\"1234\",\"001122BB\",7" : "");
 }
 
-std::string AtModem::imei(const std::string&)
+template <int DOMAIN>
+std::string AtModem::readRegistration(AtModem& modem, const std::string&)
 {
-    return information(state_.imei);
-}
-
-std::string AtModem::imsi(const std::string&)
-{
-    return cardError().empty() ? information(state_.imsi) : cardError();
-}
-
-std::string AtModem::number(const std::string&)
-{
-    if (!cardError().empty() || state_.number.empty())
-        return cardError().empty() ? OK : cardError();
-    return information("+CNUM: \"\",\"" + state_.number + "\"," +
-                       (state_.number.front() == '+' ? "145" : "129"));
-}
-
-std::string AtModem::lock(const std::string&)
-{
-    if (!state_.hasSim)
-        return SIM_NOT_INSERTED;
-    if (!isLocked())
-        return information("+CPIN: READY");
-    return information(state_.pinRetries > 0 ? "+CPIN: SIM PIN" : "+CPIN: SIM PUK");
-}
-
-std::string AtModem::unlock(const std::string& argument)
-{
-    if (state_.pinRetries > 0 && argument == "\"" + state_.pin + "\"") {
-        state_.pin.clear();
-        return OK;
-    }
-    state_.pinRetries = std::max(0, state_.pinRetries - 1);
-    return INCORRECT_PASSWORD;
-}
-
-std::string AtModem::facility(const std::string& argument)
-{
-    if (argument.compare(0, 6, "\"SC\",2") != 0)
-        return ERROR;
-    return information(isLocked() ? "+CLCK: 1" : "+CLCK: 0");
-}
-
-// VERIFY and UNBLOCK CHV without data (51.011, 9.2.9 and 9.2.13): the card tells the retries left.
-std::string AtModem::retries(const std::string& argument)
-{
-    const bool unblock = argument.find("\"002C") != std::string::npos;
-    const int left = unblock ? state_.pukRetries : state_.pinRetries;
-    return information(std::string("+CSIM: 4,\"63C") + "0123456789ABCDEF"[left] + "\"");
-}
-
-// READ BINARY of the card's number, of the length of its MNC, and of its operator's name
-// (51.011, 10.1.1, 10.3.18 and 10.3.11); no other file is there.
-std::string AtModem::file(const std::string& argument)
-{
-    if (!cardError().empty())
-        return cardError();
-    std::string content;
-    if (argument.compare(0, 9, "176,12258") == 0)
-        content = swapped("8901010123456789012");
-    else if (argument.compare(0, 9, "176,28589") == 0)
-        content = "0000000" + std::to_string(state_.mncLength);
-    else if (argument.compare(0, 9, "176,28486") == 0)
-        content = "0153494D" + std::string(26, 'F');
-    else
-        return information("+CRSM: 148,4");
-    return information("+CRSM: 144,0,\"" + content + "\"");
-}
-
-std::string AtModem::operatorName(const std::string&)
-{
-    if (registration() != 1 && registration() != 5)
-        return information("+COPS: 0");
-    return information("+COPS: 0,2,\"" + state_.network + "\",7");
-}
-
-std::string AtModem::attached(const std::string&)
-{
-    return information(registration() == 1 || registration() == 5 ? "+CGATT: 1" : "+CGATT: 0");
-}
-
-std::string AtModem::messageFormats(const std::string&)
-{
-    return state_.hasMessages ? information("+CNMI: (0-2),(0-3),(0,2),(0-2),(0,1)") : ERROR;
+    const auto report = modem.reports_.find(DOMAINS[DOMAIN]);
+    const std::string mode = report != modem.reports_.end() ? report->second : "0";
+    return information(modem.registrationLine(DOMAINS[DOMAIN], mode + ","));
 }
 
 template <int DOMAIN>
-std::string AtModem::readRegistration(const std::string&)
+std::string AtModem::reportRegistration(AtModem& modem, const std::string& argument)
 {
-    const auto report = reports_.find(DOMAINS[DOMAIN]);
-    const std::string mode = report != reports_.end() ? report->second : "0";
-    return information(registrationLine(DOMAINS[DOMAIN], mode + ","));
-}
-
-template <int DOMAIN>
-std::string AtModem::reportRegistration(const std::string& argument)
-{
-    reports_[DOMAINS[DOMAIN]] = argument;
+    modem.reports_[DOMAINS[DOMAIN]] = argument;
     return OK;
 }

@@ -25,7 +25,6 @@ public:
         int pukRetries = 10;
         int registration = 1; // <stat> of +CREG: 1 home, 2 searching, 3 denied, 5 roaming
         std::string network = "00101";
-        bool hasMessages = true;
     };
 
     AtModem(const std::string& name, const State& state);
@@ -42,7 +41,6 @@ public:
     void change(const std::function<void(State&)>& edit);
 
 private:
-    using Handler = std::string (AtModem::*)(const std::string& argument);
     struct Row;
     struct Caller {
         int descriptor;
@@ -50,33 +48,18 @@ private:
     };
 
     void serve();
-    void acceptCaller();
     bool hear(Caller& caller);
-    void say(const std::string& text) const;
-
     std::string answer(const std::string& line);
     std::string answerTo(const std::string& command);
 
-    bool isLocked() const;
     std::string cardError() const;
     int registration() const;
+    bool isRegistered() const;
     std::string registrationLine(const std::string& command, const std::string& mode) const;
-
-    std::string imei(const std::string&);
-    std::string imsi(const std::string&);
-    std::string number(const std::string&);
-    std::string lock(const std::string&);
-    std::string unlock(const std::string& argument);
-    std::string facility(const std::string& argument);
-    std::string retries(const std::string& argument);
-    std::string file(const std::string& argument);
-    std::string operatorName(const std::string&);
-    std::string attached(const std::string&);
-    std::string messageFormats(const std::string&);
     template <int DOMAIN>
-    std::string readRegistration(const std::string&);
+    static std::string readRegistration(AtModem& modem, const std::string&);
     template <int DOMAIN>
-    std::string reportRegistration(const std::string& argument);
+    static std::string reportRegistration(AtModem& modem, const std::string& argument);
 
     static const Row ROWS[];
 

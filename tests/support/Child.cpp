@@ -2,10 +2,12 @@
 #include "support/Child.h"
 
 #include <cerrno>
+#include <csignal>
 #include <stdexcept>
 
 #include <sched.h>
 #include <sys/mount.h>
+#include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -53,6 +55,53 @@ std::string inChild(const std::function<std::string()>& work)
     if (child < 0 || waitpid(child, &status, 0) != child || status != 0)
         throw std::runtime_error("the child process failed");
     return text;
+}
+
+Process::~Process()
+{
+    kill();
+}
+
+void Process::start(const std::function<void()>& become)
+{
+    id_ = fork();
+    if (id_ != 0)
+        return;
+    prctl(PR_SET_PDEATHSIG, SIGKILL); // a test that ends before its time leaves nothing behind
+    become();
+    _exit(127);
+}
+
+void Process::tell(int signal) const
+{
+    ::kill(id_, signal);
+}
+
+int Process::end()
+{
+    int status = 0;
+    waitpid(id_, &status, 0);
+    id_ = 0;
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
+}
+
+void Process::kill()
+{
+    if (id_ == 0)
+        return;
+    tell(SIGKILL);
+    end();
+}
+
+void Process::freeze() const
+{
+    tell(SIGSTOP);
+    waitpid(id_, nullptr, WUNTRACED); // until it has stopped
+}
+
+void Process::thaw() const
+{
+    tell(SIGCONT);
 }
 
 bool enterPrivateMounts()

@@ -8,9 +8,10 @@
 
 #include <gmock/gmock.h>
 
-#include "TemporaryTree.h"
 #include "backend/Backend.h"
 #include "coresystem_port.h"
+#include "support/Answer.h"
+#include "support/TemporaryTree.h"
 
 class DeviceFileTest : public testing::Test {
 protected:
@@ -43,25 +44,5 @@ protected:
     const std::string path = tree.path("/d.toml");
     const std::unique_ptr<port::Backend> backend = port::makeSimulatorBackend(path);
 };
-
-// Expects a value, and the line that it stands in.
-template <typename T, typename Value>
-void expectAnswer(const Value& expected, const std::string& source,
-                  const port::Result<port::Sourced<T>>& answer)
-{
-    ASSERT_TRUE(answer) << answer.error().reason;
-    EXPECT_EQ(expected, answer.value().value);
-    EXPECT_EQ(source, answer.value().source);
-}
-
-// Expects an error of a kind with its reason.
-template <typename T>
-void expectError(port::Error::Kind kind, const std::string& reason,
-                 const port::Result<port::Sourced<T>>& answer)
-{
-    ASSERT_FALSE(answer);
-    EXPECT_EQ(kind, answer.error().kind);
-    EXPECT_EQ(reason, answer.error().reason);
-}
 
 #endif

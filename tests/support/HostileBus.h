@@ -2,13 +2,13 @@
 #ifndef TESTS_SUPPORT_HOSTILE_BUS_H
 #define TESTS_SUPPORT_HOSTILE_BUS_H
 
-#include <csignal>
 #include <stdexcept>
 #include <string>
 
 #include <fcntl.h>
-#include <sys/wait.h>
 #include <unistd.h>
+
+#include "support/Child.h"
 
 // A bus that misbehaves in the place of another, as long as it lives.
 class HostileBus {
@@ -19,13 +19,11 @@ public:
         int answers[2];
         if (pipe2(life_, O_CLOEXEC) != 0 || pipe2(answers, O_CLOEXEC) != 0)
             throw std::runtime_error("no pipe");
-        process_ = fork();
-        if (process_ == 0) {
+        process_.start([&] {
             dup2(life_[0], STDIN_FILENO);
             dup2(answers[1], STDOUT_FILENO);
             execl(HOSTILE_BUS, HOSTILE_BUS, socket.c_str(), script, static_cast<char*>(nullptr));
-            _exit(127);
-        }
+        });
         close(answers[1]);
         char byte = 0;
         const bool isReady = read(answers[0], &byte, 1) == 1;
@@ -35,8 +33,6 @@ public:
     }
     ~HostileBus()
     {
-        kill(process_, SIGKILL);
-        waitpid(process_, nullptr, 0);
         close(life_[0]);
         close(life_[1]);
     }
@@ -45,7 +41,7 @@ public:
 
 private:
     int life_[2] = {-1, -1};
-    pid_t process_ = 0;
+    Process process_;
 };
 
 #endif

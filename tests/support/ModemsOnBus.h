@@ -8,8 +8,9 @@
 #include <memory>
 #include <string>
 
-#include <gio/gio.h>
+#include <gmock/gmock.h>
 
+#include "linux/Telephony.h"
 #include "support/AtModem.h"
 #include "support/PrivateBus.h"
 
@@ -18,9 +19,6 @@
 class ModemsOnBus {
 public:
     ModemsOnBus();
-    ~ModemsOnBus();
-    ModemsOnBus(const ModemsOnBus&) = delete;
-    ModemsOnBus& operator=(const ModemsOnBus&) = delete;
 
     /// Why it cannot be had on this machine; empty when it can.
     static std::string obstacle();
@@ -38,13 +36,24 @@ public:
     int stateOf(const std::string& id) const;
 
     /// Kills the daemon without a farewell, starts it, stops it from running and lets it go on.
-    void kill();
+    void kill()
+    {
+        process_.kill();
+    }
     void start();
-    void freeze() const;
-    void thaw() const;
+    void freeze() const
+    {
+        process_.freeze();
+    }
+    void thaw() const
+    {
+        process_.thaw();
+    }
 
-    /// Looks again whenever something changed on the bus; false after many seconds in vain.
-    bool waitUntil(const std::function<bool()>& condition) const;
+    bool waitUntil(const std::function<bool()>& condition) const
+    {
+        return client_->waitUntil(condition);
+    }
 
     const PrivateBus& bus() const
     {
@@ -52,19 +61,43 @@ public:
     }
 
 private:
-    [[noreturn]] void run(const char* logFile) const;
-    bool hasName() const;
     std::string pathOf(const std::string& id) const;
-    GVariant* call(const std::string& name, const std::string& path, const char* interface,
-                   const char* method, GVariant* arguments) const;
     void setProfile(const std::string& id, const std::string& port) const;
 
     PrivateBus bus_;
     const TemporaryTree tree_;
-    GMainContext* const context_;
-    GDBusConnection* connection_ = nullptr;
-    pid_t process_ = 0;
+    std::unique_ptr<BusClient> client_;
     std::map<std::string, std::unique_ptr<AtModem>> modems_;
+    Process process_;
+};
+
+/// Skipped where it cannot be had.
+class ModemsOnBusTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (!ModemsOnBus::obstacle().empty())
+            GTEST_SKIP() << ModemsOnBus::obstacle();
+        modems = std::make_unique<ModemsOnBus>();
+    }
+    bool comesIntoService(const port::SlotName& slot)
+    {
+        return modems->waitUntil([&] {
+            const auto service = telephony.service(slot);
+            return service && service.value().value == port::ServiceState::InService;
+        });
+    }
+    /// Plugs a modem in, switches it on and waits until it is in service.
+    void addInService(const std::string& id, const AtModem::State& state)
+    {
+        modems->add(id, state);
+        modems->enable(id);
+        ASSERT_TRUE(comesIntoService("/virtual/" + id));
+    }
+
+    std::unique_ptr<ModemsOnBus> modems;
+    port::linux_backend::Bus bus;
+    port::linux_backend::LinuxTelephony telephony{bus};
 };
 
 #endif

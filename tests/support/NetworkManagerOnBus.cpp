@@ -1,27 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/NetworkManagerOnBus.h"
 
-#include <cerrno>
-#include <csignal>
 #include <stdexcept>
 
 #include <fcntl.h>
 #include <sched.h>
 #include <sys/mount.h>
-#include <sys/prctl.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
-
-#include "support/Child.h"
-#include "support/PrivateBus.h"
-#include "support/Wait.h"
 
 namespace {
 
 const char DAEMON[] = "/usr/sbin/NetworkManager";
 const char NAME[] = "org.freedesktop.NetworkManager";
 const char PATH[] = "/org/freedesktop/NetworkManager";
+const char PROPERTIES[] = "org.freedesktop.DBus.Properties";
 
 // Nothing of the machine is configured, nobody but root is asked for, no lease is taken.
 const char CONFIGURATION[] = R"([main]
@@ -60,22 +53,32 @@ std::string NetworkManagerOnBus::obstacle()
                : "needs network and mount namespaces, so that it never sees the machine's network";
 }
 
-NetworkManagerOnBus::NetworkManagerOnBus(const std::string& address)
-    : connection_(connectToBus(address))
+NetworkManagerOnBus::NetworkManagerOnBus(const std::string& address) : client_(address)
 {
     writeConfiguration();
-    process_ = fork();
-    if (process_ == 0)
-        run();
-    waitUntilReady();
-}
-
-NetworkManagerOnBus::~NetworkManagerOnBus()
-{
-    kill(process_, SIGKILL); // it has nothing to put in order
-    waitpid(process_, nullptr, 0);
-    g_dbus_connection_close_sync(connection_, nullptr, nullptr);
-    g_object_unref(connection_);
+    const auto option = [this](const char* name, const char* file) {
+        return std::string("--") + name + "=" + tree_.path(file);
+    };
+    const std::string logFile = tree_.path("/log");
+    const std::string options[] = {
+        option("config", "/NetworkManager.conf"), option("config-dir", "/empty"),
+        option("system-config-dir", "/empty"),    option("intern-config", "/intern.conf"),
+        option("state-file", "/state"),           option("pid-file", "/pid")};
+    process_.start([&] {
+        const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+        // Without a network of its own it must not start.
+        if (log >= 0 && enterEmptyNetwork() && dup2(log, STDOUT_FILENO) >= 0 &&
+            dup2(log, STDERR_FILENO) >= 0)
+            execl(DAEMON, DAEMON, "--no-daemon", options[0].c_str(), options[1].c_str(),
+                  options[2].c_str(), options[3].c_str(), options[4].c_str(), options[5].c_str(),
+                  static_cast<char*>(nullptr));
+    });
+    const auto isReady = [this] { // it has its name before its objects
+        return client_.call(NAME, PATH, PROPERTIES, "Get",
+                            g_variant_new("(ss)", NAME, "Version")) != nullptr;
+    };
+    if (!client_.waitUntil(isReady))
+        throw std::runtime_error("NetworkManager does not start");
 }
 
 void NetworkManagerOnBus::writeConfiguration() const
@@ -87,66 +90,10 @@ void NetworkManagerOnBus::writeConfiguration() const
     tree_.write("/empty/none", "");
 }
 
-void NetworkManagerOnBus::run() const
-{
-    prctl(PR_SET_PDEATHSIG, SIGKILL);
-    const int log = open(tree_.path("/log").c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-    // Without a network of its own it must not start.
-    if (log < 0 || !enterEmptyNetwork() || dup2(log, STDOUT_FILENO) < 0 ||
-        dup2(log, STDERR_FILENO) < 0)
-        _exit(127);
-    const auto option = [this](const char* name, const char* file) {
-        return std::string("--") + name + "=" + tree_.path(file);
-    };
-    execl(DAEMON, DAEMON, "--no-daemon", option("config", "/NetworkManager.conf").c_str(),
-          option("config-dir", "/empty").c_str(), option("system-config-dir", "/empty").c_str(),
-          option("intern-config", "/intern.conf").c_str(), option("state-file", "/state").c_str(),
-          option("pid-file", "/pid").c_str(), static_cast<char*>(nullptr));
-    _exit(127);
-}
-
-// It has its name before its objects.
-bool NetworkManagerOnBus::isReady() const
-{
-    GVariant* const version =
-        g_dbus_connection_call_sync(connection_, NAME, PATH, "org.freedesktop.DBus.Properties",
-                                    "Get", g_variant_new("(ss)", NAME, "Version"), nullptr,
-                                    G_DBUS_CALL_FLAGS_NO_AUTO_START, PATIENCE_MS, nullptr, nullptr);
-    if (version != nullptr)
-        g_variant_unref(version);
-    return version != nullptr;
-}
-
-void NetworkManagerOnBus::waitUntilReady() const
-{
-    // Whatever happens on the bus, it is looked again.
-    const guint subscription = g_dbus_connection_signal_subscribe(
-        connection_, nullptr, nullptr, nullptr, nullptr, nullptr, G_DBUS_SIGNAL_FLAGS_NONE,
-        [](GDBusConnection*, const char*, const char*, const char*, const char*, GVariant*,
-           gpointer) {},
-        nullptr, nullptr);
-    const bool ready = runUntil([this] { return isReady(); });
-    g_dbus_connection_signal_unsubscribe(connection_, subscription);
-    if (!ready)
-        throw std::runtime_error("NetworkManager does not start");
-}
-
-void NetworkManagerOnBus::call(const char* path, const char* interface, const char* method,
-                               GVariant* arguments) const
-{
-    GError* error = nullptr;
-    GVariant* const reply =
-        g_dbus_connection_call_sync(connection_, NAME, path, interface, method, arguments, nullptr,
-                                    G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, &error);
-    if (reply == nullptr)
-        throw std::runtime_error(std::string(method) + ": " + error->message);
-    g_variant_unref(reply);
-}
-
 void NetworkManagerOnBus::setSwitch(const char* name, bool on) const
 {
-    call(PATH, "org.freedesktop.DBus.Properties", "Set",
-         g_variant_new("(ssv)", NAME, name, g_variant_new_boolean(on)));
+    client_.mustCall(NAME, PATH, PROPERTIES, "Set",
+                     g_variant_new("(ssv)", NAME, name, g_variant_new_boolean(on)));
 }
 
 void NetworkManagerOnBus::addCellularConnection(bool homeOnly) const
@@ -155,8 +102,8 @@ void NetworkManagerOnBus::addCellularConnection(bool homeOnly) const
                                              "<'gsm'>, 'autoconnect': <false>},"
                                              " 'gsm': {'apn': <'internet'>, 'home-only': <") +
                                  (homeOnly ? "true" : "false") + ">}},)";
-    call("/org/freedesktop/NetworkManager/Settings", "org.freedesktop.NetworkManager.Settings",
-         "AddConnectionUnsaved",
-         g_variant_parse(G_VARIANT_TYPE("(a{sa{sv}})"), settings.c_str(), nullptr, nullptr,
-                         nullptr));
+    client_.mustCall(NAME, "/org/freedesktop/NetworkManager/Settings",
+                     "org.freedesktop.NetworkManager.Settings", "AddConnectionUnsaved",
+                     g_variant_parse(G_VARIANT_TYPE("(a{sa{sv}})"), settings.c_str(), nullptr,
+                                     nullptr, nullptr));
 }

@@ -3,11 +3,7 @@
 #ifndef TESTS_SUPPORT_NETWORK_MANAGER_ON_BUS_H
 #define TESTS_SUPPORT_NETWORK_MANAGER_ON_BUS_H
 
-#include <string>
-
-#include <gio/gio.h>
-
-#include "support/TemporaryTree.h"
+#include "support/PrivateBus.h"
 
 /// NetworkManager on the system bus that DBUS_SYSTEM_BUS_ADDRESS names, in network and mount
 /// namespaces of its own: it sees none of this machine's interfaces and writes nothing that stays.
@@ -17,9 +13,6 @@ class NetworkManagerOnBus {
 public:
     /// `address` is that of the bus.
     explicit NetworkManagerOnBus(const std::string& address);
-    ~NetworkManagerOnBus();
-    NetworkManagerOnBus(const NetworkManagerOnBus&) = delete;
-    NetworkManagerOnBus& operator=(const NetworkManagerOnBus&) = delete;
 
     /// Why it cannot be had on this machine; empty when it can.
     static std::string obstacle();
@@ -30,16 +23,11 @@ public:
     void addCellularConnection(bool homeOnly) const;
 
 private:
-    [[noreturn]] void run() const;
     void writeConfiguration() const;
-    bool isReady() const;
-    void waitUntilReady() const;
-    void call(const char* path, const char* interface, const char* method,
-              GVariant* arguments) const;
 
     const TemporaryTree tree_;
-    GDBusConnection* const connection_;
-    pid_t process_ = 0;
+    const BusClient client_;
+    Process process_;
 };
 
 #endif

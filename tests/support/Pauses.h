@@ -8,6 +8,16 @@
 #include <chrono>
 #include <thread>
 
+/// How long something takes.
+template <typename Work>
+int millisecondsOf(Work work)
+{
+    const auto begin = std::chrono::steady_clock::now();
+    work();
+    const auto time = std::chrono::steady_clock::now() - begin;
+    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(time).count());
+}
+
 // Measures as long as it lives.
 class Pauses {
 public:
@@ -35,12 +45,9 @@ public:
 private:
     void measure()
     {
-        using std::chrono::milliseconds;
-        const auto start = std::chrono::steady_clock::now();
-        std::this_thread::sleep_for(milliseconds(1));
-        const auto took = std::chrono::steady_clock::now() - start;
-        longest_ = std::max<long>(
-            longest_, std::chrono::duration_cast<milliseconds>(took - milliseconds(1)).count());
+        const int took =
+            millisecondsOf([] { std::this_thread::sleep_for(std::chrono::milliseconds(1)); });
+        longest_ = std::max<long>(longest_, took - 1);
     }
 
     std::atomic<bool> isOver_{false};

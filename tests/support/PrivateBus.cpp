@@ -1,22 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "support/PrivateBus.h"
 
-#include <cerrno>
 #include <csignal>
 #include <cstdlib>
-#include <memory>
+#include <cstring>
 #include <set>
 #include <stdexcept>
 
-#include <gio/gio.h>
 #include <poll.h>
 #include <sched.h>
-#include <sys/prctl.h>
-#include <sys/wait.h>
 #include <unistd.h>
-
-#include "support/Child.h"
-#include "support/Wait.h"
 
 extern "C" { // which the header of glibc 2.36 forgets
 #include <sys/pidfd.h>
@@ -61,40 +54,13 @@ const char ALLOW_LITTLE[] = R"(<policy context="default">
   </policy>
   )";
 
-void replaceAll(std::string& text, const std::string& mark, const std::string& replacement)
-{
-    for (std::size_t at = text.find(mark); at != std::string::npos;
-         at = text.find(mark, at + replacement.size()))
-        text.replace(at, mark.size(), replacement);
-}
-
 std::string configurationFor(const std::string& root, const std::string& policy)
 {
     std::string text = CONFIGURATION;
-    replaceAll(text, "@ROOT@", root);
-    replaceAll(text, "@POLICY@", policy);
+    for (const auto& [mark, value] : {std::pair("@ROOT@", root), {"@POLICY@", policy}})
+        for (std::size_t at; (at = text.find(mark)) != std::string::npos;)
+            text.replace(at, std::strlen(mark), value);
     return text;
-}
-
-struct Release {
-    void operator()(GDBusConnection* connection) const
-    {
-        g_dbus_connection_close_sync(connection, nullptr, nullptr);
-        g_object_unref(connection);
-    }
-    void operator()(GVariant* variant) const
-    {
-        g_variant_unref(variant);
-    }
-};
-using Connection = std::unique_ptr<GDBusConnection, Release>;
-using Variant = std::unique_ptr<GVariant, Release>;
-
-Variant askBus(const Connection& bus, const char* method, GVariant* arguments)
-{
-    return Variant(g_dbus_connection_call_sync(
-        bus.get(), "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
-        arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr));
 }
 
 void endDaemon(int processDescriptor)
@@ -108,16 +74,76 @@ void endDaemon(int processDescriptor)
 
 } // namespace
 
-GDBusConnection* connectToBus(const std::string& address)
+BusClient::BusClient(const std::string& address)
+    : connection_(g_dbus_connection_new_for_address_sync(
+          address.c_str(),
+          static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
+                                            G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
+          nullptr, nullptr, nullptr))
 {
-    GDBusConnection* const connection = g_dbus_connection_new_for_address_sync(
-        address.c_str(),
-        static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT |
-                                          G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION),
-        nullptr, nullptr, nullptr);
-    if (connection == nullptr)
+    if (!connection_)
         throw std::runtime_error("no bus at " + address);
-    return connection;
+}
+
+BusClient::~BusClient()
+{
+    g_dbus_connection_close_sync(connection(), nullptr, nullptr);
+}
+
+port::Owned<GVariant> BusClient::call(const std::string& name, const std::string& path,
+                                      const std::string& interface, const char* method,
+                                      GVariant* arguments, GError** error, int timeoutMs) const
+{
+    return port::Owned<GVariant>(g_dbus_connection_call_sync(
+        connection(), name.c_str(), path.c_str(), interface.c_str(), method, arguments, nullptr,
+        G_DBUS_CALL_FLAGS_NONE, timeoutMs, nullptr, error));
+}
+
+port::Owned<GVariant> BusClient::mustCall(const std::string& name, const std::string& path,
+                                          const std::string& interface, const char* method,
+                                          GVariant* arguments) const
+{
+    port::Owned<GError> error;
+    auto reply = call(name, path, interface, method, arguments, port::Out(error));
+    if (!reply)
+        throw std::runtime_error(std::string(method) + ": " + error->message);
+    return reply;
+}
+
+port::Owned<GVariant> BusClient::askBus(const char* method, GVariant* arguments) const
+{
+    return call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", method,
+                arguments);
+}
+
+bool BusClient::isThere(const char* name) const
+{
+    const auto reply = askBus("NameHasOwner", g_variant_new("(s)", name));
+    gboolean is = FALSE;
+    if (reply)
+        g_variant_get(reply.get(), "(b)", &is);
+    return is != FALSE;
+}
+
+bool BusClient::waitUntil(const std::function<bool()>& condition) const
+{
+    const port::Owned<GMainContext> context(g_main_context_new());
+    g_main_context_push_thread_default(context.get());
+    // Subscribed before the first look, so that no change is missed. That the context ran is all.
+    const guint subscription = g_dbus_connection_signal_subscribe(
+        connection(), nullptr, nullptr, nullptr, nullptr, nullptr, G_DBUS_SIGNAL_FLAGS_NONE,
+        [](GDBusConnection*, const char*, const char*, const char*, const char*, GVariant*,
+           gpointer) {},
+        nullptr, nullptr);
+    // On a busy machine a look may find no answer in time, and no signal come after it.
+    const port::Owned<GSource> again(g_timeout_source_new(500));
+    g_source_set_callback(
+        again.get(), [](gpointer) -> gboolean { return G_SOURCE_CONTINUE; }, nullptr, nullptr);
+    g_source_attach(again.get(), context.get());
+    const bool isMet = runUntil(condition);
+    g_dbus_connection_signal_unsubscribe(connection(), subscription);
+    g_main_context_pop_thread_default(context.get());
+    return isMet;
 }
 
 PrivateBus::PrivateBus()
@@ -128,7 +154,14 @@ PrivateBus::PrivateBus()
 
 PrivateBus::~PrivateBus()
 {
-    stop();
+    if (process_.id() != 0) {
+        thaw();
+        const std::vector<int> started = daemons();
+        process_.tell(SIGTERM);
+        process_.end();
+        for (const int daemon : started)
+            endDaemon(daemon);
+    }
     unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
 }
 
@@ -155,29 +188,20 @@ void PrivateBus::useEtc(const std::string& folder)
     tree_.write("/run/systemd/why", "Where its services put their sockets.\n");
 }
 
-// In a forked child, where another thread may hold the allocator's lock for good.
-void PrivateBus::run(const char* configuration, int addressPipe) const
-{
-    // A test that ends before its time leaves no bus behind.
-    prctl(PR_SET_PDEATHSIG, SIGKILL);
-    const bool ready =
-        etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
-                         bindFolder(etc_, "/etc") && bindFolder(tree_.path("/run"), "/run"));
-    if (ready && dup2(addressPipe, ADDRESS_DESCRIPTOR) >= 0)
-        execlp("dbus-daemon", "dbus-daemon", configuration, "--nofork", "--nopidfile",
-               "--print-address=9", static_cast<char*>(nullptr));
-    _exit(127);
-}
-
 void PrivateBus::start()
 {
     int ends[2];
     if (pipe(ends) != 0)
         throw std::runtime_error("no pipe");
     const std::string configuration = "--config-file=" + tree_.path("/bus.conf");
-    process_ = fork();
-    if (process_ == 0)
-        run(configuration.c_str(), ends[1]);
+    const std::string run = tree_.path("/run");
+    process_.start([&] {
+        const bool isReady = etc_.empty() || (enterPrivateMounts() && unshare(CLONE_NEWUTS) == 0 &&
+                                              bindFolder(etc_, "/etc") && bindFolder(run, "/run"));
+        if (isReady && dup2(ends[1], ADDRESS_DESCRIPTOR) >= 0)
+            execlp("dbus-daemon", "dbus-daemon", configuration.c_str(), "--nofork", "--nopidfile",
+                   "--print-address=9", static_cast<char*>(nullptr));
+    });
     close(ends[1]);
     char first = 0;
     const bool ready = read(ends[0], &first, 1) == 1; // it prints its address once it listens
@@ -187,38 +211,20 @@ void PrivateBus::start()
     setenv("DBUS_SYSTEM_BUS_ADDRESS", address().c_str(), 1);
 }
 
-void PrivateBus::kill()
-{
-    ::kill(process_, SIGKILL);
-    waitpid(process_, nullptr, 0);
-    process_ = 0;
-}
-
-void PrivateBus::freeze() const
-{
-    ::kill(process_, SIGSTOP);
-    waitpid(process_, nullptr, WUNTRACED); // until it has stopped
-}
-
-void PrivateBus::thaw() const
-{
-    ::kill(process_, SIGCONT);
-}
-
 // The processes on the bus besides this one: the daemons that it started.
 std::vector<int> PrivateBus::daemons() const
 try {
     std::vector<int> found;
-    const Connection bus(connectToBus(address()));
-    const Variant names = askBus(bus, "ListNames", nullptr);
+    const BusClient bus(address());
+    const auto names = bus.askBus("ListNames", nullptr);
     if (!names)
         return found;
-    std::set<pid_t> seen = {getpid(), process_};
+    std::set<pid_t> seen = {getpid(), process_.id()};
     GVariantIter* each = nullptr;
     const char* name = nullptr;
     g_variant_get(names.get(), "(as)", &each);
     while (g_variant_iter_next(each, "&s", &name)) {
-        const Variant reply = askBus(bus, "GetConnectionUnixProcessID", g_variant_new("(s)", name));
+        const auto reply = bus.askBus("GetConnectionUnixProcessID", g_variant_new("(s)", name));
         guint32 process = 0;
         if (reply)
             g_variant_get(reply.get(), "(u)", &process);
@@ -229,16 +235,4 @@ try {
     return found;
 } catch (const std::runtime_error&) { // the bus died before
     return {};
-}
-
-void PrivateBus::stop()
-{
-    if (process_ == 0)
-        return;
-    thaw();
-    const std::vector<int> started = daemons();
-    ::kill(process_, SIGTERM);
-    waitpid(process_, nullptr, 0);
-    for (const int daemon : started)
-        endDaemon(daemon);
 }

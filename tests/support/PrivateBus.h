@@ -6,13 +6,43 @@
 #include <string>
 #include <vector>
 
-#include <gio/gio.h>
-#include <sys/types.h>
-
+#include "common/GLibTypes.h"
+#include "support/Child.h"
 #include "support/TemporaryTree.h"
+#include "support/Wait.h"
 
-/// A connection of the test's own to a bus; throws when there is none.
-GDBusConnection* connectToBus(const std::string& address);
+/// A connection of the test's own to a bus, closed with the object.
+class BusClient {
+public:
+    /// Throws when there is no bus.
+    explicit BusClient(const std::string& address);
+    ~BusClient();
+    BusClient(const BusClient&) = delete;
+    BusClient& operator=(const BusClient&) = delete;
+
+    GDBusConnection* connection() const
+    {
+        return connection_.get();
+    }
+    /// The reply; null, and the error where there is a slot for it, when there is none.
+    port::Owned<GVariant> call(const std::string& name, const std::string& path,
+                               const std::string& interface, const char* method,
+                               GVariant* arguments = nullptr, GError** error = nullptr,
+                               int timeoutMs = PATIENCE_MS) const;
+    /// Throws where there is none.
+    port::Owned<GVariant> mustCall(const std::string& name, const std::string& path,
+                                   const std::string& interface, const char* method,
+                                   GVariant* arguments = nullptr) const;
+    /// Asks the bus itself.
+    port::Owned<GVariant> askBus(const char* method, GVariant* arguments) const;
+    /// Without starting it.
+    bool isThere(const char* name) const;
+    /// Looks again whenever something changed on the bus; false after many seconds in vain.
+    bool waitUntil(const std::function<bool()>& condition) const;
+
+private:
+    const port::Owned<GDBusConnection> connection_;
+};
 
 /// A dbus-daemon of type system on a private socket. It is ready when start() returns. While it
 /// lives, DBUS_SYSTEM_BUS_ADDRESS of this process names it. At the end it is stopped, and so is
@@ -35,22 +65,29 @@ public:
 
     void start();
     /// Kills it without a farewell; start() brings it back under the same address.
-    void kill();
+    void kill()
+    {
+        process_.kill();
+    }
     /// Stops it from running, and lets it go on.
-    void freeze() const;
-    void thaw() const;
+    void freeze() const
+    {
+        process_.freeze();
+    }
+    void thaw() const
+    {
+        process_.thaw();
+    }
 
     /// Without the bus's identity, so that it stays right after a restart.
     std::string address() const;
 
 private:
-    [[noreturn]] void run(const char* configuration, int addressPipe) const;
     std::vector<int> daemons() const;
-    void stop();
 
     TemporaryTree tree_;
     std::string etc_;
-    pid_t process_ = 0;
+    Process process_;
 };
 
 #endif

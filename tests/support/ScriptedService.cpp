@@ -5,28 +5,22 @@
 #include <thread>
 #include <utility>
 
-#include "support/PrivateBus.h"
-#include "support/Wait.h"
+using port::share;
+using port::Variant;
 
 namespace {
 
-const char BUS_NAME[] = "org.freedesktop.DBus"; // of its interface too
-const char BUS_PATH[] = "/org/freedesktop/DBus";
 constexpr guint32 PRIMARY_OWNER = 1;
 constexpr guint32 MAY_BE_REPLACED = 1;
 constexpr guint32 REPLACE = 2;
 
-void ownName(GDBusConnection* connection, const std::string& name)
+void ownName(const BusClient& client, const std::string& name)
 {
-    GVariant* const reply =
-        g_dbus_connection_call_sync(connection, BUS_NAME, BUS_PATH, BUS_NAME, "RequestName",
-                                    g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE),
-                                    nullptr, G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
+    const auto reply = client.askBus(
+        "RequestName", g_variant_new("(su)", name.c_str(), MAY_BE_REPLACED | REPLACE));
     guint32 result = 0;
-    if (reply != nullptr)
-        g_variant_get(reply, "(u)", &result);
-    if (reply != nullptr)
-        g_variant_unref(reply);
+    if (reply)
+        g_variant_get(reply.get(), "(u)", &result);
     if (result != PRIMARY_OWNER)
         throw std::runtime_error("cannot own " + name);
 }
@@ -48,36 +42,34 @@ std::string keyOf(const std::string& method, const std::string& path)
     return path.empty() ? method : method + " " + path;
 }
 
-std::shared_ptr<GVariant> parsed(const std::string& body)
+Variant parsed(const std::string& body)
 {
     GVariant* const value = g_variant_parse(nullptr, body.c_str(), nullptr, nullptr, nullptr);
     if (value == nullptr)
         throw std::runtime_error("no GVariant text: " + body);
-    return std::shared_ptr<GVariant>(g_variant_ref_sink(value), g_variant_unref);
+    return share(g_variant_ref_sink(value));
 }
 
-std::shared_ptr<GVariant> share(GVariant* value)
+Variant child(const Variant& of, std::size_t index)
 {
-    return value != nullptr ? std::shared_ptr<GVariant>(value, g_variant_unref) : nullptr;
+    return share(g_variant_get_child_value(of.get(), index));
 }
 
-std::shared_ptr<GVariant> lookUp(const std::shared_ptr<GVariant>& table, const char* key)
+Variant lookUp(const Variant& table, const char* key)
 {
     return table != nullptr ? share(g_variant_lookup_value(table.get(), key, nullptr)) : nullptr;
 }
 
 // By path, the interfaces; of the last where one stands there twice.
-std::map<std::string, std::shared_ptr<GVariant>> objectsIn(const std::shared_ptr<GVariant>& body)
+std::map<std::string, Variant> objectsIn(const Variant& body)
 {
-    std::map<std::string, std::shared_ptr<GVariant>> objects;
+    std::map<std::string, Variant> objects;
     if (body == nullptr || !g_variant_is_of_type(body.get(), G_VARIANT_TYPE("(a{oa{sa{sv}}})")))
         return objects;
-    const auto all = share(g_variant_get_child_value(body.get(), 0));
+    const auto all = child(body, 0);
     for (std::size_t i = 0; i < g_variant_n_children(all.get()); ++i) {
-        const auto entry = share(g_variant_get_child_value(all.get(), i));
-        const auto path = share(g_variant_get_child_value(entry.get(), 0));
-        objects[g_variant_get_string(path.get(), nullptr)] =
-            share(g_variant_get_child_value(entry.get(), 1));
+        const auto entry = child(all, i);
+        objects[g_variant_get_string(child(entry, 0).get(), nullptr)] = child(entry, 1);
     }
     return objects;
 }
@@ -106,12 +98,12 @@ GDBusMessage* replyWith(GDBusMessage* question, GVariant* body)
 } // namespace
 
 ScriptedService::ScriptedService(const std::string& address, const std::string& name)
-    : name_(name), connection_(connectToBus(address)),
-      filter_(g_dbus_connection_add_filter(connection_, &ScriptedService::onMessage,
+    : name_(name), client_(address),
+      filter_(g_dbus_connection_add_filter(client_.connection(), &ScriptedService::onMessage,
                                            handedOn(state_), &ScriptedService::releaseState))
 {
     answer("(@a{sv} {},)");
-    ownName(connection_, name);
+    ownName(client_, name);
 }
 
 ScriptedService::~ScriptedService()
@@ -124,12 +116,11 @@ ScriptedService::~ScriptedService()
         for (GDBusMessage* const answer : state_->heldBack)
             g_object_unref(answer);
     }
-    g_dbus_connection_remove_filter(connection_, filter_);
-    g_dbus_connection_close_sync(connection_, nullptr, nullptr);
-    g_object_unref(connection_);
+    g_dbus_connection_remove_filter(client_.connection(), filter_);
 }
 
-bool ScriptedService::State::answer(GDBusMessage* question, std::vector<GDBusMessage*>& due)
+bool ScriptedService::State::answer(GDBusMessage* question, std::vector<GDBusMessage*>& due,
+                                    std::chrono::milliseconds& after)
 {
     const std::string method = g_dbus_message_get_member(question);
     const std::lock_guard<std::mutex> lock(mutex);
@@ -140,6 +131,7 @@ bool ScriptedService::State::answer(GDBusMessage* question, std::vector<GDBusMes
     if (script == scripts.end() && !isGet)
         return false;
     ++timesAsked;
+    after = delay;
     if (GDBusMessage* const answer = isGet ? get(question) : script->second(question))
         heldBack.push_back(answer);
     if (heldBack.size() >= together)
@@ -173,10 +165,9 @@ GDBusMessage* ScriptedService::onMessage(GDBusConnection* connection, GDBusMessa
     if (!incoming || g_dbus_message_get_message_type(message) != G_DBUS_MESSAGE_TYPE_METHOD_CALL)
         return message;
     std::vector<GDBusMessage*> due;
-    const auto taken = takenFrom(state);
-    if (!taken->answer(message, due))
+    std::chrono::milliseconds delay{0};
+    if (!takenFrom(state)->answer(message, due, delay))
         return message;
-    const auto delay = taken->timeToAnswer();
     for (GDBusMessage* const answer : due)
         if (delay > delay.zero())
             std::thread(sendLate, g_object_ref(connection), answer, delay).detach();
@@ -220,25 +211,19 @@ void ScriptedService::follow(const std::string& method, Script script, const std
 // Whoever knew what it had before learns that this is over.
 void ScriptedService::startAgain()
 {
-    GVariant* const released =
-        g_dbus_connection_call_sync(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
-                                    g_variant_new("(s)", name_.c_str()), nullptr,
-                                    G_DBUS_CALL_FLAGS_NONE, PATIENCE_MS, nullptr, nullptr);
-    if (released != nullptr)
-        g_variant_unref(released);
-    ownName(connection_, name_);
+    client_.askBus("ReleaseName", g_variant_new("(s)", name_.c_str()));
+    ownName(client_, name_);
 }
 
 void ScriptedService::send(const std::string& path, const char* interface, const char* signal,
                            GVariant* body)
 {
-    g_dbus_connection_emit_signal(connection_, nullptr, path.c_str(), interface, signal, body,
-                                  nullptr);
+    g_dbus_connection_emit_signal(client_.connection(), nullptr, path.c_str(), interface, signal,
+                                  body, nullptr);
 }
 
 // As object managers do: changed properties by themselves where only these changed.
-void ScriptedService::tellChange(const std::shared_ptr<GVariant>& before,
-                                 const std::shared_ptr<GVariant>& now)
+void ScriptedService::tellChange(const Variant& before, const Variant& now)
 {
     const auto was = objectsIn(before);
     const auto is = objectsIn(now);
@@ -247,10 +232,10 @@ void ScriptedService::tellChange(const std::shared_ptr<GVariant>& before,
         GVariantBuilder gone;
         g_variant_builder_init(&gone, G_VARIANT_TYPE("as"));
         for (std::size_t i = 0; i < g_variant_n_children(interfaces.get()); ++i) {
-            const auto entry = share(g_variant_get_child_value(interfaces.get(), i));
-            const auto name = share(g_variant_get_child_value(entry.get(), 0));
+            const auto entry = child(interfaces, i);
+            const auto name = child(entry, 0);
             const char* const text = g_variant_get_string(name.get(), nullptr);
-            const auto old = share(g_variant_get_child_value(entry.get(), 1));
+            const auto old = child(entry, 1);
             const auto fresh = there != is.end() ? lookUp(there->second, text) : nullptr;
             if (fresh == nullptr)
                 g_variant_builder_add(&gone, "s", text);
@@ -267,7 +252,7 @@ void ScriptedService::tellChange(const std::shared_ptr<GVariant>& before,
         if (was.count(path) == 0 || !g_variant_equal(was.at(path).get(), interfaces.get()))
             send(path, OBJECT_MANAGER, "InterfacesAdded",
                  g_variant_new("(o@a{sa{sv}})", path.c_str(), interfaces.get()));
-    g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
+    g_dbus_connection_flush_sync(client_.connection(), nullptr, nullptr);
 }
 
 GDBusMessage* ScriptedService::reply(GDBusMessage* question, const std::string& body)
@@ -283,7 +268,8 @@ void ScriptedService::answerOnlyTogether(std::size_t count)
 
 void ScriptedService::releaseName()
 {
-    g_dbus_connection_call(connection_, BUS_NAME, BUS_PATH, BUS_NAME, "ReleaseName",
+    g_dbus_connection_call(client_.connection(), "org.freedesktop.DBus", "/org/freedesktop/DBus",
+                           "org.freedesktop.DBus", "ReleaseName",
                            g_variant_new("(s)", name_.c_str()), nullptr, G_DBUS_CALL_FLAGS_NONE,
                            PATIENCE_MS, nullptr, nullptr, nullptr);
 }
@@ -292,12 +278,6 @@ void ScriptedService::answerLate(std::chrono::milliseconds delay)
 {
     const std::lock_guard<std::mutex> lock(state_->mutex);
     state_->delay = delay;
-}
-
-std::chrono::milliseconds ScriptedService::State::timeToAnswer()
-{
-    const std::lock_guard<std::mutex> lock(mutex);
-    return delay;
 }
 
 int ScriptedService::timesAsked() const
@@ -318,7 +298,7 @@ void ScriptedService::answerTo(const std::string& method, const std::string& bod
     const auto now = method == OBJECTS && path.empty() ? parsed(body) : nullptr;
     if (now == nullptr || !g_variant_is_of_type(now.get(), G_VARIANT_TYPE("(a{oa{sa{sv}}})")))
         return follow(method, script, path);
-    std::shared_ptr<GVariant> before;
+    Variant before;
     {
         const std::lock_guard<std::mutex> lock(state_->mutex);
         before = std::exchange(state_->objects, now);
@@ -333,9 +313,8 @@ void ScriptedService::answerTo(const std::string& method, const std::string& bod
 void ScriptedService::emit(const std::string& path, const std::string& interface,
                            const std::string& signal, const std::string& body)
 {
-    g_dbus_connection_emit_signal(connection_, nullptr, path.c_str(), interface.c_str(),
-                                  signal.c_str(), parsed(body).get(), nullptr);
-    g_dbus_connection_flush_sync(connection_, nullptr, nullptr);
+    send(path, interface.c_str(), signal.c_str(), parsed(body).get());
+    g_dbus_connection_flush_sync(client_.connection(), nullptr, nullptr);
 }
 
 void ScriptedService::fail(const std::string& errorName, const std::string& message,
@@ -362,5 +341,6 @@ void ScriptedService::whenAsked(std::function<void()> act, const std::string& me
 
 void ScriptedService::leaveWhenAsked(const std::string& method)
 {
-    whenAsked([this] { g_dbus_connection_close(connection_, nullptr, nullptr, nullptr); }, method);
+    whenAsked([this] { g_dbus_connection_close(client_.connection(), nullptr, nullptr, nullptr); },
+              method);
 }

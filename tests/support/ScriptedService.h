@@ -11,7 +11,7 @@
 #include <string>
 #include <vector>
 
-#include <gio/gio.h>
+#include "support/PrivateBus.h"
 
 /// Owns a name from construction to destruction and answers the method calls that it has a script
 /// for; at first every GetAll, with no properties.
@@ -66,15 +66,15 @@ private:
         std::size_t together = 1;
         std::chrono::milliseconds delay{0};
         std::vector<GDBusMessage*> heldBack;
-        std::shared_ptr<GVariant> objects; // of the last answer to GetManagedObjects
+        port::Variant objects; // of the last answer to GetManagedObjects
 
-        /// Whether there is a script for it; fills the answers that are due.
-        bool answer(GDBusMessage* question, std::vector<GDBusMessage*>& due);
+        /// Whether there is a script for it; fills the answers that are due, and after what time.
+        bool answer(GDBusMessage* question, std::vector<GDBusMessage*>& due,
+                    std::chrono::milliseconds& after);
         GDBusMessage* get(GDBusMessage* question);
-        std::chrono::milliseconds timeToAnswer();
     };
 
-    void tellChange(const std::shared_ptr<GVariant>& before, const std::shared_ptr<GVariant>& now);
+    void tellChange(const port::Variant& before, const port::Variant& now);
     void send(const std::string& path, const char* interface, const char* signal, GVariant* body);
     void startAgain();
     static GDBusMessage* onMessage(GDBusConnection*, GDBusMessage* message, gboolean incoming,
@@ -85,7 +85,7 @@ private:
 
     const std::shared_ptr<State> state_ = std::make_shared<State>();
     const std::string name_;
-    GDBusConnection* const connection_;
+    const BusClient client_;
     const guint filter_;
 };
 

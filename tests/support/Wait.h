@@ -3,7 +3,7 @@
 #ifndef TESTS_SUPPORT_WAIT_H
 #define TESTS_SUPPORT_WAIT_H
 
-#include <gio/gio.h>
+#include "common/GLibTypes.h"
 
 constexpr int PATIENCE_MS = 20000; // also for a sanitizer on a busy machine
 
@@ -13,20 +13,18 @@ template <typename Condition>
 bool runUntil(Condition condition)
 {
     bool late = false;
-    GMainContext* const context = g_main_context_ref_thread_default();
-    GSource* const limit = g_timeout_source_new(PATIENCE_MS);
+    const port::Owned<GMainContext> context(g_main_context_ref_thread_default());
+    const port::Owned<GSource> limit(g_timeout_source_new(PATIENCE_MS));
     const auto end = [](gpointer flag) -> gboolean {
         *static_cast<bool*>(flag) = true;
         return G_SOURCE_CONTINUE;
     };
-    g_source_set_callback(limit, end, &late, nullptr);
-    g_source_attach(limit, context);
-    while (!condition() && !late)
-        g_main_context_iteration(context, TRUE);
-    g_source_destroy(limit);
-    g_source_unref(limit);
-    g_main_context_unref(context);
-    return condition();
+    g_source_set_callback(limit.get(), end, &late, nullptr);
+    g_source_attach(limit.get(), context.get());
+    bool isMet = condition();
+    for (; !isMet && !late; isMet = condition())
+        g_main_context_iteration(context.get(), TRUE);
+    return isMet;
 }
 
 #endif
