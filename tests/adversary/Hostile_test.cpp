@@ -212,9 +212,7 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
         return text;
     };
     const auto withModem = [](const char* property, const std::string& value) {
-        FakeModem modem;
-        modem.modem[property] = value;
-        return modem.text();
+        return FakeModem::with({{property, value}}).text();
     };
     const std::string many =
         list(200000 / TIME_FACTOR, [](int i) { return "'p" + std::to_string(i) + "': <0>"; });
@@ -329,9 +327,8 @@ TEST_F(HostileTest, ModemsThatAreRenamedAllTheTimeTakeBoundedMemory)
     bus.start();
     ScriptedService modems(bus.address(), MODEM_MANAGER);
     const auto namesAfterBecoming = [&](int number) {
-        FakeModem modem;
-        modem.modem["Device"] = "<'" + std::to_string(number) + std::string(3900, 'x') + "'>";
-        modems.answerTo(TREE, treeOf({modem.text()}));
+        const std::string device = std::to_string(number) + std::string(3900, 'x');
+        modems.answerTo(TREE, treeOf({FakeModem::with({{"Device", "<'" + device + "'>"}}).text()}));
         return tel_get_cp_name_list();
     };
     char** const first = namesAfterBecoming(0);

@@ -75,19 +75,13 @@ protected:
             objects.push_back(modem.text());
         service->answerTo(TREE, treeOf(objects));
     }
-    // With a different value of one property.
-    void tellChanged(const std::string& property, const std::string& value) const
+    void tellChanged(const Entries& properties) const
     {
-        FakeModem modem;
-        modem.modem[property] = value;
-        tell(modem);
+        tellAll({FakeModem::with(properties)});
     }
     void tellSlots(const std::string& paths, const std::string& primary) const
     {
-        FakeModem modem;
-        modem.modem["SimSlots"] = paths;
-        modem.modem["PrimarySimSlot"] = primary;
-        tell(modem);
+        tellChanged({{"SimSlots", paths}, {"PrimarySimSlot", primary}});
     }
 
     PrivateBus daemon;
@@ -146,24 +140,16 @@ TEST_F(ScriptedModemsTest, NoSlotIsInUseWhenThePrimaryOneIsNone)
 
 TEST_F(ScriptedModemsTest, SlotsComeInTheOrderOfTheirDevices)
 {
-    FakeModem first;
-    first.path = "/org/freedesktop/ModemManager1/Modem/10";
-    first.modem["Device"] = "<'/sys/a'>";
-    FakeModem second;
-    second.path = "/org/freedesktop/ModemManager1/Modem/9";
-    second.modem["Device"] = "<'/sys/b'>";
-    tellAll({second, first});
+    tellAll(
+        {FakeModem::with({{"Device", "<'/sys/b'>"}}, "/org/freedesktop/ModemManager1/Modem/9"),
+         FakeModem::with({{"Device", "<'/sys/a'>"}}, "/org/freedesktop/ModemManager1/Modem/10")});
     EXPECT_THAT(valueOf(telephony.slots()), ElementsAre("/sys/a", "/sys/b"));
 }
 
 TEST_F(ScriptedModemsTest, ModemsOfOneDeviceHaveNamesOfTheirOwn)
 {
-    FakeModem older;
-    older.path = "/Modem/9";
-    FakeModem younger;
-    younger.path = "/Modem/10";
-    younger.modem["EquipmentIdentifier"] = "<'356938035643809'>";
-    tellAll({younger, older});
+    tellAll({FakeModem::with({{"EquipmentIdentifier", "<'356938035643809'>"}}, "/Modem/10"),
+             FakeModem::with({}, "/Modem/9")});
     EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME, HOME + "@/Modem/10"));
     EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
     EXPECT_EQ("356938035643809", valueOf(telephony.imei(HOME + "@/Modem/10")));
@@ -174,7 +160,7 @@ TEST_F(ScriptedModemsTest, ModemWithoutADeviceIsNamedByItsObject)
     const std::string endless(100000, 'x');
     for (const std::string& device :
          {std::string(), std::string("<5>"), std::string("<''>"), "<'" + endless + "'>"}) {
-        tellChanged("Device", device);
+        tellChanged({{"Device", device}});
         EXPECT_THAT(valueOf(telephony.slots()),
                     ElementsAre("/org/freedesktop/ModemManager1/Modem/0"));
     }
@@ -182,92 +168,59 @@ TEST_F(ScriptedModemsTest, ModemWithoutADeviceIsNamedByItsObject)
 
 TEST_F(ScriptedModemsTest, CardStatusFollowsTheModem)
 {
+    using Status = CardStatus;
+    const char* const failed = "the modem failed";
+    const char* const absent = "there is no SIM card";
+    const char* const unknown = "the modem's state is not known";
+    const char* const notReady = "the SIM card is not ready yet";
+    const char* const wantsPin = "the SIM card is locked: it wants a PIN";
+    const char* const wantsPuk = "the SIM card is locked: it wants a PUK";
+    const char* const network = "the modem is locked to a network";
+    const auto failure = [](const char* reason) { return Entries{{"StateFailedReason", reason}}; };
+    const auto lock = [](const char* lock, const char* retries = "<{uint32 2: uint32 3, 4: 10}>") {
+        return Entries{{"UnlockRequired", lock}, {"UnlockRetries", retries}};
+    };
     const struct {
-        Entries changes;
+        int state;
+        Entries others;
         CardStatus status;
         const char* reason; // of a card that cannot be read
     } rows[] = {
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 0>"}},
-         CardStatus::Unknown,
-         "the modem failed"},
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 1>"}},
-         CardStatus::Unknown,
-         "the modem failed"},
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 2>"}},
-         CardStatus::Absent,
-         "there is no SIM card"},
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 3>"}},
-         CardStatus::Error,
-         "the SIM card cannot be used"},
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 4>"}},
-         CardStatus::Unknown,
-         "the modem failed"},
-        {{{"State", "<-1>"}, {"StateFailedReason", "<uint32 5>"}},
-         CardStatus::Absent,
-         "the eSIM holds no profile"},
-        {{{"State", "<0>"}}, CardStatus::Unknown, "the modem's state is not known"},
-        {{{"State", "<1>"}, {"UnlockRequired", "<uint32 0>"}},
-         CardStatus::Initializing,
-         "the SIM card is not ready yet"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 0>"}},
-         CardStatus::Initializing,
-         "the SIM card is not ready yet"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 1>"}},
-         CardStatus::Initializing,
-         "the SIM card is not ready yet"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 2>"}},
-         CardStatus::PinRequired,
-         "the SIM card is locked: it wants a PIN"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 4>"}},
-         CardStatus::PukRequired,
-         "the SIM card is locked: it wants a PUK"},
-        {{{"State", "<2>"},
-          {"UnlockRequired", "<uint32 4>"},
-          {"UnlockRetries", "<{uint32 4: uint32 0}>"}},
-         CardStatus::Blocked,
+        {-1, failure("<uint32 0>"), Status::Unknown, failed},
+        {-1, failure("<uint32 1>"), Status::Unknown, failed},
+        {-1, failure("<uint32 2>"), Status::Absent, absent},
+        {-1, failure("<uint32 3>"), Status::Error, "the SIM card cannot be used"},
+        {-1, failure("<uint32 4>"), Status::Unknown, failed},
+        {-1, failure("<uint32 5>"), Status::Absent, "the eSIM holds no profile"},
+        {0, {}, Status::Unknown, unknown},
+        {1, lock("<uint32 0>"), Status::Initializing, notReady},
+        {2, lock("<uint32 0>"), Status::Initializing, notReady},
+        {2, lock("<uint32 1>"), Status::Initializing, notReady},
+        {2, lock("<uint32 2>"), Status::PinRequired, wantsPin},
+        {2, lock("<uint32 4>"), Status::PukRequired, wantsPuk},
+        {2, lock("<uint32 4>", "<{uint32 4: uint32 0}>"), Status::Blocked,
          "the SIM card is locked for good"},
-        {{{"State", "<2>"},
-          {"UnlockRequired", "<uint32 4>"},
-          {"UnlockRetries", "<{uint32 2: uint32 0}>"}},
-         CardStatus::PukRequired,
-         "the SIM card is locked: it wants a PUK"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 4>"}, {"UnlockRetries", "<'none'>"}},
-         CardStatus::PukRequired,
-         "the SIM card is locked: it wants a PUK"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 6>"}},
-         CardStatus::NetworkLocked,
-         "the modem is locked to a network"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 16>"}},
-         CardStatus::NetworkLocked,
-         "the modem is locked to a network"},
-        {{{"State", "<2>"}, {"UnlockRequired", "<uint32 17>"}},
-         CardStatus::Unknown,
-         "the modem's state is not known"},
-        {{{"State", "<8>"}, {"UnlockRequired", "<uint32 2>"}},
-         CardStatus::PinRequired,
-         "the SIM card is locked: it wants a PIN"},
-        {{{"State", "<3>"}, {"PowerState", "<uint32 1>"}},
-         CardStatus::PoweredOff,
-         "the modem is switched off"},
-        {{{"State", "<8>"}, {"Sim", "<objectpath '/'>"}},
-         CardStatus::Absent,
-         "there is no SIM card"},
-        {{{"State", "<12>"}}, CardStatus::Unknown, "the modem's state is not known"},
-        {{{"State", "<-2>"}}, CardStatus::Unknown, "the modem's state is not known"},
+        {2, lock("<uint32 4>", "<{uint32 2: uint32 0}>"), Status::PukRequired, wantsPuk},
+        {2, lock("<uint32 4>", "<'none'>"), Status::PukRequired, wantsPuk},
+        {2, lock("<uint32 6>"), Status::NetworkLocked, network},
+        {2, lock("<uint32 16>"), Status::NetworkLocked, network},
+        {2, lock("<uint32 17>"), Status::Unknown, unknown},
+        {8, lock("<uint32 2>"), Status::PinRequired, wantsPin},
+        {3, {{"PowerState", "<uint32 1>"}}, Status::PoweredOff, "the modem is switched off"},
+        {8, {{"Sim", "<objectpath '/'>"}}, Status::Absent, absent},
+        {12, {}, Status::Unknown, unknown},
+        {-2, {}, Status::Unknown, unknown},
     };
     for (const auto& row : rows) {
-        FakeModem modem;
-        std::string shown;
-        for (const auto& [name, value] : row.changes) {
-            modem.modem[name] = value;
-            shown += name + value;
-        }
-        tell(modem);
-        EXPECT_EQ(row.status, valueOf(telephony.card(HOME)).status) << shown;
+        SCOPED_TRACE(std::to_string(row.state) + propertiesText(row.others));
+        Entries changes = row.others;
+        changes["State"] = "<" + std::to_string(row.state) + ">";
+        tellChanged(changes);
+        EXPECT_EQ(row.status, valueOf(telephony.card(HOME)).status);
         for (const auto& error : {errorOf(telephony.imsi(HOME)), errorOf(telephony.number(HOME))}) {
-            ASSERT_TRUE(error) << shown;
-            EXPECT_EQ(Error::Kind::NoSim, error->kind) << shown;
-            EXPECT_EQ(row.reason, error->reason) << shown;
+            ASSERT_TRUE(error);
+            EXPECT_EQ(Error::Kind::NoSim, error->kind);
+            EXPECT_EQ(row.reason, error->reason);
         }
     }
 }
@@ -276,10 +229,7 @@ TEST_F(ScriptedModemsTest, CardOfAWorkingModemIsReady)
 {
     for (int state = 3; state <= 11; ++state)
         for (const char* const lock : {"<uint32 0>", "<uint32 1>", "<uint32 3>", "<uint32 5>"}) {
-            FakeModem modem;
-            modem.modem["State"] = "<" + std::to_string(state) + ">";
-            modem.modem["UnlockRequired"] = lock;
-            tell(modem);
+            tellChanged({{"State", "<" + std::to_string(state) + ">"}, {"UnlockRequired", lock}});
             EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status) << state << lock;
             EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME))) << state << lock;
         }
@@ -287,17 +237,18 @@ TEST_F(ScriptedModemsTest, CardOfAWorkingModemIsReady)
 
 TEST_F(ScriptedModemsTest, ServiceAndRoamingFollowTheRegistration)
 {
+    using State = ServiceState;
     const struct {
         int registration;
         ServiceState service;
         bool roaming;
     } rows[] = {
-        {0, ServiceState::OutOfService, false},   {1, ServiceState::InService, false},
-        {2, ServiceState::OutOfService, false},   {3, ServiceState::OutOfService, false},
-        {5, ServiceState::InService, true},       {6, ServiceState::InService, false},
-        {7, ServiceState::InService, true},       {8, ServiceState::EmergencyOnly, false},
-        {9, ServiceState::InService, false},      {10, ServiceState::InService, true},
-        {11, ServiceState::EmergencyOnly, false},
+        {0, State::OutOfService, false},   {1, State::InService, false},
+        {2, State::OutOfService, false},   {3, State::OutOfService, false},
+        {5, State::InService, true},       {6, State::InService, false},
+        {7, State::InService, true},       {8, State::EmergencyOnly, false},
+        {9, State::InService, false},      {10, State::InService, true},
+        {11, State::EmergencyOnly, false},
     };
     for (const auto& row : rows) {
         FakeModem modem;
@@ -328,7 +279,7 @@ TEST_F(ScriptedModemsTest, UnknownRegistrationIsNotInvented)
 TEST_F(ScriptedModemsTest, MessagesNeedARegisteredModemThatHandlesThem)
 {
     for (int state = -1; state <= 11; ++state) {
-        tellChanged("State", "<" + std::to_string(state) + ">");
+        tellChanged({{"State", "<" + std::to_string(state) + ">"}});
         EXPECT_EQ(state >= 8, valueOf(telephony.smsReady(HOME))) << state;
     }
     FakeModem mute;
@@ -371,12 +322,12 @@ TEST_F(ScriptedModemsTest, PropertiesOfAnotherTypeAreNamed)
         for (const auto& question : telephonyQuestions()) {
             if (std::string(question.name) != row.question)
                 continue;
-            tellChanged(row.property, "<@a{sv} {}>");
+            tellChanged({{row.property, "<@a{sv} {}>"}});
             const auto wrong = question.ask(telephony, HOME);
             ASSERT_TRUE(wrong) << row.property;
             EXPECT_EQ(Error::Kind::NotAvailable, wrong->kind) << row.property;
             EXPECT_EQ(std::string(row.property) + " is no " + row.noun, wrong->reason);
-            tellChanged(row.property, "");
+            tellChanged({{row.property, ""}});
             EXPECT_EQ(std::string(row.property) + " is missing",
                       question.ask(telephony, HOME)->reason);
         }
@@ -384,25 +335,22 @@ TEST_F(ScriptedModemsTest, PropertiesOfAnotherTypeAreNamed)
 
 TEST_F(ScriptedModemsTest, FailureWithoutAReasonIsNamed)
 {
-    FakeModem modem;
-    modem.modem["State"] = "<-1>";
-    modem.modem["StateFailedReason"] = "";
-    tell(modem);
+    tellChanged({{"State", "<-1>"}, {"StateFailedReason", ""}});
     EXPECT_EQ("StateFailedReason is missing", reasonOf(telephony.card(HOME)));
 }
 
 TEST_F(ScriptedModemsTest, ImeiHasDigitsOnly)
 {
     for (const char* const good : {"49015420323751", "490154203237518", "4901542032375183"}) {
-        tellChanged("EquipmentIdentifier", std::string("<'") + good + "'>");
+        tellChanged({{"EquipmentIdentifier", std::string("<'") + good + "'>"}});
         EXPECT_EQ(good, valueOf(telephony.imei(HOME)));
     }
     for (const char* const bad :
          {"4901542032375", "49015420323751834", "49015420323751X", "0x12345678901234", " "}) {
-        tellChanged("EquipmentIdentifier", std::string("<'") + bad + "'>");
+        tellChanged({{"EquipmentIdentifier", std::string("<'") + bad + "'>"}});
         EXPECT_EQ("EquipmentIdentifier is no IMEI", reasonOf(telephony.imei(HOME)));
     }
-    tellChanged("EquipmentIdentifier", "<''>");
+    tellChanged({{"EquipmentIdentifier", "<''>"}});
     EXPECT_EQ("EquipmentIdentifier is empty", reasonOf(telephony.imei(HOME)));
 }
 
@@ -415,7 +363,7 @@ TEST_F(ScriptedModemsTest, FirstNumberThatCanBeDialledIsTheOwnOne)
         {"<['*100#']>", "*100#"},
     };
     for (const auto& [numbers, first] : rows) {
-        tellChanged("OwnNumbers", numbers);
+        tellChanged({{"OwnNumbers", numbers}});
         EXPECT_EQ(first, valueOf(telephony.number(HOME))) << numbers;
     }
 }
@@ -433,6 +381,7 @@ std::string wordOf(const Result<Sourced<T>>& answer)
 
 TEST_F(ScriptedModemsTest, ReportTellsWhatTheModemKnows)
 {
+    const char* const noNetwork = "the modem is not registered with a network";
     const struct {
         Entries modem;
         Entries network;
@@ -472,16 +421,10 @@ TEST_F(ScriptedModemsTest, ReportTellsWhatTheModemKnows)
           "2", "there is no SIM card"}},
         {{{"State", "<7>"}, {"SignalQuality", "<(uint32 62, true)>"}},
          {{"OperatorCode", "<'20801'>"}},
-         {"the modem is not registered with a network",
-          "the modem is not registered with a network",
-          "the modem is not registered with a network",
-          "the modem is not registered with a network",
-          "the modem is not registered with a network", "2", "3"}},
+         {noNetwork, noNetwork, noNetwork, noNetwork, noNetwork, "2", "3"}},
     };
     for (const auto& row : rows) {
-        FakeModem modem;
-        for (const auto& [name, value] : row.modem)
-            modem.modem[name] = value;
+        FakeModem modem = FakeModem::with(row.modem);
         modem.network = row.network;
         tell(modem);
         const auto reports = telephony.reports();
@@ -500,10 +443,7 @@ TEST_F(ScriptedModemsTest, ReportTellsWhatTheModemKnows)
 
 TEST_F(ScriptedModemsTest, IccidIsToldAlsoOfALockedCard)
 {
-    FakeModem locked;
-    locked.modem["State"] = "<2>";
-    locked.modem["UnlockRequired"] = "<uint32 2>";
-    tell(locked);
+    tellChanged({{"State", "<2>"}, {"UnlockRequired", "<uint32 2>"}});
     const std::pair<const char*, const char*> rows[] = {
         {"<'8999900000000000010'>", "8999900000000000010"},
         {"<'89999000000000001'>", "SimIdentifier is no ICCID"},
@@ -518,7 +458,7 @@ TEST_F(ScriptedModemsTest, IccidIsToldAlsoOfALockedCard)
         EXPECT_EQ(answer, wordOf(telephony.iccid(HOME)));
         EXPECT_EQ(1, service->timesAsked() - before);
     }
-    tellChanged("Sim", "<objectpath '/'>");
+    tellChanged({{"Sim", "<objectpath '/'>"}});
     EXPECT_EQ("there is no SIM card", wordOf(telephony.iccid(HOME)));
 }
 
@@ -560,10 +500,8 @@ TEST_F(ScriptedModemsTest, ReasonsNeverHoldAnIdentity)
 {
     const std::string imsi = "999990123456789";
     service->answer(simOf("<'" + imsi + "'>", "<'00101'>"));
-    FakeModem modem;
-    modem.modem["OwnNumbers"] = "<'+15551230001'>";
-    modem.modem["EquipmentIdentifier"] = "<'" + imsi + "99'>";
-    tell(modem);
+    tellChanged(
+        {{"OwnNumbers", "<'+15551230001'>"}, {"EquipmentIdentifier", "<'" + imsi + "99'>"}});
     for (const auto& question : telephonyQuestions())
         if (const auto error = question.ask(telephony, HOME)) {
             EXPECT_THAT(error->reason, Not(HasSubstr("0123456789"))) << question.name;
@@ -639,9 +577,9 @@ TEST_F(ScriptedModemsTest, HugeValuesAreBorne)
     tellSlots(slots + "]>", "<uint32 1>");
     EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
     const std::string endless = "<'" + std::string(1000000, '1') + "'>";
-    tellChanged("EquipmentIdentifier", endless);
+    tellChanged({{"EquipmentIdentifier", endless}});
     EXPECT_EQ("EquipmentIdentifier is no IMEI", reasonOf(telephony.imei(HOME)));
-    tellChanged("OwnNumbers", "<['" + std::string(1000000, '1') + "']>");
+    tellChanged({{"OwnNumbers", "<['" + std::string(1000000, '1') + "']>"}});
     EXPECT_EQ(std::nullopt, valueOf(telephony.number(HOME)));
     service->answer(simOf(endless, "<'11111'>"));
     EXPECT_EQ("error: Imsi does not fit OperatorIdentifier", show(telephony.imsi(HOME)));
@@ -719,7 +657,7 @@ TEST_F(ScriptedModemsTest, CardOfAServiceThatTookOverIsNotMistaken)
 TEST_F(ScriptedModemsTest, CardThatMovedToAnotherObjectIsFollowed)
 {
     EXPECT_EQ("001 01 0123456789", show(telephony.imsi(HOME)));
-    tellChanged("Sim", "<objectpath '" + std::string(SIM_1) + "'>");
+    tellChanged({{"Sim", "<objectpath '" + std::string(SIM_1) + "'>"}});
     service->answerTo("GetAll", simOf("<'26201987654321'>", "<'26201'>"), SIM_1);
     EXPECT_EQ("262 01 987654321", show(telephony.imsi(HOME)));
 }
@@ -747,15 +685,11 @@ class SubscriptionsTest : public ScriptedModemsTest {
 protected:
     SubscriptionsTest()
     {
-        FakeModem first;
-        first.path = "/Modem/7";
-        first.modem["Device"] = "<'/sys/a'>";
-        FakeModem second;
-        second.path = "/Modem/3";
-        second.modem["Device"] = "<'/sys/b'>";
-        second.modem["SimSlots"] = THREE_SLOTS;
-        second.modem["PrimarySimSlot"] = "<uint32 3>";
-        tellAll({first, second});
+        tellAll({FakeModem::with({{"Device", "<'/sys/a'>"}}, "/Modem/7"),
+                 FakeModem::with({{"Device", "<'/sys/b'>"},
+                                  {"SimSlots", THREE_SLOTS},
+                                  {"PrimarySimSlot", "<uint32 3>"}},
+                                 "/Modem/3")});
         network.answerTo(TREE, networkTree("gsm", "/Modem/3"));
     }
 

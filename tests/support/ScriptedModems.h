@@ -43,6 +43,16 @@ struct FakeModem {
     Entries network = {{"RegistrationState", "<uint32 1>"}}; // home
     Entries interfaces = {};                                 // others
 
+    // With other values of some properties.
+    static FakeModem with(const Entries& properties,
+                          const std::string& path = "/org/freedesktop/ModemManager1/Modem/0")
+    {
+        FakeModem modem;
+        modem.path = path;
+        for (const auto& [name, value] : properties)
+            modem.modem[name] = value;
+        return modem;
+    }
     std::string text() const
     {
         Entries all = {{"org.freedesktop.ModemManager1.Modem", propertiesText(modem)},
