@@ -59,9 +59,11 @@ struct Question {
 
 const std::vector<Question>& questions()
 {
+    using Q = port::Question;
+    using port::Change;
     static const std::vector<Question> all = {
-        {"language", [](Backend& from) { return reasonOf(from.get<port::Question::Language>()); }},
-        {"model", [](Backend& from) { return reasonOf(from.get<port::Question::ModelName>()); }},
+        {"language", [](Backend& from) { return reasonOf(from.get<Q::Language>()); }},
+        {"model", [](Backend& from) { return reasonOf(from.get<Q::ModelName>()); }},
         {"slots", [](Backend& from) { return reasonOf(from.telephony().slots()); }},
         {"identity", // as the library asks for it
          [](Backend& from) {
@@ -76,20 +78,17 @@ const std::vector<Question>& questions()
         {"cellular", [](Backend& from) { return reasonOf(from.network().cellular()); }},
         {"wifi", [](Backend& from) { return reasonOf(from.network().wifi()); }},
         {"bluetooth", [](Backend& from) { return reasonOf(from.network().bluetooth()); }},
-        {"mobileData",
-         [](Backend& from) { return reasonOf(from.get<port::Question::MobileData>()); }},
-        {"dataRoaming",
-         [](Backend& from) { return reasonOf(from.get<port::Question::DataRoaming>()); }},
+        {"mobileData", [](Backend& from) { return reasonOf(from.get<Q::MobileData>()); }},
+        {"dataRoaming", [](Backend& from) { return reasonOf(from.get<Q::DataRoaming>()); }},
         {"services", [](Backend& from) { return from.findServices().empty() ? "none" : ""; }},
         {"listener",
          [](Backend& from) {
              port::ChangeEvents events(from);
              bool isSet = true;
-             for (const auto change :
-                  {port::Change::WifiDevice, port::Change::WifiConnection, port::Change::WifiStatus,
-                   port::Change::PacketData, port::Change::FlightMode})
+             for (const auto change : {Change::WifiDevice, Change::WifiConnection,
+                                       Change::WifiStatus, Change::PacketData, Change::FlightMode})
                  isSet = events.set(change, [](int) {}) && isSet;
-             events.unset(port::Change::FlightMode);
+             events.unset(Change::FlightMode);
              return std::string(isSet ? "" : "not set");
          }},
     };
@@ -97,13 +96,9 @@ const std::vector<Question>& questions()
 }
 
 // On a thread of its own, which has asked nothing before.
-int millisecondsOf(const std::function<void()>& work)
+int millisecondsOfThread(const std::function<void()>& work)
 {
-    const auto begin = std::chrono::steady_clock::now();
-    std::thread(work).join();
-    return static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(
-                                std::chrono::steady_clock::now() - begin)
-                                .count());
+    return millisecondsOf([&] { std::thread(work).join(); });
 }
 
 class HostileTest : public testing::Test {
@@ -121,7 +116,7 @@ protected:
         std::vector<int> times(questions().size());
         together(static_cast<int>(times.size()), [&](int number) {
             const auto fresh = port::makeLinuxBackend();
-            times[number] = millisecondsOf([&] { questions()[number].ask(*fresh); });
+            times[number] = millisecondsOfThread([&] { questions()[number].ask(*fresh); });
         });
         for (std::size_t number = 0; number < times.size(); ++number)
             EXPECT_LT(times[number], milliseconds + SLACK_MS + pauses.ofAnAnswer())
@@ -138,7 +133,7 @@ protected:
         std::atomic<int> worst{0};
         together(16, [&](int) {
             for (const Question& question : questions()) {
-                const int time = millisecondsOf([&] { question.ask(*backend); });
+                const int time = millisecondsOfThread([&] { question.ask(*backend); });
                 for (int before = worst;
                      time > before && !worst.compare_exchange_weak(before, time);)
                     continue;
@@ -228,9 +223,7 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
          "(@a{oa{sa{sv}}} {" +
              list(17,
                   [](int i) {
-                      FakeModem modem;
-                      modem.path += std::to_string(i);
-                      return modem.text();
+                      return FakeModem::with({}, FakeModem().path + std::to_string(i)).text();
                   }) +
              "},)",
          "told of more than 16 modems"},
@@ -257,7 +250,8 @@ TEST_F(HostileTest, RepliesThatAreTooLargeAreRefused)
         });
         const auto backend = port::makeLinuxBackend();
         std::string reason;
-        const int time = millisecondsOf([&] { reason = reasonOf(backend->telephony().slots()); });
+        const int time =
+            millisecondsOfThread([&] { reason = reasonOf(backend->telephony().slots()); });
         std::cout << row.what << ": " << time << " ms, " << reason << std::endl;
         EXPECT_THAT(reason, HasSubstr(row.reason)) << row.what;
         EXPECT_LT(time, QUESTION_MS + SLACK_MS + pauses.ofAnAnswer()) << row.what;

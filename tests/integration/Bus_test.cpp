@@ -189,6 +189,13 @@ protected:
         service = std::make_unique<ScriptedService>(daemon.address(), HOSTNAME1.name);
     }
 
+    // Which has a name.
+    void startBox()
+    {
+        startBox();
+    }
+
+    const std::string box = "box <hostname1 PrettyHostname>";
     PrivateBus daemon;
     std::unique_ptr<ScriptedService> service;
     Bus bus;
@@ -206,10 +213,7 @@ TEST_F(BusTest, TextIsAnsweredWithItsOrigin)
 TEST_F(BusTest, MalformedRepliesNameWhatIsWrong)
 {
     startService();
-    const struct {
-        const char* reply;
-        const char* reason;
-    } rows[] = {
+    const std::pair<const char*, const char*> rows[] = {
         {"(@a{sv} {},)", "hostname1: PrettyHostname is missing, StaticHostname is missing"},
         {"({'PrettyHostname': <5>, 'StaticHostname': <''>},)",
          "hostname1: PrettyHostname is no text, StaticHostname is empty"},
@@ -222,9 +226,9 @@ TEST_F(BusTest, MalformedRepliesNameWhatIsWrong)
         {"({'PrettyHostname': 'a'},)", "org.freedesktop.hostname1: "},
         {"(@a{sv} {}, 1)", "org.freedesktop.hostname1: "},
     };
-    for (const auto& row : rows) {
-        service->answer(row.reply);
-        EXPECT_THAT(askName(bus), StartsWith(std::string("error: ") + row.reason)) << row.reply;
+    for (const auto& [reply, reason] : rows) {
+        service->answer(reply);
+        EXPECT_THAT(askName(bus), StartsWith(std::string("error: ") + reason)) << reply;
     }
 }
 
@@ -327,9 +331,8 @@ TEST_F(BusTest, RestartedBusIsFoundByTheNextQuestion)
 
 TEST_F(BusTest, FrozenBusIsBoundedAndUsedAgainLater)
 {
-    startService();
-    service->answer("({'PrettyHostname': <'box'>},)");
-    EXPECT_EQ("box <hostname1 PrettyHostname>", askName(bus));
+    startBox();
+    EXPECT_EQ(box, askName(bus));
     daemon.freeze();
     const int time = millisecondsOf([this] {
         EXPECT_EQ("error: org.freedesktop.hostname1 did not answer in time", askName(bus));
@@ -340,7 +343,7 @@ TEST_F(BusTest, FrozenBusIsBoundedAndUsedAgainLater)
     std::string name;
     for (int i = 0; i < 10 && name.rfind("box", 0) != 0; ++i)
         name = askName(bus);
-    EXPECT_EQ("box <hostname1 PrettyHostname>", name);
+    EXPECT_EQ(box, name);
 }
 
 TEST_F(BusTest, FailedStartOfAServiceIsToldAtOnce)
@@ -364,11 +367,10 @@ TEST_F(BusTest, StateOfAServiceIsTold)
 {
     daemon.addActivatable("com.example.Other", "/bin/false");
     startService();
-    BusObject other = {"com.example.Other", "/com/example", "com.example.Other", Start::WhenAsked};
-    BusObject neverStarted = other;
-    neverStarted.start = Start::Never;
-    BusObject missing = other;
-    missing.name = "com.example.None";
+    const BusObject other = {"com.example.Other", "/com/example", "com.example.Other",
+                             Start::WhenAsked};
+    const BusObject neverStarted = {other.name, other.path, other.interface, Start::Never};
+    const BusObject missing = {"com.example.None", other.path, other.interface, other.start};
     const auto states = bus.statesOf({HOSTNAME1, other, neverStarted, missing});
     ASSERT_EQ(4U, states.size());
     EXPECT_EQ("running", states[0].value());
@@ -386,25 +388,21 @@ TEST_F(BusTest, ConnectionIsNotTheSharedOne)
     GDBusConnection* const shared = g_bus_get_sync(G_BUS_TYPE_SYSTEM, nullptr, nullptr);
     ASSERT_NE(nullptr, shared);
     g_dbus_connection_set_exit_on_close(shared, FALSE);
-    GVariant* const reply = g_dbus_connection_call_sync(
-        shared, "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus",
-        "ListNames", nullptr, nullptr, G_DBUS_CALL_FLAGS_NONE, 5000, nullptr, nullptr);
+    const auto reply = BusClient(daemon.address()).askBus("ListNames", nullptr);
     ASSERT_NE(nullptr, reply);
-    GVariant* const names = g_variant_get_child_value(reply, 0);
-    EXPECT_EQ(3U, g_variant_n_children(names)); // the bus itself, the shared one, the port's
-    g_variant_unref(names);
-    g_variant_unref(reply);
+    const port::Owned<GVariant> names(g_variant_get_child_value(reply.get(), 0));
+    // the bus itself, the shared one, the port's, the one that asks
+    EXPECT_EQ(4U, g_variant_n_children(names.get()));
     g_object_unref(shared);
 }
 
 TEST_F(BusTest, ForkedProcessIsAnsweredAtOnce)
 {
-    startService();
-    service->answer("({'PrettyHostname': <'box'>},)");
-    EXPECT_EQ("box <hostname1 PrettyHostname>", askName(bus));
+    startBox();
+    EXPECT_EQ(box, askName(bus));
     EXPECT_EQ("error: the process was forked after it had asked the system bus",
               inChild([this] { return askName(bus); }));
-    EXPECT_EQ("box <hostname1 PrettyHostname>", askName(bus));
+    EXPECT_EQ(box, askName(bus));
 }
 
 TEST_F(BusTest, ThreadsMayAskWhileTheBusRestarts)
@@ -419,12 +417,11 @@ TEST_F(BusTest, ThreadsMayAskWhileTheBusRestarts)
     });
     for (int round = 0; round < 3; ++round) {
         daemon.kill();
-        startService();
-        service->answer("({'PrettyHostname': <'box'>},)");
+        startBox();
     }
     done = true;
     askers.join();
-    EXPECT_EQ("box <hostname1 PrettyHostname>", askName(bus));
+    EXPECT_EQ(box, askName(bus));
 }
 
 } // namespace

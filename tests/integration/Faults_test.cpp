@@ -326,6 +326,7 @@ const Probe TIME("0 now", [] {
 const Probe CONNECTED("yes, 5 2 2, handles 0", [] {
     return yesOrNo(library().IsNetworkConnected(false, false)) + ", " + states();
 });
+// The library does not look at what this call gives, so that it is made here.
 const Probe DESTROYED("0, 5 2 2, handles 0", [] {
     connection_h handle = nullptr;
     connection_create(&handle);
@@ -333,6 +334,7 @@ const Probe DESTROYED("0, 5 2 2, handles 0", [] {
     return std::to_string(code) + ", " + states();
 });
 const Probe PACKAGE_VERSION("0 1.2, handles 0", packageVersion);
+// Likewise.
 const Probe PACKAGE_DESTROYED("0, 0 1.2, handles 0", [] {
     package_info_h handle = nullptr;
     package_info_create("app", &handle);
@@ -366,6 +368,7 @@ const Probe SMS("yes 1", [] {
     const bool wasRead = library().CheckSmsEnabled(modem, &isReady);
     return yesOrNo(wasRead) + " " + std::to_string(isReady);
 });
+// Likewise.
 const Probe MODEM_RELEASED("0, 0 001", [] {
     return std::to_string(tel_deinit(tel_init("cp0"))) + ", " + stored(&CoreSystem::GetMCCFromSim);
 });
@@ -422,6 +425,7 @@ const Probe NUMBER_OF_HANDLE("yes +15550100", [] {
 });
 const Probe SALES_CODE("DBT", [] { return text(library().GetCSC()); });
 
+// An error by its name and by its number.
 #define NAMED(error) #error, error
 
 const Row ROWS[] = {

@@ -471,10 +471,9 @@ TEST_F(NetworkTest, ConnectivityIsWhatNetworkManagerSays)
 // What NetworkManager tells of a Wi-Fi device at an access point.
 std::string wifiAt(unsigned state, const std::string& point, const std::string& name)
 {
-    const std::string device = NM_DEVICE;
     return treeOf({object(NM_PATH, NM, flag("WirelessEnabled", true) + number("RadioFlags", 1)),
-                   "@o '/Devices/1': {'" + device + "': {" + number("DeviceType", WIFI) + ", " +
-                       number("State", state) + ", 'Interface': <'wlan0'>}, '" + device +
+                   "@o '/Devices/1': {'" + NM_DEVICE + "': {" + number("DeviceType", WIFI) + ", " +
+                       number("State", state) + ", 'Interface': <'wlan0'>}, '" + NM_DEVICE +
                        ".Wireless': {'ActiveAccessPoint': <@o '" + point +
                        "'>, 'Bitrate': <uint32 1>}}",
                    object("/AccessPoint/7", NM + ".AccessPoint", "'Ssid': <" + name + ">")});

@@ -261,6 +261,10 @@ TEST_F(PlayedServices, CountDownWrongPins)
 TEST_F(PlayedServices, RefuseTheRest)
 {
     const std::string dbus = "org.freedesktop.DBus.Error.";
+    const std::string core = "org.freedesktop.ModemManager1.Error.Core.";
+    const std::string nm = "org.freedesktop.NetworkManager.";
+    const char* const host = "/org/freedesktop/hostname1";
+    const char* const locale = "/org/freedesktop/locale1";
     EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Enable", "('x',)"), dbus + "InvalidArgs");
     EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Nonsense"), dbus + "UnknownMethod");
     EXPECT_EQ(call(MM, "/nowhere", MM_MODEM, "Enable", "(true,)"), dbus + "UnknownMethod");
@@ -270,18 +274,15 @@ TEST_F(PlayedServices, RefuseTheRest)
     EXPECT_THAT(call(NM, NM_PATH, NM, "GetPermissions"),
                 HasSubstr("'org.freedesktop.NetworkManager.network-control': 'yes'"));
     EXPECT_EQ(call(MM, "/org/freedesktop/ModemManager1", MM, "SetLogging", "('DEBUG',)"), "()");
-    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Command", "('AT', uint32 1)"),
-              "org.freedesktop.ModemManager1.Error.Core.Unsupported");
-    EXPECT_EQ(call(NM, NM_PATH, NM, "GetDeviceByIpIface", "('eth9',)"),
-              "org.freedesktop.NetworkManager.UnknownDevice");
+    EXPECT_EQ(call(MM, MODEM, MM_MODEM, "Command", "('AT', uint32 1)"), core + "Unsupported");
+    EXPECT_EQ(call(NM, NM_PATH, NM, "GetDeviceByIpIface", "('eth9',)"), nm + "UnknownDevice");
     EXPECT_EQ(call(NM, NM_PATH, NM, "DeactivateConnection", "(objectpath '/x',)"),
-              "org.freedesktop.NetworkManager.ConnectionNotActive");
+              nm + "ConnectionNotActive");
     EXPECT_EQ(call("org.bluez", ADAPTER, "org.bluez.Adapter1", "StartDiscovery"),
               "org.bluez.Error.NotSupported");
-    EXPECT_EQ(call(HOSTNAME, "/org/freedesktop/hostname1", HOSTNAME, "SetStaticHostname",
-                   "('bad name!', false)"),
+    EXPECT_EQ(call(HOSTNAME, host, HOSTNAME, "SetStaticHostname", "('bad name!', false)"),
               dbus + "InvalidArgs");
-    EXPECT_EQ(call(LOCALE, "/org/freedesktop/locale1", LOCALE, "SetLocale", "(['FOO=x'], false)"),
+    EXPECT_EQ(call(LOCALE, locale, LOCALE, "SetLocale", "(['FOO=x'], false)"),
               dbus + "InvalidArgs");
 }
 
@@ -302,6 +303,9 @@ TEST_F(PlayedServices, MisbehaveAsTheFileSays)
         return call(MM, MODEM, PROPERTIES, "Get",
                     "('org.freedesktop.ModemManager1.Modem', 'State')", timeoutMs);
     };
+    const auto behave = [this](const char* how) {
+        played_.become(with(PHONE, {{"service.ModemManager", how}}));
+    };
     const char* const gone = "org.freedesktop.DBus.Error.ServiceUnknown";
     const char* const died = "org.freedesktop.DBus.Error.NoReply"; // with the call
     const auto askWhileIt = [&](const char* other) {
@@ -310,20 +314,19 @@ TEST_F(PlayedServices, MisbehaveAsTheFileSays)
             answer = askModem(5000);
         return answer;
     };
-    played_.become(with(PHONE, {{"service.ModemManager", "absent"}}));
+    behave("absent");
     EXPECT_EQ(askWhileIt(died), gone); // the bus may pass a call on before it knows
-    played_.become(with(PHONE, {{"service.ModemManager", "silent"}}));
+    behave("silent");
     EXPECT_EQ(askModem(50), "Timeout was reached");
     EXPECT_EQ(get(NM, NM_PATH, NM, "WirelessEnabled"), "(<true>,)"); // the others go on
-    played_.become(with(PHONE, {{"service.ModemManager", "{ error = \"slow\", delay_ms = 300 }"}}));
+    behave("{ error = \"slow\", delay_ms = 300 }");
     EXPECT_EQ(askModem(50), "Timeout was reached");
     EXPECT_EQ(askModem(5000), "(<8>,)");
-    played_.become(with(
-        PHONE, {{"service.ModemManager", "{ error = \"crashing\", call = 2, delay_ms = 1 }"}}));
+    behave("{ error = \"crashing\", call = 2, delay_ms = 1 }");
     EXPECT_EQ(askModem(5000), "(<8>,)");
     EXPECT_EQ(askModem(5000), died);
     EXPECT_EQ(askWhileIt(gone), "(<8>,)"); // it came back
-    played_.become(with(PHONE, {{"service.ModemManager", "crashing"}}));
+    behave("crashing");
     EXPECT_EQ(askWhileIt(died), gone);
     played_.become(PHONE);
     EXPECT_EQ(askModem(5000), "(<8>,)");

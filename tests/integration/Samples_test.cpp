@@ -70,34 +70,23 @@ std::string askText(Text ask)
 
 using Conversion = void (CoreSystem::*)(const char*, char**);
 
-// Replaces a country's key by the answer of another question.
-template <Conversion question>
-std::string converted(const std::string& key)
-{
-    char* answer = nullptr;
-    (library().*question)(key.c_str(), &answer);
-    return shown(answer);
-}
-
 std::string mcc()
 {
     return askText([](char** slot) { return library().GetMCCFromSim(slot); });
 }
-std::string callingCode()
+
+// A question about a country, keyed by what another one tells.
+template <Conversion question, std::string (*key)()>
+std::string by()
 {
-    return converted<&CoreSystem::GetCountryCallingCodeFromMcc>(mcc());
+    char* answer = nullptr;
+    (library().*question)(key().c_str(), &answer);
+    return shown(answer);
 }
 
-template <Conversion question>
-std::string ofMcc()
-{
-    return converted<question>(mcc());
-}
-template <Conversion question>
-std::string ofCallingCode()
-{
-    return converted<question>(callingCode());
-}
+constexpr auto callingCode = by<&CoreSystem::GetCountryCallingCodeFromMcc, mcc>;
+constexpr auto countryCode = by<&CoreSystem::GetCountryCodeFromMcc, mcc>;
+constexpr auto serviceCountryCode = by<&CoreSystem::GetServiceCountryCodeFromMcc, mcc>;
 
 struct QuietListener : IConnectionStateListener {
     void OnWifiDeviceStateChanged(int, void*) override {}
@@ -178,24 +167,17 @@ const Questions OTHERS = {
      }},
     {"IsValidMcc", [] { return shown(library().IsValidMcc(mcc().c_str())); }},
     {"IsMoSupportMcc", [] { return shown(library().IsMoSupportMcc(mcc().c_str())); }},
-    {"GetCountryCodeFromMcc", ofMcc<&CoreSystem::GetCountryCodeFromMcc>},
-    {"GetCountryNameFromMcc", ofMcc<&CoreSystem::GetCountryNameFromMcc>},
-    {"GetServiceCountryCodeFromMcc", ofMcc<&CoreSystem::GetServiceCountryCodeFromMcc>},
+    {"GetCountryCodeFromMcc", countryCode},
+    {"GetCountryNameFromMcc", by<&CoreSystem::GetCountryNameFromMcc, mcc>},
+    {"GetServiceCountryCodeFromMcc", serviceCountryCode},
     {"GetCountryCallingCodeFromMcc", callingCode},
-    {"GetAlpha3CountryCodeFromMcc", ofMcc<&CoreSystem::GetAlpha3CountryCodeFromMcc>},
-    {"GetMccFromCountryCode",
-     [] {
-         return converted<&CoreSystem::GetMccFromCountryCode>(
-             ofMcc<&CoreSystem::GetCountryCodeFromMcc>());
-     }},
+    {"GetAlpha3CountryCodeFromMcc", by<&CoreSystem::GetAlpha3CountryCodeFromMcc, mcc>},
+    {"GetMccFromCountryCode", by<&CoreSystem::GetMccFromCountryCode, countryCode>},
     {"GetMccFromServiceCountryCode",
-     [] {
-         return converted<&CoreSystem::GetMccFromServiceCountryCode>(
-             ofMcc<&CoreSystem::GetServiceCountryCodeFromMcc>());
-     }},
-    {"GetMccFromCountryCallingCode", ofCallingCode<&CoreSystem::GetMccFromCountryCallingCode>},
+     by<&CoreSystem::GetMccFromServiceCountryCode, serviceCountryCode>},
+    {"GetMccFromCountryCallingCode", by<&CoreSystem::GetMccFromCountryCallingCode, callingCode>},
     {"GetCountryNameFromCountryCallingCode",
-     ofCallingCode<&CoreSystem::GetCountryNameFromCountryCallingCode>},
+     by<&CoreSystem::GetCountryNameFromCountryCallingCode, callingCode>},
     {"GetCountryNameAlpha2FromCountryCallingCode",
      [] { // which is the library's own text
          char* alpha2 = nullptr;

@@ -2,19 +2,15 @@
 // Telephony from services under the real names that say what no real one could be brought to say.
 #include "linux/Telephony.h"
 
-#include <chrono>
-
 #include <gmock/gmock.h>
 
 #include "linux/ModemManager.h"
 #include "linux/NetworkManager.h"
 #include "support/Answer.h"
-#include "support/Pauses.h"
 #include "support/PrivateBus.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
 #include "support/TelephonyQuestions.h"
-#include "support/Together.h"
 
 using port::CardStatus;
 using port::Error;
@@ -513,14 +509,10 @@ TEST_F(ScriptedModemsTest, RepliesOfAnotherTypeAreErrors)
 {
     for (const char* const body : {"()", "('text',)", "(@a{sv} {},)", "(@a{oa{sv}} {},)"}) {
         service->answerTo(TREE, body);
-        for (const auto& question : telephonyQuestions()) {
-            const auto error = question.ask(telephony, HOME);
-            ASSERT_TRUE(error) << question.name << body;
-            EXPECT_EQ(Error::Kind::NotAvailable, error->kind);
-            EXPECT_EQ("org.freedesktop.ModemManager1: the reply to GetManagedObjects is of another "
-                      "type",
-                      error->reason);
-        }
+        SCOPED_TRACE(body);
+        expectErrors(telephony, Error::Kind::NotAvailable,
+                     "org.freedesktop.ModemManager1: the reply to GetManagedObjects is of another "
+                     "type");
     }
     tell({});
     for (const char* const body : {"()", "('text',)", "(@a{ss} {},)"}) {
@@ -538,12 +530,7 @@ TEST_F(ScriptedModemsTest, RefusedQuestionIsDenied)
     ASSERT_FALSE(imsi);
     EXPECT_EQ(Error::Kind::Denied, imsi.error().kind);
     service->fail(refusal, "not for you", TREE);
-    for (const auto& question : telephonyQuestions()) {
-        const auto error = question.ask(telephony, HOME);
-        ASSERT_TRUE(error) << question.name;
-        EXPECT_EQ(Error::Kind::Denied, error->kind) << question.name;
-        EXPECT_EQ("org.freedesktop.ModemManager1: not for you", error->reason) << question.name;
-    }
+    expectErrors(telephony, Error::Kind::Denied, "org.freedesktop.ModemManager1: not for you");
 }
 
 TEST_F(ScriptedModemsTest, SimThatWentMeanwhileIsNotAvailable)
@@ -588,15 +575,7 @@ TEST_F(ScriptedModemsTest, HugeValuesAreBorne)
 TEST_F(ScriptedModemsTest, SilentServiceIsBounded)
 {
     service->keepSilent(TREE);
-    const int time = millisecondsOf([this] {
-        together(static_cast<int>(telephonyQuestions().size()), [this](int i) {
-            const auto error =
-                telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
-            ASSERT_TRUE(error);
-            EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
-        });
-    });
-    EXPECT_LT(time, Bus::CALL_TIMEOUT_MS + SLACK_MS);
+    EXPECT_LT(expectSilence(telephony), Bus::CALL_TIMEOUT_MS + SLACK_MS);
 }
 
 TEST_F(ScriptedModemsTest, SilentSimIsBounded)

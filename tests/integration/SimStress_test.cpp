@@ -16,7 +16,6 @@
 
 #include "support/ModemsOnBus.h"
 #include "support/TelephonyQuestions.h"
-#include "support/Together.h"
 
 namespace {
 

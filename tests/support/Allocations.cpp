@@ -4,7 +4,6 @@
 #include <new>
 
 #include "FailingAllocation.h"
-#include "Ledger.h"
 
 using namespace fake;
 

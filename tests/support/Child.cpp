@@ -5,6 +5,7 @@
 #include <csignal>
 #include <stdexcept>
 
+#include <fcntl.h>
 #include <sched.h>
 #include <sys/mount.h>
 #include <sys/prctl.h>
@@ -102,6 +103,12 @@ void Process::freeze() const
 void Process::thaw() const
 {
     tell(SIGCONT);
+}
+
+bool writeInto(const char* file)
+{
+    const int log = open(file, O_WRONLY | O_CREAT | O_APPEND, 0600);
+    return log >= 0 && dup2(log, STDOUT_FILENO) >= 0 && dup2(log, STDERR_FILENO) >= 0;
 }
 
 bool enterPrivateMounts()

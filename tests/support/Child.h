@@ -41,6 +41,9 @@ private:
     pid_t id_ = 0;
 };
 
+/// For a child only: both outputs go to the end of a file. False when they cannot.
+bool writeInto(const char* file);
+
 /// For a child only: a mount namespace of its own, in which no change reaches the machine. False
 /// when that is not permitted here.
 bool enterPrivateMounts();

@@ -6,6 +6,12 @@
 #ifndef CORESYSTEM_TESTS_SUPPORT_FAILING_ALLOCATION_H
 #define CORESYSTEM_TESTS_SUPPORT_FAILING_ALLOCATION_H
 
+#include <cstdint>
+#include <map>
+#include <mutex>
+#include <string>
+#include <vector>
+
 namespace fake {
 
 enum class Allocation {
@@ -34,6 +40,35 @@ public:
     AllocationPause(const AllocationPause&) = delete;
     AllocationPause& operator=(const AllocationPause&) = delete;
 };
+
+// Who allocated which C string, and which of them were freed. Any thread. Addresses are kept
+// inverted, so that the ledger never hides a leak from LeakSanitizer.
+class Ledger {
+public:
+    // A malloc copy that counts as the platform's own.
+    char* handOut(const std::string& text);
+
+    // Strings that nobody has freed yet, sorted: "platform: TEXT" from handOut(), "copy: TEXT" from
+    // strdup().
+    std::vector<std::string> live() const;
+    // The same for one string; "" for anything else.
+    std::string origin(const char* text) const;
+    // Frees what nobody has freed yet and tells what it was: for what the library keeps on purpose.
+    std::vector<std::string> freeAll();
+
+    void addCopy(const char* text);
+    void remove(const void* address);
+    void clear();
+
+private:
+    void add(const char* text, const char* owner);
+    std::vector<std::string> texts() const;
+
+    mutable std::mutex mutex_;
+    std::map<std::uintptr_t, std::string> live_;
+};
+
+Ledger& ledger();
 
 } // namespace fake
 

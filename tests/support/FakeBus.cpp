@@ -41,27 +41,17 @@ std::string nameOf(const void* pointer, const std::string& name)
     return pointer != nullptr ? name : "no " + name;
 }
 
-std::string orNothing(const char* text)
-{
-    return text != nullptr ? text : "nothing";
-}
-
 std::string describe(GDBusMessage* call)
 {
     EXPECT_EQ(g_dbus_message_get_message_type(call), G_DBUS_MESSAGE_TYPE_METHOD_CALL);
     EXPECT_EQ(g_dbus_message_get_flags(call), G_DBUS_MESSAGE_FLAGS_NONE);
     EXPECT_EQ(g_dbus_message_get_sender(call), nullptr);
-    return orNothing(g_dbus_message_get_destination(call)) + " " +
-           orNothing(g_dbus_message_get_path(call)) + " " +
-           orNothing(g_dbus_message_get_interface(call)) + " " +
-           orNothing(g_dbus_message_get_member(call)) + " " +
-           nameOf(g_dbus_message_get_body(call), "body");
-}
-
-void unrefVariant(GVariant* variant)
-{
-    if (variant != nullptr)
-        g_variant_unref(variant);
+    std::string text;
+    for (const char* const part :
+         {g_dbus_message_get_destination(call), g_dbus_message_get_path(call),
+          g_dbus_message_get_interface(call), g_dbus_message_get_member(call)})
+        text += std::string(part != nullptr ? part : "nothing") + " ";
+    return text + nameOf(g_dbus_message_get_body(call), "body");
 }
 
 // Fails the test when GLib finds its arguments wrong.
@@ -108,8 +98,9 @@ void FakeBus::answerNothing(const std::optional<Error>& error)
 
 void FakeBus::answer(GVariant* body, GDBusMessageType type)
 {
-    const std::shared_ptr<GVariant> kept(body != nullptr ? g_variant_ref_sink(body) : nullptr,
-                                         &unrefVariant);
+    const auto kept = body != nullptr
+                          ? std::shared_ptr<GVariant>(g_variant_ref_sink(body), &g_variant_unref)
+                          : nullptr;
     makeReply_ = [kept, type] {
         GDBusMessage* const reply = g_dbus_message_new();
         g_dbus_message_set_message_type(reply, type);

@@ -22,15 +22,15 @@
 using namespace fake;
 
 struct telephony_data {
-    unsigned int slot;
+    unsigned int of; // the slot
 };
 
 struct tapi_handle {
-    std::string name;
+    std::string of; // the modem
 };
 
 struct package_info_s {
-    std::string name;
+    std::string of; // the package
 };
 
 namespace {
@@ -39,11 +39,6 @@ const std::string PREFIX = "%s: %s(%d) > ";
 const std::string BODY_BEGIN = "{#!@";
 const std::string BODY_END = "#!@}";
 const std::string DEBUG_FORMAT = PREFIX + BODY_BEGIN + "%s" + BODY_END;
-
-bool startsWith(const std::string& text, const std::string& start)
-{
-    return text.compare(0, start.size(), start) == 0;
-}
 
 std::string formatted(const char* format, va_list arguments)
 {
@@ -57,17 +52,13 @@ std::string formatted(const char* format, va_list arguments)
     return text;
 }
 
-std::string withoutMarkers(const std::string& text)
-{
-    return text.substr(BODY_BEGIN.size(), text.size() - BODY_BEGIN.size() - BODY_END.size());
-}
-
 bool isDebugLine(const LogLine& line)
 {
     return line.priority == DLOG_INFO && line.format == DEBUG_FORMAT;
 }
 
-// Every line begins with the prefix, so its first three arguments are known.
+// Every line begins with the prefix, so its first three arguments are known. Checks what holds for
+// every line.
 LogLine readLine(log_id_t id, int priority, const char* tag, const char* format, va_list arguments)
 {
     LogLine line;
@@ -75,73 +66,47 @@ LogLine readLine(log_id_t id, int priority, const char* tag, const char* format,
     line.priority = priority;
     line.tag = tag;
     line.format = format;
-    EXPECT_TRUE(startsWith(line.format, PREFIX)) << format;
+    EXPECT_TRUE(line.format.rfind(PREFIX, 0) == 0) << format;
 
     line.file = va_arg(arguments, const char*);
     line.function = va_arg(arguments, const char*);
     line.line = va_arg(arguments, int);
     line.text = formatted(format + PREFIX.size(), arguments);
-    line.plain = isDebugLine(line) ? decipher(withoutMarkers(line.text)) : line.text;
-    return line;
-}
-
-// Checks that hold for every line.
-void checkLine(const LogLine& line)
-{
+    const std::size_t markers = BODY_BEGIN.size() + BODY_END.size();
+    line.plain = isDebugLine(line)
+                     ? decipher(line.text.substr(BODY_BEGIN.size(), line.text.size() - markers))
+                     : line.text;
     EXPECT_EQ(line.id, LOG_ID_MAIN);
     EXPECT_GT(line.line, 0);
     EXPECT_EQ(line.file.find('/'), std::string::npos) << line.file;
     if (isDebugLine(line) && !line.plain.empty()) {
         EXPECT_EQ(line.text.find(line.plain), std::string::npos) << "plain text in the log";
     }
-}
-
-std::string kindOfLine(const LogLine& line)
-{
-    if (isDebugLine(line))
-        return "debug";
-    switch (line.priority) {
-    case DLOG_ERROR:
-        return "error";
-    case DLOG_INFO:
-        return "notice";
-    default:
-        return "priority " + std::to_string(line.priority);
-    }
+    return line;
 }
 
 std::string describe(const LogLine& line)
 {
-    const std::string text =
-        kindOfLine(line) + " " + line.file + " " + line.function + ": " + line.plain;
+    std::string kind = "priority " + std::to_string(line.priority);
+    if (isDebugLine(line))
+        kind = "debug";
+    else if (line.priority == DLOG_ERROR)
+        kind = "error";
+    else if (line.priority == DLOG_INFO)
+        kind = "notice";
+    const std::string text = kind + " " + line.file + " " + line.function + ": " + line.plain;
     const std::string format = line.format.substr(PREFIX.size());
     return isDebugLine(line) || format == line.plain ? text : text + " <- " + format;
 }
 
 // Never released: a handle that is used after its release is named all the same.
-telephony_h handleOfSlot(unsigned int slot)
+template <class Handle, class Key>
+Handle* handleOf(const Key& key)
 {
     static std::mutex mutex;
-    static auto& slots = *new std::map<unsigned int, telephony_data>;
+    static auto& handles = *new std::map<Key, Handle>;
     const std::lock_guard<std::mutex> lock(mutex);
-    return &slots.try_emplace(slot, telephony_data{slot}).first->second;
-}
-
-TapiHandle* handleOfModem(const char* name)
-{
-    static std::mutex mutex;
-    static auto& modems = *new std::map<std::string, tapi_handle>;
-    const std::string key = name != nullptr ? name : "null";
-    const std::lock_guard<std::mutex> lock(mutex);
-    return &modems.try_emplace(key, tapi_handle{key}).first->second;
-}
-
-package_info_h handleOfPackage(const std::string& name)
-{
-    static std::mutex mutex;
-    static auto& packages = *new std::map<std::string, package_info_s>;
-    const std::lock_guard<std::mutex> lock(mutex);
-    return &packages.try_emplace(name, package_info_s{name}).first->second;
+    return &handles.try_emplace(key, Handle{key}).first->second;
 }
 
 char connectionHandle = 'c';
@@ -160,19 +125,19 @@ std::string nameOf(const telephony_handle_list_s& list)
 
 std::string nameOf(const TapiHandle* handle)
 {
-    return handle != nullptr ? "modem " + handle->name : "no modem";
+    return handle != nullptr ? "modem " + handle->of : "no modem";
 }
 
 } // namespace
 
 void fake::writeArgument(std::ostream& out, telephony_h handle)
 {
-    out << (handle != nullptr ? "slot " + std::to_string(handle->slot) : "no slot");
+    out << (handle != nullptr ? "slot " + std::to_string(handle->of) : "no slot");
 }
 
 void fake::writeArgument(std::ostream& out, package_info_h handle)
 {
-    out << "package " << handle->name;
+    out << "package " << handle->of;
 }
 
 void fake::writeArgument(std::ostream& out, TapiHandle* handle)
@@ -268,7 +233,7 @@ telephony_handle_list_s FakePlatform::openList(unsigned int count)
 {
     auto handles = std::make_unique<telephony_h[]>(count);
     for (unsigned int slot = 0; slot < count; ++slot)
-        handles[slot] = handleOfSlot(slot);
+        handles[slot] = handleOf<telephony_data>(slot);
     const telephony_handle_list_s list = {count, handles.get()};
     addHandle(nameOf(list));
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -276,15 +241,12 @@ telephony_handle_list_s FakePlatform::openList(unsigned int count)
     return list;
 }
 
-bool FakePlatform::eraseList(const telephony_h* handles)
-{
-    const std::lock_guard<std::mutex> lock(mutex_);
-    return lists_.erase(handles) > 0;
-}
-
 void FakePlatform::closeList(const telephony_handle_list_s& list)
 {
-    if (eraseList(list.handle))
+    std::unique_lock<std::mutex> lock(mutex_);
+    const bool wasOpen = lists_.erase(list.handle) > 0;
+    lock.unlock();
+    if (wasOpen)
         removeHandle(nameOf(list));
     else
         ADD_FAILURE() << "a " << nameOf(list) << " was released that is not open";
@@ -380,7 +342,6 @@ int __dlog_print(log_id_t id, int priority, const char* tag, const char* format,
     va_start(arguments, format);
     const LogLine line = readLine(id, priority, tag, format, arguments);
     va_end(arguments);
-    checkLine(line);
     platform().record(Event::Kind::LOG, describe(line), line);
     return platform().logResult;
 }
@@ -427,7 +388,8 @@ TapiHandle* tel_init(const char* cp_name)
     const AllocationPause pause;
     if (platform().call("tel_init", cp_name) != 0)
         return nullptr;
-    TapiHandle* const handle = handleOfModem(cp_name);
+    TapiHandle* const handle =
+        handleOf<tapi_handle>(std::string(cp_name != nullptr ? cp_name : "null"));
     platform().addHandle(nameOf(handle));
     return handle;
 }
@@ -525,8 +487,8 @@ int package_info_create(const char* package_id, package_info_h* info)
     const AllocationPause pause;
     const int result = platform().call("package_info_create", package_id);
     if (result == 0) {
-        *info = handleOfPackage(package_id);
-        platform().addHandle("package " + (*info)->name);
+        *info = handleOf<package_info_s>(std::string(package_id));
+        platform().addHandle("package " + (*info)->of);
     }
     return result;
 }
@@ -535,7 +497,7 @@ int package_info_destroy(package_info_h info)
 {
     const AllocationPause pause;
     const int result = platform().call("package_info_destroy", info);
-    platform().removeHandle("package " + info->name);
+    platform().removeHandle("package " + info->of);
     return result;
 }
 

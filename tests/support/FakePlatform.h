@@ -32,7 +32,6 @@
 #include <wifi.h>
 
 #include "FailingAllocation.h"
-#include "Ledger.h"
 
 namespace fake {
 
@@ -132,7 +131,6 @@ private:
         std::any value;
     };
     Answer answerTo(const std::string& call);
-    bool eraseList(const telephony_h* handles);
 
     mutable std::mutex mutex_;
     std::vector<Event> events_;

@@ -3,7 +3,6 @@
 
 #include <stdexcept>
 
-#include <fcntl.h>
 #include <unistd.h>
 
 #include "linux/ModemManager.h"
@@ -57,10 +56,9 @@ void ModemsOnBus::start()
     // The bus may not have noticed yet that the one before was killed.
     if (!waitUntil([this] { return !client_->isThere(MODEM_MANAGER.name); }))
         throw std::runtime_error("ModemManager does not leave the bus");
-    const std::string logFile = tree_.path("/log");
+    const std::string log = tree_.path("/log");
     process_.start([&] {
-        const int log = open(logFile.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-        if (log >= 0 && dup2(log, STDOUT_FILENO) >= 0 && dup2(log, STDERR_FILENO) >= 0)
+        if (writeInto(log.c_str()))
             execl(DAEMON, DAEMON, "--test-enable", "--test-no-udev", "--test-no-qrtr",
                   "--test-no-suspend-resume", "--log-level=WARN", static_cast<char*>(nullptr));
     });

@@ -7,7 +7,11 @@
 #include <optional>
 #include <vector>
 
+#include <gmock/gmock.h>
+
 #include "backend/Telephony.h"
+#include "support/Pauses.h"
+#include "support/Together.h"
 
 inline const port::SlotName HOME = "/virtual/home";
 
@@ -56,6 +60,33 @@ inline const std::vector<TelephonyQuestion>& telephonyQuestions()
         aboutSlot("smsReady", &Telephony::smsReady),
     };
     return all;
+}
+
+/// Expects no answer to any, and the same reason for all.
+template <typename Reason>
+void expectErrors(port::Telephony& telephony, port::Error::Kind kind, const Reason& reason)
+{
+    for (const auto& question : telephonyQuestions()) {
+        SCOPED_TRACE(question.name);
+        const auto error = question.ask(telephony, HOME);
+        ASSERT_TRUE(error);
+        EXPECT_EQ(kind, error->kind);
+        EXPECT_THAT(error->reason, reason);
+    }
+}
+
+/// The same, when all are asked at the same time; how long that took.
+inline int expectSilence(port::Telephony& telephony)
+{
+    return millisecondsOf([&] {
+        together(static_cast<int>(telephonyQuestions().size()), [&](int i) {
+            const auto error =
+                telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
+            ASSERT_TRUE(error);
+            EXPECT_EQ(port::Error::Kind::NotAvailable, error->kind);
+            EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
+        });
+    });
 }
 
 #endif
