@@ -3,7 +3,7 @@
 // away.
 #include <gmock/gmock.h>
 
-#include "support/ModemsOnBus.h"
+#include "support/ModemsOnBusTest.h"
 #include "support/Program.h"
 
 using testing::HasSubstr;

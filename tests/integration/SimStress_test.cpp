@@ -14,7 +14,7 @@
 
 #include <coresystem_port.h>
 
-#include "support/ModemsOnBus.h"
+#include "support/ModemsOnBusTest.h"
 #include "support/TelephonyQuestions.h"
 
 namespace {

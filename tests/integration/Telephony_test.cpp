@@ -9,7 +9,7 @@
 #include <gmock/gmock.h>
 
 #include "support/Answer.h"
-#include "support/ModemsOnBus.h"
+#include "support/ModemsOnBusTest.h"
 #include "support/TelephonyQuestions.h"
 
 using port::CardStatus;

@@ -8,9 +8,6 @@
 #include <memory>
 #include <string>
 
-#include <gmock/gmock.h>
-
-#include "linux/Telephony.h"
 #include "support/AtModem.h"
 #include "support/PrivateBus.h"
 
@@ -69,35 +66,6 @@ private:
     std::unique_ptr<BusClient> client_;
     std::map<std::string, std::unique_ptr<AtModem>> modems_;
     Process process_;
-};
-
-/// Skipped where it cannot be had.
-class ModemsOnBusTest : public testing::Test {
-protected:
-    void SetUp() override
-    {
-        if (!ModemsOnBus::obstacle().empty())
-            GTEST_SKIP() << ModemsOnBus::obstacle();
-        modems = std::make_unique<ModemsOnBus>();
-    }
-    bool comesIntoService(const port::SlotName& slot)
-    {
-        return modems->waitUntil([&] {
-            const auto service = telephony.service(slot);
-            return service && service.value().value == port::ServiceState::InService;
-        });
-    }
-    /// Plugs a modem in, switches it on and waits until it is in service.
-    void addInService(const std::string& id, const AtModem::State& state)
-    {
-        modems->add(id, state);
-        modems->enable(id);
-        ASSERT_TRUE(comesIntoService("/virtual/" + id));
-    }
-
-    std::unique_ptr<ModemsOnBus> modems;
-    port::linux_backend::Bus bus;
-    port::linux_backend::LinuxTelephony telephony{bus};
 };
 
 #endif
