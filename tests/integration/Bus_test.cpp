@@ -192,7 +192,8 @@ protected:
     // Which has a name.
     void startBox()
     {
-        startBox();
+        startService();
+        service->answer("({'PrettyHostname': <'box'>},)");
     }
 
     const std::string box = "box <hostname1 PrettyHostname>";
