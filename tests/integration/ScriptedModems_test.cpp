@@ -173,8 +173,8 @@ TEST_F(ScriptedModemsTest, CardStatusFollowsTheModem)
     const char* const wantsPuk = "the SIM card is locked: it wants a PUK";
     const char* const network = "the modem is locked to a network";
     const auto failure = [](const char* reason) { return Entries{{"StateFailedReason", reason}}; };
-    const auto lock = [](const char* lock, const char* retries = "<{uint32 2: uint32 3, 4: 10}>") {
-        return Entries{{"UnlockRequired", lock}, {"UnlockRetries", retries}};
+    const auto lock = [](const char* kind, const char* retries = "<{uint32 2: uint32 3, 4: 10}>") {
+        return Entries{{"UnlockRequired", kind}, {"UnlockRetries", retries}};
     };
     const struct {
         int state;
