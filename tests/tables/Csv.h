@@ -45,41 +45,12 @@ inline Rows readTable(const std::string& name)
     return rows;
 }
 
-inline const Rows& mccCountries()
-{
-    static const Rows rows = readTable("MccCountryTable");
-    return rows;
-}
-
-inline const Rows& serviceCountries()
-{
-    static const Rows rows = readTable("ServiceCountryTable");
-    return rows;
-}
-
-inline const Rows& callingCodes()
-{
-    static const Rows rows = readTable("CallingCodeTable");
-    return rows;
-}
-
-inline const Rows& alpha3Countries()
-{
-    static const Rows rows = readTable("Alpha3CountryTable");
-    return rows;
-}
-
-inline const Rows& moSupportMccs()
-{
-    static const Rows rows = readTable("MoSupportMccTable");
-    return rows;
-}
-
-inline const Rows& languageCodes()
-{
-    static const Rows rows = readTable("LanguageCodeTable");
-    return rows;
-}
+inline const Rows MCC_COUNTRIES = readTable("MccCountryTable");
+inline const Rows SERVICE_COUNTRIES = readTable("ServiceCountryTable");
+inline const Rows CALLING_CODES = readTable("CallingCodeTable");
+inline const Rows ALPHA3_COUNTRIES = readTable("Alpha3CountryTable");
+inline const Rows MO_SUPPORT_MCCS = readTable("MoSupportMccTable");
+inline const Rows LANGUAGE_CODES = readTable("LanguageCodeTable");
 
 // One column, in order.
 inline std::vector<std::string> column(const Rows& rows, std::size_t index)

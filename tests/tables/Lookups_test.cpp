@@ -11,42 +11,25 @@ using namespace fake;
 namespace {
 
 const std::string NONE = "none";
+typedef std::vector<std::string> Cells;
+
+// The answer of a search that gives a text, NONE of one that gives none.
+typedef std::function<std::string(const std::string& key)> Answer;
 
 struct Lookup {
     std::string name;
-    void (SimManager::*search)(const char* key, char** slot);
-    void (CoreSystem::*question)(const char* key, char** slot);
-    const Rows& (*table)();
-    std::size_t key;
-    std::size_t value;
+    Answer answer;
+    Answer expected;
 };
-
-std::ostream& operator<<(std::ostream& out, const Lookup& lookup)
-{
-    return out << lookup.name;
-}
-
-#define LOOKUP(name) #name, &SimManager::name, &CoreSystem::name
-const Lookup LOOKUPS[] = {
-    {LOOKUP(GetCountryCodeFromMcc), mccCountries, 0, 1},
-    {LOOKUP(GetCountryNameFromMcc), mccCountries, 0, 2},
-    {LOOKUP(GetMccFromCountryCode), mccCountries, 1, 0},
-    {LOOKUP(GetMccFromServiceCountryCode), serviceCountries, 1, 0},
-    {LOOKUP(GetServiceCountryCodeFromMcc), serviceCountries, 0, 1},
-    {LOOKUP(GetMccFromCountryCallingCode), callingCodes, 1, 0},
-    {LOOKUP(GetCountryCallingCodeFromMcc), callingCodes, 0, 1},
-    {LOOKUP(GetAlpha3CountryCodeFromMcc), alpha3Countries, 0, 1},
-};
-#undef LOOKUP
 
 // All cells of all tables, all numbers of up to three digits with and without leading zeros, and
 // all pairs of letters in both cases.
 std::set<std::string> makeKeys()
 {
     std::set<std::string> keys;
-    for (const auto table : {mccCountries, serviceCountries, callingCodes, alpha3Countries,
-                             moSupportMccs, languageCodes})
-        for (const Row& row : table())
+    for (const Rows* table : {&MCC_COUNTRIES, &SERVICE_COUNTRIES, &CALLING_CODES, &ALPHA3_COUNTRIES,
+                              &MO_SUPPORT_MCCS, &LANGUAGE_CODES})
+        for (const Row& row : *table)
             keys.insert(row.begin(), row.end());
     for (int number = 0; number < 1000; ++number) {
         const std::string digits = std::to_string(number);
@@ -64,117 +47,109 @@ const std::set<std::string>& keys()
     return all;
 }
 
+// The searches free what they give but for the one that gives the table's own text.
 template <class Singleton>
-std::string answer(Singleton& asked, void (Singleton::*question)(const char*, char**),
-                   const std::string& key)
+Answer textOf(Singleton& (*asked)(), void (Singleton::*question)(const char*, char**),
+              bool isCopy = true)
 {
-    char* slot = nullptr;
-    (asked.*question)(key.c_str(), &slot);
-    const std::string text = slot != nullptr ? slot : NONE;
-    std::free(slot);
-    return text;
+    return [=](const std::string& key) {
+        char* slot = nullptr;
+        (asked().*question)(key.c_str(), &slot);
+        const std::string text = slot != nullptr ? slot : NONE;
+        if (isCopy)
+            std::free(slot);
+        return text;
+    };
 }
 
-std::string firstOf(const std::vector<std::string>& cells)
+std::string firstOf(const Cells& cells)
 {
     return cells.empty() ? NONE : cells.front();
 }
 
-std::string lastOf(const std::vector<std::string>& cells)
+Answer firstOf(const Rows& rows, std::size_t key, std::size_t value)
 {
-    return cells.empty() ? NONE : cells.back();
+    return [&rows, key, value](const std::string& text) {
+        return firstOf(cellsOf(rows, key, text, value));
+    };
 }
 
-class LookupTest : public PlatformTest, public testing::WithParamInterface<Lookup> {
-protected:
-    const Lookup& lookup = GetParam();
-
-    std::string expected(const std::string& key)
-    {
-        return firstOf(cellsOf(lookup.table(), lookup.key, key, lookup.value));
-    }
-};
-
-INSTANTIATE_TEST_SUITE_P(Every, LookupTest, testing::ValuesIn(LOOKUPS), rowName<Lookup>);
-
-TEST_P(LookupTest, SearchAnswersAsPlainScanDoes)
+std::string mccOfCallingCode(const std::string& code)
 {
-    for (const std::string& key : keys()) {
-        ASSERT_EQ(answer(sim, lookup.search, key), expected(key)) << key;
-        platform().forgetEvents();
-    }
+    return firstOf(cellsOf(CALLING_CODES, 1, code, 0));
 }
 
-TEST_P(LookupTest, FacadeAnswersAsPlainScanDoes)
+std::string yesOrNo(bool answer)
 {
-    for (const std::string& key : keys()) {
-        ASSERT_EQ(answer(system, lookup.question, key), expected(key)) << key;
-        platform().forgetEvents();
-    }
+    return answer ? "yes" : "no";
 }
 
-class OtherLookupTest : public PlatformTest {
-protected:
-    static std::string mccOf(const std::string& code)
-    {
-        return firstOf(cellsOf(callingCodes(), 1, code, 0));
-    }
-};
+std::vector<Lookup> lookups()
+{
+    std::vector<Lookup> all;
+#define LOOKUP(name, ...)                                                                \
+    all.push_back({#name, textOf(simManager, &SimManager::name), firstOf(__VA_ARGS__)}); \
+    all.push_back({"CoreSystem" #name, textOf(coreSystem, &CoreSystem::name), firstOf(__VA_ARGS__)})
+    LOOKUP(GetCountryCodeFromMcc, MCC_COUNTRIES, 0, 1);
+    LOOKUP(GetCountryNameFromMcc, MCC_COUNTRIES, 0, 2);
+    LOOKUP(GetMccFromCountryCode, MCC_COUNTRIES, 1, 0);
+    LOOKUP(GetMccFromServiceCountryCode, SERVICE_COUNTRIES, 1, 0);
+    LOOKUP(GetServiceCountryCodeFromMcc, SERVICE_COUNTRIES, 0, 1);
+    LOOKUP(GetMccFromCountryCallingCode, CALLING_CODES, 1, 0);
+    LOOKUP(GetCountryCallingCodeFromMcc, CALLING_CODES, 0, 1);
+    LOOKUP(GetAlpha3CountryCodeFromMcc, ALPHA3_COUNTRIES, 0, 1);
+#undef LOOKUP
+    const auto isMcc = [](const std::string& key) {
+        return yesOrNo(!cellsOf(MCC_COUNTRIES, 0, key, 0).empty());
+    };
+    const auto yes = [](const std::string&) { return "yes"; };
+    const std::vector<Lookup> others = {
+        {"NameOfCallingCodeIsThatOfItsFirstMcc",
+         textOf(coreSystem, &CoreSystem::GetCountryNameFromCountryCallingCode),
+         [](const std::string& key) {
+             return firstOf(cellsOf(MCC_COUNTRIES, 0, mccOfCallingCode(key), 2));
+         }},
+        {"Alpha2OfCallingCodeIsThatOfTheLastRow",
+         textOf(coreSystem, &CoreSystem::GetCountryNameAlpha2FromCountryCallingCode, false),
+         [](const std::string& key) {
+             const Cells cells = cellsOf(MCC_COUNTRIES, 0, mccOfCallingCode(key), 1);
+             return cells.empty() ? NONE : cells.back();
+         }},
+        {"IsValidMcc",
+         [](const auto& key) { return yesOrNo(simManager().IsValidMcc(key.c_str())); }, isMcc},
+        {"CoreSystemIsValidMcc",
+         [](const auto& key) { return yesOrNo(coreSystem().IsValidMcc(key.c_str())); }, isMcc},
+        {"IsMoSupportMcc",
+         [](const auto& key) { return yesOrNo(simManager().IsMoSupportMcc(key.c_str())); }, yes},
+        {"CoreSystemIsMoSupportMcc",
+         [](const auto& key) { return yesOrNo(coreSystem().IsMoSupportMcc(key.c_str())); }, yes},
+        {"GetISO639LangCodeFromDeviceLang",
+         [](const std::string& key) {
+             const char* const code = CoreSystemInternals::iso639(key, nullptr);
+             return code != nullptr ? code : NONE;
+         },
+         firstOf(LANGUAGE_CODES, 1, 0)},
+    };
+    all.insert(all.end(), others.begin(), others.end());
+    return all;
+}
 
-TEST_F(OtherLookupTest, KeysCoverWhatTheyShould)
+class LookupTest : public PlatformTest {};
+
+TEST_F(LookupTest, KeysCoverWhatTheyShould)
 {
     EXPECT_GT(keys().size(), 1000u + 2 * 676u + 236u);
     for (const std::string key : {"000", "999", "aa", "zz", "AA", "ZZ", "0", "en_GB", "Zimbabwe"})
         EXPECT_EQ(keys().count(key), 1u) << key;
 }
 
-TEST_F(OtherLookupTest, NameOfCallingCodeIsThatOfItsFirstMcc)
+TEST_F(LookupTest, EveryKeyIsAnsweredAsPlainScanDoes)
 {
-    for (const std::string& key : keys()) {
-        ASSERT_EQ(answer(system, &CoreSystem::GetCountryNameFromCountryCallingCode, key),
-                  firstOf(cellsOf(mccCountries(), 0, mccOf(key), 2)))
-            << key;
-        platform().forgetEvents();
-    }
-}
-
-TEST_F(OtherLookupTest, Alpha2OfCallingCodeIsThatOfTheLastRow)
-{
-    for (const std::string& key : keys()) {
-        char* slot = nullptr;
-        system.GetCountryNameAlpha2FromCountryCallingCode(key.c_str(), &slot);
-        const std::string answer = slot != nullptr ? slot : NONE;
-        ASSERT_EQ(answer, lastOf(cellsOf(mccCountries(), 0, mccOf(key), 1))) << key;
-        platform().forgetEvents();
-    }
-}
-
-TEST_F(OtherLookupTest, ValidMccsAreThoseOfTheTable)
-{
-    for (const std::string& key : keys()) {
-        const bool valid = !cellsOf(mccCountries(), 0, key, 0).empty();
-        ASSERT_EQ(sim.IsValidMcc(key.c_str()), valid) << key;
-        ASSERT_EQ(system.IsValidMcc(key.c_str()), valid) << key;
-        platform().forgetEvents();
-    }
-}
-
-TEST_F(OtherLookupTest, EveryKeySupportsMo)
-{
-    for (const std::string& key : keys()) {
-        ASSERT_TRUE(sim.IsMoSupportMcc(key.c_str())) << key;
-        ASSERT_TRUE(system.IsMoSupportMcc(key.c_str())) << key;
-        platform().forgetEvents();
-    }
-}
-
-TEST_F(OtherLookupTest, LanguageIsConvertedAsPlainScanDoes)
-{
-    for (const std::string& key : keys()) {
-        const char* const code = CoreSystemInternals::iso639(key, nullptr);
-        ASSERT_EQ(code != nullptr ? code : NONE, firstOf(cellsOf(languageCodes(), 1, key, 0)))
-            << key;
-    }
+    for (const Lookup& lookup : lookups())
+        for (const std::string& key : keys()) {
+            ASSERT_EQ(lookup.answer(key), lookup.expected(key)) << lookup.name << ' ' << key;
+            platform().forgetEvents();
+        }
 }
 
 } // namespace
