@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// The country questions of the facade.
-#include <atomic>
+// The country questions: the searches of SimManager, and the facade's ways to them.
 #include <stdexcept>
-#include <thread>
 
-#include "Converters.h"
+#include "support/PlatformTest.h"
+#include "support/Together.h"
 
 using namespace fake;
 using testing::IsEmpty;
@@ -12,14 +11,105 @@ using testing::StrEq;
 
 namespace {
 
-typedef void (CoreSystem::*Question)(const char* key, char** slot);
+struct Converter {
+    std::string name;
+    void (SimManager::*search)(const char* key, char** slot);
+    void (CoreSystem::*question)(const char* key, char** slot);
+    std::string keyName;
+    std::string key;
+    std::string value;
+    std::string valueName;
+    std::string entry = name; // SimManager's text before the key
+    std::string success = "success to get ";
+};
+
+std::ostream& operator<<(std::ostream& out, const Converter& converter)
+{
+    return out << converter.name;
+}
+
+// An entry that names another method and a success that is marked are meant.
+#define CONVERTER(name) #name, &SimManager::name, &CoreSystem::name
+const std::vector<Converter> CONVERTERS = {
+    {CONVERTER(GetCountryCodeFromMcc), "mcc", "450", "kr", "countrycode", "GetMccToCountryCode"},
+    {CONVERTER(GetCountryNameFromMcc), "mcc", "450", "Korea, South", "countryName"},
+    {CONVERTER(GetMccFromCountryCode), "countryCode", "kr", "450", "mcc"},
+    {CONVERTER(GetMccFromServiceCountryCode), "serviceCountryCode", "ko_KR", "450", "mcc"},
+    {CONVERTER(GetServiceCountryCodeFromMcc), "mcc", "450", "ko_KR", "serviceCountryCode",
+     "GetServiceCountryCodeFromMcc", "!! success to get "},
+    {CONVERTER(GetMccFromCountryCallingCode), "countryCallingCode", "82", "450", "mcc"},
+    {CONVERTER(GetCountryCallingCodeFromMcc), "mcc", "450", "82", "countryCallingCode"},
+    {CONVERTER(GetAlpha3CountryCodeFromMcc), "mcc", "450", "KOR", "alpha3CountryCode"},
+};
+#undef CONVERTER
+
+// The log lines of SimManager for a key that it finds, and for one that it does not.
+Texts foundTrace(const Converter& row, const std::string& key, const std::string& value)
+{
+    return {SIM_MANAGER.debug(row.name, row.entry + " [" + row.keyName + " : " + key + "]"),
+            SIM_MANAGER.debug(row.name, row.success + row.valueName + " : " + value)};
+}
+
+Texts missedTrace(const Converter& row, const std::string& key)
+{
+    return {SIM_MANAGER.debug(row.name, row.entry + " [" + row.keyName + " : " + key + "]"),
+            SIM_MANAGER.error(row.name, "fail to get " + row.valueName)};
+}
+
+// Keys that no table holds.
+std::vector<std::string> strangeKeys(const std::string& key)
+{
+    std::string everyByte;
+    for (int byte = 1; byte < 256; ++byte)
+        everyByte += static_cast<char>(byte);
+    // The last one is long enough for any buffer.
+    return {" " + key,
+            key + " ",
+            key + "0",
+            "0" + key,
+            "+" + key,
+            key + "\n",
+            "-",
+            "-1",
+            "12",
+            "99999999999999999999",
+            "abc",
+            "no digits here",
+            "%s%n",
+            "\xc3\xa9",
+            "\xff\xfe\xfd\xfc",
+            everyByte,
+            std::string(10 << 20, '4')};
+}
 
 // The slot's content after a question that begins with `preset` in it.
-char* ask(Question question, const char* key, char* preset = nullptr)
+template <class Target>
+char* ask(Target& target, void (Target::*question)(const char*, char**), const char* key,
+          char* preset = nullptr)
 {
     char* slot = preset;
-    (coreSystem().*question)(key, &slot);
+    (target.*question)(key, &slot);
     return slot;
+}
+
+typedef void (CoreSystem::*Question)(const char* key, char** slot);
+
+char* ask(Question question, const char* key, char* preset = nullptr)
+{
+    return ask(coreSystem(), question, key, preset);
+}
+
+// A converter as SimManager has it, and as the facade has it.
+typedef std::function<char*(const std::string& key, char* preset)> Way;
+
+std::vector<Way> waysOf(const Converter& row)
+{
+    return {[row](const std::string& key, char* preset) {
+                return ask(simManager(), row.search, key.c_str(), preset);
+            },
+            [row](const std::string& key, char* preset) {
+                return ask(row.question, key.c_str(), preset);
+            }};
 }
 
 Texts entryLine(const std::string& method)
@@ -47,19 +137,28 @@ LoggedCall refusedCall(const std::string& name, Question question, const char* k
 std::vector<LoggedCall> converterCalls()
 {
     std::vector<LoggedCall> calls;
-    for (const Converter& row : converters()) {
+    for (const Converter& row : CONVERTERS) {
+        const Texts found = foundTrace(row, row.key, row.value);
+        const Texts missed = missedTrace(row, "KR 9");
         const Texts entry = entryLine(row.name);
-        const auto result = [&row](const std::string& value) {
-            return Texts{CORE_SYSTEM.debug(row.name, row.result + value)};
+        const auto searched = [&](const Texts& trace, const std::string& value) {
+            return entry + SIM_MANAGER.access() + trace +
+                   Texts{CORE_SYSTEM.debug(row.name, row.valueName + " : " + value)};
         };
+        const auto call = [&](const std::string& way, std::size_t number, const Texts& foundHere,
+                              const Texts& missedHere) {
+            const Way asked = waysOf(row)[number];
+            calls.push_back(
+                {way + row.name + "Found", [=] { std::free(asked(row.key, nullptr)); }, foundHere});
+            calls.push_back({way + row.name + "Missed",
+                             [=] { EXPECT_EQ(asked("KR 9", nullptr), nullptr); }, missedHere});
+        };
+        call("Sim", 0, found, missed);
+        call("", 1, searched(found, row.value), searched(missed, "(null)"));
+        calls.push_back({"Sim" + row.name + "EmptyKey",
+                         [row] { EXPECT_EQ(waysOf(row)[0]("", nullptr), nullptr); },
+                         missedTrace(row, "")});
         const Texts refusal = entry + emptyKeyError(row.name, row.keyName);
-        calls.push_back({row.name + "Found",
-                         [row] { std::free(ask(row.question, row.key.c_str())); },
-                         entry + SIM_MANAGER.access() + foundTrace(row, row.key, row.value) +
-                             result(row.value)});
-        calls.push_back(
-            {row.name + "Missed", [row] { EXPECT_EQ(ask(row.question, "KR 9"), nullptr); },
-             entry + SIM_MANAGER.access() + missedTrace(row, "KR 9") + result("(null)")});
         calls.push_back(refusedCall(row.name + "EmptyKey", row.question, "", refusal));
         calls.push_back(refusedCall(row.name + "NullKey", row.question, nullptr, refusal));
     }
@@ -73,52 +172,44 @@ const char* const ALPHA2 = "GetCountryNameAlpha2FromCountryCallingCode";
 const Question ASK_NAME = &CoreSystem::GetCountryNameFromCountryCallingCode;
 const Question ASK_ALPHA2 = &CoreSystem::GetCountryNameAlpha2FromCountryCallingCode;
 
-const Converter& converter(const char* name)
+const Converter& converter(const std::string& name)
 {
-    for (const Converter& row : converters())
+    for (const Converter& row : CONVERTERS)
         if (row.name == name)
             return row;
     throw std::logic_error(name);
 }
 
-Texts mccSearched(const std::string& code, const std::string& mcc)
-{
-    const Converter& row = converter("GetMccFromCountryCallingCode");
-    return SIM_MANAGER.access() +
-           (mcc.empty() ? missedTrace(row, code) : foundTrace(row, code, mcc));
-}
-
-// Names another method than the one that was asked.
-const Texts STEP_LINE = {CORE_SYSTEM.debug(NAME, "CoreSystem::GetCountryCallingCodeFromMcc")};
-
 std::vector<LoggedCall> chainedCalls()
 {
-    return {
+    const Converter& toMcc = converter("GetMccFromCountryCallingCode");
+    const Texts found = SIM_MANAGER.access() + foundTrace(toMcc, "596", "340");
+    const Texts missed = SIM_MANAGER.access() + missedTrace(toMcc, "999");
+    // Names another method than the one that was asked.
+    const Texts step = {CORE_SYSTEM.debug(NAME, "CoreSystem::GetCountryCallingCodeFromMcc")};
+    std::vector<LoggedCall> calls = {
         {"NameOfCallingCodeFound", [] { std::free(ask(ASK_NAME, "596")); },
-         entryLine(NAME) + mccSearched("596", "340") + STEP_LINE + SIM_MANAGER.access() +
+         entryLine(NAME) + found + step + SIM_MANAGER.access() +
              foundTrace(converter("GetCountryNameFromMcc"), "340", "Guadeloupe (France)") +
              Texts{CORE_SYSTEM.debug(NAME, "countryName : Guadeloupe (France)")}},
-        refusedCall("NameOfCallingCodeMissed", ASK_NAME, "999",
-                    entryLine(NAME) + mccSearched("999", "") + STEP_LINE +
-                        emptyKeyError(NAME, "mcc")),
-        refusedCall("NameOfEmptyCallingCode", ASK_NAME, "",
-                    entryLine(NAME) + emptyKeyError(NAME, "countryCallingCode")),
-        refusedCall("NameOfNullCallingCode", ASK_NAME, nullptr,
-                    entryLine(NAME) + emptyKeyError(NAME, "countryCallingCode")),
-
         {"Alpha2OfCallingCodeFound", [] { EXPECT_THAT(ask(ASK_ALPHA2, "596"), StrEq("mq")); },
-         entryLine(ALPHA2) + mccSearched("596", "340") +
-             Texts{CORE_SYSTEM.debug(ALPHA2, "countryNameAlpha2 : mq")}},
+         entryLine(ALPHA2) + found + Texts{CORE_SYSTEM.debug(ALPHA2, "countryNameAlpha2 : mq")}},
+        refusedCall("NameOfCallingCodeMissed", ASK_NAME, "999",
+                    entryLine(NAME) + missed + step + emptyKeyError(NAME, "mcc")),
         refusedCall("Alpha2OfCallingCodeMissed", ASK_ALPHA2, "999",
-                    entryLine(ALPHA2) + mccSearched("999", "") + emptyKeyError(ALPHA2, "mcc")),
-        refusedCall("Alpha2OfEmptyCallingCode", ASK_ALPHA2, "",
-                    entryLine(ALPHA2) + emptyKeyError(ALPHA2, "countryCallingCode")),
-        refusedCall("Alpha2OfNullCallingCode", ASK_ALPHA2, nullptr,
-                    entryLine(ALPHA2) + emptyKeyError(ALPHA2, "countryCallingCode")),
+                    entryLine(ALPHA2) + missed + emptyKeyError(ALPHA2, "mcc")),
     };
+    for (const auto& [method, question] : {std::pair{NAME, ASK_NAME}, {ALPHA2, ASK_ALPHA2}}) {
+        const Texts trace = entryLine(method) + emptyKeyError(method, "countryCallingCode");
+        calls.push_back(refusedCall(method + std::string("Empty"), question, "", trace));
+        calls.push_back(refusedCall(method + std::string("Null"), question, nullptr, trace));
+    }
+    return calls;
 }
 
-// The predicates.
+// The predicates. An MCC may be asked for as const and as mutable.
+
+typedef bool (*Predicate)(const char* key);
 
 bool isValidMcc(const char* mcc)
 {
@@ -130,89 +221,117 @@ bool isValidMutableMcc(const char* mcc)
     return coreSystem().IsValidMcc(const_cast<char*>(mcc));
 }
 
+bool isValidMccOfSim(const char* mcc)
+{
+    return simManager().IsValidMcc(mcc);
+}
+
 bool isMoSupportMcc(const char* mcc)
 {
     return coreSystem().IsMoSupportMcc(mcc);
 }
 
-LoggedCall predicateCall(const std::string& name, bool (*ask)(const char*), const char* mcc,
-                         bool answer, const Texts& trace)
+bool isMoSupportMccOfSim(const char* mcc)
+{
+    return simManager().IsMoSupportMcc(mcc);
+}
+
+LoggedCall predicateCall(const std::string& name, Predicate ask, const char* mcc, bool answer,
+                         const Texts& trace)
 {
     return {name, [=] { EXPECT_EQ(ask(mcc), answer); }, trace};
 }
 
-std::vector<LoggedCall> validMccCalls(const std::string& name, bool (*ask)(const char*))
+Texts validity(const std::string& mcc, bool isValid)
 {
     const std::string method = "IsValidMcc";
-    const Texts refusal = entryLine(method) + emptyKeyError(method, "mcc");
-    const Texts search = entryLine(method) + SIM_MANAGER.access();
-    return {
-        predicateCall(name + "Valid", ask, "450", true,
-                      search + Texts{SIM_MANAGER.debug(method, "IsValidMcc [mcc : 450]"),
-                                     SIM_MANAGER.debug(method, "mcc is valid")}),
-        predicateCall(name + "Invalid", ask, "999", false,
-                      search + Texts{SIM_MANAGER.debug(method, "IsValidMcc [mcc : 999]"),
-                                     SIM_MANAGER.error(method, "mcc is invalid")}),
-        predicateCall(name + "Empty", ask, "", false, refusal),
-        predicateCall(name + "Null", ask, nullptr, false, refusal),
-    };
+    return {SIM_MANAGER.debug(method, "IsValidMcc [mcc : " + mcc + "]"),
+            isValid ? SIM_MANAGER.debug(method, "mcc is valid")
+                    : SIM_MANAGER.error(method, "mcc is invalid")};
 }
 
-std::vector<LoggedCall> moSupportCalls()
+std::vector<LoggedCall> predicateCalls()
 {
-    const std::string method = "IsMoSupportMcc";
-    return {
-        predicateCall("MoSupportAsked", isMoSupportMcc, "123", true,
-                      SIM_MANAGER.access() +
-                          Texts{SIM_MANAGER.debug(method, "IsMoSupportMcc [mcc : 123]"),
-                                SIM_MANAGER.debug(method, "IsMOSupportMcc? : true")}),
-        predicateCall("MoSupportEmpty", isMoSupportMcc, "", false, emptyKeyError(method, "mcc")),
-        predicateCall("MoSupportNull", isMoSupportMcc, nullptr, false,
-                      emptyKeyError(method, "mcc")),
+    const std::string mo = "IsMoSupportMcc";
+    const Texts moAsked = {SIM_MANAGER.debug(mo, "IsMoSupportMcc [mcc : 505]"),
+                           SIM_MANAGER.debug(mo, "IsMOSupportMcc? : true")};
+    const Texts entry = entryLine("IsValidMcc");
+    const Texts refusal = entry + emptyKeyError("IsValidMcc", "mcc");
+    std::vector<LoggedCall> calls = {
+        predicateCall("SimValidMcc", isValidMccOfSim, "412", true, validity("412", true)),
+        predicateCall("SimInvalidMcc", isValidMccOfSim, "4120", false, validity("4120", false)),
+        predicateCall("SimEmptyMcc", isValidMccOfSim, "", false, validity("", false)),
+        predicateCall("SimMoSupport", isMoSupportMccOfSim, "505", true, moAsked),
+        predicateCall("MoSupport", isMoSupportMcc, "505", true, SIM_MANAGER.access() + moAsked),
+        predicateCall("MoSupportEmpty", isMoSupportMcc, "", false, emptyKeyError(mo, "mcc")),
+        predicateCall("MoSupportNull", isMoSupportMcc, nullptr, false, emptyKeyError(mo, "mcc")),
     };
+    for (const Predicate ask : {isValidMcc, isValidMutableMcc}) {
+        const std::string name = ask == isValidMcc ? "ConstMcc" : "MutableMcc";
+        for (const auto& [mcc, isValid] : {std::pair{"450", true}, {"999", false}})
+            calls.push_back(predicateCall(name + mcc, ask, mcc, isValid,
+                                          entry + SIM_MANAGER.access() + validity(mcc, isValid)));
+        calls.push_back(predicateCall(name + "Empty", ask, "", false, refusal));
+        calls.push_back(predicateCall(name + "Null", ask, nullptr, false, refusal));
+    }
+    return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(CountryConverters, LoggedCallTest, testing::ValuesIn(converterCalls()),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(CountryChains, LoggedCallTest, testing::ValuesIn(chainedCalls()),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(CountryValidity, LoggedCallTest,
-                         testing::ValuesIn(validMccCalls("ConstMcc", isValidMcc)),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(CountryValidityMutable, LoggedCallTest,
-                         testing::ValuesIn(validMccCalls("MutableMcc", isValidMutableMcc)),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(CountryMoSupport, LoggedCallTest, testing::ValuesIn(moSupportCalls()),
+std::vector<LoggedCall> countryCalls()
+{
+    std::vector<LoggedCall> all;
+    for (const auto& calls : {converterCalls(), chainedCalls(), predicateCalls()})
+        all.insert(all.end(), calls.begin(), calls.end());
+    return all;
+}
+
+INSTANTIATE_TEST_SUITE_P(Country, LoggedCallTest, testing::ValuesIn(countryCalls()),
                          rowName<LoggedCall>);
 
-class CountryQuestionTest : public PlatformTest, public testing::WithParamInterface<Converter> {
+class ConverterTest : public PlatformTest, public testing::WithParamInterface<Converter> {
 protected:
     const Converter& row = GetParam();
     char preset = 'p';
 };
 
-INSTANTIATE_TEST_SUITE_P(Every, CountryQuestionTest, testing::ValuesIn(converters()),
-                         rowName<Converter>);
+INSTANTIATE_TEST_SUITE_P(Every, ConverterTest, testing::ValuesIn(CONVERTERS), rowName<Converter>);
 
-TEST_P(CountryQuestionTest, AnswerIsCopyThatTheCallerFrees)
+TEST_P(ConverterTest, AnswerIsCopyThatTheCallerFrees)
 {
-    char* const value = ask(row.question, row.key.c_str(), &preset);
-    EXPECT_THAT(value, StrEq(row.value));
-    EXPECT_EQ(ledger().live(), Texts{"copy: " + row.value});
-    std::free(value);
-    EXPECT_THAT(ledger().live(), IsEmpty());
+    for (const Way& ask : waysOf(row)) {
+        char* const value = ask(row.key, &preset);
+        EXPECT_THAT(value, StrEq(row.value));
+        EXPECT_EQ(ledger().live(), Texts{"copy: " + row.value});
+        std::free(value);
+        EXPECT_THAT(ledger().live(), IsEmpty());
+    }
 }
 
-TEST_P(CountryQuestionTest, UnknownKeysGiveNull)
+TEST_P(ConverterTest, UnknownKeysGiveNull)
 {
     for (const int mode : {0, 1}) {
         platform().debugMode = mode;
         for (const std::string& key : strangeKeys(row.key))
-            EXPECT_EQ(ask(row.question, key.c_str(), &preset), nullptr) << key.substr(0, 100);
+            for (const Way& ask : waysOf(row))
+                EXPECT_EQ(ask(key, &preset), nullptr) << key.substr(0, 100);
+    }
+    EXPECT_EQ(ask(simManager(), row.search, "", &preset), nullptr);
+    EXPECT_THAT(ledger().live(), IsEmpty());
+}
+
+TEST_P(ConverterTest, FailedCopyGivesNull)
+{
+    platform().debugMode = 1;
+    for (const Way& ask : waysOf(row)) {
+        platform().forgetEvents();
+        const FailingAllocation failure(Allocation::STRDUP);
+        EXPECT_EQ(ask(row.key, &preset), nullptr);
+        EXPECT_TRUE(failure.happened());
+        EXPECT_THAT(platform().trace(), testing::IsSupersetOf(foundTrace(row, row.key, "(null)")));
     }
 }
 
-TEST_P(CountryQuestionTest, SlotIsWrittenAfterTheSearch)
+TEST_P(ConverterTest, FacadesSlotIsWrittenAfterTheSearch)
 {
     const Question question = row.question;
     char* slot = &preset;
@@ -222,50 +341,17 @@ TEST_P(CountryQuestionTest, SlotIsWrittenAfterTheSearch)
         if (event.text == foundTrace(row, row.key, row.value).back())
             seen = slot;
     };
-    (coreSystem().*question)(row.key.c_str(), &slot);
+    (system.*question)(row.key.c_str(), &slot);
     EXPECT_EQ(seen, &preset);
     std::free(slot);
 }
 
-TEST_P(CountryQuestionTest, FailedCopyGivesNull)
-{
-    const FailingAllocation failure(Allocation::STRDUP);
-    EXPECT_EQ(ask(row.question, row.key.c_str(), &preset), nullptr);
-    EXPECT_TRUE(failure.happened());
-}
-
-class CountryChainTest : public PlatformTest {
+class CountryTest : public PlatformTest {
 protected:
-    std::string name(const char* code)
-    {
-        char* const answer = ask(ASK_NAME, code);
-        const std::string text = answer;
-        std::free(answer);
-        return text;
-    }
-
     char preset = 'p';
 };
 
-TEST_F(CountryChainTest, NameIsThatOfTheFirstMcc)
-{
-    EXPECT_EQ(name("1"), "American Samoa (US)");
-    EXPECT_EQ(name("7"), "Kazakhstan");
-    EXPECT_EQ(name("44"), "United Kingdom");
-    EXPECT_EQ(name("590"), "Guadeloupe (France)");
-    EXPECT_EQ(name("596"), "Guadeloupe (France)");
-    EXPECT_EQ(name("82"), "Korea, South");
-}
-
-TEST_F(CountryChainTest, Alpha2IsThatOfTheLastRow)
-{
-    EXPECT_STREQ(ask(ASK_ALPHA2, "590"), "mq");
-    EXPECT_STREQ(ask(ASK_ALPHA2, "596"), "mq");
-    EXPECT_STREQ(ask(ASK_ALPHA2, "1"), "as");
-    EXPECT_STREQ(ask(ASK_ALPHA2, "7"), "kz");
-}
-
-TEST_F(CountryChainTest, NameIsCopyAndItsMccIsKept)
+TEST_F(CountryTest, NameIsCopyAndItsMccIsKept)
 {
     char* const answer = ask(ASK_NAME, "596", &preset);
     EXPECT_EQ(ledger().live(), (Texts{"copy: 340", "copy: Guadeloupe (France)"}));
@@ -273,7 +359,7 @@ TEST_F(CountryChainTest, NameIsCopyAndItsMccIsKept)
     EXPECT_EQ(ledger().live(), Texts{"copy: 340"});
 }
 
-TEST_F(CountryChainTest, Alpha2IsTheTablesOwnTextAndItsMccIsKept)
+TEST_F(CountryTest, Alpha2IsTheTablesOwnTextAndItsMccIsKept)
 {
     const char* const answer = ask(ASK_ALPHA2, "596", &preset);
     EXPECT_EQ(ask(ASK_ALPHA2, "590", &preset), answer);
@@ -281,19 +367,18 @@ TEST_F(CountryChainTest, Alpha2IsTheTablesOwnTextAndItsMccIsKept)
     EXPECT_EQ(ledger().live(), (Texts{"copy: 340", "copy: 340"}));
 }
 
-TEST_F(CountryChainTest, UnknownCodesLeaveTheSlotAndKeepNothing)
+TEST_F(CountryTest, UnknownCallingCodesLeaveTheSlotAndKeepNothing)
 {
     for (const int mode : {0, 1}) {
         platform().debugMode = mode;
-        for (const std::string& code : strangeKeys("596")) {
-            EXPECT_EQ(ask(ASK_NAME, code.c_str(), &preset), &preset) << code.substr(0, 100);
-            EXPECT_EQ(ask(ASK_ALPHA2, code.c_str(), &preset), &preset) << code.substr(0, 100);
-        }
+        for (const std::string& code : strangeKeys("596"))
+            for (const Question question : {ASK_NAME, ASK_ALPHA2})
+                EXPECT_EQ(ask(question, code.c_str(), &preset), &preset) << code.substr(0, 100);
     }
     EXPECT_THAT(ledger().live(), IsEmpty());
 }
 
-TEST_F(CountryChainTest, FailedCopyOfTheMccLeavesTheSlot)
+TEST_F(CountryTest, FailedCopyOfTheChainedMccLeavesTheSlot)
 {
     for (const Question question : {ASK_NAME, ASK_ALPHA2}) {
         const FailingAllocation failure(Allocation::STRDUP);
@@ -302,57 +387,33 @@ TEST_F(CountryChainTest, FailedCopyOfTheMccLeavesTheSlot)
     }
 }
 
-TEST_F(CountryChainTest, FailedCopyOfTheNameGivesNull)
+TEST_F(CountryTest, FailedCopyOfTheChainedNameGivesNull)
 {
     const FailingAllocation failure(Allocation::STRDUP, 1);
     EXPECT_EQ(ask(ASK_NAME, "596", &preset), nullptr);
     EXPECT_TRUE(failure.happened());
 }
 
-class CountryPredicateTest : public PlatformTest {};
-
-TEST_F(CountryPredicateTest, ConstAndMutableMccsAreTreatedAlike)
+TEST_F(CountryTest, StrangeMccsAreInvalidAndSupportMo)
 {
-    for (const char* mcc : {"450", "340", "406", "659", "999", "", "45", "4500"})
-        EXPECT_EQ(isValidMcc(mcc), isValidMutableMcc(mcc)) << mcc;
-}
-
-TEST_F(CountryPredicateTest, ValidityIsMembershipInTheTable)
-{
-    EXPECT_TRUE(isValidMcc("450"));
-    EXPECT_FALSE(isValidMcc("406"));
-    EXPECT_FALSE(isValidMcc("659"));
-    for (const std::string& key : strangeKeys("412"))
-        EXPECT_FALSE(isValidMcc(key.c_str())) << key.substr(0, 100);
-}
-
-TEST_F(CountryPredicateTest, EveryMccButTheEmptyOneSupportsMo)
-{
-    EXPECT_TRUE(isMoSupportMcc("505"));
-    EXPECT_TRUE(isMoSupportMcc("123"));
-    for (const std::string& key : strangeKeys("505"))
+    for (const std::string& key : strangeKeys("412")) {
+        for (const Predicate isValid : {isValidMcc, isValidMutableMcc, isValidMccOfSim})
+            EXPECT_FALSE(isValid(key.c_str())) << key.substr(0, 100);
         EXPECT_TRUE(isMoSupportMcc(key.c_str()));
-    EXPECT_FALSE(isMoSupportMcc(""));
-    EXPECT_FALSE(isMoSupportMcc(nullptr));
+        EXPECT_TRUE(isMoSupportMccOfSim(key.c_str()));
+    }
+    EXPECT_TRUE(sim.IsMoSupportMcc("")); // the facade alone refuses it
 }
 
-class CountryThreadTest : public PlatformTest {};
-
-TEST_F(CountryThreadTest, ManyThreadsMayAskAtOnce)
+TEST_F(CountryTest, ManyThreadsMayAskAtOnce)
 {
-    std::vector<std::thread> threads;
-    std::atomic<int> good{0};
-    for (int i = 0; i < 8; ++i)
-        threads.emplace_back([&good] {
-            for (const Converter& row : converters()) {
-                char* const value = ask(row.question, row.key.c_str());
-                good += value != nullptr && row.value == value;
-                std::free(value);
-            }
-        });
-    for (std::thread& thread : threads)
-        thread.join();
-    EXPECT_EQ(good, 8 * static_cast<int>(converters().size()));
+    together(8, [](int) {
+        for (const Converter& row : CONVERTERS) {
+            char* const value = ask(row.question, row.key.c_str());
+            EXPECT_EQ(value, row.value);
+            std::free(value);
+        }
+    });
 }
 
 } // namespace
