@@ -44,7 +44,7 @@ void askStates(CoreSystem& system)
 
 void askIdentity(CoreSystem& system)
 {
-    for (const IdentityRead& read : identityReads()) {
+    for (const IdentityRead& read : IDENTITY_READS) {
         char* value = nullptr;
         const int result = (system.*read.readFirst)(&value);
         EXPECT_EQ(result, 0);
