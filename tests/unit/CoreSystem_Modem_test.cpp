@@ -5,7 +5,6 @@
 #include "SimSlots.h"
 
 using namespace fake;
-using testing::AnyOf;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
@@ -121,26 +120,44 @@ Texts modemsAsked(unsigned int count, int asked)
     return trace;
 }
 
-// The modem of the last slot that is asked answers.
-LoggedCall answeredCall(const std::string& name, const std::function<void()>& prepare,
-                        unsigned int count, int asked, const std::string& answer)
+// What the modem of a slot answers.
+struct Imei {
+    int code;
+    std::any value;
+};
+
+void setImeis(const std::vector<Imei>& imeis, unsigned int count)
 {
-    return {name,
+    setSlotCount(count);
+    int slot = 0;
+    for (const Imei& imei : imeis)
+        platform().answer(imeiCall(slot++), imei.code, imei.value);
+}
+
+void setImei(int code, const std::any& value = {})
+{
+    setImeis({{code, value}}, 1);
+}
+
+// The modem of the last slot that is asked answers.
+LoggedCall answeredCall(const std::string& name, const std::string& answer,
+                        const std::vector<Imei>& imeis, unsigned int count)
+{
+    const auto asked = static_cast<int>(imeis.size());
+    const std::string line = "Slot" + std::to_string(asked - 1) + " IMEI exist";
+    return {"Imei" + name,
             [=] {
-                setSlotCount(count);
-                prepare();
+                setImeis(imeis, count);
                 expectImei(answer, "platform: "); // the platform's own string, handed on
             },
-            modemsAsked(count, asked) +
-                Texts{CORE_SYSTEM.debug("GetIMEI",
-                                        "Slot" + std::to_string(asked - 1) + " IMEI exist")} +
+            modemsAsked(count, asked) + Texts{CORE_SYSTEM.debug("GetIMEI", line)} +
                 accessed(listReleased(count))};
 }
 
-LoggedCall fallbackCall(const std::string& name, const std::function<void()>& prepare,
-                        const Texts& trace)
+LoggedCall fallbackCall(const std::string& name, const Texts& trace,
+                        const std::function<void()>& prepare)
 {
-    return {name,
+    return {"Imei" + name,
             [=] {
                 const TimeZone zone("KST-9");
                 prepare();
@@ -149,53 +166,23 @@ LoggedCall fallbackCall(const std::string& name, const std::function<void()>& pr
             trace + Texts{"intToStr(32400)"}};
 }
 
-void answerImei(int slot, int code, const std::any& value = {})
-{
-    platform().answer(imeiCall(slot), code, value);
-}
-
 std::vector<LoggedCall> imeiCalls()
 {
+    const std::any null = static_cast<char*>(nullptr);
     return {
-        answeredCall(
-            "ImeiOfOnlyModem", [] { answerImei(0, 0, IMEI_0); }, 1, 1, IMEI_0),
-        answeredCall(
-            "ImeiOfFirstModemAndNoOtherIsAsked", [] { answerImei(0, 0, IMEI_0); }, 2, 1, IMEI_0),
-        answeredCall(
-            "ImeiOfSecondModem",
-            [] {
-                answerImei(0, -13);
-                answerImei(1, 0, IMEI_1);
-            },
-            2, 2, IMEI_1),
-        answeredCall(
-            "ImeiAfterSuccessWithNull",
-            [] {
-                answerImei(0, 0);
-                answerImei(1, 1);
-                answerImei(2, 0, IMEI_1);
-            },
-            3, 3, IMEI_1),
-        answeredCall(
-            "ImeiEmpty", [] { answerImei(0, 0, std::string()); }, 1, 1, ""),
-        fallbackCall(
-            "ImeiOfNoModem",
-            [] {
-                setSlotCount(2);
-                answerImei(0, -13);
-                answerImei(1, 1);
-            },
-            modemsAsked(2, 2) + accessed(listReleased(2))),
-        fallbackCall(
-            "ImeiNullOfEveryModem",
-            [] {
-                setSlotCount(1);
-                answerImei(0, 0, static_cast<char*>(nullptr));
-            },
-            modemsAsked(1, 1) + accessed(listReleased(1))),
-        fallbackCall(
-            "ImeiWithoutTelephony", [] { setNoTelephony(); },
-            IMEI_ENTRY + accessed(noListTaken()) + IMEI_WITHOUT_LIST),
+        answeredCall("OfOnlyModem", IMEI_0, {{0, IMEI_0}}, 1),
+        answeredCall("OfFirstModemAndNoOtherIsAsked", IMEI_0, {{0, IMEI_0}}, 2),
+        answeredCall("OfSecondModem", IMEI_1, {{-13, {}}, {0, IMEI_1}}, 2),
+        answeredCall("AfterSuccessWithNull", IMEI_1, {{0, {}}, {1, {}}, {0, IMEI_1}}, 3),
+        answeredCall("Empty", "", {{0, std::string()}}, 1),
+        fallbackCall("OfNoModem", modemsAsked(2, 2) + accessed(listReleased(2)),
+                     [] {
+                         setImeis({{-13, {}}, {1, {}}}, 2);
+                     }),
+        fallbackCall("NullOfEveryModem", modemsAsked(1, 1) + accessed(listReleased(1)),
+                     [=] { setImei(0, null); }),
+        fallbackCall("WithoutTelephony", IMEI_ENTRY + accessed(noListTaken()) + IMEI_WITHOUT_LIST,
+                     [] { setNoTelephony(); }),
     };
 }
 
@@ -216,23 +203,7 @@ std::string roamingLine(const std::string& text)
     return SIM_MANAGER.debug("GetRoamingStatus", text);
 }
 
-// Always an error line: meant.
-const std::string ROAMING_ENTRY =
-    SIM_MANAGER.error("GetRoamingStatus", "SimManager::GetRoamingStatus()");
-
-// Answers of the platform, and the result and the flag that are expected of them.
-struct RoamingCase {
-    std::string name;
-    int slot;
-    std::function<void()> prepare;
-    bool answered;
-    bool preset;
-    bool flag;
-    Texts steps; // after the initialisation
-    unsigned int count = 2;
-};
-
-void setService(int slot, int code, int state)
+void setService(int slot, int code, const std::any& state)
 {
     setSlotCount(2);
     platform().answer(serviceCall(slot), code, state);
@@ -240,154 +211,101 @@ void setService(int slot, int code, int state)
 
 void setRoaming(int slot, int code, const std::any& value)
 {
-    setService(slot, 0, TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE);
+    setService(slot, 0, 0);
     platform().answer(roamingCall(slot), code, value);
 }
 
-const std::string SUCCESS_LINE = roamingLine("telephony_init success");
-const std::string IN_SERVICE_LINE = roamingLine("telephony_network_service_state : [In Service]");
+// How far a question gets: the list is taken, the slot is asked for its service, and for roaming,
+// which it answers.
+enum Steps { REFUSED, TAKEN, ASKED, IN_SERVICE, ANSWERED };
 
-Texts inServiceAsked(int slot)
+Texts roamingSteps(int slot, Steps steps)
 {
-    return {SUCCESS_LINE, serviceCall(slot), IN_SERVICE_LINE, roamingCall(slot)};
+    const Texts all = {roamingLine("telephony_init success"), serviceCall(slot),
+                       roamingLine("telephony_network_service_state : [In Service]"),
+                       roamingCall(slot),
+                       roamingLine("telephony_network_get_roaming_status success")};
+    const int lengths[] = {0, 1, 2, 4, 5};
+    return Texts(all.begin(), all.begin() + lengths[steps]);
 }
 
-Texts roamingAnswered(int slot)
-{
-    return inServiceAsked(slot) +
-           Texts{roamingLine("telephony_network_get_roaming_status success")};
-}
-
-std::vector<RoamingCase> answeredCases()
-{
-    std::vector<RoamingCase> cases;
-    for (const int slot : {0, 1})
-        for (const bool roaming : {false, true})
-            cases.push_back({"RoamingSlot" + std::to_string(slot) + (roaming ? "Away" : "Home"),
-                             slot, [=] { setRoaming(slot, 0, roaming); }, true, !roaming, roaming,
-                             roamingAnswered(slot)});
-    return cases;
-}
+// The flag holds the opposite before where it is told, and keeps what it holds where not.
+struct RoamingCase {
+    std::string name;
+    int slot;
+    Steps steps;
+    bool isTold;
+    bool flag;
+    std::function<void()> prepare;
+    std::string released = deinitCall(2);
+};
 
 // No roaming status without service; every failure is false and the flag is the platform's.
-std::vector<RoamingCase> unansweredCases()
+std::vector<RoamingCase> roamingCases()
 {
-    std::vector<RoamingCase> cases;
+    std::vector<RoamingCase> cases = {
+        {"RefusedButWritten", 0, IN_SERVICE, true, true, [] { setRoaming(0, -13, true); }},
+        {"ServiceNotTold", 0, ASKED, false, true, [] { setService(0, 0, {}); }},
+        {"OfNoSlots", 0, TAKEN, false, true, [] { setSlotCount(0); }, deinitCall(0)},
+        {"WithoutTelephony", 0, REFUSED, false, true, [] { setNoTelephony(); },
+         "telephony_deinit(no list)"},
+        {"WithListOfFailedCall", 0, REFUSED, false, true,
+         [] {
+             setSlotCount(2);
+             platform().answer("telephony_init()", 1, 2u);
+         }},
+        {"WhateverTheReleaseAnswers", 0, ANSWERED, true, true,
+         [] {
+             setRoaming(0, 0, true);
+             platform().answer(deinitCall(2), -22);
+         }},
+    };
+    for (const int slot : {0, 1})
+        for (const bool roaming : {false, true})
+            cases.push_back({"Slot" + std::to_string(slot) + (roaming ? "Away" : "Home"), slot,
+                             ANSWERED, true, roaming, [=] { setRoaming(slot, 0, roaming); }});
     for (const int state : {1, 2, 3, 7, -1})
-        cases.push_back({"RoamingServiceState" + std::to_string(state + 1),
-                         1,
-                         [=] { setService(1, 0, state); },
-                         false,
-                         true,
-                         true,
-                         {SUCCESS_LINE, serviceCall(1)}});
-    for (const int code : {-13, 1})
-        cases.push_back({"RoamingServiceRefused" + std::to_string(code + 13),
-                         0,
-                         [=] { setService(0, code, 0); },
-                         false,
-                         true,
-                         true,
-                         {SUCCESS_LINE, serviceCall(0)}});
-    for (const int code : {-13, 1})
-        cases.push_back({"RoamingRefused" + std::to_string(code + 13), 0,
-                         [=] { setRoaming(0, code, {}); }, false, true, true, inServiceAsked(0)});
-    cases.push_back({"RoamingRefusedButWritten", 0, [] { setRoaming(0, -13, true); }, false, false,
-                     true, inServiceAsked(0)});
-    cases.push_back({"RoamingServiceNotTold",
-                     0,
-                     [] {
-                         setSlotCount(2);
-                         platform().answer(serviceCall(0), 0);
-                     },
-                     false,
-                     true,
-                     true,
-                     {SUCCESS_LINE, serviceCall(0)}});
-    return cases;
-}
-
-std::vector<RoamingCase> slotCases()
-{
-    std::vector<RoamingCase> cases;
+        cases.push_back({"ServiceState" + std::to_string(state + 1), 1, ASKED, false, true,
+                         [=] { setService(1, 0, state); }});
+    for (const int code : {-13, 1}) {
+        const std::string refused = "Refused" + std::to_string(code + 13);
+        cases.push_back(
+            {"Service" + refused, 0, ASKED, false, true, [=] { setService(0, code, 0); }});
+        cases.push_back({refused, 0, IN_SERVICE, false, true, [=] { setRoaming(0, code, {}); }});
+    }
     for (const int slot : {2, 3, -1, INT32_MAX, INT32_MIN})
-        cases.push_back({"RoamingNoSlot" + std::to_string(static_cast<unsigned int>(slot)),
-                         slot,
-                         [] { setSlotCount(2); },
-                         false,
-                         true,
-                         true,
-                         {SUCCESS_LINE}});
-    cases.push_back(
-        {"RoamingOfNoSlots", 0, [] { setSlotCount(0); }, false, true, true, {SUCCESS_LINE}, 0});
+        cases.push_back({"NoSlot" + std::to_string(static_cast<unsigned int>(slot)), slot, TAKEN,
+                         false, true, [] { setSlotCount(2); }});
     return cases;
-}
-
-Texts roamingTrace(const RoamingCase& row)
-{
-    return lockedThroughout(Texts{ROAMING_ENTRY, "telephony_init()"} + row.steps +
-                            Texts{deinitCall(row.count)});
-}
-
-Texts facadeTrace(const RoamingCase& row, const Texts& trace)
-{
-    const std::string result = !row.answered ? "GetRoamingStatus Failed"
-                               : row.flag    ? "GetRoamingStatus : [Roaming]"
-                                             : "GetRoamingStatus : [Not Roaming]";
-    return Texts{CORE_SYSTEM.debug("GetRoamingStatus", "CoreSystem::GetRoamingStatus")} +
-           accessed(trace) + Texts{CORE_SYSTEM.debug("GetRoamingStatus", result)};
 }
 
 template <class Target>
 void askRoaming(Target& target, const RoamingCase& row)
 {
     row.prepare();
-    bool flag = row.preset;
-    EXPECT_EQ(target.GetRoamingStatus(row.slot, &flag), row.answered);
+    bool flag = row.isTold ? !row.flag : row.flag;
+    EXPECT_EQ(target.GetRoamingStatus(row.slot, &flag), row.steps == ANSWERED);
     EXPECT_EQ(flag, row.flag);
     EXPECT_THAT(platform().liveHandles(), IsEmpty());
 }
 
-void addRoamingCalls(std::vector<LoggedCall>& calls, const RoamingCase& row, const Texts& trace)
-{
-    calls.push_back({"Sim" + row.name, [=] { askRoaming(simManager(), row); }, trace});
-    calls.push_back({row.name, [=] { askRoaming(coreSystem(), row); }, facadeTrace(row, trace)});
-}
-
 std::vector<LoggedCall> roamingCalls()
 {
+    const std::string method = "GetRoamingStatus";
     std::vector<LoggedCall> calls;
-    for (const auto& cases : {answeredCases(), unansweredCases(), slotCases()})
-        for (const RoamingCase& row : cases)
-            addRoamingCalls(calls, row, roamingTrace(row));
-    addRoamingCalls(
-        calls, {"RoamingWithoutTelephony", 0, [] { setNoTelephony(); }, false, true, true, {}},
-        lockedThroughout({ROAMING_ENTRY, "telephony_init()", "telephony_deinit(no list)"}));
-    addRoamingCalls(calls,
-                    {"RoamingWithListOfFailedCall",
-                     0,
-                     [] {
-                         setSlotCount(2);
-                         platform().answer("telephony_init()", 1, 2u);
-                     },
-                     false,
-                     true,
-                     true,
-                     {}},
-                    lockedThroughout({ROAMING_ENTRY, "telephony_init()", deinitCall(2)}));
-    addRoamingCalls(calls,
-                    {"RoamingWhateverTheReleaseAnswers",
-                     0,
-                     [] {
-                         setRoaming(0, 0, true);
-                         platform().answer(deinitCall(2), -22);
-                     },
-                     true,
-                     false,
-                     true,
-                     {}},
-                    lockedThroughout(Texts{ROAMING_ENTRY, "telephony_init()"} + roamingAnswered(0) +
-                                     Texts{deinitCall(2)}));
+    for (const RoamingCase& row : roamingCases()) {
+        // Begins with an error line, always: meant.
+        const Texts trace = lockedThroughout(
+            Texts{SIM_MANAGER.error(method, "SimManager::GetRoamingStatus()"), "telephony_init()"} +
+            roamingSteps(row.slot, row.steps) + Texts{row.released});
+        const std::string result = row.steps != ANSWERED ? "GetRoamingStatus Failed"
+                                   : row.flag            ? "GetRoamingStatus : [Roaming]"
+                                                         : "GetRoamingStatus : [Not Roaming]";
+        calls.push_back({"SimRoaming" + row.name, [=] { askRoaming(simManager(), row); }, trace});
+        calls.push_back({"Roaming" + row.name, [=] { askRoaming(coreSystem(), row); },
+                         Texts{CORE_SYSTEM.debug(method, "CoreSystem::GetRoamingStatus")} +
+                             accessed(trace) + Texts{CORE_SYSTEM.debug(method, result)}});
+    }
     return calls;
 }
 
@@ -420,9 +338,9 @@ TEST_P(ZoneTest, ReadingOfTheClockChangesNothing)
     }
 }
 
-class ImeiTest : public PlatformTest {};
+class ModemTest : public PlatformTest {};
 
-TEST_F(ImeiTest, ZoneThatChangesBetweenTwoCallsIsSeen)
+TEST_F(ModemTest, ZoneThatChangesBetweenTwoCallsIsSeen)
 {
     setNoTelephony();
     platform().now = WINTER;
@@ -434,7 +352,7 @@ TEST_F(ImeiTest, ZoneThatChangesBetweenTwoCallsIsSeen)
     expectFallback("-18000000000000");
 }
 
-TEST_F(ImeiTest, SummerTimeThatBeginsBetweenTwoCallsIsSeen)
+TEST_F(ModemTest, SummerTimeThatBeginsBetweenTwoCallsIsSeen)
 {
     setNoTelephony();
     const TimeZone zone("CET-1CEST,M3.5.0,M10.5.0/3");
@@ -444,7 +362,7 @@ TEST_F(ImeiTest, SummerTimeThatBeginsBetweenTwoCallsIsSeen)
     expectFallback("720000000000000");
 }
 
-TEST_F(ImeiTest, MachinesOwnZoneGivesFifteenCharacters)
+TEST_F(ModemTest, MachinesOwnZoneGivesFifteenCharacters)
 {
     setNoTelephony();
     char* const value = imei();
@@ -452,7 +370,7 @@ TEST_F(ImeiTest, MachinesOwnZoneGivesFifteenCharacters)
     std::free(value);
 }
 
-TEST_F(ImeiTest, FallbackWithoutSlotsKeepsTheList)
+TEST_F(ModemTest, FallbackWithoutSlotsKeepsTheList)
 {
     const TimeZone zone("UTC0");
     setSlotCount(0);
@@ -463,50 +381,39 @@ TEST_F(ImeiTest, FallbackWithoutSlotsKeepsTheList)
     std::free(value);
 }
 
-TEST_F(ImeiTest, EveryFailureCodeLeadsToTheFallback)
+TEST_F(ModemTest, EveryFailureCodeLeadsToTheFallback)
 {
     const TimeZone zone("UTC0");
     for (const int code : PLATFORM_FAILURES) {
-        setSlotCount(1);
-        answerImei(0, code);
+        setImei(code);
         expectFallback("000000000000000");
         setNoTelephony(code);
         expectFallback("000000000000000");
     }
 }
 
-TEST_F(ImeiTest, StringOfFailedReadIsNotTaken)
+TEST_F(ModemTest, StringOfFailedReadIsNotTaken)
 {
     const TimeZone zone("UTC0");
-    setSlotCount(1);
-    answerImei(0, -13, IMEI_0);
+    setImei(-13, IMEI_0);
     char* const value = imei();
     EXPECT_STREQ(value, "000000000000000");
     std::free(value);
     EXPECT_THAT(ledger().freeAll(), ElementsAre("platform: " + IMEI_0));
 }
 
-TEST_F(ImeiTest, OddAnswersPassThroughUnchanged)
+TEST_F(ModemTest, OddAnswersPassThroughUnchanged)
 {
+    platform().debugMode = 1;
     for (const std::string& odd :
          {std::string("%s%n"), std::string("\xff\n"), std::string(1 << 20, '4')}) {
-        platform().debugMode = 1;
-        setSlotCount(1);
-        answerImei(0, 0, odd);
+        setImei(0, odd);
         expectImei(odd, "platform: ");
         EXPECT_FALSE(isTold(odd));
     }
 }
 
-TEST_F(ImeiTest, AnswerTakesNoLockOfItsOwn)
-{
-    setSlotCount(1);
-    answerImei(0, 0, IMEI_0);
-    std::free(imei());
-    EXPECT_EQ(platform().texts(Event::Kind::LOCK), (Texts{SIM_MANAGER.lock(), SIM_MANAGER.lock()}));
-}
-
-TEST_F(ImeiTest, FailedCopyOfTheFallbackGivesNull)
+TEST_F(ModemTest, FailedCopyOfTheFallbackGivesNull)
 {
     setNoTelephony();
     const FailingAllocation failure(Allocation::STRDUP);
@@ -514,20 +421,16 @@ TEST_F(ImeiTest, FailedCopyOfTheFallbackGivesNull)
     EXPECT_TRUE(failure.happened());
 }
 
-TEST_F(ImeiTest, NoExceptionCrossesTheInterface)
+TEST_F(ModemTest, NoExceptionCrossesTheInterface)
 {
     platform().numberTextThrows = true;
     setNoTelephony();
     EXPECT_EQ(imei(), nullptr);
 }
 
-class RoamingTest : public PlatformTest {
-protected:
-    bool flag = false;
-};
-
-TEST_F(RoamingTest, EveryFailureCodeIsNoAnswer)
+TEST_F(ModemTest, EveryFailureCodeIsNoRoamingStatus)
 {
+    bool flag = false;
     for (const int code : PLATFORM_FAILURES) {
         setRoaming(0, code, {});
         EXPECT_FALSE(system.GetRoamingStatus(0, &flag)) << code;
@@ -535,18 +438,6 @@ TEST_F(RoamingTest, EveryFailureCodeIsNoAnswer)
         EXPECT_FALSE(system.GetRoamingStatus(0, &flag)) << code;
         setNoTelephony(code);
         EXPECT_FALSE(system.GetRoamingStatus(0, &flag)) << code;
-    }
-}
-
-TEST_F(RoamingTest, NothingIsCached)
-{
-    for (const bool roaming : {true, false, true}) {
-        setRoaming(1, 0, roaming);
-        EXPECT_TRUE(system.GetRoamingStatus(1, &flag));
-        EXPECT_EQ(flag, roaming);
-        setService(1, 0, TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY);
-        EXPECT_FALSE(system.GetRoamingStatus(1, &flag));
-        EXPECT_EQ(flag, roaming);
     }
 }
 
