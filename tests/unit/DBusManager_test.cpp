@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The serial number that the device daemon tells on the system bus.
+// The serial number that the device daemon tells on the system bus: asked by the manager, and
+// through the facade.
 #include <array>
 
 #include "support/FakeBus.h"
@@ -8,7 +9,6 @@
 using namespace fake;
 using testing::Each;
 using testing::ElementsAre;
-using testing::Field;
 using testing::IsEmpty;
 using testing::StrEq;
 
@@ -63,86 +63,101 @@ Texts answeredTrace(const std::string& serial)
                            debugLine(QUESTION, "deviceUniqueID : " + serial)};
 }
 
-// The slot's content after a question that begins with `preset` in it.
-char* ask(int expectedCode, char* preset = nullptr)
+// The slot's content after a question that begins with something else in it.
+char* ask(int expectedCode)
 {
-    char* slot = preset;
+    char preset = 'p';
+    char* slot = &preset;
     EXPECT_EQ(CoreSystemInternals::instance<DBusManager>()->GetDeviceUniqueID(&slot), expectedCode);
+    EXPECT_EQ(preset, 'p');
     return slot;
 }
 
-void expectFailure(int code)
+char* askFacade(int expectedCode)
 {
-    char preset = 'p';
-    EXPECT_EQ(ask(code, &preset), nullptr);
-    EXPECT_EQ(preset, 'p');
+    const char* slot = "preset";
+    EXPECT_EQ(coreSystem().GetDeviceUniqueID(&slot), expectedCode);
+    return const_cast<char*>(slot);
 }
 
 const FakeBus::Error TIMED_OUT = {G_IO_ERROR, 24, "Time out was reached"};
 const FakeBus::Error REFUSED_ERROR = {G_IO_ERROR, 39, "Could not connect: Connection refused"};
 const FakeBus::Error NO_SERVICE = {G_DBUS_ERROR, 2, "no such service"};
 
-// The bus answers what `arrange` says, and the question fails with the code.
-LoggedCall failedCall(const std::string& name, int code, const std::function<void()>& arrange,
-                      const Texts& trace)
-{
-    return {name,
-            [=] {
-                bus().reset();
-                arrange();
-                expectFailure(code);
-            },
-            trace};
-}
+const char* const SERIAL = "R38N50A4ZB";
 
-const std::vector<LoggedCall> READ_CALLS = {
-    {"SerialAnswered",
-     [] {
-         bus().reset();
-         bus().answerText("R38N50A4ZB");
-         std::free(ask(0));
-     },
-     answeredTrace("R38N50A4ZB")},
-    failedCall(
-        "SerialConnectionFailedWithoutError", 1, [] { bus().refuseConnection({}); },
-        REFUSED + Texts{errorLine(INIT, "[dbus] CORE_DBUS_ERROR_CONNECTION_FAIL")}),
-    failedCall(
-        "SerialConnectionFailed", 1, [] { bus().refuseConnection(REFUSED_ERROR); },
-        REFUSED +
-            Texts{detailLine(INIT, "g_bus_get_sync()", 39, "Could not connect: Connection refused"),
-                  errorLine(INIT, "[dbus] DBUS_ERROR_CONNECTION_FAIL")}),
-    failedCall(
-        "SerialConnectionTimedOut", 3, [] { bus().refuseConnection(TIMED_OUT); },
-        REFUSED + Texts{detailLine(INIT, "g_bus_get_sync()", 24, "Time out was reached"),
-                        errorLine(INIT, "[dbus] DBUS_ERROR_CONNECTION_TIME_OUT")}),
-    failedCall(
-        "SerialUnansweredWithoutError", 2, [] { bus().answerNothing({}); }, UNANSWERED + NO_REPLY),
-    failedCall(
-        "SerialUnanswered", 2, [] { bus().answerNothing(NO_SERVICE); },
-        UNANSWERED +
-            Texts{detailLine(SEND, "g_dbus_connection_send_message_with_reply_sync()", 2,
-                             "no such service")} +
-            NO_REPLY),
-    failedCall(
-        "SerialErrorReply", 2,
-        [] { bus().answerError("org.freedesktop.DBus.Error.AccessDenied", "not for you"); },
-        ERROR_REPLIED +
-            Texts{detailLine(PARSE, "g_dbus_message_to_gerror()", 9,
-                             "GDBus.Error:org.freedesktop.DBus.Error.AccessDenied: not for you")}),
-    failedCall(
-        "SerialErrorReplyWithoutDetail", 2,
-        [] {
-            bus().answerError("org.freedesktop.DBus.Error.AccessDenied", "not for you");
-            bus().producesErrors = false;
-        },
-        ERROR_REPLIED),
-    failedCall(
-        "SerialReplyWithoutBody", 2, [] { bus().answer(nullptr); }, REPLIED),
-    failedCall(
-        "SerialReplyWithNumber", 2, [] { bus().answer(g_variant_new("(i)", 7)); }, REPLIED),
+class SerialCalls : public std::vector<LoggedCall> {
+public:
+    // The bus answers what `arrange` says: asked for are the manager, and the facade, whose lines
+    // are around the manager's.
+    void add(const std::string& name, int code, const Texts& trace,
+             const std::function<void()>& arrange)
+    {
+        const std::string result = code == 0 ? SERIAL : "(null)";
+        push_back({"Serial" + name, runOf(&ask, code, arrange), trace});
+        push_back({"CoreSystemSerial" + name, runOf(&askFacade, code, arrange),
+                   Texts{CORE_SYSTEM.debug(QUESTION, "CoreSystem::GetDeviceUniqueID")} +
+                       D_BUS_MANAGER.access() + trace +
+                       Texts{CORE_SYSTEM.debug(QUESTION, "DeviceUniqueID : " + result)}});
+    }
+
+private:
+    static std::function<void()> runOf(char* (*question)(int), int code,
+                                       const std::function<void()>& arrange)
+    {
+        return [=] {
+            bus().reset();
+            arrange();
+            char* const serial = question(code);
+            // The parser's copy is freed; the connection is kept, and nothing of a refused one.
+            EXPECT_EQ(ledger().live(), code == 0 ? Texts{"copy: R38N50A4ZB"} : Texts());
+            EXPECT_EQ(ledger().origin(serial), code == 0 ? "copy: R38N50A4ZB" : "");
+            EXPECT_EQ(bus().held(), code % 2 == 0 ? Texts{"connection"} : Texts());
+            if (code == 0)
+                std::free(serial);
+            else
+                EXPECT_EQ(serial, nullptr);
+        };
+    }
 };
 
-INSTANTIATE_TEST_SUITE_P(Serial, LoggedCallTest, testing::ValuesIn(READ_CALLS),
+SerialCalls serialCalls()
+{
+    const std::string send = "g_dbus_connection_send_message_with_reply_sync()";
+    const std::string denied = "org.freedesktop.DBus.Error.AccessDenied";
+    const auto refusedWith = [](const FakeBus::Error& error, const std::string& line) {
+        return REFUSED + Texts{detailLine(INIT, "g_bus_get_sync()", error.code, error.message),
+                               errorLine(INIT, "[dbus] " + line)};
+    };
+    const auto unansweredWith = [&](const FakeBus::Error& error) {
+        return UNANSWERED + Texts{detailLine(SEND, send, error.code, error.message)} + NO_REPLY;
+    };
+    SerialCalls calls;
+    calls.add("Answered", 0, answeredTrace(SERIAL), [] { bus().answerText(SERIAL); });
+    calls.add("ConnectionFailedWithoutError", 1,
+              REFUSED + Texts{errorLine(INIT, "[dbus] CORE_DBUS_ERROR_CONNECTION_FAIL")},
+              [] { bus().refuseConnection({}); });
+    calls.add("ConnectionFailed", 1, refusedWith(REFUSED_ERROR, "DBUS_ERROR_CONNECTION_FAIL"),
+              [] { bus().refuseConnection(REFUSED_ERROR); });
+    calls.add("ConnectionTimedOut", 3, refusedWith(TIMED_OUT, "DBUS_ERROR_CONNECTION_TIME_OUT"),
+              [] { bus().refuseConnection(TIMED_OUT); });
+    calls.add("UnansweredWithoutError", 2, UNANSWERED + NO_REPLY, [] { bus().answerNothing({}); });
+    calls.add("Unanswered", 2, unansweredWith(NO_SERVICE), [] { bus().answerNothing(NO_SERVICE); });
+    // A time-out of the call is an absent reply.
+    calls.add("TimedOut", 2, unansweredWith(TIMED_OUT), [] { bus().answerNothing(TIMED_OUT); });
+    calls.add("ErrorReply", 2,
+              ERROR_REPLIED + Texts{detailLine(PARSE, "g_dbus_message_to_gerror()", 9,
+                                               "GDBus.Error:" + denied + ": not for you")},
+              [=] { bus().answerError(denied.c_str(), "not for you"); });
+    calls.add("ErrorReplyWithoutDetail", 2, ERROR_REPLIED, [=] {
+        bus().answerError(denied.c_str(), "not for you");
+        bus().producesErrors = false;
+    });
+    calls.add("ReplyWithoutBody", 2, REPLIED, [] { bus().answer(nullptr); });
+    return calls;
+}
+
+INSTANTIATE_TEST_SUITE_P(Serial, LoggedCallTest, testing::ValuesIn(serialCalls()),
                          rowName<LoggedCall>);
 
 class DBusManagerTest : public PlatformTest {
@@ -157,47 +172,6 @@ protected:
     }
 };
 
-TEST_F(DBusManagerTest, SerialIsCopyThatTheCallerFrees)
-{
-    bus().answerText("R38N50A4ZB");
-    char preset = 'p';
-    char* const serial = ask(0, &preset);
-    ASSERT_THAT(serial, StrEq("R38N50A4ZB"));
-    EXPECT_THAT(ledger().live(), ElementsAre("copy: R38N50A4ZB")); // the parser's is freed
-    EXPECT_EQ(ledger().origin(serial), "copy: R38N50A4ZB");
-    std::free(serial);
-    EXPECT_THAT(ledger().live(), IsEmpty());
-}
-
-TEST_F(DBusManagerTest, TwoCallsGiveTwoAllocationsOfTheSameText)
-{
-    bus().answerText("R38N50A4ZB");
-    char* const first = ask(0);
-    char* const second = ask(0);
-    EXPECT_NE(first, second);
-    EXPECT_THAT(first, StrEq("R38N50A4ZB"));
-    EXPECT_THAT(second, StrEq("R38N50A4ZB"));
-    std::free(first);
-    std::free(second);
-}
-
-TEST_F(DBusManagerTest, NothingIsCached)
-{
-    for (const std::string serial : {"first", "second"}) {
-        platform().forgetEvents();
-        platform().debugMode = 1;
-        bus().answerText(serial);
-        char* const answer = ask(0);
-        EXPECT_EQ(answer, serial);
-        EXPECT_EQ(platform().trace(), answeredTrace(serial));
-        std::free(answer);
-    }
-    bus().answerNothing(NO_SERVICE);
-    expectFailure(2);
-    bus().refuseConnection(TIMED_OUT);
-    expectFailure(3);
-}
-
 TEST_F(DBusManagerTest, OddSerialsPassThroughUnchanged)
 {
     for (const std::string& odd : {std::string(), std::string("%s%n"), std::string(" \n"),
@@ -211,95 +185,52 @@ TEST_F(DBusManagerTest, OddSerialsPassThroughUnchanged)
         }
 }
 
-TEST_F(DBusManagerTest, LongSerialIsCutInTheLogOnly)
-{
-    platform().debugMode = 1;
-    const std::string serial(700, 's');
-    bus().answerText(serial);
-    char* const answer = ask(0);
-    EXPECT_EQ(answer, serial);
-    const Texts trace = platform().trace();
-    const std::string shown = "deviceUniqueID : " + serial;
-    EXPECT_EQ(trace.back(), debugLine(QUESTION, shown.substr(0, 598)));
-    std::free(answer);
-}
-
-TEST_F(DBusManagerTest, OnlyTheReferenceToTheConnectionIsKept)
-{
-    bus().answerText("R38N50A4ZB");
-    Texts held;
-    for (int i = 0; i < 3; ++i) {
-        std::free(ask(0));
-        held.push_back("connection");
-        EXPECT_EQ(bus().held(), held);
-    }
-    bus().answerNothing(NO_SERVICE);
-    expectFailure(2);
-    held.push_back("connection");
-    EXPECT_EQ(bus().held(), held);
-    bus().answerError("org.freedesktop.DBus.Error.Failed", "text");
-    expectFailure(2);
-    held.push_back("connection");
-    EXPECT_EQ(bus().held(), held);
-    bus().answer(nullptr);
-    expectFailure(2);
-    held.push_back("connection");
-    EXPECT_EQ(bus().held(), held);
-}
-
-TEST_F(DBusManagerTest, RefusedConnectionLeavesNothingHeld)
-{
-    for (const FakeBus::Error& error : {TIMED_OUT, REFUSED_ERROR}) {
-        bus().refuseConnection(error);
-        ask(error.message == TIMED_OUT.message ? 3 : 1);
-        EXPECT_THAT(bus().held(), IsEmpty());
-    }
-    bus().refuseConnection({});
-    expectFailure(1);
-    EXPECT_THAT(bus().held(), IsEmpty());
-}
-
 TEST_F(DBusManagerTest, TimeOutIsToldByTheTextAloneWhereverItStands)
 {
-    const std::pair<std::string, int> messages[] = {{"Time", 3},
-                                                    {"Timeout", 3},
-                                                    {"a Time in between", 3},
-                                                    {"at the end: Time", 3},
-                                                    {"LifeTime of it", 3},
-                                                    {"TTime", 3},
-                                                    {"time", 1},
-                                                    {"TIME", 1},
-                                                    {"Tim", 1},
-                                                    {"T ime", 1},
-                                                    {"timed out", 1},
-                                                    {"Tim\ne", 1},
-                                                    {"", 1},
-                                                    {"%s Time %n", 3},
-                                                    {"%s%n", 1},
-                                                    {std::string(10 << 20, 'x') + "Time", 3}};
-    for (const auto& [message, code] : messages)
-        for (const auto& [domain, number] :
-             {std::pair<GQuark, int>{G_IO_ERROR, G_IO_ERROR_TIMED_OUT},
-              {G_DBUS_ERROR, G_DBUS_ERROR_TIMEOUT},
-              {G_DBUS_ERROR, G_DBUS_ERROR_NO_SERVER},
-              {G_IO_ERROR, -1}}) {
-            platform().forgetEvents();
-            bus().refuseConnection(FakeBus::Error{domain, number, message});
-            expectFailure(code);
-            EXPECT_TRUE(
-                platform().trace() ==
-                (Texts{"g_type_init()", CONNECT_CALL, errorLine(INIT, "GDBusConnection is NULL"),
-                       detailLine(INIT, "g_bus_get_sync()", number, message),
-                       errorLine(INIT, code == 3 ? "[dbus] DBUS_ERROR_CONNECTION_TIME_OUT"
-                                                 : "[dbus] DBUS_ERROR_CONNECTION_FAIL")}))
-                << message.substr(0, 100);
-        }
+    const auto expectCode = [](const std::string& message, int code, GQuark domain, int number) {
+        platform().forgetEvents();
+        bus().refuseConnection(FakeBus::Error{domain, number, message});
+        EXPECT_EQ(ask(code), nullptr);
+        const std::string kind = code == 3 ? "TIME_OUT" : "FAIL";
+        EXPECT_TRUE(
+            platform().trace() ==
+            (Texts{"g_type_init()", CONNECT_CALL, errorLine(INIT, "GDBusConnection is NULL"),
+                   detailLine(INIT, "g_bus_get_sync()", number, message),
+                   errorLine(INIT, "[dbus] DBUS_ERROR_CONNECTION_" + kind)}))
+            << message.substr(0, 100);
+    };
+    const std::pair<GQuark, int> errors[] = {{G_IO_ERROR, G_IO_ERROR_TIMED_OUT},
+                                             {G_DBUS_ERROR, G_DBUS_ERROR_TIMEOUT},
+                                             {G_DBUS_ERROR, G_DBUS_ERROR_NO_SERVER},
+                                             {G_IO_ERROR, -1}};
+    for (const auto& [domain, number] : errors) {
+        for (const std::string& message :
+             {std::string("Time"), std::string("Timeout"), std::string("a Time in between"),
+              std::string("at the end: Time"), std::string("LifeTime of it"), std::string("TTime"),
+              std::string("%s Time %n"), std::string(10 << 20, 'x') + "Time"})
+            expectCode(message, 3, domain, number);
+        for (const char* message :
+             {"time", "TIME", "Tim", "T ime", "timed out", "Tim\ne", "", "%s%n"})
+            expectCode(message, 1, domain, number);
+    }
 }
 
-TEST_F(DBusManagerTest, TimeOutOfTheCallIsAnAbsentReply)
+TEST_F(DBusManagerTest, FailedCopyGivesNull)
 {
-    bus().answerNothing(TIMED_OUT);
-    expectFailure(2);
+    const Texts parsed = REPLIED + Texts{debugLine(PARSE, "Success to get deviceUniqueID: text ")};
+    for (const int skipped : {0, 1}) { // the parser's copy, and the caller's
+        bus().reset();
+        platform().reset();
+        platform().debugMode = 1;
+        bus().answerText("text");
+        const FailingAllocation failure(Allocation::STRDUP, skipped);
+        EXPECT_EQ(ask(0), nullptr);
+        EXPECT_TRUE(failure.happened());
+        const Texts copied = {debugLine(QUESTION, "deviceUniqueID : (null)")};
+        EXPECT_EQ(platform().trace(), parsed + (skipped == 1 ? copied : Texts()));
+        EXPECT_THAT(ledger().live(), IsEmpty());
+        EXPECT_THAT(bus().held(), ElementsAre("connection"));
+    }
 }
 
 TEST_F(DBusManagerTest, RepliesWithoutTextFirstAreNoSerial)
@@ -316,7 +247,7 @@ TEST_F(DBusManagerTest, RepliesWithoutTextFirstAreNoSerial)
     for (GVariant* const body : bodies) {
         platform().forgetEvents();
         bus().answer(body);
-        expectFailure(2);
+        EXPECT_EQ(ask(2), nullptr);
         EXPECT_EQ(platform().trace(),
                   (Texts{"g_type_init()", CONNECT_CALL, SEND_CALL, FLUSH_CALL}));
         EXPECT_THAT(bus().held(), Each("connection"));
@@ -350,36 +281,8 @@ TEST_F(DBusManagerTest, EveryTypeButErrorsIsAnAnswer)
 TEST_F(DBusManagerTest, TextOfAnErrorReplyIsNoSerial)
 {
     bus().answer(g_variant_new("(s)", "looks like a serial"), G_DBUS_MESSAGE_TYPE_ERROR);
-    expectFailure(2);
+    EXPECT_EQ(ask(2), nullptr);
     EXPECT_THAT(ledger().live(), IsEmpty());
-}
-
-TEST_F(DBusManagerTest, FailedParsersCopyGivesNull)
-{
-    platform().debugMode = 1;
-    bus().answerText("a serial");
-    const FailingAllocation failure(Allocation::STRDUP);
-    char preset = 'p';
-    EXPECT_EQ(ask(0, &preset), nullptr);
-    EXPECT_TRUE(failure.happened());
-    EXPECT_EQ(platform().trace(),
-              REPLIED + Texts{debugLine(PARSE, "Success to get deviceUniqueID: a serial ")});
-    EXPECT_THAT(bus().held(), ElementsAre("connection"));
-}
-
-TEST_F(DBusManagerTest, FailedCallersCopyGivesNull)
-{
-    platform().debugMode = 1;
-    bus().answerText("a serial");
-    const FailingAllocation failure(Allocation::STRDUP, 1);
-    char preset = 'p';
-    EXPECT_EQ(ask(0, &preset), nullptr);
-    EXPECT_TRUE(failure.happened());
-    EXPECT_EQ(platform().trace(),
-              (REPLIED + Texts{debugLine(PARSE, "Success to get deviceUniqueID: a serial "),
-                               debugLine(QUESTION, "deviceUniqueID : (null)")}));
-    EXPECT_THAT(ledger().live(), IsEmpty());
-    EXPECT_THAT(bus().held(), ElementsAre("connection"));
 }
 
 TEST_F(DBusManagerTest, StepsStoreTheirCodeOnFailureOnly)
@@ -409,19 +312,6 @@ TEST_F(DBusManagerTest, StepsStoreTheirCodeOnFailureOnly)
     bus().refuseConnection(TIMED_OUT);
     EXPECT_EQ(dbus.InitDbusConnection(&status), nullptr);
     EXPECT_EQ(status, 3);
-}
-
-TEST_F(DBusManagerTest, EveryLineCarriesItsOwnTagUnlessTheApplicationHasOne)
-{
-    platform().debugMode = 1;
-    bus().refuseConnection(TIMED_OUT);
-    expectFailure(3);
-    EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, "Logger")));
-    EXPECT_EQ(platform().lines().size(), 5u);
-    platform().forgetEvents();
-    platform().tag = "MyApplication";
-    expectFailure(3);
-    EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, "MyApplication")));
 }
 
 } // namespace
