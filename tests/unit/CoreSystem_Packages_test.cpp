@@ -3,17 +3,16 @@
 #include "support/PlatformTest.h"
 
 using namespace fake;
-using testing::ElementsAre;
 using testing::IsEmpty;
-using testing::StrEq;
 
 namespace {
 
 const int NO_SUCH_PACKAGE = -18153359;
 
 // Codes that the platform documents, and some that it does not.
-const int PACKAGE_FAILURES[] = {-22,       -12, -5, -13, NO_SUCH_PACKAGE, NO_SUCH_PACKAGE + 1,
-                                -18153358, -1,  1,  4,   INT32_MAX,       INT32_MIN};
+const int PACKAGE_FAILURES[] = {
+    -22, -12, -5, -13,       NO_SUCH_PACKAGE, NO_SUCH_PACKAGE + 1, NO_SUCH_PACKAGE - 1,
+    -1,  1,   4,  INT32_MAX, INT32_MIN};
 
 // Nothing is read into a name: what it says is the platform's affair.
 std::vector<std::string> oddNames()
@@ -42,63 +41,49 @@ struct Package {
     std::string size = "package_manager_get_package_size_info(" + name + ")";
 };
 
-// A string of the platform's that nobody else may free.
-class KeptString {
-public:
-    explicit KeptString(const std::string& text) : text_(ledger().handOut(text)) {}
-    ~KeptString()
-    {
-        EXPECT_EQ(ledger().origin(text_).substr(0, 10), "platform: ");
-        std::free(text_);
-    }
-    KeptString(const KeptString&) = delete;
-    KeptString& operator=(const KeptString&) = delete;
-
-    char* text() const
-    {
-        return text_;
-    }
-
-private:
-    char* const text_;
-};
-
-// The answers of a package whose version can be read.
-void install(const Package& package, char* version)
-{
-    platform().answer(package.create, 0);
-    platform().answer(package.getVersion, 0, version);
-    platform().answer(package.destroy, 0);
-}
-
-// The slot's content after a question that begins with `preset` in it.
-char* versionOf(const char* name, int expectedCode, char* preset = nullptr)
-{
-    char* slot = preset;
-    EXPECT_EQ(coreSystem().GetPackageVersion(name, &slot), expectedCode);
-    return slot;
-}
-
-void expectUntouchedSlot(const char* name, int expectedCode)
-{
-    char preset = 'p';
-    EXPECT_EQ(versionOf(name, expectedCode, &preset), &preset);
-    EXPECT_EQ(preset, 'p');
-}
-
 const Package APP("org.example.app");
+const Texts OPEN = {"package org.example.app"};
 const std::string VERSION = "GetPackageVersion";
 const std::string INSTALLED = "IsPackageInstalled";
-const std::string VERSION_ENTRY = CORE_SYSTEM.debug(VERSION, "CoreSystem::GetPackageVersion");
 
-std::string versionLine(const std::string& version)
+// The answers of a package whose version can be read.
+void install(const std::any& version, int codeOfRelease = 0)
 {
-    return CORE_SYSTEM.debug(VERSION, "packageVersion : " + version);
+    platform().answer(APP.create, 0);
+    platform().answer(APP.getVersion, 0, version);
+    platform().answer(APP.destroy, codeOfRelease);
 }
 
-Texts answeredTrace(const std::string& version)
+// Whether the answer is the version, as a copy beside the platform's own string, which is kept.
+void expectVersion(const std::string& expected)
 {
-    return {VERSION_ENTRY, APP.create, APP.getVersion, APP.destroy, versionLine(version)};
+    char preset = 'p';
+    char* version = &preset;
+    EXPECT_EQ(coreSystem().GetPackageVersion("org.example.app", &version), 0);
+    EXPECT_TRUE(version == expected);
+    EXPECT_EQ(ledger().origin(version), "copy: " + expected);
+    std::free(version);
+    EXPECT_EQ(ledger().freeAll(), Texts{"platform: " + expected});
+    EXPECT_THAT(platform().liveHandles(), IsEmpty());
+}
+
+void expectFailure(const char* name, int code, const Texts& open = {})
+{
+    char preset = 'p';
+    char* version = &preset;
+    EXPECT_EQ(coreSystem().GetPackageVersion(name, &version), code);
+    EXPECT_EQ(version, &preset);
+    EXPECT_EQ(preset, 'p');
+    EXPECT_EQ(platform().liveHandles(), open);
+}
+
+void expectNull()
+{
+    char preset = 'p';
+    char* version = &preset;
+    EXPECT_EQ(coreSystem().GetPackageVersion("org.example.app", &version), 0);
+    EXPECT_EQ(version, nullptr);
+    EXPECT_THAT(platform().liveHandles(), IsEmpty());
 }
 
 std::string failureLine(const std::string& function, int code)
@@ -107,62 +92,58 @@ std::string failureLine(const std::string& function, int code)
                                           function + " failed [%d]");
 }
 
-const std::vector<LoggedCall> VERSION_CALLS = {
-    {"GetPackageVersionAnswered",
-     [] {
-         const KeptString version("1.2.3");
-         install(APP, version.text());
-         std::free(versionOf("org.example.app", 0));
-     },
-     answeredTrace("1.2.3")},
-    {"GetPackageVersionAnsweredNull",
-     [] {
-         install(APP, nullptr);
-         char preset = 'p';
-         EXPECT_EQ(versionOf("org.example.app", 0, &preset), nullptr);
-     },
-     answeredTrace("(null)")},
-    {"GetPackageVersionOfUnknownPackage",
-     [] {
-         platform().answer(APP.create, NO_SUCH_PACKAGE);
-         expectUntouchedSlot("org.example.app", NO_SUCH_PACKAGE);
-     },
-     {VERSION_ENTRY, APP.create, failureLine("package_info_create", NO_SUCH_PACKAGE)}},
-    {"GetPackageVersionUnreadable",
-     [] {
-         platform().answer(APP.create, 0);
-         platform().answer(APP.getVersion, -5);
-         expectUntouchedSlot("org.example.app", -5);
-     },
-     {VERSION_ENTRY, APP.create, APP.getVersion, failureLine("package_info_get_version", -5)}},
-    {"GetPackageVersionOfNull",
-     [] {
-         platform().answer("package_info_create(null)", -22);
-         expectUntouchedSlot(nullptr, -22);
-     },
-     {VERSION_ENTRY, "package_info_create(null)", failureLine("package_info_create", -22)}},
-};
+Texts answeredTrace(const std::string& version)
+{
+    return {CORE_SYSTEM.debug(VERSION, "CoreSystem::GetPackageVersion"), APP.create, APP.getVersion,
+            APP.destroy, CORE_SYSTEM.debug(VERSION, "packageVersion : " + version)};
+}
+
+std::vector<LoggedCall> versionCalls()
+{
+    const std::string entry = CORE_SYSTEM.debug(VERSION, "CoreSystem::GetPackageVersion");
+    std::vector<LoggedCall> calls;
+    const auto add = [&](const std::string& name, const Texts& trace, const auto& run) {
+        calls.push_back({VERSION + name, run, trace});
+    };
+    add("Answered", answeredTrace("1.2.3"), [] {
+        install(std::string("1.2.3"));
+        expectVersion("1.2.3");
+    });
+    add("AnsweredAndReleaseFailed", answeredTrace("1.2.3"), [] {
+        install(std::string("1.2.3"), -5);
+        expectVersion("1.2.3");
+    });
+    add("AnsweredNull", answeredTrace("(null)"), [] {
+        install({});
+        expectNull();
+    });
+    add("OfNull", {entry, "package_info_create(null)", failureLine("package_info_create", -22)},
+        [] {
+            platform().answer("package_info_create(null)", -22);
+            expectFailure(nullptr, -22);
+        });
+    for (const int code : PACKAGE_FAILURES) {
+        const std::string number = std::to_string(static_cast<unsigned int>(code));
+        add("OfUnknown" + number, {entry, APP.create, failureLine("package_info_create", code)},
+            [=] {
+                platform().answer(APP.create, code);
+                expectFailure("org.example.app", code);
+            });
+        // The handle stays open: meant.
+        add("Unreadable" + number,
+            {entry, APP.create, APP.getVersion, failureLine("package_info_get_version", code)},
+            [=] {
+                platform().answer(APP.create, 0);
+                platform().answer(APP.getVersion, code);
+                expectFailure("org.example.app", code, OPEN);
+            });
+    }
+    return calls;
+}
 
 bool isInstalled(const char* name)
 {
     return CoreSystemInternals::isPackageInstalled(name);
-}
-
-LoggedCall refusedCall(const std::string& name, const char* packageName)
-{
-    return {name,
-            [packageName] { EXPECT_FALSE(isInstalled(packageName)); },
-            {CORE_SYSTEM.error(INSTALLED, "PackageName is empty. IsPackageInstalled finish.")}};
-}
-
-LoggedCall installedCall(const std::string& name, int code, const std::string& line)
-{
-    return {name,
-            [code] {
-                platform().answer(APP.size, code);
-                EXPECT_EQ(isInstalled("org.example.app"), code == 0);
-            },
-            {APP.size, line}};
 }
 
 std::string noSuchPackageLine(const std::string& name)
@@ -170,40 +151,38 @@ std::string noSuchPackageLine(const std::string& name)
     return CORE_SYSTEM.error(INSTALLED, "No Such Package [" + name + "] <- No Such Package [%s]");
 }
 
-std::string otherErrorLine(int code)
+std::vector<LoggedCall> installedCalls()
 {
-    const std::string text = "Other Error Case.. [package_manager_error_e] code is ";
-    return CORE_SYSTEM.error(INSTALLED, text + std::to_string(code) + " <- " + text + "%d");
+    std::vector<LoggedCall> calls;
+    const auto add = [&](const std::string& name, int code, const std::string& line) {
+        calls.push_back({INSTALLED + name,
+                         [=] {
+                             platform().answer(APP.size, code);
+                             EXPECT_EQ(isInstalled("org.example.app"), code == 0);
+                         },
+                         {APP.size, line}});
+    };
+    add("Yes", 0, CORE_SYSTEM.debug(INSTALLED, "Package [org.example.app] is installed"));
+    const std::string other = "Other Error Case.. [package_manager_error_e] code is ";
+    for (const int code : PACKAGE_FAILURES)
+        add("Failed" + std::to_string(static_cast<unsigned int>(code)), code,
+            code == NO_SUCH_PACKAGE ? noSuchPackageLine("org.example.app")
+                                    : CORE_SYSTEM.error(INSTALLED, other + std::to_string(code) +
+                                                                       " <- " + other + "%d"));
+    const std::string empty = "PackageName is empty. IsPackageInstalled finish.";
+    for (const char* name : {static_cast<const char*>(nullptr), ""})
+        calls.push_back({INSTALLED + (name == nullptr ? "Null" : "Empty"),
+                         [=] { EXPECT_FALSE(isInstalled(name)); },
+                         {CORE_SYSTEM.error(INSTALLED, empty)}});
+    return calls;
 }
 
-const std::vector<LoggedCall> INSTALLED_CALLS = {
-    refusedCall("IsPackageInstalledNull", nullptr),
-    refusedCall("IsPackageInstalledEmpty", ""),
-    installedCall("IsPackageInstalledYes", 0,
-                  CORE_SYSTEM.debug(INSTALLED, "Package [org.example.app] is installed")),
-    installedCall("IsPackageInstalledNo", NO_SUCH_PACKAGE, noSuchPackageLine("org.example.app")),
-    installedCall("IsPackageInstalledFailed", -22, otherErrorLine(-22)),
-};
-
-INSTANTIATE_TEST_SUITE_P(PackageVersions, LoggedCallTest, testing::ValuesIn(VERSION_CALLS),
+INSTANTIATE_TEST_SUITE_P(PackageVersions, LoggedCallTest, testing::ValuesIn(versionCalls()),
                          rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(InstalledPackages, LoggedCallTest, testing::ValuesIn(INSTALLED_CALLS),
+INSTANTIATE_TEST_SUITE_P(InstalledPackages, LoggedCallTest, testing::ValuesIn(installedCalls()),
                          rowName<LoggedCall>);
 
 class PackagesTest : public PlatformTest {};
-
-TEST_F(PackagesTest, VersionIsCopyBesideThePlatformsOwnString)
-{
-    const KeptString kept("1.2.3");
-    install(APP, kept.text());
-    char* const version = versionOf("org.example.app", 0);
-    ASSERT_THAT(version, StrEq("1.2.3"));
-    EXPECT_EQ(ledger().origin(version), "copy: 1.2.3");
-    EXPECT_THAT(ledger().live(), ElementsAre("copy: 1.2.3", "platform: 1.2.3"));
-    EXPECT_THAT(platform().liveHandles(), IsEmpty());
-    std::free(version);
-    EXPECT_THAT(ledger().live(), ElementsAre("platform: 1.2.3"));
-}
 
 TEST_F(PackagesTest, OddVersionsPassThroughUnchanged)
 {
@@ -211,31 +190,25 @@ TEST_F(PackagesTest, OddVersionsPassThroughUnchanged)
          {std::string(), std::string("%s%n"), std::string("\xff\n"), std::string(10 << 20, '9')})
         for (const int mode : {0, 1}) {
             platform().debugMode = mode;
-            const KeptString kept(odd);
-            install(APP, kept.text());
-            char* const version = versionOf("org.example.app", 0);
-            EXPECT_TRUE(version == odd);
-            std::free(version);
+            install(odd);
+            expectVersion(odd);
         }
 }
 
 TEST_F(PackagesTest, FailedCopyGivesNull)
 {
     platform().debugMode = 1;
-    const KeptString kept("1.2.3");
-    install(APP, kept.text());
+    install(std::string("1.2.3"));
     const FailingAllocation failure(Allocation::STRDUP);
-    char preset = 'p';
-    EXPECT_EQ(versionOf("org.example.app", 0, &preset), nullptr);
+    expectNull();
     EXPECT_TRUE(failure.happened());
     EXPECT_EQ(platform().trace(), answeredTrace("(null)"));
-    EXPECT_THAT(platform().liveHandles(), IsEmpty());
+    ledger().freeAll();
 }
 
 TEST_F(PackagesTest, HandleIsReleasedBeforeTheVersionIsStored)
 {
-    const KeptString kept("1.2.3");
-    install(APP, kept.text());
+    install(std::string("1.2.3"));
     char preset = 'p';
     char* slot = &preset;
     bool released = false;
@@ -247,110 +220,41 @@ TEST_F(PackagesTest, HandleIsReleasedBeforeTheVersionIsStored)
     };
     EXPECT_EQ(system.GetPackageVersion("org.example.app", &slot), 0);
     EXPECT_TRUE(released);
-    EXPECT_THAT(slot, StrEq("1.2.3"));
-    std::free(slot);
-}
-
-TEST_F(PackagesTest, FailedReleaseOfTheHandleIsIgnored)
-{
-    const KeptString kept("1.2.3");
-    install(APP, kept.text());
-    platform().answer(APP.destroy, -5);
-    char* const version = versionOf("org.example.app", 0);
-    EXPECT_THAT(version, StrEq("1.2.3"));
-    std::free(version);
-}
-
-TEST_F(PackagesTest, EveryCodeOfUnknownPackageIsReturned)
-{
-    for (const int code : PACKAGE_FAILURES) {
-        platform().forgetEvents();
-        platform().answer(APP.create, code);
-        expectUntouchedSlot("org.example.app", code);
-        EXPECT_EQ(platform().trace(),
-                  (Texts{APP.create, failureLine("package_info_create", code)}));
-        EXPECT_THAT(platform().liveHandles(), IsEmpty());
-    }
-}
-
-TEST_F(PackagesTest, HandleIsKeptWhenTheVersionCannotBeRead)
-{
-    Texts kept;
-    for (const int code : PACKAGE_FAILURES) {
-        platform().forgetEvents();
-        platform().answer(APP.create, 0);
-        platform().answer(APP.getVersion, code);
-        expectUntouchedSlot("org.example.app", code);
-        EXPECT_EQ(platform().trace(), (Texts{APP.create, APP.getVersion,
-                                             failureLine("package_info_get_version", code)}));
-        kept.push_back("package org.example.app");
-        EXPECT_EQ(platform().liveHandles(), kept);
-    }
+    ledger().freeAll();
 }
 
 TEST_F(PackagesTest, VersionOfFailedReadIsNeitherCopiedNorFreed)
 {
-    const KeptString kept("1.2.3");
-    platform().answer(APP.create, 0);
-    platform().answer(APP.getVersion, -5, kept.text());
-    expectUntouchedSlot("org.example.app", -5);
-    EXPECT_THAT(ledger().live(), ElementsAre("platform: 1.2.3"));
+    install({});
+    platform().answer(APP.getVersion, -5, std::string("1.2.3"));
+    expectFailure("org.example.app", -5, OPEN);
+    EXPECT_EQ(ledger().freeAll(), Texts{"platform: 1.2.3"});
 }
 
 TEST_F(PackagesTest, OddNamesReachThePlatformUnchanged)
 {
-    for (std::string name : oddNames()) {
-        const Package package(name);
-        platform().forgetEvents();
-        platform().answer(package.create, NO_SUCH_PACKAGE);
-        expectUntouchedSlot(name.c_str(), NO_SUCH_PACKAGE);
-        EXPECT_TRUE(platform().trace().at(0) == package.create);
-    }
-    platform().answer("package_info_create()", -22);
-    expectUntouchedSlot("", -22);
-}
-
-TEST_F(PackagesTest, OnlyResultZeroIsInstalled)
-{
-    for (const int code : PACKAGE_FAILURES) {
-        platform().forgetEvents();
-        platform().answer(APP.size, code);
-        EXPECT_FALSE(isInstalled("org.example.app"));
-        EXPECT_EQ(platform().trace(),
-                  (Texts{APP.size, code == NO_SUCH_PACKAGE ? noSuchPackageLine("org.example.app")
-                                                           : otherErrorLine(code)}));
-    }
-    platform().answer(APP.size, 0);
-    EXPECT_TRUE(isInstalled("org.example.app"));
-}
-
-TEST_F(PackagesTest, OddNamesAreAskedForAsTheyAre)
-{
     platform().debugMode = 1;
     for (const std::string& name : oddNames()) {
         const Package package(name);
+        platform().answer(package.create, NO_SUCH_PACKAGE);
+        expectFailure(name.c_str(), NO_SUCH_PACKAGE);
+        EXPECT_TRUE(platform().trace().at(1) == package.create);
+
         platform().forgetEvents();
         platform().answer(package.size, 0);
         EXPECT_TRUE(isInstalled(name.c_str()));
         platform().answer(package.size, NO_SUCH_PACKAGE);
         EXPECT_FALSE(isInstalled(name.c_str()));
-
         // A debug line is cut, an error line is not.
         const std::string shown = "Package [" + name + "] is installed";
         EXPECT_TRUE(platform().trace() ==
                     (Texts{package.size, CORE_SYSTEM.debug(INSTALLED, shown.substr(0, 598)),
                            package.size, noSuchPackageLine(name)}))
             << name.substr(0, 100);
+        platform().forgetEvents();
     }
-}
-
-TEST_F(PackagesTest, ErrorFormatsAreConstants)
-{
-    platform().answer("package_manager_get_package_size_info(%s%n)", NO_SUCH_PACKAGE);
-    EXPECT_FALSE(isInstalled("%s%n"));
-    const LogLine line = platform().lines().at(0);
-    EXPECT_EQ(line.format, "%s: %s(%d) > No Such Package [%s]");
-    EXPECT_EQ(line.text, "No Such Package [%s%n]");
+    platform().answer("package_info_create()", -22);
+    expectFailure("", -22);
 }
 
 } // namespace

@@ -5,8 +5,6 @@
 #include "support/PlatformTest.h"
 
 using namespace fake;
-using testing::IsEmpty;
-using testing::StrEq;
 
 namespace {
 
@@ -33,11 +31,6 @@ struct Switch {
     }
 };
 
-std::ostream& operator<<(std::ostream& out, const Switch& row)
-{
-    return out << row.name;
-}
-
 const Switch SWITCHES[] = {
     {"IsFlightMode", &CoreSystem::IsFlightMode, "runtime_info_get_value_bool(0)", "FlightMode"},
     {"IsDataRoamingEnabled", &CoreSystem::IsDataRoamingEnabled, "runtime_info_get_value_bool(10)",
@@ -48,43 +41,38 @@ const Switch SWITCHES[] = {
 std::vector<LoggedCall> switchCalls()
 {
     std::vector<LoggedCall> calls;
-    for (const Switch& row : SWITCHES) {
-        for (const bool isOn : {true, false})
-            calls.push_back({row.name + (isOn ? "On" : "Off"),
-                             [row, isOn] {
-                                 platform().answer(row.call, 0, isOn);
-                                 EXPECT_EQ(row.answer(), isOn);
-                             },
-                             row.trace(isOn)});
-        calls.push_back({row.name + "Failed",
-                         [row] {
-                             platform().answer(row.call, -1073741822);
-                             EXPECT_FALSE(row.answer());
-                         },
-                         row.trace(false)});
-    }
+    for (const Switch& row : SWITCHES)
+        for (const int code : {0, -1073741822})
+            for (const std::any& value : {std::any(true), std::any(false), std::any()}) {
+                const bool isOn = value.has_value() && std::any_cast<bool>(value);
+                const std::string read = isOn ? "On" : value.has_value() ? "Off" : "Unwritten";
+                calls.push_back({row.name + read + (code == 0 ? "" : "Failed"),
+                                 [=] {
+                                     platform().answer(row.call, code, value);
+                                     EXPECT_EQ(row.answer(), isOn); // whatever the result
+                                 },
+                                 row.trace(isOn)});
+            }
     return calls;
 }
 
 const std::string SALES_CODE_CALL = "vconf_get_str(db/csc/salescode)";
 const Texts SALES_CODE_TRACE = {CORE_SYSTEM.debug("GetCSC", "CoreSystem::GetCSC"), SALES_CODE_CALL};
 
-char* salesCode()
-{
-    return coreSystem().GetCSC();
-}
-
 const std::vector<LoggedCall> SALES_CODE_CALLS = {
     {"GetCSCAnswered",
      [] {
          platform().answer(SALES_CODE_CALL, 0, std::string("KOO"));
-         std::free(salesCode());
+         char* const value = coreSystem().GetCSC();
+         EXPECT_EQ(value, std::string("KOO"));
+         EXPECT_EQ(ledger().origin(value), "platform: KOO"); // the platform's own string
+         EXPECT_EQ(ledger().freeAll(), Texts{"platform: KOO"});
      },
      SALES_CODE_TRACE},
     {"GetCSCWithoutKey",
      [] {
          platform().answer(SALES_CODE_CALL, 0);
-         EXPECT_EQ(salesCode(), nullptr);
+         EXPECT_EQ(coreSystem().GetCSC(), nullptr);
      },
      SALES_CODE_TRACE},
 };
@@ -126,53 +114,38 @@ int fontSize(int expectedCode)
 std::vector<LoggedCall> fontSizeCalls()
 {
     std::vector<LoggedCall> calls;
+    const auto add = [&](const std::string& name, int code, const FontSize& row,
+                         const std::any& written) {
+        calls.push_back({"GetFontSize" + name,
+                         [=] {
+                             platform().answer(FONT_SIZE_CALL, code, written);
+                             EXPECT_EQ(fontSize(code), row.value);
+                         },
+                         fontSizeTrace(row)});
+    };
     for (const FontSize& row : FONT_SIZES)
-        for (const int code : {0, -5}) {
-            std::string name = "GetFontSize" + std::to_string(row.value) + (code ? "Failed" : "");
-            std::replace(name.begin(), name.end(), '-', 'n');
-            calls.push_back({name,
-                             [row, code] {
-                                 platform().answer(FONT_SIZE_CALL, code, row.value);
-                                 EXPECT_EQ(fontSize(code), row.value);
-                             },
-                             fontSizeTrace(row)});
-        }
+        for (const int code : {0, -5})
+            add(std::to_string(static_cast<unsigned int>(row.value)) + (code ? "Failed" : ""), code,
+                row, row.value);
+    for (const int code : SETTING_FAILURES) { // what cannot be read is zero, unless it is written
+        const std::string name = "Failure" + std::to_string(static_cast<unsigned int>(code));
+        add(name, code, FONT_SIZES[1], {});
+        add(name + "Written", code, FONT_SIZES[4], 3);
+    }
     return calls;
 }
 
 const std::string TIME_CALL = "alarm_get_current_time()";
 
-std::tm brokenDown()
-{
-    static const char* const ZONE = "ZONE";
-    std::tm time = {};
-    time.tm_sec = 59;
-    time.tm_min = 58;
-    time.tm_hour = 23;
-    time.tm_mday = 31;
-    time.tm_mon = 11;
-    time.tm_year = 126;
-    time.tm_wday = 4;
-    time.tm_yday = 364;
-    time.tm_isdst = 1;
-    time.tm_gmtoff = 32400;
-    time.tm_zone = ZONE;
-    return time;
-}
+const char* const ZONE = "ZONE";
+const std::tm BROKEN_DOWN = {59, 58, 23, 31, 11, 126, 4, 364, 1, 32400, ZONE};
+const std::tm OUT_OF_RANGE = {INT32_MIN, 60, INT32_MAX, -1, 11, 126, 4, 364, 1, -34200, nullptr};
 
-void expectSame(const std::tm& time, const std::tm& expected)
+auto fieldsOf(const std::tm& time)
 {
-    EXPECT_EQ(time.tm_sec, expected.tm_sec);
-    EXPECT_EQ(time.tm_min, expected.tm_min);
-    EXPECT_EQ(time.tm_hour, expected.tm_hour);
-    EXPECT_EQ(time.tm_mday, expected.tm_mday);
-    EXPECT_EQ(time.tm_mon, expected.tm_mon);
-    EXPECT_EQ(time.tm_year, expected.tm_year);
-    EXPECT_EQ(time.tm_wday, expected.tm_wday);
-    EXPECT_EQ(time.tm_yday, expected.tm_yday);
-    EXPECT_EQ(time.tm_isdst, expected.tm_isdst);
-    EXPECT_EQ(time.tm_gmtoff, expected.tm_gmtoff);
-    EXPECT_EQ(time.tm_zone, expected.tm_zone); // the pointer, not the text
+    return std::make_tuple(time.tm_sec, time.tm_min, time.tm_hour, time.tm_mday, time.tm_mon,
+                           time.tm_year, time.tm_wday, time.tm_yday, time.tm_isdst, time.tm_gmtoff,
+                           static_cast<const void*>(time.tm_zone)); // not its text
 }
 
 // The content of a slot that held something else before.
@@ -190,20 +163,28 @@ Texts timeTrace(const std::string& text)
             CORE_SYSTEM.debug("GetCurrentTime", "currentTime : " + text)};
 }
 
-const std::vector<LoggedCall> TIME_CALLS = {
-    {"GetCurrentTimeAnswered",
-     [] {
-         platform().answer(TIME_CALL, 0, brokenDown());
-         expectSame(currentTime(0), brokenDown());
-     },
-     timeTrace("day 31,  23:58:59")},
-    {"GetCurrentTimeFailed",
-     [] {
-         platform().answer(TIME_CALL, -22);
-         expectSame(currentTime(-22), std::tm());
-     },
-     timeTrace("day 0,  0:0:0")},
-};
+std::vector<LoggedCall> timeCalls()
+{
+    std::vector<LoggedCall> calls;
+    const auto add = [&](const std::string& name, int code, const std::any& written,
+                         const std::tm& expected, const std::string& text) {
+        calls.push_back({"GetCurrentTime" + name,
+                         [=] {
+                             platform().answer(TIME_CALL, code, written);
+                             EXPECT_EQ(fieldsOf(currentTime(code)), fieldsOf(expected));
+                         },
+                         timeTrace(text)});
+    };
+    add("Answered", 0, BROKEN_DOWN, BROKEN_DOWN, "day 31,  23:58:59");
+    add("OutOfRange", 0, OUT_OF_RANGE, OUT_OF_RANGE, "day -1,  2147483647:60:-2147483648");
+    for (const int code :
+         SETTING_FAILURES) { // what cannot be read is cleared, unless it is written
+        const std::string name = "Failure" + std::to_string(static_cast<unsigned int>(code));
+        add(name, code, {}, std::tm(), "day 0,  0:0:0");
+        add(name + "Written", code, BROKEN_DOWN, BROKEN_DOWN, "day 31,  23:58:59");
+    }
+    return calls;
+}
 
 INSTANTIATE_TEST_SUITE_P(Switches, LoggedCallTest, testing::ValuesIn(switchCalls()),
                          rowName<LoggedCall>);
@@ -211,52 +192,22 @@ INSTANTIATE_TEST_SUITE_P(SalesCode, LoggedCallTest, testing::ValuesIn(SALES_CODE
                          rowName<LoggedCall>);
 INSTANTIATE_TEST_SUITE_P(FontSizes, LoggedCallTest, testing::ValuesIn(fontSizeCalls()),
                          rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(CurrentTime, LoggedCallTest, testing::ValuesIn(TIME_CALLS),
+INSTANTIATE_TEST_SUITE_P(CurrentTime, LoggedCallTest, testing::ValuesIn(timeCalls()),
                          rowName<LoggedCall>);
-
-class SwitchTest : public PlatformTest, public testing::WithParamInterface<Switch> {
-protected:
-    const Switch& row = GetParam();
-};
-
-INSTANTIATE_TEST_SUITE_P(Every, SwitchTest, testing::ValuesIn(SWITCHES), rowName<Switch>);
-
-TEST_P(SwitchTest, FailedReadIsOff)
-{
-    for (const int code : SETTING_FAILURES) {
-        platform().answer(row.call, code);
-        EXPECT_FALSE(row.answer()) << code;
-    }
-}
-
-TEST_P(SwitchTest, ResultCodePlaysNoPart)
-{
-    for (const int code : SETTING_FAILURES)
-        for (const bool value : {true, false}) {
-            platform().answer(row.call, code, value);
-            EXPECT_EQ(row.answer(), value) << code;
-        }
-}
-
-TEST_P(SwitchTest, NothingIsCached)
-{
-    for (const bool value : {true, false, true}) {
-        platform().answer(row.call, 0, value);
-        EXPECT_EQ(row.answer(), value);
-    }
-}
 
 class SettingsTest : public PlatformTest {};
 
-TEST_F(SettingsTest, SalesCodeIsThePlatformsOwnString)
+TEST_F(SettingsTest, NoResultCodePlaysAPartForASwitch)
 {
-    platform().answer(SALES_CODE_CALL, 0, std::string("KOO"));
-    char* const value = system.GetCSC();
-    EXPECT_THAT(value, StrEq("KOO"));
-    EXPECT_EQ(ledger().live(), Texts{"platform: KOO"});
-    EXPECT_EQ(ledger().origin(value), "platform: KOO");
-    std::free(value);
-    EXPECT_THAT(ledger().live(), IsEmpty());
+    for (const Switch& row : SWITCHES)
+        for (const int code : SETTING_FAILURES) {
+            platform().answer(row.call, code);
+            EXPECT_FALSE(row.answer()) << row.name << code;
+            for (const bool value : {true, false}) {
+                platform().answer(row.call, code, value);
+                EXPECT_EQ(row.answer(), value) << row.name << code;
+            }
+        }
 }
 
 TEST_F(SettingsTest, OddSalesCodesPassThroughUnchanged)
@@ -264,60 +215,9 @@ TEST_F(SettingsTest, OddSalesCodesPassThroughUnchanged)
     for (const std::string& odd :
          {std::string(), std::string("%s%n"), std::string(" \n\xff"), std::string(10 << 20, 'c')}) {
         platform().answer(SALES_CODE_CALL, 0, odd);
-        char* const value = system.GetCSC();
-        EXPECT_TRUE(value == odd);
-        std::free(value);
+        EXPECT_TRUE(system.GetCSC() == odd);
+        ledger().freeAll();
     }
-}
-
-TEST_F(SettingsTest, FontSizeThatCannotBeReadIsZero)
-{
-    platform().debugMode = 1;
-    for (const int code : SETTING_FAILURES) {
-        platform().forgetEvents();
-        platform().answer(FONT_SIZE_CALL, code);
-        EXPECT_EQ(fontSize(code), 0);
-        EXPECT_EQ(platform().trace(), fontSizeTrace(FONT_SIZES[1]));
-    }
-}
-
-TEST_F(SettingsTest, FontSizeIsStoredWhateverTheResult)
-{
-    for (const int code : SETTING_FAILURES) {
-        platform().answer(FONT_SIZE_CALL, code, 3);
-        EXPECT_EQ(fontSize(code), 3);
-    }
-}
-
-TEST_F(SettingsTest, TimeIsCopiedWholeWhateverTheResult)
-{
-    for (const int code : SETTING_FAILURES) {
-        platform().answer(TIME_CALL, code, brokenDown());
-        expectSame(currentTime(code), brokenDown());
-    }
-}
-
-TEST_F(SettingsTest, TimeThatCannotBeReadIsCleared)
-{
-    for (const int code : SETTING_FAILURES) {
-        platform().answer(TIME_CALL, code);
-        expectSame(currentTime(code), std::tm());
-    }
-}
-
-TEST_F(SettingsTest, TimeOutOfRangePassesThrough)
-{
-    platform().debugMode = 1;
-    std::tm odd = brokenDown();
-    odd.tm_mday = -1;
-    odd.tm_hour = INT32_MAX;
-    odd.tm_min = 60;
-    odd.tm_sec = INT32_MIN;
-    odd.tm_gmtoff = -34200;
-    odd.tm_zone = nullptr;
-    platform().answer(TIME_CALL, 0, odd);
-    expectSame(currentTime(0), odd);
-    EXPECT_EQ(platform().trace(), timeTrace("day -1,  2147483647:60:-2147483648"));
 }
 
 } // namespace
