@@ -19,25 +19,14 @@ struct Network {
     {
         return function + "(" + handle + ")";
     }
-    int connected() const
-    {
-        return static_cast<int>(states.size()) - 1;
-    }
-    std::string stateLine(int state) const
-    {
-        return CONNECTION_MANAGER.debug(name,
-                                        name + " : " + states.at(static_cast<std::size_t>(state)));
-    }
-    bool isListed(int state) const
-    {
-        return state >= 0 && static_cast<std::size_t>(state) < states.size();
-    }
-    // The calls of one read, with a handle of its own.
+    // The calls of one read, with a handle of its own; the line of a state that is listed.
     Texts trace(int state, const std::string& handle = "connection") const
     {
-        return Texts{"connection_create()", readCall(handle)} +
-               (isListed(state) ? Texts{stateLine(state)} : Texts()) +
-               Texts{"connection_destroy(" + handle + ")"};
+        Texts texts = {"connection_create()", readCall(handle)};
+        if (state >= 0 && state < static_cast<int>(states.size()))
+            texts.push_back(CONNECTION_MANAGER.debug(
+                name, name + " : " + states[static_cast<std::size_t>(state)]));
+        return texts + Texts{"connection_destroy(" + handle + ")"};
     }
     void answer(int state, int code = 0) const
     {
@@ -47,32 +36,31 @@ struct Network {
     }
 };
 
-std::ostream& operator<<(std::ostream& out, const Network& network)
+// The names of the states begin with the same words.
+Texts statesOf(const std::string& network, const Texts& states)
 {
-    return out << network.name;
+    Texts names;
+    for (const std::string& state : states)
+        names.push_back("CONNECTION_" + network + "_STATE_" + state);
+    return names;
 }
 
-const Network CELLULAR = {
-    "GetCellularNetworkState",
-    &ConnectionManager::GetCellularNetworkState,
-    CoreSystemInternals::GET_CELLULAR_STATE,
-    "connection_get_cellular_state",
-    {"CONNECTION_CELLULAR_STATE_OUT_OF_SERVICE", "CONNECTION_CELLULAR_STATE_FLIGHT_MODE",
-     "CONNECTION_CELLULAR_STATE_ROAMING_OFF", "CONNECTION_CELLULAR_STATE_CALL_ONLY_AVAILABLE",
-     "CONNECTION_CELLULAR_STATE_AVAILABLE", "CONNECTION_CELLULAR_STATE_CONNECTED"}};
-const Network WIFI = {"GetWifiNetworkState",
-                      &ConnectionManager::GetWifiNetworkState,
-                      CoreSystemInternals::GET_WIFI_STATE,
-                      "connection_get_wifi_state",
-                      {"CONNECTION_WIFI_STATE_DEACTIVATED", "CONNECTION_WIFI_STATE_DISCONNECTED",
-                       "CONNECTION_WIFI_STATE_CONNECTED"}};
-const Network BLUETOOTH = {"GetBTNetworkState",
-                           &ConnectionManager::GetBTNetworkState,
-                           CoreSystemInternals::GET_BT_STATE,
-                           "connection_get_bt_state",
-                           {"CONNECTION_BT_STATE_DEACTIVATED", "CONNECTION_BT_STATE_DISCONNECTED",
-                            "CONNECTION_BT_STATE_CONNECTED"}};
-const Network NETWORKS[] = {CELLULAR, WIFI, BLUETOOTH};
+const Texts CELLULAR_STATES =
+    statesOf("CELLULAR", {"OUT_OF_SERVICE", "FLIGHT_MODE", "ROAMING_OFF", "CALL_ONLY_AVAILABLE",
+                          "AVAILABLE", "CONNECTED"});
+const Texts OTHER_STATES = {"DEACTIVATED", "DISCONNECTED", "CONNECTED"};
+const Network NETWORKS[] = {
+    {"GetCellularNetworkState", &ConnectionManager::GetCellularNetworkState,
+     CoreSystemInternals::GET_CELLULAR_STATE, "connection_get_cellular_state", CELLULAR_STATES},
+    {"GetWifiNetworkState", &ConnectionManager::GetWifiNetworkState,
+     CoreSystemInternals::GET_WIFI_STATE, "connection_get_wifi_state",
+     statesOf("WIFI", OTHER_STATES)},
+    {"GetBTNetworkState", &ConnectionManager::GetBTNetworkState, CoreSystemInternals::GET_BT_STATE,
+     "connection_get_bt_state", statesOf("BT", OTHER_STATES)},
+};
+const Network& CELLULAR = NETWORKS[0];
+const Network& WIFI = NETWORKS[1];
+const Network& BLUETOOTH = NETWORKS[2];
 
 // Every state that the platform lists, and some that it does not.
 const int STATES[] = {0, 1, 2, 3, 4, 5, 6, 7, -1, INT32_MAX, INT32_MIN};
@@ -91,24 +79,23 @@ Texts facadeTrace(const std::string& method)
 std::vector<LoggedCall> stateCalls()
 {
     std::vector<LoggedCall> calls;
-    for (const Network& network : NETWORKS) {
+    for (const Network& network : NETWORKS)
         for (const int state : STATES) {
-            std::string name = network.name + std::to_string(state);
-            std::replace(name.begin(), name.end(), '-', 'n');
-            calls.push_back({name,
-                             [network, state] {
-                                 network.answer(state);
-                                 EXPECT_EQ((manager().*network.read)(), state);
-                             },
-                             network.trace(state)});
+            const std::string name =
+                network.name + std::to_string(static_cast<unsigned int>(state));
+            const auto add = [&](const std::string& way, const Texts& trace, const auto& read) {
+                calls.push_back({way + name,
+                                 [=] {
+                                     network.answer(state);
+                                     EXPECT_EQ(read(), state);
+                                     EXPECT_THAT(platform().liveHandles(), IsEmpty());
+                                 },
+                                 trace});
+            };
+            add("", network.trace(state), [=] { return (manager().*network.read)(); });
+            add("Facade", facadeTrace(network.name) + network.trace(state),
+                [=] { return (coreSystem().*network.ask)(); });
         }
-        calls.push_back({"Facade" + network.name,
-                         [network] {
-                             network.answer(1);
-                             EXPECT_EQ((coreSystem().*network.ask)(), 1);
-                         },
-                         facadeTrace(network.name) + network.trace(1)});
-    }
     return calls;
 }
 
@@ -126,46 +113,37 @@ Texts connectedTrace(const std::string& checked, int cellular)
            CELLULAR.trace(cellular);
 }
 
-LoggedCall connectedCall(const std::string& name, bool checkWifi, bool checkBT, bool answer,
-                         const Texts& trace)
-{
-    return {name,
-            [=] {
-                answerAll(4, 2, 1);
-                EXPECT_EQ(manager().IsNetworkConnected(checkWifi, checkBT), answer);
-            },
-            trace};
-}
-
 std::vector<LoggedCall> connectedCalls()
 {
-    return {
-        connectedCall("NothingIsChecked", false, false, false, connectedTrace("", 4)),
-        connectedCall("WifiIsChecked", true, false, true,
-                      connectedTrace("[WIFI]", 4) + WIFI.trace(2)),
-        connectedCall("BluetoothIsChecked", false, true, false,
-                      connectedTrace("[BT]", 4) + BLUETOOTH.trace(1)),
-        connectedCall("BothAreChecked", true, true, true,
-                      connectedTrace("[WIFI][BT]", 4) + WIFI.trace(2) + BLUETOOTH.trace(1)),
-        {"ConnectedCellularIsNoShortCut",
-         [] {
-             answerAll(5, 2, 2);
-             EXPECT_TRUE(manager().IsNetworkConnected(true, true));
-         },
-         connectedTrace("[WIFI][BT]", 5) + WIFI.trace(2) + BLUETOOTH.trace(2)},
-        {"FacadeIsNetworkConnectedWifi",
-         [] {
-             answerAll(0, 2, 0);
-             EXPECT_TRUE(coreSystem().IsNetworkConnected(true, false));
-         },
-         facadeTrace("IsNetworkConnected") + connectedTrace("[WIFI]", 0) + WIFI.trace(2)},
-        {"FacadeIsNetworkConnectedBluetooth",
-         [] {
-             answerAll(0, 0, 2);
-             EXPECT_TRUE(coreSystem().IsNetworkConnected(false, true));
-         },
-         facadeTrace("IsNetworkConnected") + connectedTrace("[BT]", 0) + BLUETOOTH.trace(2)},
+    std::vector<LoggedCall> calls;
+    const auto add = [&](const std::string& name, bool checkWifi, bool checkBT, int cellular,
+                         int wifi, int bluetooth, bool answer) {
+        const std::string checked =
+            std::string(checkWifi ? "[WIFI]" : "") + (checkBT ? "[BT]" : "");
+        const Texts trace = connectedTrace(checked, cellular) +
+                            (checkWifi ? WIFI.trace(wifi) : Texts()) +
+                            (checkBT ? BLUETOOTH.trace(bluetooth) : Texts());
+        calls.push_back({name,
+                         [=] {
+                             answerAll(cellular, wifi, bluetooth);
+                             EXPECT_EQ(manager().IsNetworkConnected(checkWifi, checkBT), answer);
+                         },
+                         trace});
+        calls.push_back({"Facade" + name,
+                         [=] {
+                             answerAll(cellular, wifi, bluetooth);
+                             EXPECT_EQ(coreSystem().IsNetworkConnected(checkWifi, checkBT), answer);
+                         },
+                         facadeTrace("IsNetworkConnected") + trace});
     };
+    add("NothingIsChecked", false, false, 4, 2, 1, false);
+    add("WifiIsChecked", true, false, 4, 2, 1, true);
+    add("BluetoothIsChecked", false, true, 4, 2, 1, false);
+    add("BothAreChecked", true, true, 4, 2, 1, true);
+    add("ConnectedCellularIsNoShortCut", true, true, 5, 2, 2, true);
+    add("OnlyWifiIsConnected", true, false, 0, 2, 0, true);
+    add("OnlyBluetoothIsConnected", false, true, 0, 0, 2, true);
+    return calls;
 }
 
 INSTANTIATE_TEST_SUITE_P(NetworkStates, LoggedCallTest, testing::ValuesIn(stateCalls()),
@@ -173,80 +151,32 @@ INSTANTIATE_TEST_SUITE_P(NetworkStates, LoggedCallTest, testing::ValuesIn(stateC
 INSTANTIATE_TEST_SUITE_P(NetworkConnected, LoggedCallTest, testing::ValuesIn(connectedCalls()),
                          rowName<LoggedCall>);
 
-class NetworkTest : public PlatformTest, public testing::WithParamInterface<Network> {
-protected:
-    const Network& network = GetParam();
+class NetworkTest : public PlatformTest {};
 
-    int state()
-    {
-        return (connections.*network.read)();
-    }
-    int stateOfFacade()
-    {
-        const CoreSystemInternals::StateRead ask = network.ask;
-        return (system.*ask)();
-    }
-};
-
-INSTANTIATE_TEST_SUITE_P(Every, NetworkTest, testing::ValuesIn(NETWORKS), rowName<Network>);
-
-TEST_P(NetworkTest, FailedCreationReadsWithNoHandle)
+TEST_F(NetworkTest, ResultCodesPlayNoPartAndWhatIsNotReadIsZero)
 {
     platform().debugMode = 1;
-    platform().answer(network.readCall("no connection"), -22);
     platform().answer("connection_destroy(no connection)", -22);
-    for (const int code : CONNECTION_FAILURES) {
-        platform().forgetEvents();
-        platform().answer("connection_create()", code);
-        EXPECT_EQ(state(), 0);
-        EXPECT_EQ(platform().trace(), network.trace(0, "no connection"));
+    for (const Network& network : NETWORKS) {
+        const auto expectState = [&](int state, const std::string& handle) {
+            platform().forgetEvents();
+            EXPECT_EQ((connections.*network.read)(), state);
+            EXPECT_EQ(platform().trace(), network.trace(state, handle));
+        };
+        for (const int code : CONNECTION_FAILURES) {
+            network.answer(2, code);
+            platform().answer("connection_destroy(connection)", code);
+            expectState(2, "connection");
+            platform().answer(network.readCall(), code);
+            expectState(0, "connection");
+            platform().answer("connection_create()", code);
+            platform().answer(network.readCall("no connection"), -22);
+            expectState(0, "no connection");
+        }
     }
 }
 
-TEST_P(NetworkTest, FailedReadIsZero)
-{
-    platform().debugMode = 1;
-    network.answer(0);
-    for (const int code : CONNECTION_FAILURES) {
-        platform().forgetEvents();
-        platform().answer(network.readCall(), code);
-        EXPECT_EQ(state(), 0);
-        EXPECT_EQ(platform().trace(), network.trace(0));
-    }
-}
-
-TEST_P(NetworkTest, ResultCodesPlayNoPart)
-{
-    platform().debugMode = 1;
-    for (const int code : CONNECTION_FAILURES) {
-        platform().forgetEvents();
-        network.answer(network.connected(), code);
-        platform().answer("connection_destroy(connection)", code);
-        EXPECT_EQ(state(), network.connected());
-        EXPECT_EQ(platform().trace(), network.trace(network.connected()));
-    }
-}
-
-TEST_P(NetworkTest, HandleIsReleasedByEachCall)
-{
-    for (const int expected : {0, 1, 2, 7}) {
-        network.answer(expected);
-        EXPECT_EQ(state(), expected);
-        EXPECT_THAT(platform().liveHandles(), IsEmpty());
-    }
-}
-
-TEST_P(NetworkTest, FacadePassesEveryStateOn)
-{
-    for (const int expected : STATES) {
-        network.answer(expected);
-        EXPECT_EQ(stateOfFacade(), expected);
-    }
-}
-
-class NetworkConnectedTest : public PlatformTest {};
-
-TEST_F(NetworkConnectedTest, OnlyConnectedNetworksThatAreCheckedCount)
+TEST_F(NetworkTest, OnlyConnectedNetworksThatAreCheckedCount)
 {
     for (const int cellular : STATES)
         for (const int wifi : STATES)
@@ -262,14 +192,7 @@ TEST_F(NetworkConnectedTest, OnlyConnectedNetworksThatAreCheckedCount)
                     }
 }
 
-TEST_F(NetworkConnectedTest, NetworksThatAreNotCheckedAreNotAsked)
-{
-    CELLULAR.answer(0); // anything else has no answer
-    EXPECT_FALSE(connections.IsNetworkConnected(false, false));
-    EXPECT_EQ(platform().trace(), CELLULAR.trace(-1));
-}
-
-TEST_F(NetworkConnectedTest, NothingIsConnectedWhereNoHandleIsToBeHad)
+TEST_F(NetworkTest, NothingIsConnectedWhereNoHandleIsToBeHad)
 {
     platform().answer("connection_create()", -12);
     for (const Network& network : NETWORKS)
@@ -278,7 +201,7 @@ TEST_F(NetworkConnectedTest, NothingIsConnectedWhereNoHandleIsToBeHad)
     EXPECT_FALSE(connections.IsNetworkConnected(true, true));
 }
 
-TEST_F(NetworkConnectedTest, ManyThreadsMayAskAtOnce)
+TEST_F(NetworkTest, ManyThreadsMayAskAtOnce)
 {
     answerAll(0, 1, 2);
     together(8, [&](int) {

@@ -3,8 +3,8 @@
 #include "support/PlatformTest.h"
 
 using namespace fake;
+using testing::Field;
 using testing::IsEmpty;
-using testing::StrEq;
 
 namespace {
 
@@ -52,52 +52,63 @@ std::string resultLine(const DeviceQuestion& question, const std::string& value,
 }
 
 // Asks with a slot that holds `preset`; what the slot holds then.
-char* ask(const DeviceQuestion& question, int expectedCode, char* preset = nullptr)
+char* ask(const DeviceQuestion& question, int expectedCode, char* preset)
 {
     char* slot = preset;
     EXPECT_EQ((coreSystem().*question.ask)(&slot), expectedCode);
     return slot;
 }
 
-Texts answeredTrace(const DeviceQuestion& question, const std::string& value)
+// One string is alive: the platform's own, or the copy of it.
+void expectValue(const DeviceQuestion& question, const std::string& expected)
+{
+    char preset = 'p';
+    platform().answer(question.call, 0, expected);
+    char* const value = ask(question, 0, &preset);
+    EXPECT_TRUE(value == expected);
+    const std::string origin = (question.copies ? "copy: " : "platform: ") + expected;
+    EXPECT_EQ(ledger().origin(value), origin);
+    EXPECT_EQ(ledger().freeAll(), Texts{origin});
+}
+
+Texts answeredTrace(const DeviceQuestion& question, const std::string& value, int code = 0)
 {
     return {CORE_SYSTEM.debug(question.name, question.entry), question.call,
-            resultLine(question, value, 0)};
+            resultLine(question, value, code)};
 }
 
 Texts failedTrace(const DeviceQuestion& question, int code)
 {
-    const Texts begin = {CORE_SYSTEM.debug(question.name, question.entry), question.call};
-    if (!question.copies)
-        return begin + Texts{resultLine(question, "(null)", code)};
-    return begin +
-           Texts{CORE_SYSTEM.error(
-               question.name, "system_info_get_platform_string failed [" + std::to_string(code) +
-                                  "] <- system_info_get_platform_string failed [%d]")};
+    Texts trace = answeredTrace(question, "(null)", code);
+    const std::string text = "system_info_get_platform_string failed ";
+    if (question.copies)
+        trace.back() = CORE_SYSTEM.error(question.name, text + "[" + std::to_string(code) +
+                                                            "] <- " + text + "[%d]");
+    return trace;
 }
 
 std::vector<LoggedCall> loggedCalls()
 {
     std::vector<LoggedCall> calls;
     for (const DeviceQuestion& question : QUESTIONS) {
-        calls.push_back({question.name + "Answered",
-                         [question] {
-                             platform().answer(question.call, 0, std::string("a value"));
-                             std::free(ask(question, 0));
-                         },
+        calls.push_back({question.name + "Answered", [=] { expectValue(question, "a value"); },
                          answeredTrace(question, "a value")});
-        calls.push_back({question.name + "Failed",
-                         [question] {
-                             platform().answer(question.call, -5);
-                             ask(question, -5);
-                         },
-                         failedTrace(question, -5)});
-        calls.push_back({question.name + "AnsweredNull",
-                         [question] {
-                             platform().answer(question.call, 0);
-                             EXPECT_EQ(ask(question, 0), nullptr);
-                         },
-                         answeredTrace(question, "(null)")});
+        const auto fails = [&](const std::string& name, int code, bool keepsSlot,
+                               const Texts& trace) {
+            calls.push_back({question.name + name,
+                             [=] {
+                                 char preset = 'p';
+                                 platform().answer(question.call, code);
+                                 char* const slot = ask(question, code, &preset);
+                                 EXPECT_EQ(slot, keepsSlot ? &preset : nullptr);
+                                 EXPECT_THAT(ledger().live(), IsEmpty());
+                             },
+                             trace});
+        };
+        fails("AnsweredNull", 0, false, answeredTrace(question, "(null)"));
+        for (const int code : DEVICE_FAILURES)
+            fails("Failed" + std::to_string(static_cast<unsigned int>(code)), code, question.copies,
+                  failedTrace(question, code));
     }
     return calls;
 }
@@ -114,43 +125,14 @@ protected:
 INSTANTIATE_TEST_SUITE_P(Every, DeviceQuestionTest, testing::ValuesIn(QUESTIONS),
                          rowName<DeviceQuestion>);
 
-TEST_P(DeviceQuestionTest, AnswerBelongsToTheCaller)
-{
-    platform().answer(question.call, 0, std::string("my device"));
-    char* const value = ask(question, 0, &preset);
-    ASSERT_THAT(value, StrEq("my device"));
-    // One string is alive: the platform's own, or the copy of it.
-    const std::string origin = question.copies ? "copy: my device" : "platform: my device";
-    EXPECT_EQ(ledger().live(), Texts{origin});
-    EXPECT_EQ(ledger().origin(value), origin);
-    std::free(value);
-    EXPECT_THAT(ledger().live(), IsEmpty());
-}
-
 TEST_P(DeviceQuestionTest, OddValuesPassThroughUnchanged)
 {
     for (const std::string& odd : {std::string(), std::string("%s%n"),
                                    std::string("\xff\xc3\xa9\n"), std::string(10 << 20, 'n')})
         for (const int mode : {0, 1}) {
             platform().debugMode = mode;
-            platform().answer(question.call, 0, odd);
-            char* const value = ask(question, 0);
-            EXPECT_TRUE(value == odd);
-            std::free(value);
+            expectValue(question, odd);
         }
-}
-
-TEST_P(DeviceQuestionTest, EveryFailureCodeIsReturnedUnchanged)
-{
-    for (const int code : DEVICE_FAILURES) {
-        platform().forgetEvents();
-        platform().debugMode = 1;
-        platform().answer(question.call, code);
-        char* const value = ask(question, code, &preset);
-        EXPECT_EQ(value, question.copies ? &preset : nullptr);
-        EXPECT_EQ(platform().trace(), failedTrace(question, code));
-        EXPECT_THAT(ledger().live(), IsEmpty());
-    }
 }
 
 TEST_P(DeviceQuestionTest, SlotAfterFailureIsWhatThePlatformLeftThere)
@@ -161,31 +143,17 @@ TEST_P(DeviceQuestionTest, SlotAfterFailureIsWhatThePlatformLeftThere)
     EXPECT_STREQ(remains, "remains");
 }
 
-TEST_P(DeviceQuestionTest, NullStringAfterSuccessGivesNull)
-{
-    platform().answer(question.call, 0);
-    EXPECT_EQ(ask(question, 0, &preset), nullptr);
-}
-
-TEST_P(DeviceQuestionTest, NothingIsCached)
-{
-    for (const std::string text : {"first", "second"}) {
-        platform().answer(question.call, 0, text);
-        char* const value = ask(question, 0);
-        EXPECT_EQ(value, text);
-        std::free(value);
-    }
-}
-
-class TizenIdTest : public PlatformTest {};
+class TizenIdTest : public PlatformTest {
+protected:
+    const DeviceQuestion& question = QUESTIONS[1];
+    char preset = 'p';
+};
 
 TEST_F(TizenIdTest, FailedCopyGivesNullAndFreesThePlatformsString)
 {
-    const DeviceQuestion& question = QUESTIONS[1];
     platform().answer(question.call, 0, std::string("an identifier"));
     platform().debugMode = 1;
     const FailingAllocation failure(Allocation::STRDUP);
-    char preset = 'p';
     EXPECT_EQ(ask(question, 0, &preset), nullptr);
     EXPECT_TRUE(failure.happened());
     EXPECT_THAT(ledger().live(), IsEmpty());
@@ -194,17 +162,15 @@ TEST_F(TizenIdTest, FailedCopyGivesNullAndFreesThePlatformsString)
 
 TEST_F(TizenIdTest, TagAndModeMayChangeDuringTheCall)
 {
-    platform().answer(QUESTIONS[1].call, -5);
+    platform().answer(question.call, -5);
     platform().onEvent = [](const Event& event) {
         if (event.kind == Event::Kind::CALL)
             platform().tag = "Late";
     };
     platform().debugMode = 1;
-    ask(QUESTIONS[1], -5);
-    const auto lines = platform().lines();
-    ASSERT_EQ(lines.size(), 2u);
-    EXPECT_EQ(lines[0].tag, "CoreSystem");
-    EXPECT_EQ(lines[1].tag, "Late");
+    ask(question, -5, &preset);
+    EXPECT_THAT(platform().lines(), testing::ElementsAre(Field(&LogLine::tag, "CoreSystem"),
+                                                         Field(&LogLine::tag, "Late")));
 }
 
 } // namespace

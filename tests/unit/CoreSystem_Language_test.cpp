@@ -97,22 +97,43 @@ INSTANTIATE_TEST_SUITE_P(Language, LoggedCallTest, testing::ValuesIn(LANGUAGE_CA
 
 class LanguageTest : public PlatformTest {};
 
-TEST_F(LanguageTest, LanguagePartIsUpperCased)
+TEST_F(LanguageTest, LanguagePartIsUpperCasedOrConverted)
 {
-    EXPECT_EQ(languageCodeOf("en_US.UTF-8", false), "EN");
-    EXPECT_EQ(languageCodeOf("ko_KR.UTF-8", false), "KO");
-    EXPECT_EQ(languageCodeOf("de_DE.UTF-8", false), "DE");
-    EXPECT_EQ(languageCodeOf("azAZ_x", false), "AZAZ");
-    EXPECT_EQ(languageCodeOf("a_b_c", false), "A");
+    const struct {
+        std::string setting;
+        bool convert;
+        std::string code;
+    } rows[] = {
+        {"en_US.UTF-8", false, "EN"},
+        {"ko_KR.UTF-8", false, "KO"},
+        {"de_DE.UTF-8", false, "DE"},
+        {"azAZ_x", false, "AZAZ"},
+        {"a_b_c", false, "A"},
+        {"en_US.UTF-8", true, "eng"},
+        {"ko_KR.UTF-8", true, "kor"},
+        {"LG_x", true, "lug"},
+        {"hi_IN", true, "hin"},
+        {"ie", true, "ine"},
+        // Without the separator all of it is the language, and before it is what begins with it.
+        {"C", false, "C"},
+        {"c.utf-8", false, "C.UTF-8"},
+        {"", false, ""},
+        {"", true, UNTOUCHED},
+        {"_x", false, ""},
+        {"_", false, ""},
+    };
+    for (const auto& row : rows)
+        EXPECT_EQ(languageCodeOf(row.setting, row.convert), row.code) << row.setting;
 }
 
-TEST_F(LanguageTest, LanguagePartIsConverted)
+TEST_F(LanguageTest, FailedReadAnswersWithTheDefaultAndItsCode)
 {
-    EXPECT_EQ(languageCodeOf("en_US.UTF-8", true), "eng");
-    EXPECT_EQ(languageCodeOf("ko_KR.UTF-8", true), "kor");
-    EXPECT_EQ(languageCodeOf("LG_x", true), "lug");
-    EXPECT_EQ(languageCodeOf("hi_IN", true), "hin");
-    EXPECT_EQ(languageCodeOf("ie", true), "ine");
+    for (const int code : {-5, -22, -13, -1073741822, 1, 0}) { // 0: the string is null
+        platform().answer(READ, code);
+        EXPECT_EQ(languageCode(false, code), "EN");
+        EXPECT_EQ(languageCode(true, code), "eng");
+        EXPECT_THAT(platform().lines(), IsEmpty());
+    }
 }
 
 TEST_F(LanguageTest, LanguageThatTheTableLacksLeavesTheSlot)
@@ -120,20 +141,6 @@ TEST_F(LanguageTest, LanguageThatTheTableLacksLeavesTheSlot)
     for (const std::string setting : {"de_DE.UTF-8", "fr_FR", "zh_CN", "C", "POSIX", "_x", "eng_GB",
                                       "en.UTF-8", " en_US", "e_n", "\xff_x"})
         EXPECT_EQ(languageCodeOf(setting, true), UNTOUCHED) << setting;
-}
-
-TEST_F(LanguageTest, SettingWithoutSeparatorIsTakenWhole)
-{
-    EXPECT_EQ(languageCodeOf("C", false), "C");
-    EXPECT_EQ(languageCodeOf("c.utf-8", false), "C.UTF-8");
-    EXPECT_EQ(languageCodeOf("", false), "");
-    EXPECT_EQ(languageCodeOf("", true), UNTOUCHED);
-}
-
-TEST_F(LanguageTest, SettingThatBeginsWithTheSeparatorIsEmpty)
-{
-    EXPECT_EQ(languageCodeOf("_x", false), "");
-    EXPECT_EQ(languageCodeOf("_", false), "");
 }
 
 TEST_F(LanguageTest, OnlyAsciiLowerCaseLettersChange)
@@ -148,29 +155,12 @@ TEST_F(LanguageTest, OnlyAsciiLowerCaseLettersChange)
     }
 }
 
-TEST_F(LanguageTest, FailedReadAnswersWithTheDefaultAndItsCode)
-{
-    for (const int code : {-5, -22, -13, -1073741822, 1}) {
-        platform().answer(READ, code);
-        EXPECT_EQ(languageCode(false, code), "EN");
-        EXPECT_EQ(languageCode(true, code), "eng");
-        EXPECT_THAT(platform().lines(), IsEmpty());
-    }
-}
-
 TEST_F(LanguageTest, RemainsOfFailedReadAreNeitherUsedNorFreed)
 {
     char remains[] = "ko_KR";
     platform().answer(READ, -5, static_cast<char*>(remains));
     EXPECT_EQ(languageCode(false, -5), "EN");
     EXPECT_STREQ(remains, "ko_KR");
-}
-
-TEST_F(LanguageTest, NullStringAfterSuccessAnswersWithTheDefault)
-{
-    platform().answer(READ, 0);
-    EXPECT_EQ(languageCode(false, 0), "EN");
-    EXPECT_EQ(languageCode(true, 0), "eng");
 }
 
 TEST_F(LanguageTest, HugeSettingIsHandled)
@@ -213,7 +203,8 @@ TEST_F(LanguageTest, NoAllocationFailureLeavesTheMethod)
                 EXPECT_NO_THROW(EXPECT_EQ(system.GetDeviceLanguageCode(&slot, false), 0));
                 happened = failure.happened();
             }
-            EXPECT_TRUE(happened || slot == std::string(100, 'X'));
+            // With lines, it may be a line that is lost.
+            EXPECT_TRUE(happened ? mode == 1 || slot == &preset : slot == std::string(100, 'X'));
             if (slot != &preset)
                 std::free(slot);
             EXPECT_THAT(ledger().live(), IsEmpty());
@@ -222,84 +213,66 @@ TEST_F(LanguageTest, NoAllocationFailureLeavesTheMethod)
     }
 }
 
-TEST_F(LanguageTest, FailedAllocationLeavesTheSlot)
-{
-    platform().answer(READ, 0, std::string(100, 'x'));
-    char preset = 'p';
-    char* slot = &preset;
-    const FailingAllocation failure(Allocation::THROWING);
-    EXPECT_EQ(system.GetDeviceLanguageCode(&slot, false), 0);
-    EXPECT_TRUE(failure.happened());
-    EXPECT_EQ(slot, &preset);
-}
-
 TEST_F(LanguageTest, TagPositionIsThatOfTheFirstOccurrence)
 {
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("en_US", "_"), 2);
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("_a_b", "_"), 0);
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("a__b", "__"), 1);
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("abc", "_"), -1);
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("", "_"), -1);
-    EXPECT_EQ(CoreSystemInternals::tagStartPosition("abc", ""), 0);
-}
-
-TEST_F(LanguageTest, TagPositionLineNamesTheTag)
-{
+    const auto positionOf = &CoreSystemInternals::tagStartPosition;
+    EXPECT_EQ(positionOf("en_US", "_"), 2);
+    EXPECT_EQ(positionOf("_a_b", "_"), 0);
+    EXPECT_EQ(positionOf("a__b", "__"), 1);
+    EXPECT_EQ(positionOf("abc", "_"), -1);
+    EXPECT_EQ(positionOf("", "_"), -1);
+    EXPECT_EQ(positionOf("abc", ""), 0);
     platform().debugMode = 1;
-    CoreSystemInternals::tagStartPosition("a<b>", "<b>");
+    EXPECT_EQ(positionOf("a<b>", "<b>"), 1);
     EXPECT_EQ(platform().trace().back(),
               CORE_SYSTEM.debug("GetTagStartPosition", "[TAG: <b>] tag pos 1"));
 }
 
 TEST_F(LanguageTest, ValueReachesFromStartToEndInclusive)
 {
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, 1), "ab");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 2, 2), "c");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 5), "def");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 2), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, -1), "");
-}
-
-TEST_F(LanguageTest, NegativeLengthMeansTheWholeRest)
-{
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 0, -2), "abcdef");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 3, 0), "def");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 1, std::numeric_limits<int>::min()),
-              "bcdef");
-}
-
-TEST_F(LanguageTest, ValueEndsWithTheText)
-{
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 4, 100), "ef");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 4, std::numeric_limits<int>::max()),
-              "ef");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 6, 8), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("", 0, 0), "");
-}
-
-TEST_F(LanguageTest, ValueThatStartsOutsideTheTextIsEmpty)
-{
     const int least = std::numeric_limits<int>::min();
     const int most = std::numeric_limits<int>::max();
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", 7, 8), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", most, most), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", -1, 3), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("abcdef", least, most), "");
-    EXPECT_EQ(CoreSystemInternals::valueFromPosition("", 1, 1), "");
+    const struct {
+        std::string text;
+        int start;
+        int end;
+        std::string value;
+    } rows[] = {
+        {"abcdef", 0, 1, "ab"},
+        {"abcdef", 2, 2, "c"},
+        {"abcdef", 3, 5, "def"},
+        {"abcdef", 3, 2, ""},
+        {"abcdef", 0, -1, ""},
+        // A negative length means the whole rest.
+        {"abcdef", 0, -2, "abcdef"},
+        {"abcdef", 3, 0, "def"},
+        {"abcdef", 1, least, "bcdef"},
+        // The value ends with the text.
+        {"abcdef", 4, 100, "ef"},
+        {"abcdef", 4, most, "ef"},
+        {"abcdef", 6, 8, ""},
+        {"", 0, 0, ""},
+        // A start outside the text.
+        {"abcdef", 7, 8, ""},
+        {"abcdef", most, most, ""},
+        {"abcdef", -1, 3, ""},
+        {"abcdef", least, most, ""},
+        {"", 1, 1, ""},
+    };
+    for (const auto& [text, start, end, value] : rows)
+        EXPECT_EQ(CoreSystemInternals::valueFromPosition(text, start, end), value)
+            << text << ' ' << start << ' ' << end;
 }
 
-TEST_F(LanguageTest, ConversionIsExactAndClearsItsSlot)
+TEST_F(LanguageTest, ConversionIsExactAndAnswersWithTheTablesOwnText)
 {
-    EXPECT_STREQ(CoreSystemInternals::iso639("EN", UNTOUCHED), "eng");
-    for (const std::string unknown : {"en", "EN ", "E", "ENG", "", "DE"})
-        EXPECT_EQ(CoreSystemInternals::iso639(unknown, UNTOUCHED), nullptr) << unknown;
-}
-
-TEST_F(LanguageTest, ConversionAnswersWithTheTablesOwnText)
-{
-    const char* const first = CoreSystemInternals::iso639("EN", nullptr);
-    EXPECT_EQ(CoreSystemInternals::iso639("EN", nullptr), first);
+    const auto convert = &CoreSystemInternals::iso639;
+    const char* const first = convert("EN", UNTOUCHED);
+    EXPECT_STREQ(first, "eng");
+    EXPECT_EQ(convert("EN", nullptr), first);
     EXPECT_THAT(ledger().live(), IsEmpty());
+    for (const std::string unknown : {"en", "EN ", "E", "ENG", "", "DE"})
+        EXPECT_EQ(convert(unknown, UNTOUCHED), nullptr) << unknown;
 }
 
 } // namespace

@@ -10,135 +10,124 @@ const int AVAILABLE = TELEPHONY_SIM_STATE_AVAILABLE;
 const int LOCKED = TELEPHONY_SIM_STATE_LOCKED;
 const int ABSENT = TELEPHONY_SIM_STATE_UNAVAILABLE;
 
-bool isSimAvailable()
-{
-    return coreSystem().IsSimAvailable();
-}
-
-typedef bool (*Question)();
-
 void setStates(const std::vector<int>& states)
 {
     setSlotCount(static_cast<unsigned int>(states.size()));
-    for (std::size_t slot = 0; slot < states.size(); ++slot)
-        setState(static_cast<int>(slot), states[slot]);
+    int slot = 0;
+    for (const int state : states)
+        setState(slot++, state);
 }
 
-Texts slotsAsked(const std::vector<int>& states, std::size_t asked)
+class SimCalls : public std::vector<LoggedCall> {
+public:
+    typedef std::function<bool()> Question;
+
+    void add(const std::string& name, const Question& ask, bool expected, const Texts& live,
+             const Texts& trace, const std::function<void()>& prepare)
+    {
+        const auto run = [=] {
+            prepare();
+            EXPECT_EQ(ask(), expected);
+            EXPECT_EQ(platform().liveHandles(), live);
+        };
+        push_back({name, run, trace});
+    }
+
+    // `asked` slots are asked in order; a line of the facade's own may follow.
+    void addWalk(const std::string& name, const Question& ask, const std::string& entry,
+                 const std::vector<int>& states, int asked, bool expected, const Texts& result = {})
+    {
+        const auto count = static_cast<unsigned int>(states.size());
+        Texts trace = Texts{entry} + accessed(listTaken(count));
+        for (int slot = 0; slot < asked; ++slot) {
+            const bool available = states[static_cast<std::size_t>(slot)] == AVAILABLE;
+            trace = trace + accessed(availabilityAsked(slot, count, available));
+        }
+        add(name, ask, expected, {}, trace + result + accessed(listReleased(count)),
+            [=] { setStates(states); });
+    }
+
+    void addWithoutList(const std::string& name, const Question& ask, const std::string& entry)
+    {
+        const Texts trace = Texts{entry} + accessed(noListTaken());
+        add(name + "WithoutTelephony", ask, false, {}, trace, [] { setNoTelephony(); });
+        add(name + "WithoutSlots", ask, false, {"list of 0"}, trace, [] { setSlotCount(0); });
+    }
+};
+
+SimCalls availableCalls()
 {
-    Texts trace;
-    for (std::size_t slot = 0; slot < asked; ++slot)
-        trace = trace + accessed(availabilityAsked(static_cast<int>(slot),
-                                                   static_cast<unsigned int>(states.size()),
-                                                   states[slot] == AVAILABLE));
-    return trace;
+    const auto ask = [] { return coreSystem().IsSimAvailable(); };
+    const std::string entry = CORE_SYSTEM.debug("IsSimAvailable", "CoreSystem IsSimAvailable()");
+    SimCalls calls;
+    const auto add = [&](const std::string& name, const std::vector<int>& states, int asked,
+                         bool expected) {
+        calls.addWalk("SimAvailable" + name, ask, entry, states, asked, expected);
+    };
+    add("InOnlySlot", {AVAILABLE}, 1, true);
+    add("InFirstSlotAndNoOtherIsAsked", {AVAILABLE, AVAILABLE, ABSENT}, 1, true);
+    add("InSecondSlotOnly", {ABSENT, AVAILABLE}, 2, true);
+    add("InLastSlotOnly", {LOCKED, ABSENT, AVAILABLE}, 3, true);
+    add("NotWhereLocked", {LOCKED}, 1, false);
+    add("InNoSlot", {ABSENT, LOCKED, 3, 7, -1}, 5, false);
+    calls.addWithoutList("SimAvailable", ask, entry);
+    return calls;
 }
 
-LoggedCall simCall(const std::string& name, Question ask, const std::function<void()>& prepare,
-                   bool expected, const Texts& live, const Texts& trace)
+SimCalls dualCalls()
 {
-    return {name,
-            [=] {
-                prepare();
-                EXPECT_EQ(ask(), expected);
-                EXPECT_EQ(platform().liveHandles(), live);
-            },
-            trace};
-}
-
-// `asked` slots are asked in order.
-LoggedCall availableCall(const std::string& name, const std::vector<int>& states, std::size_t asked,
-                         bool expected)
-{
-    const auto count = static_cast<unsigned int>(states.size());
-    return simCall(
-        "SimAvailable" + name, &isSimAvailable, [=] { setStates(states); }, expected, {},
-        Texts{CORE_SYSTEM.debug("IsSimAvailable", "CoreSystem IsSimAvailable()")} +
-            accessed(listTaken(count)) + slotsAsked(states, asked) + accessed(listReleased(count)));
+    const auto ask = &CoreSystemInternals::isDualSimAvailable;
+    const std::string method = "IsDualSimAvailable";
+    const std::string entry = CORE_SYSTEM.debug(method, "CoreSystem IsDualSimAvailable()");
+    SimCalls calls;
+    const auto add = [&](const std::string& name, const std::vector<int>& states, int asked,
+                         bool expected) {
+        const std::string result = expected ? "DualSimAvailable." : "NO DualSim MODE";
+        calls.addWalk("DualSim" + name, ask, entry, states, asked, expected,
+                      {CORE_SYSTEM.debug(method, result)});
+    };
+    add("InBothSlots", {AVAILABLE, AVAILABLE}, 2, true);
+    add("InFirstSlotOnly", {AVAILABLE, ABSENT}, 2, false);
+    add("InSecondSlotOnlyAndItIsNotAsked", {ABSENT, AVAILABLE}, 1, false);
+    add("NotWhereLocked", {LOCKED, LOCKED}, 1, false);
+    add("NotInSecondAndThirdSlot", {ABSENT, AVAILABLE, AVAILABLE}, 1, false);
+    add("InFirstTwoOfThreeSlots", {AVAILABLE, AVAILABLE, AVAILABLE}, 2, true);
+    calls.addWithoutList("DualSim", ask, entry);
+    // The one list that is not released: meant.
+    const std::string single = "[Single Sim Device] Not support Dual Sim.";
+    calls.add("DualSimOnSingleSlotKeepsTheList", ask, false, {"list of 1"},
+              Texts{entry} + accessed(listTaken(1)) + Texts{CORE_SYSTEM.error(method, single)},
+              [] { setStates({AVAILABLE}); });
+    return calls;
 }
 
 // Handed on without a line of the facade's own.
-LoggedCall existsCall(const std::string& name, int state, const std::string& stateName,
-                      bool expected)
+SimCalls existsCalls()
 {
-    const auto line = [](const std::string& text) { return SIM_MANAGER.debug("IsSimExist", text); };
-    return simCall(
-        "SimExists" + name, [] { return coreSystem().IsSimExist(); }, [=] { setStates({state}); },
-        expected, {},
-        accessed(lockedThroughout({"telephony_init()", stateCall(0),
-                                   line("RESULT sim_get_state[0] : 0 | 0"),
-                                   line("SIM STATE[0] : " + stateName), deinitCall(1)})));
+    SimCalls calls;
+    for (const auto& [state, name] : {std::pair{AVAILABLE, "AVAILABLE"}, {LOCKED, "LOCKED"}}) {
+        const auto line = [](const std::string& text) {
+            return SIM_MANAGER.debug("IsSimExist", text);
+        };
+        calls.add(
+            std::string("SimExists") + name, [] { return coreSystem().IsSimExist(); },
+            state == AVAILABLE, {},
+            accessed(lockedThroughout(
+                {"telephony_init()", stateCall(0), line("RESULT sim_get_state[0] : 0 | 0"),
+                 line(std::string("SIM STATE[0] : TELEPHONY_SIM_STATE_") + name), deinitCall(1)})),
+            [state = state] { setStates({state}); });
+    }
+    return calls;
 }
 
-const std::string DUAL_ENTRY =
-    CORE_SYSTEM.debug("IsDualSimAvailable", "CoreSystem IsDualSimAvailable()");
-
-LoggedCall dualCall(const std::string& name, const std::vector<int>& states, std::size_t asked,
-                    bool expected)
-{
-    const auto count = static_cast<unsigned int>(states.size());
-    return simCall(
-        "DualSim" + name, &CoreSystemInternals::isDualSimAvailable, [=] { setStates(states); },
-        expected, {},
-        Texts{DUAL_ENTRY} + accessed(listTaken(count)) + slotsAsked(states, asked) +
-            Texts{CORE_SYSTEM.debug("IsDualSimAvailable",
-                                    expected ? "DualSimAvailable." : "NO DualSim MODE")} +
-            accessed(listReleased(count)));
-}
-
-std::vector<LoggedCall> simCalls()
-{
-    const Texts entry = {CORE_SYSTEM.debug("IsSimAvailable", "CoreSystem IsSimAvailable()")};
-    return {
-        availableCall("InOnlySlot", {AVAILABLE}, 1, true),
-        availableCall("InFirstSlotAndNoOtherIsAsked", {AVAILABLE, AVAILABLE, ABSENT}, 1, true),
-        availableCall("InSecondSlotOnly", {ABSENT, AVAILABLE}, 2, true),
-        availableCall("InLastSlotOnly", {LOCKED, ABSENT, AVAILABLE}, 3, true),
-        availableCall("NotWhereLocked", {LOCKED}, 1, false),
-        availableCall("InNoSlot", {ABSENT, LOCKED, 3, 7, -1}, 5, false),
-        simCall(
-            "SimAvailableWithoutTelephony", &isSimAvailable, [] { setNoTelephony(); }, false, {},
-            entry + accessed(noListTaken())),
-        simCall(
-            "SimAvailableWithoutSlots", &isSimAvailable, [] { setSlotCount(0); }, false,
-            {"list of 0"}, entry + accessed(noListTaken())),
-        existsCall("Present", AVAILABLE, "TELEPHONY_SIM_STATE_AVAILABLE", true),
-        existsCall("Locked", LOCKED, "TELEPHONY_SIM_STATE_LOCKED", false),
-        dualCall("InBothSlots", {AVAILABLE, AVAILABLE}, 2, true),
-        dualCall("InFirstSlotOnly", {AVAILABLE, ABSENT}, 2, false),
-        dualCall("InSecondSlotOnlyAndItIsNotAsked", {ABSENT, AVAILABLE}, 1, false),
-        dualCall("NotWhereLocked", {LOCKED, LOCKED}, 1, false),
-        dualCall("NotInSecondAndThirdSlot", {ABSENT, AVAILABLE, AVAILABLE}, 1, false),
-        dualCall("InFirstTwoOfThreeSlots", {AVAILABLE, AVAILABLE, AVAILABLE}, 2, true),
-        // The one list that is not released: meant.
-        simCall(
-            "DualSimOnSingleSlotKeepsTheList", &CoreSystemInternals::isDualSimAvailable,
-            [] { setStates({AVAILABLE}); }, false, {"list of 1"},
-            Texts{DUAL_ENTRY} + accessed(listTaken(1)) +
-                Texts{CORE_SYSTEM.error("IsDualSimAvailable",
-                                        "[Single Sim Device] Not support Dual Sim.")}),
-        simCall(
-            "DualSimWithoutTelephony", &CoreSystemInternals::isDualSimAvailable,
-            [] { setNoTelephony(); }, false, {}, Texts{DUAL_ENTRY} + accessed(noListTaken())),
-        simCall(
-            "DualSimWithoutSlots", &CoreSystemInternals::isDualSimAvailable,
-            [] { setSlotCount(0); }, false, {"list of 0"},
-            Texts{DUAL_ENTRY} + accessed(noListTaken())),
-    };
-}
-
-INSTANTIATE_TEST_SUITE_P(Sim, LoggedCallTest, testing::ValuesIn(simCalls()), rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(SimAvailable, LoggedCallTest, testing::ValuesIn(availableCalls()),
+                         rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(DualSim, LoggedCallTest, testing::ValuesIn(dualCalls()),
+                         rowName<LoggedCall>);
+INSTANTIATE_TEST_SUITE_P(SimExists, LoggedCallTest, testing::ValuesIn(existsCalls()),
+                         rowName<LoggedCall>);
 
 class CoreSystemSimTest : public PlatformTest {};
-
-TEST_F(CoreSystemSimTest, SecondSlotTakesOneErrorLineBeforeTheAnswer)
-{
-    setStates({ABSENT, AVAILABLE});
-    EXPECT_TRUE(system.IsSimAvailable());
-    const auto lines = platform().lines();
-    ASSERT_EQ(lines.size(), 1u);
-    EXPECT_EQ(lines[0].plain, "Sim is not available");
-}
 
 TEST_F(CoreSystemSimTest, ChangeBetweenTwoQuestionsIsSeen)
 {

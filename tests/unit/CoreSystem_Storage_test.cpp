@@ -94,73 +94,44 @@ INSTANTIATE_TEST_SUITE_P(Storage, LoggedCallTest, testing::ValuesIn(STORAGE_CALL
 
 class StorageTest : public PlatformTest {};
 
-TEST_F(StorageTest, ComparisonIsStrict)
+TEST_F(StorageTest, MoreThanWhatIsRequiredMustBeFree)
 {
-    EXPECT_TRUE(isAvailable(SMALL, std::nextafter(3.0, 0.0)));
-    EXPECT_FALSE(isAvailable(SMALL, 3.0));
-    EXPECT_FALSE(isAvailable(SMALL, std::nextafter(3.0, 4.0)));
-}
-
-TEST_F(StorageTest, ZeroIsAvailableWheneverAnyBlockIsFree)
-{
-    EXPECT_TRUE(isAvailable(volume(1, 1, 1), 0.0));
-    EXPECT_TRUE(isAvailable(volume(512, 1000, 1), 0.0));
-    EXPECT_FALSE(isAvailable(volume(512, 1000, 0), 0.0));
-    EXPECT_FALSE(isAvailable(volume(512, 1000, 0), -0.0));
-}
-
-TEST_F(StorageTest, NaNIsNeverAvailable)
-{
-    for (const fsblkcnt_t free : {0u, 1u, 768u})
-        for (const double nan : {NAN_VALUE, -NAN_VALUE})
-            EXPECT_FALSE(isAvailable(volume(4096, 1280, free), nan));
-}
-
-TEST_F(StorageTest, MoreThanEverythingIsNeverAvailable)
-{
+    const unsigned long width = std::numeric_limits<unsigned long>::max();
     const fsblkcnt_t most = std::numeric_limits<fsblkcnt_t>::max();
-    for (const double required : {INFINITE, LARGEST})
-        EXPECT_FALSE(
-            isAvailable(volume(std::numeric_limits<unsigned long>::max(), most, most), required));
-}
-
-TEST_F(StorageTest, LessThanNothingIsAlwaysAvailable)
-{
-    for (const double required : {-SMALLEST, -1.0, -LARGEST, -INFINITE})
-        EXPECT_TRUE(isAvailable(volume(0, 0, 0), required)) << required;
-}
-
-TEST_F(StorageTest, FreeSpaceIsThatOfOrdinaryUsersInBlocksOfTheirOwnSize)
-{
-    platform().debugMode = 1;
-    struct statvfs fs = {};
-    fs.f_bsize = 1 << 20;
-    fs.f_frsize = 1 << 10;
-    fs.f_blocks = 7;
-    fs.f_bfree = 5;
-    fs.f_bavail = 3;
-    fs.f_files = 11;
-    fs.f_ffree = 13;
-    fs.f_favail = 17;
-    EXPECT_FALSE(isAvailable(fs, 3));
-    EXPECT_EQ(platform().trace(),
-              trace("Total Memory : 7168.000000 byte, Avail Memory : 3145728.000000 byte",
-                    SMALL_CONVERTED, "Total mem under 3.000000"));
-}
-
-TEST_F(StorageTest, ProductsBeyond32BitsAreWhole)
-{
-    const struct statvfs fs = volume(65536, 65536, 65536); // 2^32 bytes
-    EXPECT_TRUE(isAvailable(fs, 4095.5));
-    EXPECT_FALSE(isAvailable(fs, 4096));
-}
-
-TEST_F(StorageTest, FieldsOf32BitsHoldMoreThanFourTebibytes)
-{
-    const struct statvfs fs = volume(4096, UINT32_MAX, UINT32_MAX); // a block less than 16 TiB
-    EXPECT_TRUE(isAvailable(fs, 16777215.5));
-    EXPECT_FALSE(isAvailable(fs, 16777215.99609375));
-    EXPECT_TRUE(isAvailable(volume(UINT32_MAX, UINT32_MAX, UINT32_MAX), 17592186036223.5));
+    const struct statvfs everything = volume(width, most, most);
+    const struct statvfs nothing = volume(0, 0, 0);
+    const struct statvfs fourGibibytes = volume(65536, 65536, 65536);
+    const struct statvfs nearly16Tebibytes = volume(4096, UINT32_MAX, UINT32_MAX); // a block less
+    const struct {
+        std::string name;
+        struct statvfs fs;
+        double required;
+        bool answer;
+    } rows[] = {
+        {"a little less", SMALL, std::nextafter(3.0, 0.0), true},
+        {"exactly that", SMALL, 3.0, false},
+        {"a little more", SMALL, std::nextafter(3.0, 4.0), false},
+        {"none of one byte", volume(1, 1, 1), 0.0, true},
+        {"none of one block", volume(512, 1000, 1), 0.0, true},
+        {"none of a full volume", volume(512, 1000, 0), 0.0, false},
+        {"minus zero of a full volume", volume(512, 1000, 0), -0.0, false},
+        {"no number of a full volume", volume(4096, 1280, 0), NAN_VALUE, false},
+        {"no number", SMALL, NAN_VALUE, false},
+        {"no negative number", SMALL, -NAN_VALUE, false},
+        {"infinity of everything", everything, INFINITE, false},
+        {"the largest of everything", everything, LARGEST, false},
+        {"the smallest below zero of nothing", nothing, -SMALLEST, true},
+        {"one below zero of nothing", nothing, -1.0, true},
+        {"the largest below zero of nothing", nothing, -LARGEST, true},
+        {"infinity below zero of nothing", nothing, -INFINITE, true},
+        {"a product beyond 32 bits", fourGibibytes, 4095.5, true},
+        {"all of a product beyond 32 bits", fourGibibytes, 4096, false},
+        {"blocks counted with 32 bits", nearly16Tebibytes, 16777215.5, true},
+        {"all blocks counted with 32 bits", nearly16Tebibytes, 16777215.99609375, false},
+        {"both of 32 bits", volume(UINT32_MAX, UINT32_MAX, UINT32_MAX), 17592186036223.5, true},
+    };
+    for (const auto& row : rows)
+        EXPECT_EQ(isAvailable(row.fs, row.required), row.answer) << row.name;
 }
 
 TEST_F(StorageTest, FieldsOf64BitsAreWhole)
@@ -178,33 +149,31 @@ TEST_F(StorageTest, FieldsOf64BitsAreWhole)
     }
 }
 
-TEST_F(StorageTest, EveryNegativeResultIsFailure)
+TEST_F(StorageTest, FreeSpaceIsThatOfOrdinaryUsersInBlocksOfTheirOwnSize)
 {
-    for (const int code : {-1, -19, -22, INT32_MIN}) {
-        platform().forgetEvents();
-        platform().answer(CALL, code, SMALL);
-        EXPECT_FALSE(ask(-INFINITE));
-        EXPECT_EQ(
-            platform().trace(),
-            (Texts{CALL, CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size")}));
-    }
+    platform().debugMode = 1;
+    struct statvfs fs = volume(1 << 20, 7, 3);
+    fs.f_frsize = 1 << 10;
+    fs.f_bfree = 5;
+    fs.f_files = 11;
+    fs.f_ffree = 13;
+    fs.f_favail = 17;
+    EXPECT_FALSE(isAvailable(fs, 3));
+    EXPECT_EQ(platform().trace(),
+              trace("Total Memory : 7168.000000 byte, Avail Memory : 3145728.000000 byte",
+                    SMALL_CONVERTED, "Total mem under 3.000000"));
 }
 
-TEST_F(StorageTest, OtherResultsAreSuccess)
+TEST_F(StorageTest, NegativeResultsAloneAreFailures)
 {
-    for (const int code : {1, INT32_MAX}) {
+    const std::string failed =
+        CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size");
+    for (const int code : {-1, -19, -22, INT32_MIN, 1, INT32_MAX}) {
         platform().forgetEvents();
         platform().answer(CALL, code, SMALL);
-        EXPECT_TRUE(ask(2.5));
-        EXPECT_EQ(platform().trace(), Texts{CALL});
+        EXPECT_EQ(ask(code < 0 ? -INFINITE : 2.5), code > 0) << code;
+        EXPECT_EQ(platform().trace(), code < 0 ? (Texts{CALL, failed}) : Texts{CALL}) << code;
     }
-}
-
-TEST_F(StorageTest, NothingIsCached)
-{
-    EXPECT_TRUE(isAvailable(volume(1 << 20, 10, 5), 1));
-    EXPECT_FALSE(isAvailable(volume(1 << 20, 10, 1), 1));
-    EXPECT_TRUE(isAvailable(volume(1 << 20, 10, 5), 1));
 }
 
 } // namespace

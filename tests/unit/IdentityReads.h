@@ -10,6 +10,8 @@
 
 #include "SimSlots.h"
 
+namespace fake {
+
 const int SIM_NOT_AVAILABLE = -39841791;
 
 struct IdentityRead {
@@ -65,5 +67,7 @@ inline const std::vector<IdentityRead> IDENTITY_READS = {
      "CoreSystem::GetPhoneNumberFromSim", "", CoreSystemInternals::LIST_PHONE_NUMBERS,
      "GetPhoneNumberListFromSim [Vector]TYPE", "ADD PhoneNumber "},
 };
+
+} // namespace fake
 
 #endif

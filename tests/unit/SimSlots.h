@@ -16,6 +16,8 @@
 
 #include "support/PlatformTest.h"
 
+namespace fake {
+
 // Result codes of the platform, listed and not.
 const int PLATFORM_FAILURES[] = {-22, -13,       -1073741822, -39845887, -39841791,
                                  -1,  INT32_MIN, 1,           INT32_MAX};
@@ -103,29 +105,29 @@ inline TelSimImsiInfo_t imsiInfo(const Card& card)
 // Telephony that reports `count` slots; what the slots answer is set apart.
 inline void setSlotCount(unsigned int count)
 {
-    fake::platform().answer("telephony_init()", 0, count);
-    fake::platform().answer(deinitCall(count), 0);
+    platform().answer("telephony_init()", 0, count);
+    platform().answer(deinitCall(count), 0);
 }
 
 // Telephony that cannot be initialised.
 inline void setNoTelephony(int code = -1073741822)
 {
-    fake::platform().answer("telephony_init()", code);
-    fake::platform().answer("telephony_deinit(no list)", 0);
+    platform().answer("telephony_init()", code);
+    platform().answer("telephony_deinit(no list)", 0);
 }
 
 inline void setState(int slot, int state, int code = 0)
 {
-    fake::platform().answer(stateCall(slot), code, state);
+    platform().answer(stateCall(slot), code, state);
 }
 
 inline void setCard(int slot, const Card& card)
 {
     setState(slot, TELEPHONY_SIM_STATE_AVAILABLE);
-    fake::platform().answer(initCall(slot), 0);
-    fake::platform().answer(imsiCall(slot), 0, imsiInfo(card));
-    fake::platform().answer(modemCall("tel_deinit", slot), 0);
-    fake::platform().answer(numberCall(slot), 0, card.number);
+    platform().answer(initCall(slot), 0);
+    platform().answer(imsiCall(slot), 0, imsiInfo(card));
+    platform().answer(modemCall("tel_deinit", slot), 0);
+    platform().answer(numberCall(slot), 0, card.number);
 }
 
 const std::nullopt_t NO_CARD = std::nullopt;
@@ -133,7 +135,7 @@ const std::nullopt_t NO_CARD = std::nullopt;
 // A whole device: one slot each.
 inline void setSlots(const std::vector<std::optional<Card>>& cards)
 {
-    fake::Texts modems;
+    Texts modems;
     for (const std::optional<Card>& card : cards) {
         const int slot = static_cast<int>(modems.size());
         if (card)
@@ -142,14 +144,14 @@ inline void setSlots(const std::vector<std::optional<Card>>& cards)
             setState(slot, TELEPHONY_SIM_STATE_UNAVAILABLE);
         modems.push_back(modemOf(slot));
     }
-    fake::platform().setModems(modems);
+    platform().setModems(modems);
     setSlotCount(static_cast<unsigned int>(cards.size()));
 }
 
 // A list as telephony_init() fills it, for the calls that take one. The fake keeps it.
 inline telephony_handle_list_s openList(unsigned int count)
 {
-    return fake::platform().openList(count);
+    return platform().openList(count);
 }
 
 // \name What was done
@@ -157,60 +159,57 @@ inline telephony_handle_list_s openList(unsigned int count)
 const std::string SIM_ACCESS = "CORE_MUTEX_NAME_SIM_ACCESS";
 
 // Locked around one platform call only.
-inline fake::Texts lockedAround(const std::string& call)
+inline Texts lockedAround(const std::string& call)
 {
     return {SIM_ACCESS + ".Lock()", call, SIM_ACCESS + ".Unlock()"};
 }
 
 // Locked from the beginning to the end.
-inline fake::Texts lockedThroughout(const fake::Texts& trace)
+inline Texts lockedThroughout(const Texts& trace)
 {
-    using fake::operator+;
-    return fake::Texts{"lock " + SIM_ACCESS} + trace + fake::Texts{"unlock " + SIM_ACCESS};
+    return Texts{"lock " + SIM_ACCESS} + trace + Texts{"unlock " + SIM_ACCESS};
 }
 
-inline fake::Texts listTaken(unsigned int count)
+inline Texts listAskedFor(const std::string& line)
 {
-    return {fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle", "SuccessToInitTelephonyHandle"),
-            "telephony_init()",
-            fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle",
-                                    "Success! telephony_init, handle count : " +
-                                        std::to_string(count))};
+    const std::string method = "SuccessToInitTelephonyHandle";
+    return {SIM_MANAGER.debug(method, method), "telephony_init()", line};
 }
 
-inline fake::Texts noListTaken()
+inline Texts listTaken(unsigned int count)
 {
-    return {fake::SIM_MANAGER.debug("SuccessToInitTelephonyHandle", "SuccessToInitTelephonyHandle"),
-            "telephony_init()",
-            fake::SIM_MANAGER.error("SuccessToInitTelephonyHandle", "telephony_init Failed.")};
+    const std::string line = "Success! telephony_init, handle count : " + std::to_string(count);
+    return listAskedFor(SIM_MANAGER.debug("SuccessToInitTelephonyHandle", line));
 }
 
-inline fake::Texts listReleased(unsigned int count)
+inline Texts noListTaken()
 {
-    return {fake::SIM_MANAGER.debug("DeleteTelephonyHandle", "DeleteTelephonyHandle"),
-            deinitCall(count)};
+    return listAskedFor(
+        SIM_MANAGER.error("SuccessToInitTelephonyHandle", "telephony_init Failed."));
+}
+
+inline Texts listReleased(unsigned int count)
+{
+    return {SIM_MANAGER.debug("DeleteTelephonyHandle", "DeleteTelephonyHandle"), deinitCall(count)};
 }
 
 // SimManager::IsSimAvailable() of one slot.
-inline fake::Texts availabilityAsked(int slot, unsigned int count, bool available)
+inline Texts availabilityAsked(int slot, unsigned int count, bool available)
 {
-    using fake::operator+;
     const auto line = [](const std::string& text) {
-        return fake::SIM_MANAGER.debug("IsSimAvailable", text);
+        return SIM_MANAGER.debug("IsSimAvailable", text);
     };
-    return fake::Texts{line("IsSimAvailable : slot " + std::to_string(slot + 1)),
-                       line("GetTelephonyHandle, handle count : " + std::to_string(count))} +
+    return Texts{line("IsSimAvailable : slot " + std::to_string(slot + 1)),
+                 line("GetTelephonyHandle, handle count : " + std::to_string(count))} +
            lockedAround(stateCall(slot)) +
-           fake::Texts{available
-                           ? line("SIM is available")
-                           : fake::SIM_MANAGER.error("IsSimAvailable", "Sim is not available")};
+           Texts{available ? line("SIM is available")
+                           : SIM_MANAGER.error("IsSimAvailable", "Sim is not available")};
 }
 
 // Steps of the facade, each with the access to SimManager before it.
-inline fake::Texts accessed(const fake::Texts& step)
+inline Texts accessed(const Texts& step)
 {
-    using fake::operator+;
-    return fake::SIM_MANAGER.access() + step;
+    return SIM_MANAGER.access() + step;
 }
 
 // \name What must not be told
@@ -218,14 +217,13 @@ inline fake::Texts accessed(const fake::Texts& step)
 // Whether the text was formatted or logged anywhere.
 inline bool isTold(const std::string& secret)
 {
-    const auto holds = [&](const std::string& text) {
-        return text.find(secret) != std::string::npos;
-    };
-    const std::vector<fake::Event> events = fake::platform().events();
-    return fake::isInFormatBuffer(secret) ||
-           std::any_of(events.begin(), events.end(), [&](const fake::Event& event) {
-               return holds(event.text) || holds(event.line.text) || holds(event.line.plain);
-           });
+    if (isInFormatBuffer(secret))
+        return true;
+    for (const Event& event : platform().events())
+        for (const std::string& text : {event.text, event.line.text, event.line.plain})
+            if (text.find(secret) != std::string::npos)
+                return true;
+    return false;
 }
 
 // Whether any five digits in a row of the MSIN or of the number were formatted or logged.
@@ -237,5 +235,7 @@ inline bool isIdentityTold(const Card& card)
                 return true;
     return false;
 }
+
+} // namespace fake
 
 #endif

@@ -13,26 +13,16 @@ using testing::Field;
 namespace {
 
 template <class Singleton>
-const SourceFile& sourceOf();
-template <>
-const SourceFile& sourceOf<CoreSystem>()
+const SourceFile& sourceOf()
 {
-    return CORE_SYSTEM;
-}
-template <>
-const SourceFile& sourceOf<SimManager>()
-{
-    return SIM_MANAGER;
-}
-template <>
-const SourceFile& sourceOf<ConnectionManager>()
-{
-    return CONNECTION_MANAGER;
-}
-template <>
-const SourceFile& sourceOf<DBusManager>()
-{
-    return D_BUS_MANAGER;
+    if constexpr (std::is_same_v<Singleton, CoreSystem>)
+        return CORE_SYSTEM;
+    else if constexpr (std::is_same_v<Singleton, SimManager>)
+        return SIM_MANAGER;
+    else if constexpr (std::is_same_v<Singleton, ConnectionManager>)
+        return CONNECTION_MANAGER;
+    else
+        return D_BUS_MANAGER;
 }
 
 typedef testing::Types<CoreSystem, SimManager, ConnectionManager, DBusManager> Singletons;
@@ -127,36 +117,24 @@ TYPED_TEST(SingletonTest, HasVirtualDestructorAndNoData)
     EXPECT_FALSE(std::is_copy_assignable<TypeParam>::value);
 }
 
-TYPED_TEST(SingletonTest, FirstCallConstructsUnderItsLock)
+TYPED_TEST(SingletonTest, FirstCallConstructsUnderItsLockAndLaterOnesFindTheInstance)
 {
+    destroyInstances(Singletons());
     TypeParam* const instance = TypeParam::GetInstance();
     ASSERT_NE(instance, nullptr);
     EXPECT_EQ(instance, CoreSystemInternals::instance<TypeParam>());
+    EXPECT_EQ(instances(Singletons()), Texts{this->source.className}); // and no other
     EXPECT_EQ(platform().trace(), this->accessAround(this->constructorLine()));
-}
-
-TYPED_TEST(SingletonTest, ConstructorCreatesNoOtherInstance)
-{
-    destroyInstances(Singletons());
-    TypeParam::GetInstance();
-    EXPECT_EQ(instances(Singletons()), Texts{this->source.className});
-}
-
-TYPED_TEST(SingletonTest, EveryLineCarriesTheDefaultTag)
-{
-    TypeParam::GetInstance();
-    EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, this->source.defaultTag)));
     EXPECT_EQ(platform().lines().size(), 2u);
-}
-
-TYPED_TEST(SingletonTest, LaterCallsTakeTheLockAndConstructNothing)
-{
-    TypeParam* const instance = TypeParam::GetInstance();
     for (int i = 0; i < 3; ++i) {
+        EXPECT_THAT(platform().lines(), Each(Field(&LogLine::tag, this->source.defaultTag)));
         platform().forgetEvents();
         EXPECT_EQ(TypeParam::GetInstance(), instance);
         EXPECT_EQ(platform().trace(), this->source.access());
     }
+    platform().forgetEvents();
+    CoreSystemInternals::destroyInstance<TypeParam>();
+    EXPECT_TRUE(platform().events().empty());
 }
 
 TYPED_TEST(SingletonTest, QuietModeStillTakesTheLock)
@@ -166,33 +144,21 @@ TYPED_TEST(SingletonTest, QuietModeStillTakesTheLock)
     EXPECT_EQ(platform().trace(), (Texts{this->source.lock(), "un" + this->source.lock()}));
 }
 
-TYPED_TEST(SingletonTest, FailedAllocationGivesNullAndAnErrorLine)
+TYPED_TEST(SingletonTest, FailedAllocationGivesNullAndIsTriedAgain)
 {
-    const FailingAllocation failure(Allocation::NOTHROW);
-    EXPECT_EQ(TypeParam::GetInstance(), nullptr);
-    EXPECT_TRUE(failure.happened());
-    EXPECT_EQ(platform().trace(), this->accessAround(this->source.error(
-                                      "GetInstance", this->source.className + "() failed.")));
-    EXPECT_EQ(platform().lines().back().tag, this->source.defaultTag);
-}
-
-TYPED_TEST(SingletonTest, CallAfterFailedAllocationTriesAgain)
-{
+    const std::string failed = this->source.className + "() failed.";
     for (int i = 0; i < 2; ++i) {
+        platform().forgetEvents();
         const FailingAllocation failure(Allocation::NOTHROW);
         EXPECT_EQ(TypeParam::GetInstance(), nullptr);
+        EXPECT_TRUE(failure.happened());
+        EXPECT_EQ(platform().trace(),
+                  this->accessAround(this->source.error("GetInstance", failed)));
+        EXPECT_EQ(platform().lines().back().tag, this->source.defaultTag);
     }
     platform().forgetEvents();
     EXPECT_NE(TypeParam::GetInstance(), nullptr);
     EXPECT_EQ(platform().trace(), this->accessAround(this->constructorLine()));
-}
-
-TYPED_TEST(SingletonTest, DestructorIsSilent)
-{
-    TypeParam::GetInstance();
-    platform().forgetEvents();
-    CoreSystemInternals::destroyInstance<TypeParam>();
-    EXPECT_TRUE(platform().events().empty());
 }
 
 TYPED_TEST(SingletonTest, ManyThreadsGetOneInstanceConstructedOnce)
