@@ -57,29 +57,27 @@ Texts missedTrace(const Converter& row, const std::string& key)
 }
 
 // Keys that no table holds.
-std::vector<std::string> strangeKeys(const std::string& key)
+Texts strangeKeys(const std::string& key)
 {
     std::string everyByte;
     for (int byte = 1; byte < 256; ++byte)
         everyByte += static_cast<char>(byte);
-    // The last one is long enough for any buffer.
-    return {" " + key,
-            key + " ",
-            key + "0",
-            "0" + key,
-            "+" + key,
-            key + "\n",
-            "-",
-            "-1",
-            "12",
-            "99999999999999999999",
-            "abc",
-            "no digits here",
-            "%s%n",
-            "\xc3\xa9",
-            "\xff\xfe\xfd\xfc",
-            everyByte,
-            std::string(10 << 20, '4')};
+    Texts keys = {"-",
+                  "-1",
+                  "12",
+                  "99999999999999999999",
+                  "abc",
+                  "no digits here",
+                  "%s%n",
+                  "\xc3\xa9",
+                  "\xff\xfe\xfd\xfc",
+                  everyByte};
+    for (const char* before : {" ", "0", "+"})
+        keys.push_back(before + key);
+    for (const char* after : {" ", "0", "\n"})
+        keys.push_back(key + after);
+    keys.push_back(std::string(10 << 20, '4')); // long enough for any buffer
+    return keys;
 }
 
 // The slot's content after a question that begins with `preset` in it.
@@ -211,30 +209,15 @@ std::vector<LoggedCall> chainedCalls()
 
 typedef bool (*Predicate)(const char* key);
 
-bool isValidMcc(const char* mcc)
-{
-    return coreSystem().IsValidMcc(mcc);
-}
-
-bool isValidMutableMcc(const char* mcc)
-{
+const Predicate IS_VALID = [](const char* mcc) { return coreSystem().IsValidMcc(mcc); };
+const Predicate IS_VALID_MUTABLE = [](const char* mcc) {
     return coreSystem().IsValidMcc(const_cast<char*>(mcc));
-}
-
-bool isValidMccOfSim(const char* mcc)
-{
-    return simManager().IsValidMcc(mcc);
-}
-
-bool isMoSupportMcc(const char* mcc)
-{
-    return coreSystem().IsMoSupportMcc(mcc);
-}
-
-bool isMoSupportMccOfSim(const char* mcc)
-{
+};
+const Predicate IS_VALID_OF_SIM = [](const char* mcc) { return simManager().IsValidMcc(mcc); };
+const Predicate IS_MO_SUPPORT = [](const char* mcc) { return coreSystem().IsMoSupportMcc(mcc); };
+const Predicate IS_MO_SUPPORT_OF_SIM = [](const char* mcc) {
     return simManager().IsMoSupportMcc(mcc);
-}
+};
 
 LoggedCall predicateCall(const std::string& name, Predicate ask, const char* mcc, bool answer,
                          const Texts& trace)
@@ -258,16 +241,16 @@ std::vector<LoggedCall> predicateCalls()
     const Texts entry = entryLine("IsValidMcc");
     const Texts refusal = entry + emptyKeyError("IsValidMcc", "mcc");
     std::vector<LoggedCall> calls = {
-        predicateCall("SimValidMcc", isValidMccOfSim, "412", true, validity("412", true)),
-        predicateCall("SimInvalidMcc", isValidMccOfSim, "4120", false, validity("4120", false)),
-        predicateCall("SimEmptyMcc", isValidMccOfSim, "", false, validity("", false)),
-        predicateCall("SimMoSupport", isMoSupportMccOfSim, "505", true, moAsked),
-        predicateCall("MoSupport", isMoSupportMcc, "505", true, SIM_MANAGER.access() + moAsked),
-        predicateCall("MoSupportEmpty", isMoSupportMcc, "", false, emptyKeyError(mo, "mcc")),
-        predicateCall("MoSupportNull", isMoSupportMcc, nullptr, false, emptyKeyError(mo, "mcc")),
+        predicateCall("SimValidMcc", IS_VALID_OF_SIM, "412", true, validity("412", true)),
+        predicateCall("SimInvalidMcc", IS_VALID_OF_SIM, "4120", false, validity("4120", false)),
+        predicateCall("SimEmptyMcc", IS_VALID_OF_SIM, "", false, validity("", false)),
+        predicateCall("SimMoSupport", IS_MO_SUPPORT_OF_SIM, "505", true, moAsked),
+        predicateCall("MoSupport", IS_MO_SUPPORT, "505", true, SIM_MANAGER.access() + moAsked),
+        predicateCall("MoSupportEmpty", IS_MO_SUPPORT, "", false, emptyKeyError(mo, "mcc")),
+        predicateCall("MoSupportNull", IS_MO_SUPPORT, nullptr, false, emptyKeyError(mo, "mcc")),
     };
-    for (const Predicate ask : {isValidMcc, isValidMutableMcc}) {
-        const std::string name = ask == isValidMcc ? "ConstMcc" : "MutableMcc";
+    for (const Predicate ask : {IS_VALID, IS_VALID_MUTABLE}) {
+        const std::string name = ask == IS_VALID ? "ConstMcc" : "MutableMcc";
         for (const auto& [mcc, isValid] : {std::pair{"450", true}, {"999", false}})
             calls.push_back(predicateCall(name + mcc, ask, mcc, isValid,
                                           entry + SIM_MANAGER.access() + validity(mcc, isValid)));
@@ -397,10 +380,10 @@ TEST_F(CountryTest, FailedCopyOfTheChainedNameGivesNull)
 TEST_F(CountryTest, StrangeMccsAreInvalidAndSupportMo)
 {
     for (const std::string& key : strangeKeys("412")) {
-        for (const Predicate isValid : {isValidMcc, isValidMutableMcc, isValidMccOfSim})
+        for (const Predicate isValid : {IS_VALID, IS_VALID_MUTABLE, IS_VALID_OF_SIM})
             EXPECT_FALSE(isValid(key.c_str())) << key.substr(0, 100);
-        EXPECT_TRUE(isMoSupportMcc(key.c_str()));
-        EXPECT_TRUE(isMoSupportMccOfSim(key.c_str()));
+        EXPECT_TRUE(IS_MO_SUPPORT(key.c_str()));
+        EXPECT_TRUE(IS_MO_SUPPORT_OF_SIM(key.c_str()));
     }
     EXPECT_TRUE(sim.IsMoSupportMcc("")); // the facade alone refuses it
 }
