@@ -72,10 +72,7 @@ const Zone ZONES[] = {
     {"SummerTimeAllYear", "XXX3EDT4,0/0,J365/23", WINTER, -14400, "-14400000000000"},
 };
 
-std::string imeiCall(int slot)
-{
-    return slotCall("telephony_modem_get_imei", slot);
-}
+const auto imeiCall = [](int slot) { return slotCall("telephony_modem_get_imei", slot); };
 
 // Asks with a slot that holds something else; what it holds then.
 char* imei()
@@ -188,15 +185,12 @@ std::vector<LoggedCall> imeiCalls()
 
 // \name Roaming
 
-std::string serviceCall(int slot)
-{
+const auto serviceCall = [](int slot) {
     return slotCall("telephony_network_get_service_state", slot);
-}
-
-std::string roamingCall(int slot)
-{
+};
+const auto roamingCall = [](int slot) {
     return slotCall("telephony_network_get_roaming_status", slot);
-}
+};
 
 std::string roamingLine(const std::string& text)
 {

@@ -154,10 +154,7 @@ void addSubscriptionCalls(LegacyCalls& calls)
         [](auto& target, char* name, int* answer) { return target.CheckSmsEnabled(name, answer); });
 }
 
-std::string initInfoCall(int slot)
-{
-    return modemCall("tel_get_sim_init_info", slot);
-}
+const auto initInfoCall = [](int slot) { return modemCall("tel_get_sim_init_info", slot); };
 
 // Two modems; the status of each slot is to be set.
 void setModems()

@@ -45,45 +45,23 @@ inline std::string slotCall(const std::string& function, int slot)
     return function + "(slot " + std::to_string(slot) + ")";
 }
 
-inline std::string modemOf(int slot)
-{
-    return "cp" + std::to_string(slot);
-}
+inline const auto modemOf = [](int slot) { return "cp" + std::to_string(slot); };
 
 inline std::string modemCall(const std::string& function, int slot)
 {
     return function + "(modem " + modemOf(slot) + ")";
 }
 
-inline std::string initCall(int slot)
-{
-    return "tel_init(" + modemOf(slot) + ")";
-}
-
-inline std::string stateCall(int slot)
-{
-    return slotCall("telephony_sim_get_state", slot);
-}
-
-inline std::string numberCall(int slot)
-{
+inline const auto initCall = [](int slot) { return "tel_init(" + modemOf(slot) + ")"; };
+inline const auto stateCall = [](int slot) { return slotCall("telephony_sim_get_state", slot); };
+inline const auto numberCall = [](int slot) {
     return slotCall("telephony_sim_get_subscriber_number", slot);
-}
-
-inline std::string imsiCall(int slot)
-{
-    return modemCall("tel_get_sim_imsi", slot);
-}
-
-inline std::string listName(unsigned int count)
-{
-    return "list of " + std::to_string(count);
-}
-
-inline std::string deinitCall(unsigned int count)
-{
+};
+inline const auto imsiCall = [](int slot) { return modemCall("tel_get_sim_imsi", slot); };
+inline const auto listName = [](unsigned int count) { return "list of " + std::to_string(count); };
+inline const auto deinitCall = [](unsigned int count) {
     return "telephony_deinit(" + listName(count) + ")";
-}
+};
 
 // A field without room for its NUL is given without one.
 template <std::size_t size>
