@@ -201,12 +201,12 @@ TEST_F(SettingsTest, NoResultCodePlaysAPartForASwitch)
 {
     for (const Switch& row : SWITCHES)
         for (const int code : SETTING_FAILURES) {
-            platform().answer(row.call, code);
-            EXPECT_FALSE(row.answer()) << row.name << code;
-            for (const bool value : {true, false}) {
+            for (const bool value : {false, true}) {
                 platform().answer(row.call, code, value);
                 EXPECT_EQ(row.answer(), value) << row.name << code;
             }
+            platform().answer(row.call, code); // and nothing is left of the answer before
+            EXPECT_FALSE(row.answer()) << row.name << code;
         }
 }
 
