@@ -211,7 +211,7 @@ void setRoaming(int slot, int code, const std::any& value)
 
 // How far a question gets: the list is taken, the slot is asked for its service, and for roaming,
 // which it answers.
-enum Steps { REFUSED, TAKEN, ASKED, IN_SERVICE, ANSWERED };
+enum Steps { NO_LIST, TAKEN, ASKED, IN_SERVICE, ANSWERED };
 
 Texts roamingSteps(int slot, Steps steps)
 {
@@ -241,9 +241,9 @@ std::vector<RoamingCase> roamingCases()
         {"RefusedButWritten", 0, IN_SERVICE, true, true, [] { setRoaming(0, -13, true); }},
         {"ServiceNotTold", 0, ASKED, false, true, [] { setService(0, 0, {}); }},
         {"OfNoSlots", 0, TAKEN, false, true, [] { setSlotCount(0); }, deinitCall(0)},
-        {"WithoutTelephony", 0, REFUSED, false, true, [] { setNoTelephony(); },
+        {"WithoutTelephony", 0, NO_LIST, false, true, [] { setNoTelephony(); },
          "telephony_deinit(no list)"},
-        {"WithListOfFailedCall", 0, REFUSED, false, true,
+        {"WithListOfFailedCall", 0, NO_LIST, false, true,
          [] {
              setSlotCount(2);
              platform().answer("telephony_init()", 1, 2u);

@@ -57,7 +57,7 @@ const Texts REPLIED = SENT + Texts{debugLine(SEND, "Success get reply"), FLUSH_C
                                    debugLine(PARSE, "DBusManager::ParseDeviceUniqueID")};
 const Texts ERROR_REPLIED = REPLIED + Texts{"g_dbus_message_to_gerror()"};
 
-Texts answeredTrace(const std::string& serial)
+Texts serialTrace(const std::string& serial)
 {
     return REPLIED + Texts{debugLine(PARSE, "Success to get deviceUniqueID: " + serial + " "),
                            debugLine(QUESTION, "deviceUniqueID : " + serial)};
@@ -133,7 +133,7 @@ SerialCalls serialCalls()
         return UNANSWERED + Texts{detailLine(SEND, send, error.code, error.message)} + NO_REPLY;
     };
     SerialCalls calls;
-    calls.add("Answered", 0, answeredTrace(SERIAL), [] { bus().answerText(SERIAL); });
+    calls.add("Answered", 0, serialTrace(SERIAL), [] { bus().answerText(SERIAL); });
     calls.add("ConnectionFailedWithoutError", 1,
               REFUSED + Texts{errorLine(INIT, "[dbus] CORE_DBUS_ERROR_CONNECTION_FAIL")},
               [] { bus().refuseConnection({}); });
@@ -273,7 +273,7 @@ TEST_F(DBusManagerTest, EveryTypeButErrorsIsAnAnswer)
         bus().answer(g_variant_new("(s)", "a serial"), type);
         char* const serial = ask(0);
         EXPECT_THAT(serial, StrEq("a serial"));
-        EXPECT_EQ(platform().trace(), answeredTrace("a serial"));
+        EXPECT_EQ(platform().trace(), serialTrace("a serial"));
         std::free(serial);
     }
 }

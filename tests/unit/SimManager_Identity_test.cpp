@@ -278,12 +278,12 @@ std::vector<LoggedCall> firstCalls(const IdentityRead& read)
 
 // \name Every slot
 
-const int UNTOUCHED = 77;
+const int UNTOUCHED_COUNT = 77;
 
 // The answers of a list read, and its count.
 struct Answers {
     std::vector<char*> values;
-    int count = UNTOUCHED;
+    int count = UNTOUCHED_COUNT;
 
     // Frees what the library handed out.
     Texts take()
@@ -358,7 +358,7 @@ std::vector<LoggedCall> listCalls(const IdentityRead& read)
                  setNoTelephony();
                  Answers answers;
                  ask(read, answers);
-                 EXPECT_EQ(answers.count, UNTOUCHED);
+                 EXPECT_EQ(answers.count, UNTOUCHED_COUNT);
                  EXPECT_THAT(answers.values, IsEmpty());
              },
              Texts{CORE_SYSTEM.debug(read.name, read.allEntry)} + accessed(noListTaken())}};
@@ -531,7 +531,7 @@ TEST_P(IdentityReadTest, NoSlotsLeaveWhatTheCallerHolds)
     EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 0"));
     answers.values = {&preset};
     ask(read, answers);
-    EXPECT_EQ(answers.count, UNTOUCHED);
+    EXPECT_EQ(answers.count, UNTOUCHED_COUNT);
     EXPECT_THAT(answers.values, ElementsAre(&preset));
     EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 0", "list of 0"));
     EXPECT_THAT(ledger().live(), IsEmpty());
@@ -554,7 +554,7 @@ TEST_P(IdentityReadTest, NewValuesFollowWhatTheVectorHolds)
 TEST_P(IdentityReadTest, CountIsZeroBeforeTheFirstSlotIsAsked)
 {
     setSlots({KOREAN_CARD});
-    int countThen = UNTOUCHED;
+    int countThen = UNTOUCHED_COUNT;
     platform().onEvent = [&](const Event& event) {
         if (event.text == stateCall(0))
             countThen = answers.count;

@@ -181,7 +181,7 @@ void addExistenceCalls(StateCalls& calls)
               });
 }
 
-StateCalls stateCalls()
+StateCalls simStateCalls()
 {
     StateCalls calls;
     addListCalls(calls);
@@ -202,7 +202,7 @@ StateCalls stateCalls()
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(SimState, LoggedCallTest, testing::ValuesIn(stateCalls()),
+INSTANTIATE_TEST_SUITE_P(SimState, LoggedCallTest, testing::ValuesIn(simStateCalls()),
                          rowName<LoggedCall>);
 
 class SimStateTest : public PlatformTest {};
