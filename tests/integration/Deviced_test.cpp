@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // The service that stands in for the device daemon, started by a private system bus.
+#include <algorithm>
 #include <array>
 #include <csignal>
 #include <cstdlib>
+#include <memory>
+#include <vector>
 
 #include <gmock/gmock.h>
 #include <unistd.h>
@@ -240,6 +243,27 @@ TEST_F(DevicedTest, CallerHasALimitedNumberOfCallsUnderWay)
     EXPECT_THAT(many.serial(), HasSubstr("LimitsExceeded: too many calls under way"));
     useFault("");
     EXPECT_EQ("('SN-4711',)", serial()); // another caller
+}
+
+TEST_F(DevicedTest, CallersTogetherHaveALimitedNumberOfCallsUnderWay)
+{
+    bus.start();
+    ASSERT_EQ("('SN-4711',)", serial()); // it runs
+    useFault("{ delay_ms = 60000 }");
+    std::vector<std::unique_ptr<Client>> callers;
+    const auto sendFrom = [](const Client& caller, int count) {
+        send(caller, count, G_DBUS_MESSAGE_FLAGS_NONE);
+        caller.askBus("GetId", nullptr); // the bus has passed them on
+    };
+    for (int left = 4095; left > 0; left -= 64) {
+        callers.push_back(std::make_unique<Client>(bus.address()));
+        sendFrom(*callers.back(), std::min(left, 64));
+    }
+    EXPECT_THAT(
+        Client(bus.address()).ask(PATH, "org.freedesktop.DBus.Introspectable", "Introspect"),
+        HasSubstr(R"(<arg type="s" name="serial" direction="out")"));
+    sendFrom(*callers.back(), 1);
+    EXPECT_THAT(serial(), HasSubstr("LimitsExceeded: too many calls under way"));
 }
 
 // Runs the service by hand.
