@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // SIM slots of a device file.
+#include "support/Answer.h"
 #include "support/DeviceFileTest.h"
 
 using port::Card;
@@ -9,8 +10,10 @@ using port::Imsi;
 using port::ServiceState;
 using port::Subscriptions;
 using port::Telephony;
-using testing::ElementsAre;
+using testing::AllOf;
+using testing::Each;
 using testing::IsEmpty;
+using testing::SizeIs;
 using testing::StartsWith;
 
 namespace {
@@ -18,13 +21,13 @@ namespace {
 class SimulatorTelephonyTest : public DeviceFileTest {
 protected:
     // The kind of error of every question about a slot.
-    std::vector<Error::Kind> errorsOf(const std::string& name)
+    std::vector<Error::Kind> errorsOf(const std::string& name, const std::string& reason)
     {
         std::vector<Error::Kind> kinds;
         const auto add = [&](const auto& answer) {
             if (!answer) {
                 kinds.push_back(answer.error().kind);
-                EXPECT_THAT(answer.error().reason, StartsWith(path + ":"));
+                EXPECT_THAT(answer.error().reason, StartsWith(reason));
             }
         };
         add(telephony.card(name));
@@ -35,6 +38,11 @@ protected:
         add(telephony.roaming(name));
         add(telephony.smsReady(name));
         return kinds;
+    }
+
+    static auto allAre(Error::Kind kind)
+    {
+        return AllOf(SizeIs(7), Each(kind));
     }
 
     Telephony& telephony = backend->telephony();
@@ -60,8 +68,7 @@ TEST_F(SimulatorTelephonyTest, DeviceMayHaveNoTelephony)
     const std::string reason = line(3) + ": this device has no telephony";
     expectError(Error::Kind::NotSupported, reason, telephony.slots());
     expectError(Error::Kind::NotSupported, reason, telephony.subscriptions());
-    EXPECT_THAT(errorsOf("cp0"),
-                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::NotSupported)));
+    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::NotSupported));
 }
 
 TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
@@ -70,15 +77,13 @@ TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
              "number = '+15550100'\nimei = '490154203237518'\nservice = 'in_service'\n"
              "roaming = true\nsms = false\ncard_changed = true\n");
     const auto card = telephony.card("cp0");
-    ASSERT_TRUE(card);
-    EXPECT_EQ(CardStatus::Ready, card.value().value.status);
-    EXPECT_TRUE(card.value().value.changed);
+    EXPECT_EQ(CardStatus::Ready, valueOf(card).status);
+    EXPECT_TRUE(valueOf(card).changed);
     EXPECT_EQ(line(3), card.value().source);
     const auto imsi = telephony.imsi("cp0");
-    ASSERT_TRUE(imsi);
-    EXPECT_EQ("450", imsi.value().value.mcc);
-    EXPECT_EQ("05", imsi.value().value.mnc);
-    EXPECT_EQ("0123456789", imsi.value().value.msin);
+    EXPECT_EQ("450", valueOf(imsi).mcc);
+    EXPECT_EQ("05", valueOf(imsi).mnc);
+    EXPECT_EQ("0123456789", valueOf(imsi).msin);
     EXPECT_EQ(line(4), imsi.value().source);
     expectAnswer(std::optional<std::string>("+15550100"), line(7), telephony.number("cp0"));
     expectAnswer("490154203237518", line(8), telephony.imei("cp0"));
@@ -90,8 +95,7 @@ TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
 TEST_F(SimulatorTelephonyTest, AbsentKeysOfASlotAreNotAvailable)
 {
     describe("[[slot]]\n");
-    EXPECT_THAT(errorsOf("cp0"),
-                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::NotAvailable)));
+    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::NotAvailable));
     expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
                 telephony.card("cp0"));
     expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
@@ -151,70 +155,72 @@ TEST_F(SimulatorTelephonyTest, ImsiIsWholeOrNotAvailable)
 TEST_F(SimulatorTelephonyTest, UnknownSlotIsNotAvailable)
 {
     describe("[[slot]]\nsim = 'available'\n");
-    for (const char* const name : {"cp1", "", "cp", "CP0"})
+    for (const char* const name : {"cp1", "", "cp", "CP0"}) {
         expectError(Error::Kind::NotAvailable, path + ": no slot " + name, telephony.card(name));
-}
-
-TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatus)
-{
-    const struct {
-        const char* sim;
-        CardStatus status;
-    } rows[] = {
-        {"available", CardStatus::Ready},
-        {"locked", CardStatus::PinRequired},
-        {"pin", CardStatus::PinRequired},
-        {"puk", CardStatus::PukRequired},
-        {"blocked", CardStatus::Blocked},
-        {"network_locked", CardStatus::NetworkLocked},
-        {"absent", CardStatus::Absent},
-        {"removed", CardStatus::Removed},
-        {"error", CardStatus::Error},
-        {"powered_off", CardStatus::PoweredOff},
-        {"initializing", CardStatus::Initializing},
-        {"unknown", CardStatus::Unknown},
-    };
-    for (const auto& row : rows) {
-        describe("[[slot]]\nsim = '" + std::string(row.sim) + "'\nmcc = '450'\nmnc = '05'\n" +
-                 "msin = '1'\nnumber = '5'\n");
-        const auto card = telephony.card("cp0");
-        ASSERT_TRUE(card) << row.sim;
-        EXPECT_EQ(row.status, card.value().value.status) << row.sim;
-        const bool isReady = row.status == CardStatus::Ready;
-        EXPECT_EQ(isReady, static_cast<bool>(telephony.imsi("cp0")));
-        EXPECT_EQ(isReady, static_cast<bool>(telephony.number("cp0")));
-        if (!isReady) {
-            EXPECT_EQ(Error::Kind::NoSim, telephony.imsi("cp0").error().kind);
-            EXPECT_EQ(Error::Kind::NoSim, telephony.number("cp0").error().kind);
-        }
+        EXPECT_THAT(errorsOf(name, path + ": no slot "), allAre(Error::Kind::NotAvailable));
     }
 }
 
-TEST_F(SimulatorTelephonyTest, CardThatCannotBeReadSaysWhy)
+TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatusAndItsReason)
 {
+    const char* const absent = "there is no SIM card";
+    const char* const pin = "the SIM card is locked: it wants a PIN";
+    const char* const puk = "the SIM card is locked: it wants a PUK";
+    const char* const blocked = "the SIM card is locked for good";
+    const char* const bound = "the SIM card is locked to a network, provider or device";
+    const char* const unusable = "the SIM card cannot be used";
+    const char* const off = "the SIM card is switched off";
+    const char* const notYet = "the SIM card is not ready yet";
     const struct {
-        const char* status;
+        const char* key;
+        const char* value;
+        CardStatus status;
         const char* reason;
     } rows[] = {
-        {"card_error", "the SIM card cannot be used"},
-        {"card_not_present", "there is no SIM card"},
-        {"sim_initializing", "the SIM card is not ready yet"},
-        {"sim_pin_required", "the SIM card is locked: it wants a PIN"},
-        {"sim_puk_required", "the SIM card is locked: it wants a PUK"},
-        {"card_blocked", "the SIM card is locked for good"},
-        {"sim_nck_required", "the SIM card is locked to a network, provider or device"},
-        {"sim_nsck_required", "the SIM card is locked to a network, provider or device"},
-        {"sim_spck_required", "the SIM card is locked to a network, provider or device"},
-        {"sim_cck_required", "the SIM card is locked to a network, provider or device"},
-        {"card_removed", "there is no SIM card"},
-        {"sim_lock_required", "the SIM card is locked to a network, provider or device"},
-        {"card_crashed", "the SIM card cannot be used"},
-        {"card_poweroff", "the SIM card is switched off"},
-        {"unknown", "the SIM card is not ready yet"},
+        {"sim", "locked", CardStatus::PinRequired, pin},
+        {"sim", "pin", CardStatus::PinRequired, pin},
+        {"sim", "puk", CardStatus::PukRequired, puk},
+        {"sim", "blocked", CardStatus::Blocked, blocked},
+        {"sim", "network_locked", CardStatus::NetworkLocked, bound},
+        {"sim", "absent", CardStatus::Absent, absent},
+        {"sim", "removed", CardStatus::Removed, absent},
+        {"sim", "error", CardStatus::Error, unusable},
+        {"sim", "powered_off", CardStatus::PoweredOff, off},
+        {"sim", "initializing", CardStatus::Initializing, notYet},
+        {"sim", "unknown", CardStatus::Unknown, notYet},
+        {"init_status", "card_error", CardStatus::Error, unusable},
+        {"init_status", "card_not_present", CardStatus::Absent, absent},
+        {"init_status", "sim_initializing", CardStatus::Initializing, notYet},
+        {"init_status", "sim_pin_required", CardStatus::PinRequired, pin},
+        {"init_status", "sim_puk_required", CardStatus::PukRequired, puk},
+        {"init_status", "card_blocked", CardStatus::Blocked, blocked},
+        {"init_status", "sim_nck_required", CardStatus::NetworkLocked, bound},
+        {"init_status", "sim_nsck_required", CardStatus::SubsetLocked, bound},
+        {"init_status", "sim_spck_required", CardStatus::ProviderLocked, bound},
+        {"init_status", "sim_cck_required", CardStatus::CorporateLocked, bound},
+        {"init_status", "card_removed", CardStatus::Removed, absent},
+        {"init_status", "sim_lock_required", CardStatus::DeviceLocked, bound},
+        {"init_status", "card_crashed", CardStatus::Crashed, unusable},
+        {"init_status", "card_poweroff", CardStatus::PoweredOff, off},
+        {"init_status", "unknown", CardStatus::Unknown, notYet},
     };
     for (const auto& row : rows) {
-        describe("[[slot]]\nsim = 'available'\ninit_status = '" + std::string(row.status) + "'\n");
-        expectError(Error::Kind::NoSim, line(4) + ": " + row.reason, telephony.imsi("cp0"));
+        SCOPED_TRACE(row.value);
+        describe("[[slot]]\nmcc = '450'\nmnc = '05'\nmsin = '1'\nnumber = '5'\n" +
+                 std::string(row.key) + " = '" + row.value + "'\n");
+        EXPECT_EQ(row.status, valueOf(telephony.card("cp0")).status);
+        expectError(Error::Kind::NoSim, line(7) + ": " + row.reason, telephony.imsi("cp0"));
+        expectError(Error::Kind::NoSim, line(7) + ": " + row.reason, telephony.number("cp0"));
+    }
+}
+
+TEST_F(SimulatorTelephonyTest, EveryServiceHasItsState)
+{
+    for (const auto& [service, state] : {std::pair("in_service", ServiceState::InService),
+                                         {"out_of_service", ServiceState::OutOfService},
+                                         {"emergency_only", ServiceState::EmergencyOnly}}) {
+        describe("[[slot]]\nservice = '" + std::string(service) + "'\n");
+        expectAnswer(state, line(3), telephony.service("cp0"));
     }
 }
 
@@ -222,10 +228,9 @@ TEST_F(SimulatorTelephonyTest, DetailedStatusGoesBeforeTheState)
 {
     describe("[[slot]]\nsim = 'absent'\ninit_status = 'sim_init_completed'\n");
     const auto card = telephony.card("cp0");
-    ASSERT_TRUE(card);
-    EXPECT_EQ(CardStatus::Ready, card.value().value.status);
+    EXPECT_EQ(CardStatus::Ready, valueOf(card).status);
     EXPECT_EQ(line(4), card.value().source);
-    EXPECT_FALSE(card.value().value.changed);
+    EXPECT_FALSE(valueOf(card).changed);
 }
 
 TEST_F(SimulatorTelephonyTest, CardWithoutANumberIsNoError)
@@ -239,32 +244,26 @@ TEST_F(SimulatorTelephonyTest, CardWithoutANumberIsNoError)
 TEST_F(SimulatorTelephonyTest, PrivateSlotDeniesEveryQuestion)
 {
     describe("[[slot]]\nsim = 'available'\ndenied = true\n[[slot]]\nsim = 'absent'\n");
-    EXPECT_THAT(errorsOf("cp0"),
-                testing::AllOf(testing::SizeIs(7), testing::Each(Error::Kind::Denied)));
+    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::Denied));
     EXPECT_TRUE(telephony.card("cp1"));
 }
 
-TEST_F(SimulatorTelephonyTest, SubscriptionsAreUnknownWhereTheFileIsSilent)
+TEST_F(SimulatorTelephonyTest, SubscriptionsNameSlotsOrAreUnknown)
 {
-    describe("[[slot]]\n");
-    const auto all = telephony.subscriptions();
-    ASSERT_TRUE(all);
-    EXPECT_EQ(std::nullopt, all.value().value.network);
-    EXPECT_EQ(std::nullopt, all.value().value.data);
-    EXPECT_EQ(Subscriptions::Voice::Unknown, all.value().value.voice);
-    describe("[subscriptions]\nnetwork = 'unknown'\ndata = 'unknown'\nvoice = 'unknown'\n");
-    EXPECT_EQ(std::nullopt, telephony.subscriptions().value().value.network);
-    EXPECT_EQ(std::nullopt, telephony.subscriptions().value().value.data);
-}
-
-TEST_F(SimulatorTelephonyTest, SubscriptionsNameSlots)
-{
+    for (const char* const silent :
+         {"[[slot]]\n",
+          "[subscriptions]\nnetwork = 'unknown'\ndata = 'unknown'\nvoice = 'unknown'\n"}) {
+        describe(silent);
+        const auto all = valueOf(telephony.subscriptions());
+        EXPECT_EQ(std::nullopt, all.network);
+        EXPECT_EQ(std::nullopt, all.data);
+        EXPECT_EQ(Subscriptions::Voice::Unknown, all.voice);
+    }
     describe("[subscriptions]\nnetwork = 0\ndata = 1\nvoice = 'ask_always'\n");
     const auto all = telephony.subscriptions();
-    ASSERT_TRUE(all);
-    EXPECT_EQ(0, all.value().value.network);
-    EXPECT_EQ(1, all.value().value.data);
-    EXPECT_EQ(Subscriptions::Voice::AskAlways, all.value().value.voice);
+    EXPECT_EQ(0, valueOf(all).network);
+    EXPECT_EQ(1, valueOf(all).data);
+    EXPECT_EQ(Subscriptions::Voice::AskAlways, valueOf(all).voice);
     EXPECT_EQ(line(2), all.value().source);
 }
 
