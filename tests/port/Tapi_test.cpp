@@ -28,6 +28,7 @@ using testing::SizeIs;
 namespace {
 
 using ModemHandles = port::Handles<TapiHandle*, port::SlotName>;
+using Names = FakeTelephony::Names;
 
 class TapiTest : public testing::Test {
 protected:
@@ -76,22 +77,16 @@ TEST_F(TapiTest, NamesAreListedInOrder)
 
 TEST_F(TapiTest, NoModemIsAListWithoutNames)
 {
-    telephony.slotsAnswer = answered(FakeTelephony::Names{});
-    ASSERT_NE(nullptr, tel_get_cp_name_list());
-    EXPECT_THAT(textsOf(tel_get_cp_name_list()), IsEmpty());
-}
-
-TEST_F(TapiTest, PlaceOfASlotThatWentAwayHoldsNoName)
-{
-    telephony.slotsAnswer = answered(FakeTelephony::Names{});
+    telephony.slotsAnswer = answered(Names{});
     char** const names = tel_get_cp_name_list();
+    ASSERT_NE(nullptr, names);
     for (std::size_t slot = 0; slot <= port::SLOT_LIMIT; ++slot)
-        EXPECT_EQ(nullptr, names[slot]) << slot;
+        EXPECT_EQ(nullptr, names[slot]) << "the place of a slot that went away: " << slot;
 }
 
 TEST_F(TapiTest, NoListIsLongerThanTheLimit)
 {
-    FakeTelephony::Names names;
+    Names names;
     while (names.size() < port::SLOT_LIMIT)
         names.push_back("modem" + std::to_string(names.size()));
     telephony.slotsAnswer = answered(names);
@@ -117,40 +112,33 @@ TEST_F(TapiTest, NoServiceIsNoList)
 TEST_F(TapiTest, ListsStayAndAreNotMultiplied)
 {
     char** const first = tel_get_cp_name_list();
-    telephony.slotsAnswer = answered(FakeTelephony::Names{"other"});
+    telephony.slotsAnswer = answered(Names{"other"});
     char** const second = tel_get_cp_name_list();
     EXPECT_NE(first, second);
     EXPECT_THAT(textsOf(second), ElementsAre("other"));
     EXPECT_THAT(textsOf(first), ElementsAre("modem0", "modem1"));
-    telephony.slotsAnswer = answered(FakeTelephony::Names{"modem0", "modem1"});
+    telephony.slotsAnswer = answered(Names{"modem0", "modem1"});
     EXPECT_EQ(first, tel_get_cp_name_list());
 }
 
-TEST_F(TapiTest, ModemIsOpenedByItsName)
+TEST_F(TapiTest, ModemIsOpenedByItsNameAndTheFirstOneWithout)
 {
-    TapiHandle* const handle = tel_init("modem1");
-    ASSERT_NE(nullptr, handle);
-    telephony.questions.clear();
-    EXPECT_EQ(0, tel_get_sim_imsi(handle, &imsi));
-    EXPECT_THAT(telephony.questions, ElementsAre("imsi modem1"));
-    EXPECT_EQ(0, tel_deinit(handle));
-}
-
-TEST_F(TapiTest, NoNameIsTheFirstModem)
-{
-    TapiHandle* const handle = tel_init(nullptr);
-    ASSERT_NE(nullptr, handle);
-    telephony.questions.clear();
-    EXPECT_EQ(0, tel_get_sim_imsi(handle, &imsi));
-    EXPECT_THAT(telephony.questions, ElementsAre("imsi modem0"));
-    EXPECT_EQ(0, tel_deinit(handle));
+    for (const auto& [name, question] :
+         {std::pair("modem1", "imsi modem1"), {nullptr, "imsi modem0"}}) {
+        TapiHandle* const handle = tel_init(name);
+        ASSERT_NE(nullptr, handle);
+        telephony.questions.clear();
+        EXPECT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+        EXPECT_THAT(telephony.questions, ElementsAre(question));
+        EXPECT_EQ(0, tel_deinit(handle));
+    }
 }
 
 TEST_F(TapiTest, UnknownModemsAreNotOpened)
 {
     for (const char* const name : {"", "modem", "modem00", "MODEM0", " modem0"})
         EXPECT_EQ(nullptr, tel_init(name)) << name;
-    telephony.slotsAnswer = answered(FakeTelephony::Names{});
+    telephony.slotsAnswer = answered(Names{});
     EXPECT_EQ(nullptr, tel_init(nullptr));
     telephony.slotsAnswer = port::notAvailable("no service");
     EXPECT_EQ(nullptr, tel_init("modem0"));
@@ -227,21 +215,17 @@ TEST_F(TapiHandleTest, NullSlotsAreInvalid)
 
 TEST_F(TapiHandleTest, EveryErrorHasItsCode)
 {
-    const struct {
-        port::Error error;
-        int code;
-    } rows[] = {{port::notAvailable("gone"), -17},
-                {port::notSupported("no radio"), -3},
-                {port::denied("private"), -19}};
-    for (const auto& row : rows) {
-        telephony.imsiAnswer = row.error;
-        telephony.cardAnswer = row.error;
-        telephony.subscriptionsAnswer = row.error;
-        telephony.smsAnswer = row.error;
-        EXPECT_THAT(askAll(handle), Each(row.code));
+    for (const auto& [error, code] : {std::pair(port::notAvailable("gone"), -17),
+                                      {port::notSupported("no radio"), -3},
+                                      {port::denied("private"), -19}}) {
+        telephony.imsiAnswer = error;
+        telephony.cardAnswer = error;
+        telephony.subscriptionsAnswer = error;
+        telephony.smsAnswer = error;
+        EXPECT_THAT(askAll(handle), Each(code));
         for (const Question question : {Question::SimIdentity, Question::SimCard,
                                         Question::Subscriptions, Question::SmsReadiness})
-            EXPECT_EQ(row.error.reason, lastOrigin(question).reason);
+            EXPECT_EQ(error.reason, lastOrigin(question).reason);
     }
 }
 
@@ -270,115 +254,90 @@ TEST_F(TapiHandleTest, ImsiThatDoesNotFitIsNotCut)
     }
 }
 
-TEST_F(TapiHandleTest, UnreadableCardSaysWhy)
+TEST_F(TapiHandleTest, BothGenerationsTellEveryCardAndWhyItCannotBeRead)
 {
     const struct {
         CardStatus status;
-        int code;
-    } rows[] = {{CardStatus::Absent, -501},      {CardStatus::Removed, -501},
-                {CardStatus::Error, -501},       {CardStatus::PinRequired, -503},
-                {CardStatus::PukRequired, -503}, {CardStatus::NetworkLocked, -503},
-                {CardStatus::Blocked, -504},     {CardStatus::Initializing, -502},
-                {CardStatus::Unknown, -502},     {CardStatus::Ready, -502}};
+        int number;
+        telephony_sim_state_e state;
+        int imsiCode;
+    } rows[] = {
+        {CardStatus::Error, 0, TELEPHONY_SIM_STATE_UNAVAILABLE, -501},
+        {CardStatus::Absent, 1, TELEPHONY_SIM_STATE_UNAVAILABLE, -501},
+        {CardStatus::Initializing, 2, TELEPHONY_SIM_STATE_UNKNOWN, -502},
+        {CardStatus::Ready, 3, TELEPHONY_SIM_STATE_AVAILABLE, -502},
+        {CardStatus::PinRequired, 4, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::PukRequired, 5, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::Blocked, 6, TELEPHONY_SIM_STATE_LOCKED, -504},
+        {CardStatus::NetworkLocked, 7, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::SubsetLocked, 8, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::ProviderLocked, 9, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::CorporateLocked, 10, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::Removed, 11, TELEPHONY_SIM_STATE_UNAVAILABLE, -501},
+        {CardStatus::DeviceLocked, 12, TELEPHONY_SIM_STATE_LOCKED, -503},
+        {CardStatus::Crashed, 13, TELEPHONY_SIM_STATE_UNAVAILABLE, -501},
+        {CardStatus::PoweredOff, 14, TELEPHONY_SIM_STATE_UNAVAILABLE, -501},
+        {CardStatus::Unknown, 255, TELEPHONY_SIM_STATE_UNKNOWN, -502},
+    };
+    telephony_handle_list_s list = {};
+    ASSERT_EQ(0, telephony_init(&list));
     telephony.imsiAnswer = port::noSim("why");
     for (const auto& row : rows) {
+        SCOPED_TRACE(row.number);
         setCard(row.status);
-        EXPECT_EQ(row.code, tel_get_sim_imsi(handle, &imsi)) << static_cast<int>(row.status);
+        ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
+        EXPECT_EQ(row.number, static_cast<int>(status));
+        EXPECT_EQ(0, changed);
+        auto state = static_cast<telephony_sim_state_e>(3);
+        ASSERT_EQ(0, telephony_sim_get_state(list.handle[0], &state));
+        EXPECT_EQ(row.state, state);
+        EXPECT_EQ(row.imsiCode, tel_get_sim_imsi(handle, &imsi));
         EXPECT_STREQ("", imsi.szMcc);
     }
+    EXPECT_EQ("test", lastOrigin(Question::SimCard).source);
+    EXPECT_EQ(0, telephony_deinit(&list));
+    setCard(CardStatus::Ready, true);
+    ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
+    EXPECT_EQ(1, changed);
     telephony.cardAnswer = port::notAvailable("gone in between");
     EXPECT_EQ(-17, tel_get_sim_imsi(handle, &imsi));
     EXPECT_EQ("why", lastOrigin(Question::SimIdentity).reason);
 }
 
-TEST_F(TapiHandleTest, EveryCardStatusHasItsNumber)
-{
-    const struct {
-        CardStatus status;
-        int number;
-    } rows[] = {{CardStatus::Error, 0},
-                {CardStatus::Absent, 1},
-                {CardStatus::Initializing, 2},
-                {CardStatus::Ready, 3},
-                {CardStatus::PinRequired, 4},
-                {CardStatus::PukRequired, 5},
-                {CardStatus::Blocked, 6},
-                {CardStatus::NetworkLocked, 7},
-                {CardStatus::SubsetLocked, 8},
-                {CardStatus::ProviderLocked, 9},
-                {CardStatus::CorporateLocked, 10},
-                {CardStatus::Removed, 11},
-                {CardStatus::DeviceLocked, 12},
-                {CardStatus::Crashed, 13},
-                {CardStatus::PoweredOff, 14},
-                {CardStatus::Unknown, 255}};
-    for (const auto& row : rows) {
-        setCard(row.status);
-        ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
-        EXPECT_EQ(row.number, static_cast<int>(status));
-        EXPECT_EQ(0, changed);
-    }
-    setCard(CardStatus::Ready, true);
-    ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
-    EXPECT_EQ(1, changed);
-}
-
-TEST_F(TapiHandleTest, BothGenerationsAgree)
-{
-    telephony_handle_list_s list = {};
-    ASSERT_EQ(0, telephony_init(&list));
-    for (int value = 0; value <= static_cast<int>(CardStatus::Unknown); ++value) {
-        setCard(static_cast<CardStatus>(value));
-        telephony_sim_state_e state = TELEPHONY_SIM_STATE_UNKNOWN;
-        ASSERT_EQ(0, telephony_sim_get_state(list.handle[0], &state));
-        ASSERT_EQ(0, tel_get_sim_init_info(handle, &status, &changed));
-        EXPECT_EQ(status == TAPI_SIM_STATUS_SIM_INIT_COMPLETED,
-                  state == TELEPHONY_SIM_STATE_AVAILABLE);
-    }
-    EXPECT_EQ(0, telephony_deinit(&list));
-}
-
 TEST_F(TapiHandleTest, SubscriptionsAreNumberedFromTheFirstSlot)
 {
-    const struct {
-        std::optional<int> slot;
-        int name;
-    } rows[] = {{std::nullopt, -1}, {0, 0}, {1, 1}, {2, -1}};
-    for (const auto& row : rows) {
+    for (const auto& [slot, name] :
+         {std::pair(std::optional<int>(), -1), {0, 0}, {1, 1}, {2, -1}}) {
         Subscriptions all;
-        all.network = row.slot;
+        all.network = slot;
         telephony.subscriptionsAnswer = answered(all);
         TelNetworkDefaultSubs_t network = TAPI_NETWORK_DEFAULT_SUBS_UNKNOWN;
         TelNetworkDefaultDataSubs_t data = TAPI_NETWORK_DEFAULT_DATA_SUBS_SIM1;
         ASSERT_EQ(0, tel_get_network_default_subscription(handle, &network));
         ASSERT_EQ(0, tel_get_network_default_data_subscription(handle, &data));
-        EXPECT_EQ(row.name, static_cast<int>(network));
+        EXPECT_EQ(name, static_cast<int>(network));
         EXPECT_EQ(TAPI_NETWORK_DEFAULT_DATA_SUBS_UNKNOWN, data);
         std::swap(all.network, all.data);
         telephony.subscriptionsAnswer = answered(all);
         ASSERT_EQ(0, tel_get_network_default_data_subscription(handle, &data));
-        EXPECT_EQ(row.name, static_cast<int>(data));
+        EXPECT_EQ(name, static_cast<int>(data));
     }
 }
 
 TEST_F(TapiHandleTest, EveryVoicePreferenceHasItsNumber)
 {
     using Voice = Subscriptions::Voice;
-    const struct {
-        Voice voice;
-        int number;
-    } rows[] = {{Voice::Unknown, -1},
-                {Voice::CurrentNetwork, 0},
-                {Voice::AskAlways, 1},
-                {Voice::Slot1, 2},
-                {Voice::Slot2, 3}};
-    for (const auto& row : rows) {
+    for (const auto& [preference, number] : {std::pair(Voice::Unknown, -1),
+                                             {Voice::CurrentNetwork, 0},
+                                             {Voice::AskAlways, 1},
+                                             {Voice::Slot1, 2},
+                                             {Voice::Slot2, 3}}) {
         Subscriptions all;
-        all.voice = row.voice;
+        all.voice = preference;
         telephony.subscriptionsAnswer = answered(all);
         TelCallPreferredVoiceSubs_t voice = TAPI_CALL_PREFERRED_VOICE_SUBS_UNKNOWN;
         ASSERT_EQ(0, tel_get_call_preferred_voice_subscription(handle, &voice));
-        EXPECT_EQ(row.number, static_cast<int>(voice));
+        EXPECT_EQ(number, static_cast<int>(voice));
     }
 }
 

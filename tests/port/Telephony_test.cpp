@@ -14,8 +14,9 @@
 
 using coresystem_port::lastOrigin;
 using coresystem_port::Question;
-using port::CardStatus;
+using testing::Each;
 using testing::ElementsAre;
+using testing::IsEmpty;
 
 namespace {
 
@@ -35,6 +36,10 @@ namespace {
 using SlotHandles = port::Handles<telephony_h, port::SlotName>;
 
 char* const UNTOUCHED = reinterpret_cast<char*>(1);
+
+const std::pair<port::Error, int> ERRORS[] = {{port::notAvailable("no service"), -39845887},
+                                              {port::notSupported("a tablet"), -1073741822},
+                                              {port::denied("private"), -13}};
 
 class TelephonyTest : public testing::Test {
 protected:
@@ -101,12 +106,14 @@ TEST_F(TelephonyTest, EveryListIsCountedUntilItIsReleased)
     EXPECT_EQ(0U, port::liveTelephonyLists());
 }
 
-TEST_F(TelephonyTest, ReleaseEmptiesTheList)
+TEST_F(TelephonyTest, ReleaseEmptiesTheListAndASecondOneOfACopyIsInvalid)
 {
     open();
+    telephony_handle_list_s copy = list;
     EXPECT_EQ(0, telephony_deinit(&list));
     EXPECT_EQ(0U, list.count);
     EXPECT_EQ(nullptr, list.handle);
+    EXPECT_EQ(-22, telephony_deinit(&copy));
 }
 
 TEST_F(TelephonyTest, ListThatWasNeverFilledIsNoError)
@@ -115,14 +122,6 @@ TEST_F(TelephonyTest, ListThatWasNeverFilledIsNoError)
     list.count = 7; // whatever was on the stack
     EXPECT_EQ(0, telephony_deinit(&list));
     EXPECT_EQ(0U, list.count);
-}
-
-TEST_F(TelephonyTest, SecondReleaseOfACopyIsInvalid)
-{
-    open();
-    telephony_handle_list_s copy = list;
-    EXPECT_EQ(0, telephony_deinit(&list));
-    EXPECT_EQ(-22, telephony_deinit(&copy));
 }
 
 TEST_F(TelephonyTest, ForeignListIsInvalidAndLeftAlone)
@@ -138,7 +137,7 @@ TEST_F(TelephonyTest, NullListIsInvalid)
 {
     EXPECT_EQ(-22, telephony_init(nullptr));
     EXPECT_EQ(-22, telephony_deinit(nullptr));
-    EXPECT_THAT(telephony.questions, testing::IsEmpty());
+    EXPECT_THAT(telephony.questions, IsEmpty());
 }
 
 TEST_F(TelephonyTest, ServiceWithoutAModemIsAnEmptyList)
@@ -154,65 +153,25 @@ TEST_F(TelephonyTest, ServiceWithoutAModemIsAnEmptyList)
 
 TEST_F(TelephonyTest, ListThatCannotBeHadSaysWhyAndStaysUntouched)
 {
-    const struct {
-        port::Error error;
-        int code;
-    } rows[] = {{port::notAvailable("no service"), -39845887},
-                {port::notSupported("a tablet"), -1073741822},
-                {port::denied("private"), -13}};
-    for (const auto& row : rows) {
-        telephony.slotsAnswer = row.error;
+    for (const auto& [error, code] : ERRORS) {
+        telephony.slotsAnswer = error;
         list = {7, nullptr};
-        EXPECT_EQ(row.code, telephony_init(&list));
+        EXPECT_EQ(code, telephony_init(&list));
         EXPECT_EQ(7U, list.count);
-        EXPECT_EQ(row.error.reason, lastOrigin(Question::SimSlots).reason);
+        EXPECT_EQ(error.reason, lastOrigin(Question::SimSlots).reason);
     }
-}
-
-TEST_F(TelephonyListTest, StateFollowsTheCard)
-{
-    const struct {
-        CardStatus status;
-        telephony_sim_state_e state;
-    } rows[] = {
-        {CardStatus::Ready, TELEPHONY_SIM_STATE_AVAILABLE},
-        {CardStatus::PinRequired, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::PukRequired, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::Blocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::NetworkLocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::SubsetLocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::ProviderLocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::CorporateLocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::DeviceLocked, TELEPHONY_SIM_STATE_LOCKED},
-        {CardStatus::Absent, TELEPHONY_SIM_STATE_UNAVAILABLE},
-        {CardStatus::Removed, TELEPHONY_SIM_STATE_UNAVAILABLE},
-        {CardStatus::Error, TELEPHONY_SIM_STATE_UNAVAILABLE},
-        {CardStatus::Crashed, TELEPHONY_SIM_STATE_UNAVAILABLE},
-        {CardStatus::PoweredOff, TELEPHONY_SIM_STATE_UNAVAILABLE},
-        {CardStatus::Initializing, TELEPHONY_SIM_STATE_UNKNOWN},
-        {CardStatus::Unknown, TELEPHONY_SIM_STATE_UNKNOWN},
-    };
-    for (const auto& row : rows) {
-        telephony.cardAnswer = answered(port::Card{row.status, false});
-        ASSERT_EQ(0, telephony_sim_get_state(handle, &simState));
-        EXPECT_EQ(row.state, simState) << static_cast<int>(row.status);
-    }
-    EXPECT_EQ("test", lastOrigin(Question::SimCard).source);
 }
 
 TEST_F(TelephonyListTest, ServiceStateIsTold)
 {
-    const struct {
-        port::ServiceState service;
-        int state;
-    } rows[] = {{port::ServiceState::InService, 0},
-                {port::ServiceState::OutOfService, 1},
-                {port::ServiceState::EmergencyOnly, 2}};
-    for (const auto& row : rows) {
-        telephony.serviceAnswer = answered(row.service);
-        telephony_network_service_state_e state = TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE;
+    const port::ServiceState services[] = {port::ServiceState::InService,
+                                           port::ServiceState::OutOfService,
+                                           port::ServiceState::EmergencyOnly};
+    for (int number = 0; number < 3; ++number) {
+        telephony.serviceAnswer = answered(services[number]);
+        auto state = static_cast<telephony_network_service_state_e>(3);
         ASSERT_EQ(0, telephony_network_get_service_state(handle, &state));
-        EXPECT_EQ(row.state, state);
+        EXPECT_EQ(number, state);
     }
 }
 
@@ -241,50 +200,41 @@ TEST_F(TelephonyListTest, TextsAreCopiesOfTheCallersOwn)
     EXPECT_STREQ("+15550100", slot);
 }
 
-TEST_F(TelephonyListTest, CardWithoutANumberIsAnErrorThatStoresNull)
+TEST_F(TelephonyListTest, CardWithoutANumberStoresNullAndIsAnErrorUnlessAFileAsksForSuccess)
 {
-    telephony.numberAnswer = answered(FakeTelephony::Number());
-    EXPECT_EQ(-39845887, telephony_sim_get_subscriber_number(handle, &slot));
-    EXPECT_EQ(nullptr, slot);
-}
-
-TEST_F(TelephonyListTest, DeviceFileMayAskForSuccessWithoutANumber)
-{
-    telephony.numberAnswer = answered(FakeTelephony::Number(""));
-    EXPECT_EQ(0, telephony_sim_get_subscriber_number(handle, &slot));
-    EXPECT_EQ(nullptr, slot);
+    for (const auto& [number, code] : {std::pair(FakeTelephony::Number(), -39845887), {"", 0}}) {
+        telephony.numberAnswer = answered(number);
+        slot = UNTOUCHED;
+        EXPECT_EQ(code, telephony_sim_get_subscriber_number(handle, &slot));
+        EXPECT_EQ(nullptr, slot);
+    }
 }
 
 TEST_F(TelephonyListTest, EveryErrorHasItsCodeAndLeavesTheSlotUntouched)
 {
-    const struct {
-        port::Error error;
-        int code;
-    } rows[] = {{port::notAvailable("gone"), -39845887},
-                {port::notSupported("no radio"), -1073741822},
-                {port::denied("private"), -13},
-                {port::noSim("no card"), -39841791}};
-    for (const auto& row : rows) {
-        telephony.cardAnswer = row.error;
-        telephony.numberAnswer = row.error;
-        telephony.imeiAnswer = row.error;
-        telephony.serviceAnswer = row.error;
-        telephony.roamingAnswer = row.error;
+    std::vector<std::pair<port::Error, int>> errors(std::begin(ERRORS), std::end(ERRORS));
+    errors.emplace_back(port::noSim("no card"), -39841791);
+    for (const auto& [error, code] : errors) {
+        telephony.cardAnswer = error;
+        telephony.numberAnswer = error;
+        telephony.imeiAnswer = error;
+        telephony.serviceAnswer = error;
+        telephony.roamingAnswer = error;
         telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
         telephony_network_service_state_e service = TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY;
         bool roaming = true;
-        EXPECT_EQ(row.code, telephony_sim_get_state(handle, &state));
-        EXPECT_EQ(row.code, telephony_sim_get_subscriber_number(handle, &slot));
-        EXPECT_EQ(row.code, telephony_modem_get_imei(handle, &slot));
-        EXPECT_EQ(row.code, telephony_network_get_service_state(handle, &service));
-        EXPECT_EQ(row.code, telephony_network_get_roaming_status(handle, &roaming));
+        EXPECT_EQ(code, telephony_sim_get_state(handle, &state));
+        EXPECT_EQ(code, telephony_sim_get_subscriber_number(handle, &slot));
+        EXPECT_EQ(code, telephony_modem_get_imei(handle, &slot));
+        EXPECT_EQ(code, telephony_network_get_service_state(handle, &service));
+        EXPECT_EQ(code, telephony_network_get_roaming_status(handle, &roaming));
         EXPECT_EQ(UNTOUCHED, slot);
         EXPECT_EQ(TELEPHONY_SIM_STATE_LOCKED, state);
         EXPECT_EQ(TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY, service);
         EXPECT_TRUE(roaming);
         for (const Question question : {Question::SimCard, Question::PhoneNumber, Question::Imei,
                                         Question::NetworkService, Question::Roaming})
-            EXPECT_EQ(row.error.reason, lastOrigin(question).reason);
+            EXPECT_EQ(error.reason, lastOrigin(question).reason);
     }
 }
 
@@ -314,8 +264,8 @@ TEST_F(TelephonyTest, NullReleasedAndForeignHandlesAreInvalid)
     int onTheStack = 0;
     for (const telephony_h handle :
          {telephony_h{}, released, otherKind, reinterpret_cast<telephony_h>(&onTheStack)})
-        EXPECT_THAT(readAll(handle), testing::Each(-22));
-    EXPECT_THAT(telephony.questions, testing::IsEmpty());
+        EXPECT_THAT(readAll(handle), Each(-22));
+    EXPECT_THAT(telephony.questions, IsEmpty());
     EXPECT_TRUE((port::Handles<TapiHandle*, port::SlotName>::close(modem)));
 }
 
@@ -326,7 +276,7 @@ TEST_F(TelephonyListTest, NullSlotsAreInvalid)
     EXPECT_EQ(-22, telephony_modem_get_imei(handle, nullptr));
     EXPECT_EQ(-22, telephony_network_get_service_state(handle, nullptr));
     EXPECT_EQ(-22, telephony_network_get_roaming_status(handle, nullptr));
-    EXPECT_THAT(telephony.questions, testing::IsEmpty());
+    EXPECT_THAT(telephony.questions, IsEmpty());
 }
 
 TEST_F(TelephonyListTest, EachReadIsOneQuestion)
