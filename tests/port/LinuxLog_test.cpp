@@ -74,26 +74,19 @@ TEST_F(LinuxLogTest, LinesOfManyThreadsStayWhole)
     EXPECT_EQ(800, count);
 }
 
-TEST_F(LinuxLogTest, ClosedStandardErrorIsToldToTheCaller)
-{
-    const int kept = dup(STDERR_FILENO);
-    close(STDERR_FILENO);
-    const bool written = write(DLOG_INFO, "CoreSystem", "text");
-    dup2(kept, STDERR_FILENO);
-    close(kept);
-    EXPECT_FALSE(written);
-}
-
-TEST_F(LinuxLogTest, FullDiskIsToldToTheCaller)
+TEST_F(LinuxLogTest, ClosedStandardErrorAndAFullDiskAreToldToTheCaller)
 {
     const int kept = dup(STDERR_FILENO);
     const int full = open("/dev/full", O_WRONLY);
+    close(STDERR_FILENO);
+    const bool writtenToNothing = write(DLOG_INFO, "CoreSystem", "text");
     dup2(full, STDERR_FILENO);
-    const bool written = write(DLOG_INFO, "CoreSystem", "text");
+    const bool writtenToAFullDisk = write(DLOG_INFO, "CoreSystem", "text");
     dup2(kept, STDERR_FILENO);
     close(full);
     close(kept);
-    EXPECT_FALSE(written);
+    EXPECT_FALSE(writtenToNothing);
+    EXPECT_FALSE(writtenToAFullDisk);
 }
 
 // A pipe in the place of standard error, as long as this lives. Nobody reads it.
@@ -193,12 +186,21 @@ protected:
         return std::string(record, size > 0 ? static_cast<std::size_t>(size) : 0);
     }
 
-    // The standard error of a process with this /run.
-    std::string standardErrorOf(int priority, const std::string& text, LogSink sink)
+    // What a process with this /run captures.
+    template <typename Work>
+    std::string inPlaceOfRun(Work work)
     {
         return inChild([&]() -> std::string {
             if (!enterPrivateMounts() || !bindFolder(tree.root(), "/run"))
                 return "failed";
+            return work();
+        });
+    }
+    // The standard error of such a process, and where its lines go by themselves.
+    std::string standardErrorOf(int priority, const std::string& text,
+                                LogSink sink = LogSink::Automatic)
+    {
+        return inPlaceOfRun([&] {
             coresystem_port::setLogSink(sink);
             CapturedStandardError log;
             const bool written = write(priority, "CoreSystem", text);
@@ -214,26 +216,22 @@ protected:
 TEST_F(JournalTest, LinesGoToTheJournalWhenItIsThere)
 {
     listen();
-    EXPECT_EQ("journal", standardErrorOf(DLOG_ERROR, "one line", LogSink::Automatic));
+    EXPECT_EQ("journal", standardErrorOf(DLOG_ERROR, "one line"));
     EXPECT_EQ(field("MESSAGE", "one line") + field("PRIORITY", "3") +
                   field("SYSLOG_IDENTIFIER", "CoreSystem"),
               received());
-}
-
-TEST_F(JournalTest, LongTextReachesTheJournalWhole)
-{
-    listen();
-    standardErrorOf(DLOG_INFO, std::string(20000, 'x'), LogSink::Automatic);
+    standardErrorOf(DLOG_INFO, std::string(20000, 'x'));
     EXPECT_THAT(received(), HasSubstr(std::string(20000, 'x')));
+    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text", LogSink::StandardError),
+                MatchesRegex("W/CoreSystem\\([ 0-9]+\\): text\njournal"));
+    EXPECT_EQ("", received()) << "standard error was chosen";
 }
 
 TEST_F(JournalTest, LinesGoToStandardErrorWhenTheJournalStalls)
 {
     listen(); // and never read
     const auto start = std::chrono::steady_clock::now();
-    EXPECT_THAT(inChild([&]() -> std::string {
-                    if (!enterPrivateMounts() || !bindFolder(tree.root(), "/run"))
-                        return "failed";
+    EXPECT_THAT(inPlaceOfRun([] {
                     CapturedStandardError log;
                     bool written = true;
                     for (int line = 0; line < 3000; ++line)
@@ -245,26 +243,14 @@ TEST_F(JournalTest, LinesGoToStandardErrorWhenTheJournalStalls)
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
 }
 
-TEST_F(JournalTest, WithoutAJournalLinesGoToStandardError)
+TEST_F(JournalTest, LinesGoToStandardErrorWithoutAJournalAndWhenItDied)
 {
-    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text", LogSink::Automatic),
+    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text"),
                 MatchesRegex("W/CoreSystem\\([ 0-9]+\\): text\nstandard error"));
-}
-
-TEST_F(JournalTest, JournalThatDiedIsReplacedByStandardError)
-{
     listen();
     close(std::exchange(socket_, -1)); // its socket file stays
-    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text", LogSink::Automatic),
+    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text"),
                 MatchesRegex("W/CoreSystem\\([ 0-9]+\\): text\njournal"));
-}
-
-TEST_F(JournalTest, ChosenStandardErrorIsTakenAlsoWithAJournal)
-{
-    listen();
-    EXPECT_THAT(standardErrorOf(DLOG_WARN, "text", LogSink::StandardError),
-                MatchesRegex("W/CoreSystem\\([ 0-9]+\\): text\njournal"));
-    EXPECT_EQ("", received());
 }
 
 } // namespace

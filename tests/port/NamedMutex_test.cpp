@@ -21,66 +21,62 @@ void countSlowly(int& count)
     count = before + 1;
 }
 
-TEST(NamedMutexTest, ScopedLocksOfOneNameExclude)
+// Every thread counts 200 times, each time while `countOnce(number, count)` holds the mutex.
+template <typename Work>
+void expectExclusion(int threads, Work countOnce)
 {
     int count = 0;
-    together(8, [&](int) {
-        for (int round = 0; round < 200; ++round) {
-            const CoreMutexLock lock("NamedMutexTest::scoped");
-            countSlowly(count);
-        }
+    together(threads, [&](int number) {
+        for (int round = 0; round < 200; ++round)
+            countOnce(number, count);
     });
-    EXPECT_EQ(8 * 200, count);
+    EXPECT_EQ(threads * 200, count);
+}
+
+TEST(NamedMutexTest, ScopedLocksOfOneNameExclude)
+{
+    expectExclusion(8, [](int, int& count) {
+        const CoreMutexLock lock("NamedMutexTest::scoped");
+        countSlowly(count);
+    });
 }
 
 TEST(NamedMutexTest, BothClassesMeanTheSameMutex)
 {
-    int count = 0;
-    together(8, [&](int number) {
-        CoreMutex mutex("NamedMutexTest::both");
-        for (int round = 0; round < 200; ++round) {
-            if (number % 2 == 0) {
-                const CoreMutexLock lock("NamedMutexTest::both");
-                countSlowly(count);
-            } else {
-                mutex.Lock();
-                countSlowly(count);
-                mutex.Unlock();
-            }
+    expectExclusion(8, [](int number, int& count) {
+        if (number % 2 == 0) {
+            const CoreMutexLock lock("NamedMutexTest::both");
+            countSlowly(count);
+        } else {
+            CoreMutex mutex("NamedMutexTest::both");
+            mutex.Lock();
+            countSlowly(count);
+            mutex.Unlock();
         }
     });
-    EXPECT_EQ(8 * 200, count);
 }
 
 TEST(NamedMutexTest, HolderMayTakeItAgain)
 {
-    int count = 0;
-    together(4, [&](int) {
-        for (int round = 0; round < 200; ++round) {
-            const CoreMutexLock outer("NamedMutexTest::again");
-            {
-                const CoreMutexLock inner("NamedMutexTest::again");
-                CoreMutex mutex("NamedMutexTest::again");
-                mutex.Lock();
-                mutex.Unlock();
-            }
-            countSlowly(count); // the outer lock still holds
+    expectExclusion(4, [](int, int& count) {
+        const CoreMutexLock outer("NamedMutexTest::again");
+        {
+            const CoreMutexLock inner("NamedMutexTest::again");
+            CoreMutex mutex("NamedMutexTest::again");
+            mutex.Lock();
+            mutex.Unlock();
         }
+        countSlowly(count); // the outer lock still holds
     });
-    EXPECT_EQ(4 * 200, count);
 }
 
 TEST(NamedMutexTest, LockOutlivesTheObjectThatTookIt)
 {
-    int count = 0;
-    together(4, [&](int) {
-        for (int round = 0; round < 200; ++round) {
-            CoreMutex("NamedMutexTest::outlives").Lock();
-            countSlowly(count);
-            CoreMutex("NamedMutexTest::outlives").Unlock();
-        }
+    expectExclusion(4, [](int, int& count) {
+        CoreMutex("NamedMutexTest::outlives").Lock();
+        countSlowly(count);
+        CoreMutex("NamedMutexTest::outlives").Unlock();
     });
-    EXPECT_EQ(4 * 200, count);
 }
 
 TEST(NamedMutexTest, ThousandNamesAreThousandMutexes)
@@ -113,31 +109,23 @@ TEST(NamedMutexTest, ThreadsThatMakeTheSameNameAtOnceGetOneMutex)
 TEST(NamedMutexTest, NameIsCopied)
 {
     std::string name = "NamedMutexTest::copied";
-    int count = 0;
     CoreMutex mutex(name.c_str());
     name.assign(name.size(), 'x');
-    together(4, [&](int number) {
-        for (int round = 0; round < 200; ++round) {
-            CoreMutex own("NamedMutexTest::copied");
-            CoreMutex& used = number % 2 == 0 ? mutex : own;
-            used.Lock();
-            countSlowly(count);
-            used.Unlock();
-        }
+    expectExclusion(4, [&](int number, int& count) {
+        CoreMutex own("NamedMutexTest::copied");
+        CoreMutex& used = number % 2 == 0 ? mutex : own;
+        used.Lock();
+        countSlowly(count);
+        used.Unlock();
     });
-    EXPECT_EQ(4 * 200, count);
 }
 
 TEST(NamedMutexTest, NullIsTheEmptyName)
 {
-    int count = 0;
-    together(4, [&](int number) {
-        for (int round = 0; round < 200; ++round) {
-            const CoreMutexLock lock(number % 2 == 0 ? nullptr : "");
-            countSlowly(count);
-        }
+    expectExclusion(4, [](int number, int& count) {
+        const CoreMutexLock lock(number % 2 == 0 ? nullptr : "");
+        countSlowly(count);
     });
-    EXPECT_EQ(4 * 200, count);
 }
 
 TEST(NamedMutexTest, UnlockByAThreadThatDoesNotHoldItDoesNothing)
@@ -145,15 +133,11 @@ TEST(NamedMutexTest, UnlockByAThreadThatDoesNotHoldItDoesNothing)
 #if defined(__SANITIZE_THREAD__)
     GTEST_SKIP() << "the thread sanitizer reports such an unlock, as it should";
 #endif
-    int count = 0;
-    together(4, [&](int) {
-        for (int round = 0; round < 200; ++round) {
-            const CoreMutexLock lock("NamedMutexTest::not held");
-            std::thread([] { CoreMutex("NamedMutexTest::not held").Unlock(); }).join();
-            countSlowly(count);
-        }
+    expectExclusion(4, [](int, int& count) {
+        const CoreMutexLock lock("NamedMutexTest::not held");
+        std::thread([] { CoreMutex("NamedMutexTest::not held").Unlock(); }).join();
+        countSlowly(count);
     });
-    EXPECT_EQ(4 * 200, count);
 }
 
 } // namespace

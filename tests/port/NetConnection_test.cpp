@@ -19,6 +19,8 @@ namespace {
 
 using Answers = FakeNetwork::Answers;
 
+constexpr int INVALID = CONNECTION_ERROR_INVALID_PARAMETER;
+
 class NetConnectionTest : public testing::Test {
 protected:
     NetConnectionTest()
@@ -31,30 +33,17 @@ protected:
         EXPECT_EQ(0U, Connections::live());
     }
 
-    int cellular()
+    // Every read answers with a code.
+    void expectCode(int code, connection_h handle)
     {
-        return connection_get_cellular_state(connection, &cellularState);
+        EXPECT_EQ(code, connection_get_cellular_state(handle, &cellularState));
+        EXPECT_EQ(code, connection_get_wifi_state(handle, &wifiState));
+        EXPECT_EQ(code, connection_get_bt_state(handle, &bluetoothState));
     }
-    int wifi()
-    {
-        return connection_get_wifi_state(connection, &wifiState);
-    }
-    int bluetooth()
-    {
-        return connection_get_bt_state(connection, &bluetoothState);
-    }
-
     // Every read fails with a code and leaves its state alone.
-    void expectFailures(const port::Error& error, int code)
+    void expectFailure(int code, connection_h handle)
     {
-        backend.fakeNetwork.change([&error](Answers& answers) {
-            answers.cellular = error;
-            answers.wifi = error;
-            answers.bluetooth = error;
-        });
-        EXPECT_EQ(code, cellular());
-        EXPECT_EQ(code, wifi());
-        EXPECT_EQ(code, bluetooth());
+        expectCode(code, handle);
         EXPECT_EQ(CONNECTION_CELLULAR_STATE_ROAMING_OFF, cellularState);
         EXPECT_EQ(CONNECTION_WIFI_STATE_DISCONNECTED, wifiState);
         EXPECT_EQ(CONNECTION_BT_STATE_DISCONNECTED, bluetoothState);
@@ -67,61 +56,52 @@ protected:
     connection_bt_state_e bluetoothState = CONNECTION_BT_STATE_DISCONNECTED;
 };
 
-TEST_F(NetConnectionTest, EveryCellularStateHasThePlatformsNumber)
+TEST_F(NetConnectionTest, EveryStateHasThePlatformsNumber)
 {
     const CellularState states[] = {CellularState::OutOfService, CellularState::FlightMode,
                                     CellularState::RoamingOff,   CellularState::CallOnlyAvailable,
                                     CellularState::Available,    CellularState::Connected};
+    const LinkState links[] = {LinkState::Deactivated, LinkState::Disconnected,
+                               LinkState::Connected};
     for (int number = 0; number < 6; ++number) {
-        backend.fakeNetwork.change(
-            [&](Answers& answers) { answers.cellular = answered(states[number]); });
-        EXPECT_EQ(0, cellular());
-        EXPECT_EQ(number, static_cast<int>(cellularState));
-    }
-}
-
-TEST_F(NetConnectionTest, EveryLinkStateHasThePlatformsNumber)
-{
-    const LinkState states[] = {LinkState::Deactivated, LinkState::Disconnected,
-                                LinkState::Connected};
-    for (int number = 0; number < 3; ++number) {
         backend.fakeNetwork.change([&](Answers& answers) {
-            answers.wifi = answered(states[number]);
-            answers.bluetooth = answered(states[2 - number]);
+            answers.cellular = answered(states[number]);
+            answers.wifi = answered(links[number % 3]);
+            answers.bluetooth = answered(links[2 - number % 3]);
         });
-        EXPECT_EQ(0, wifi());
-        EXPECT_EQ(0, bluetooth());
-        EXPECT_EQ(number, static_cast<int>(wifiState));
-        EXPECT_EQ(2 - number, static_cast<int>(bluetoothState));
+        expectCode(0, connection);
+        EXPECT_EQ(number, static_cast<int>(cellularState));
+        EXPECT_EQ(number % 3, static_cast<int>(wifiState));
+        EXPECT_EQ(2 - number % 3, static_cast<int>(bluetoothState));
     }
+    for (const Question question : {Question::Cellular, Question::Wifi, Question::Bluetooth})
+        EXPECT_EQ("test", lastOrigin(question).source);
 }
 
 TEST_F(NetConnectionTest, FailuresHaveTheirCodesAndLeaveTheStateAlone)
 {
-    expectFailures(port::notAvailable("why"), CONNECTION_ERROR_OPERATION_FAILED);
-    expectFailures(port::notSupported("why"), CONNECTION_ERROR_NOT_SUPPORTED);
-    expectFailures(port::denied("why"), CONNECTION_ERROR_PERMISSION_DENIED);
-}
-
-TEST_F(NetConnectionTest, OriginsAreKept)
-{
-    cellular();
-    bluetooth();
-    backend.fakeNetwork.change([](Answers& answers) { answers.wifi = port::denied("no"); });
-    wifi();
-    EXPECT_EQ("test", lastOrigin(Question::Cellular).source);
-    EXPECT_EQ("test", lastOrigin(Question::Bluetooth).source);
-    EXPECT_EQ("no", lastOrigin(Question::Wifi).reason);
+    for (const auto& [error, code] :
+         {std::pair(port::notAvailable("gone"), CONNECTION_ERROR_OPERATION_FAILED),
+          {port::notSupported("none"), CONNECTION_ERROR_NOT_SUPPORTED},
+          {port::denied("no"), CONNECTION_ERROR_PERMISSION_DENIED}}) {
+        backend.fakeNetwork.change([&why = error](Answers& answers) {
+            answers.cellular = why;
+            answers.wifi = why;
+            answers.bluetooth = why;
+        });
+        expectFailure(code, connection);
+        for (const Question question : {Question::Cellular, Question::Wifi, Question::Bluetooth})
+            EXPECT_EQ(error.reason, lastOrigin(question).reason);
+    }
 }
 
 TEST_F(NetConnectionTest, NullArgumentsAreInvalid)
 {
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_create(nullptr));
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_destroy(nullptr));
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER,
-              connection_get_cellular_state(connection, nullptr));
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_get_wifi_state(connection, nullptr));
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_get_bt_state(connection, nullptr));
+    EXPECT_EQ(INVALID, connection_create(nullptr));
+    EXPECT_EQ(INVALID, connection_destroy(nullptr));
+    EXPECT_EQ(INVALID, connection_get_cellular_state(connection, nullptr));
+    EXPECT_EQ(INVALID, connection_get_wifi_state(connection, nullptr));
+    EXPECT_EQ(INVALID, connection_get_bt_state(connection, nullptr));
 }
 
 TEST_F(NetConnectionTest, HandleThatIsNoneIsInvalid)
@@ -131,16 +111,10 @@ TEST_F(NetConnectionTest, HandleThatIsNoneIsInvalid)
     EXPECT_NE(connection, released);
     EXPECT_EQ(2U, Connections::live());
     ASSERT_EQ(0, connection_destroy(released));
-    EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_destroy(released));
+    EXPECT_EQ(INVALID, connection_destroy(released));
     int something = 0;
-    for (const connection_h none : {connection_h(), released, static_cast<void*>(&something)}) {
-        EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER,
-                  connection_get_cellular_state(none, &cellularState));
-        EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER, connection_get_wifi_state(none, &wifiState));
-        EXPECT_EQ(CONNECTION_ERROR_INVALID_PARAMETER,
-                  connection_get_bt_state(none, &bluetoothState));
-    }
-    EXPECT_EQ(CONNECTION_CELLULAR_STATE_ROAMING_OFF, cellularState);
+    for (const connection_h none : {connection_h(), released, static_cast<void*>(&something)})
+        expectFailure(INVALID, none);
 }
 
 TEST_F(NetConnectionTest, ThreadsHaveHandlesOfTheirOwn)

@@ -9,10 +9,6 @@
 #include "support/Answer.h"
 #include "support/DeviceFileTest.h"
 
-using port::CardStatus;
-using port::CellularState;
-using port::FontSize;
-using port::LinkState;
 using port::devicefile::BusFault;
 using port::devicefile::DeviceFile;
 using port::devicefile::Fault;
@@ -47,40 +43,6 @@ protected:
 
     DeviceFile file{path};
 };
-
-TEST_F(SimulatorSchemaTest, EveryKindOfValueIsReadWithItsLine)
-{
-    describe(
-        "[device]\nserial = 'R58'\ntelephony = false\n[settings]\nfont_size = 'huge'\n"
-        "utc_offset = -18000\n[network]\ncellular = 'call_only_available'\nwifi = 'connected'\n"
-        "[storage]\nblocks = 9223372036854775807\n");
-    expectAnswer("R58", line(3), file.get<std::string>("device", "serial"));
-    expectAnswer(false, line(4), file.get<bool>("device", "telephony"));
-    expectAnswer(FontSize::Huge, line(6), file.get<FontSize>("settings", "font_size"));
-    expectAnswer(-18000, line(7), file.get<int>("settings", "utc_offset"));
-    expectAnswer(CellularState::CallOnlyAvailable, line(9),
-                 file.get<CellularState>("network", "cellular"));
-    expectAnswer(LinkState::Connected, line(10), file.get<LinkState>("network", "wifi"));
-    expectAnswer(std::numeric_limits<std::int64_t>::max(), line(12),
-                 file.get<std::int64_t>("storage", "blocks"));
-}
-
-TEST_F(SimulatorSchemaTest, AbsentKeyAndAbsentSectionAreNotAvailable)
-{
-    describe("[network]\n");
-    for (const char* const key : {"cellular", "bluetooth"})
-        expectError(port::Error::Kind::NotAvailable, line(2) + ": [network] has no " + key,
-                    file.get<LinkState>("network", key));
-    expectError(port::Error::Kind::NotAvailable, path + ": [storage] has no blocks",
-                file.get<std::int64_t>("storage", "blocks"));
-}
-
-TEST_F(SimulatorSchemaTest, DeviceMayLackARadio)
-{
-    describe("[network]\nwifi = 'not_supported'\n");
-    expectError(port::Error::Kind::NotSupported, line(3) + ": this device has no wifi",
-                file.get<LinkState>("network", "wifi"));
-}
 
 TEST_F(SimulatorSchemaTest, SwitchesAreTrueOrFalse)
 {
@@ -147,12 +109,6 @@ TEST_F(SimulatorSchemaTest, EveryNameIsTaken)
             else
                 EXPECT_EQ(static_cast<std::int64_t>(i), value.value().value) << name;
         }
-}
-
-TEST_F(SimulatorSchemaTest, FontSizesBeyondTheNamedOnesArePassedThrough)
-{
-    describe("[settings]\nfont_size = 7\n");
-    expectAnswer(static_cast<FontSize>(7), line(3), file.get<FontSize>("settings", "font_size"));
 }
 
 TEST_F(SimulatorSchemaTest, DigitsAreCounted)
