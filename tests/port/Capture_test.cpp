@@ -7,88 +7,40 @@
 #include "support/DeviceFileTest.h"
 #include "support/FakeBackend.h"
 
-using coresystem_port::CaptureOptions;
 using port::CardStatus;
 using port::devicefile::Device;
 using port::devicefile::Section;
 using port::simulator::capture;
+using testing::AllOf;
 using testing::HasSubstr;
 using testing::Not;
 
 namespace {
 
-const char EVERYTHING[] = R"([device]
-platform_id = "5d3f0a9c71e84b62a0c4d8e6f1b27390"
-platform_name = "Tizen"
-platform_version = "2.3.1"
-model_name = "A \"model\"\n"
-serial = "R38DUAL0001"
-[settings]
-device_name = "Küchentelefon"
-language = "ko_KR.UTF-8"
-sales_code = ""
-font_size = "huge"
-flight_mode = false
-data_roaming = false
-mobile_data = true
-packet_data = true
-utc_offset = -12600
-[[slot]]
-sim = "available"
-card_changed = true
-mcc = "310"
-mnc = "260"
-msin = "123456789"
-number = "+12025550143"
-imei = "356938035643809"
-service = "in_service"
-roaming = true
-operator = "R\u00e9seau"
-operator_mcc = "208"
-operator_mnc = "01"
-access_technology = "lte"
-signal = 0
-power = "low"
-iccid = "8999900000000000010"
-pin_retries = 2
-sms = true
-cp_name = "modem"
-[[slot]]
-init_status = "sim_spck_required"
-imei = "490154203237518"
-service = "emergency_only"
-roaming = false
-pin_retries = 3
-sms = false
-[[slot]]
-denied = true
-[[slot]]
-sim = "available"
-mcc = "262"
-mnc = "01"
-msin = "0123456789"
-number = "null"
-pin_retries = 0
-[subscriptions]
-network = 0
-data = 1
-voice = "ask_always"
-[network]
-cellular = "call_only_available"
-wifi = "connected"
-wifi_connection = "configuration"
-ssid = "Caf\u00e9"
-bluetooth = "not_supported"
-ethernet = "connected"
-connectivity = "portal"
-[storage]
-block_size = 4096
-fragment_size = 1024
-blocks = 4194304
-available_blocks = 9223372036854775807
-[packages]
-"org.example.clock" = "1.2.3"
-)";
+const char EVERYTHING[] =
+    "device = { platform_id = '5d3f0a9c71e84b62a0c4d8e6f1b27390', platform_name = 'Tizen', "
+    "platform_version = '2.3.1', model_name = \"A \\\"model\\\"\\n\", serial = 'R38DUAL0001' }\n"
+    "settings = { device_name = 'Küchentelefon', language = 'ko_KR.UTF-8', sales_code = '', "
+    "font_size = 'huge', flight_mode = false, data_roaming = false, mobile_data = true, "
+    "packet_data = true, utc_offset = -12600 }\n"
+    "slot = [\n"
+    "{ sim = 'available', card_changed = true, mcc = '310', mnc = '260', msin = '123456789', "
+    "number = '+12025550143', imei = '356938035643809', service = 'in_service', roaming = true, "
+    "operator = \"R\\u00e9seau\", operator_mcc = '208', operator_mnc = '01', "
+    "access_technology = 'lte', signal = 0, power = 'low', iccid = '8999900000000000010', "
+    "pin_retries = 2, sms = true, cp_name = 'modem' },\n"
+    "{ init_status = 'sim_spck_required', imei = '490154203237518', service = 'emergency_only', "
+    "roaming = false, pin_retries = 3, sms = false },\n"
+    "{ denied = true },\n"
+    "{ sim = 'available', mcc = '262', mnc = '01', msin = '0123456789', number = 'null', "
+    "pin_retries = 0 } ]\n"
+    "subscriptions = { network = 0, data = 1, voice = 'ask_always' }\n"
+    "network = { cellular = 'call_only_available', wifi = 'connected', "
+    "wifi_connection = 'configuration', ssid = \"Caf\\u00e9\", bluetooth = 'not_supported', "
+    "ethernet = 'connected', connectivity = 'portal' }\n"
+    "storage = { block_size = 4096, fragment_size = 1024, blocks = 4194304, "
+    "available_blocks = 9223372036854775807 }\n"
+    "packages = { 'org.example.clock' = '1.2.3' }\n";
 
 Device deviceOf(const std::string& text)
 {
@@ -122,11 +74,6 @@ void expectSame(const port::devicefile::SectionRow& row, const Section& wanted, 
 
 class CaptureTest : public DeviceFileTest {
 protected:
-    static CaptureOptions everything()
-    {
-        return {true, {"org.example.clock", "org.example.radio"}};
-    }
-
     static std::string captured(FakeBackend& fake, bool reveal = false)
     {
         const std::string text = capture(fake, {reveal, {}});
@@ -140,7 +87,8 @@ TEST_F(CaptureTest, EveryKeyOfADeviceFileIsCaptured)
     describe(EVERYTHING);
     ASSERT_EQ("", backend->deviceFileProblem());
     const Device wanted = deviceOf("schema = 1\n" + std::string(EVERYTHING));
-    const Device got = deviceOf(capture(*backend, everything()));
+    const Device got =
+        deviceOf(capture(*backend, {true, {"org.example.clock", "org.example.radio"}}));
     for (const char* const name : {"device", "settings", "subscriptions", "network", "storage"})
         expectSame(*port::devicefile::findSection(name), wanted.section(name), got.section(name));
     ASSERT_EQ(wanted.slots.size(), got.slots.size());
@@ -179,10 +127,10 @@ TEST_F(CaptureTest, ServiceThatDoesNotAnswerIsNoServiceWithoutModem)
 {
     FakeBackend fake;
     fake.fakeTelephony.slotsAnswer = port::notAvailable("nobody\nanswers");
-    EXPECT_THAT(captured(fake), testing::AllOf(HasSubstr("\ntelephony_init = \"TELEPHONY_ERROR_"
-                                                         "OPERATION_FAILED\" # nobody answers\n"),
-                                               HasSubstr("\ntel_init = \"null\""),
-                                               HasSubstr("\ntel_get_cp_name_list = \"null\"")));
+    EXPECT_THAT(captured(fake), AllOf(HasSubstr("\ntelephony_init = \"TELEPHONY_ERROR_"
+                                                "OPERATION_FAILED\" # nobody answers\n"),
+                                      HasSubstr("\ntel_init = \"null\""),
+                                      HasSubstr("\ntel_get_cp_name_list = \"null\"")));
     fake.fakeTelephony.slotsAnswer = port::denied("not yours");
     EXPECT_THAT(captured(fake), HasSubstr("\"TELEPHONY_ERROR_PERMISSION_DENIED\" # not yours\n"));
     fake.fakeTelephony.slotsAnswer = port::notSupported("a tablet");
@@ -215,11 +163,10 @@ TEST_F(CaptureTest, RadioThatFailsIsNotOneThatIsOffOrMissing)
     });
     EXPECT_THAT(
         captured(fake),
-        testing::AllOf(
-            HasSubstr("\nconnection_get_wifi_state = \"CONNECTION_ERROR_PERMISSION_DENIED\""),
-            HasSubstr("\nconnection_get_cellular_state = "
-                      "\"CONNECTION_ERROR_OPERATION_FAILED\" # no answer\n"),
-            HasSubstr("\nbluetooth = \"not_supported\" # no such radio\n")));
+        AllOf(HasSubstr("\nconnection_get_wifi_state = \"CONNECTION_ERROR_PERMISSION_DENIED\""),
+              HasSubstr("\nconnection_get_cellular_state = "
+                        "\"CONNECTION_ERROR_OPERATION_FAILED\" # no answer\n"),
+              HasSubstr("\nbluetooth = \"not_supported\" # no such radio\n")));
 }
 
 TEST_F(CaptureTest, BadTextsStayReadable)

@@ -98,15 +98,6 @@ protected:
     std::vector<std::string> told;
 };
 
-TEST_F(ChangeEventsTest, NothingIsToldWithoutAChange)
-{
-    for (const Change change : ALL)
-        listen(change, "x");
-    EXPECT_THAT(taken(), IsEmpty());
-    network.tell();
-    EXPECT_THAT(taken(), IsEmpty());
-}
-
 TEST_F(ChangeEventsTest, EveryChangeIsToldWithItsValueInAFixedOrder)
 {
     const char* const NAMES[] = {"device", "connection", "status", "data", "flight", "roaming"};
@@ -132,6 +123,9 @@ TEST_F(ChangeEventsTest, OnlyWhatChangedIsTold)
 {
     for (const Change change : ALL)
         listen(change, std::to_string(static_cast<int>(change)) + "=");
+    EXPECT_THAT(taken(), IsEmpty());
+    network.tell();
+    EXPECT_THAT(taken(), IsEmpty());
     network.change([](Answers& answers) { answers.packetData = answered(true); });
     EXPECT_THAT(taken(), ElementsAre("3=1"));
     network.change([](Answers& answers) { answers.wifi = answered(LinkState::Connected); });

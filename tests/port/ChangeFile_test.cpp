@@ -18,7 +18,7 @@
 #include "support/Child.h"
 #include "support/TemporaryTree.h"
 
-using testing::AllOf;
+using port::devicefile::changeFile;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::UnorderedElementsAre;
@@ -38,7 +38,7 @@ protected:
     }
     static std::string addLineTo(const std::string& file, const std::string& line)
     {
-        return port::devicefile::changeFile(file, LIMIT, [&](std::string& content) {
+        return changeFile(file, LIMIT, [&](std::string& content) {
             content += line + "\n";
             return std::string();
         });
@@ -51,7 +51,13 @@ protected:
         return text.str();
     }
 
-    // Lists the folder: a file left behind would show.
+    // The file as it was, and nothing left behind in its folder.
+    void expectUntouched() const
+    {
+        EXPECT_EQ("first\n", content());
+        EXPECT_THAT(names(), ElementsAre("file"));
+    }
+
     std::vector<std::string> names() const
     {
         std::vector<std::string> found;
@@ -94,21 +100,19 @@ TEST_F(ChangeFileTest, OwnerIsKeptWhereThatIsPermitted)
 TEST_F(ChangeFileTest, UnchangedContentIsNotWritten)
 {
     const ino_t before = status().st_ino;
-    EXPECT_EQ(
-        "", port::devicefile::changeFile(path, LIMIT, [](std::string&) { return std::string(); }));
+    EXPECT_EQ("", changeFile(path, LIMIT, [](std::string&) { return std::string(); }));
     EXPECT_EQ(before, status().st_ino);
 }
 
 TEST_F(ChangeFileTest, RefusalLeavesTheFile)
 {
-    EXPECT_EQ("no", port::devicefile::changeFile(path, LIMIT, [](std::string& text) {
+    EXPECT_EQ("no", changeFile(path, LIMIT, [](std::string& text) {
                   text = "other";
                   return std::string("no");
               }));
-    EXPECT_EQ("first\n", content());
     EXPECT_THAT(addLineTo(tree.path("/none"), "x"), HasSubstr("No such file or directory"));
     EXPECT_THAT(addLineTo(tree.root(), "x"), HasSubstr("Is a directory"));
-    EXPECT_THAT(names(), ElementsAre("file"));
+    expectUntouched();
 }
 
 TEST_F(ChangeFileTest, LinkGoesOnLeadingToTheFile)
@@ -124,8 +128,7 @@ TEST_F(ChangeFileTest, ReadOnlyFileIsRefusedWhereTheFolderIsNot)
 {
     ASSERT_EQ(0, chmod(path.c_str(), 0444));
     EXPECT_THAT(addLine("second"), HasSubstr("Permission denied"));
-    EXPECT_EQ("first\n", content());
-    EXPECT_THAT(names(), ElementsAre("file"));
+    expectUntouched();
 }
 
 TEST_F(ChangeFileTest, ReadOnlyFolderIsAnError)
@@ -138,8 +141,7 @@ TEST_F(ChangeFileTest, ReadOnlyFolderIsAnError)
                 }),
                 HasSubstr("Permission denied"));
     ASSERT_EQ(0, chmod(tree.root().c_str(), 0755));
-    EXPECT_EQ("first\n", content());
-    EXPECT_THAT(names(), ElementsAre("file"));
+    expectUntouched();
 }
 
 TEST_F(ChangeFileTest, FullDiskLeavesTheOldFileWhole)
@@ -150,8 +152,7 @@ TEST_F(ChangeFileTest, FullDiskLeavesTheOldFileWhole)
                     return setrlimit(RLIMIT_FSIZE, &tiny) == 0 ? addLine("second") : "no limit";
                 }),
                 HasSubstr("File too large"));
-    EXPECT_EQ("first\n", content());
-    EXPECT_THAT(names(), ElementsAre("file"));
+    expectUntouched();
 }
 
 TEST_F(ChangeFileTest, WhatKilledWritersLeftIsCollected)
@@ -181,7 +182,7 @@ TEST_F(ChangeFileTest, WhoMayOnlyReadCannotKeepWritersOut)
     ASSERT_EQ(0, flock(reader.number(), LOCK_EX));
     EXPECT_EQ("", addLine("second"));
     EXPECT_THAT(inChild([this] {
-                    return port::devicefile::changeFile(path, LIMIT, [this](std::string&) {
+                    return changeFile(path, LIMIT, [this](std::string&) {
                         struct stat lock = {};
                         return stat(tree.path("/.file.coresystem-lock").c_str(), &lock) == 0 &&
                                        (lock.st_mode & 07777) == 0600
@@ -229,10 +230,8 @@ TEST_F(ChangeFileTest, ManyWritersLoseNothing)
     EXPECT_EQ("first", line);
     int count = 0;
     for (; std::getline(lines, line); ++count) {
-        const int writer = std::stoi(line);
-        EXPECT_EQ(std::to_string(writer) + "." +
-                      std::to_string(next.at(static_cast<std::size_t>(writer))++),
-                  line);
+        const auto writer = static_cast<std::size_t>(std::stoi(line));
+        EXPECT_EQ(std::to_string(writer) + "." + std::to_string(next.at(writer)++), line);
     }
     EXPECT_EQ(WRITERS * LINES, count);
     EXPECT_THAT(names(), ElementsAre("file"));

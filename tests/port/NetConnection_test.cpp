@@ -7,7 +7,6 @@
 #include "coresystem_port.h"
 #include "shim/HandleKinds.h"
 #include "support/FakeBackend.h"
-#include "support/Together.h"
 
 using coresystem_port::lastOrigin;
 using coresystem_port::Question;
@@ -115,20 +114,6 @@ TEST_F(NetConnectionTest, HandleThatIsNoneIsInvalid)
     int something = 0;
     for (const connection_h none : {connection_h(), released, static_cast<void*>(&something)})
         expectFailure(INVALID, none);
-}
-
-TEST_F(NetConnectionTest, ThreadsHaveHandlesOfTheirOwn)
-{
-    together(8, [](int) {
-        for (int round = 0; round < 100; ++round) {
-            connection_h own = nullptr;
-            connection_wifi_state_e state = CONNECTION_WIFI_STATE_CONNECTED;
-            EXPECT_EQ(0, connection_create(&own));
-            EXPECT_EQ(0, connection_get_wifi_state(own, &state));
-            EXPECT_EQ(CONNECTION_WIFI_STATE_DISCONNECTED, state);
-            EXPECT_EQ(0, connection_destroy(own));
-        }
-    });
 }
 
 } // namespace

@@ -33,12 +33,14 @@ protected:
     }
 
     // Both functions that take a name fail alike.
-    void expectFailure(int code)
+    void expectFailure(int code, const Answer<Version>& failure, const std::string& reason)
     {
+        answer(failure);
         package_info_h none = nullptr;
         EXPECT_EQ(code, package_info_create("app", &none));
         EXPECT_EQ(nullptr, none);
         EXPECT_EQ(code, package_manager_get_package_size_info("app", nullptr, nullptr));
+        EXPECT_EQ(reason, lastOrigin(Question::PackageVersion).reason);
     }
 
     FakedBackend backend;
@@ -46,38 +48,30 @@ protected:
     char* version = nullptr;
 };
 
-TEST_F(PackagesTest, VersionIsTheOneOfTheHandlesPackage)
+TEST_F(PackagesTest, VersionIsTheOneOfTheHandlesPackageInACopyForEachCall)
 {
+    char* second = nullptr;
     ASSERT_EQ(0, package_info_create("app", &info));
     EXPECT_EQ("test", lastOrigin(Question::PackageVersion).source);
     answer(answered(Version("2.0"))); // an update does not change what the handle tells
     ASSERT_EQ(0, package_info_get_version(info, &version));
-    EXPECT_STREQ("1.0", version);
-    EXPECT_EQ(1U, InstalledPackages::live());
-    EXPECT_EQ(0, package_info_destroy(info));
-}
-
-TEST_F(PackagesTest, EachCallHandsOutACopyOfItsOwn)
-{
-    char* second = nullptr;
-    ASSERT_EQ(0, package_info_create("app", &info));
-    ASSERT_EQ(0, package_info_get_version(info, &version));
     ASSERT_EQ(0, package_info_get_version(info, &second));
+    EXPECT_STREQ("1.0", version);
+    EXPECT_STREQ("1.0", second);
     EXPECT_NE(version, second);
     free(second);
+    EXPECT_EQ(1U, InstalledPackages::live());
     EXPECT_EQ(0, package_info_destroy(info));
 }
 
 TEST_F(PackagesTest, NamesGoThroughUnchanged)
 {
-    const std::vector<std::string> names = {
-        "",
-        " app ",
-        "a\nb",
-        "../../etc/passwd",
-        "$(touch x); `id` | cat",
-        std::string(10000000, 'x'),
-    };
+    const std::vector<std::string> names = {"",
+                                            " app ",
+                                            "a\nb",
+                                            "../../etc/passwd",
+                                            "$(touch x); `id` | cat",
+                                            std::string(10000000, 'x')};
     std::vector<std::string> asked;
     backend.versionAnswer = [&asked](const std::string& name) {
         asked.push_back(name);
@@ -91,16 +85,11 @@ TEST_F(PackagesTest, NamesGoThroughUnchanged)
 
 TEST_F(PackagesTest, FailuresHaveTheirCodes)
 {
-    answer(answered(Version()));
-    expectFailure(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE);
-    EXPECT_EQ("test: not installed", lastOrigin(Question::PackageVersion).reason);
-    answer(port::notAvailable("why"));
-    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR);
-    EXPECT_EQ("why", lastOrigin(Question::PackageVersion).reason);
-    answer(port::notSupported("why"));
-    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR);
-    answer(port::denied("why"));
-    expectFailure(PACKAGE_MANAGER_ERROR_PERMISSION_DENIED);
+    expectFailure(PACKAGE_MANAGER_ERROR_NO_SUCH_PACKAGE, answered(Version()),
+                  "test: not installed");
+    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR, port::notAvailable("gone"), "gone");
+    expectFailure(PACKAGE_MANAGER_ERROR_IO_ERROR, port::notSupported("none"), "none");
+    expectFailure(PACKAGE_MANAGER_ERROR_PERMISSION_DENIED, port::denied("no"), "no");
 }
 
 TEST_F(PackagesTest, NullArgumentsAreInvalid)
@@ -113,7 +102,7 @@ TEST_F(PackagesTest, NullArgumentsAreInvalid)
     EXPECT_EQ(nullptr, version);
 }
 
-TEST_F(PackagesTest, ReleasedHandleIsInvalid)
+TEST_F(PackagesTest, HandleThatWasReleasedOrIsOfAnotherKindIsInvalid)
 {
     ASSERT_EQ(0, package_info_create("app", &info));
     EXPECT_EQ(-22, package_info_get_version(info, nullptr));
@@ -121,22 +110,14 @@ TEST_F(PackagesTest, ReleasedHandleIsInvalid)
     EXPECT_EQ(-22, package_info_destroy(info));
     EXPECT_EQ(-22, package_info_get_version(info, &version));
     EXPECT_EQ(nullptr, version);
-}
-
-TEST_F(PackagesTest, HandleOfAnotherKindIsInvalid)
-{
     const connection_h connection = port::Connections::open({});
     EXPECT_EQ(-22, package_info_destroy(static_cast<package_info_h>(connection)));
     EXPECT_TRUE(port::Connections::close(connection));
 }
 
-TEST_F(PackagesTest, InstalledPackageIsKnownWithoutACallback)
+TEST_F(PackagesTest, InstalledPackageIsKnownWithoutACallbackAndSizesAreNotMadeUp)
 {
     EXPECT_EQ(0, package_manager_get_package_size_info("app", nullptr, nullptr));
-}
-
-TEST_F(PackagesTest, SizesAreNotMadeUp)
-{
     const auto never = [](const char*, const package_size_info_t*, void*) { ADD_FAILURE(); };
     EXPECT_EQ(PACKAGE_MANAGER_ERROR_SYSTEM_ERROR,
               package_manager_get_package_size_info("app", never, nullptr));

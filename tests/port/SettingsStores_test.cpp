@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Settings, configuration store and clock over a backend that answers what a test says.
 #include <cstdlib>
+#include <tuple>
 
 #include <app_alarm.h>
 #include <gmock/gmock.h>
@@ -54,19 +55,25 @@ TEST_F(SettingsStoresTest, FontSizesHaveThePlatformsNumbers)
 
 TEST_F(SettingsStoresTest, FailuresHaveTheirCodesAndLeaveTheValueAlone)
 {
-    const std::pair<port::Error, int> failures[] = {
-        {port::notAvailable("why"), SYSTEM_SETTINGS_ERROR_IO_ERROR},
-        {port::notSupported("why"), SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED},
-        {port::denied("why"), SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED},
-    };
-    for (const auto& failure : failures) {
-        backend.fontSizeAnswer = failure.first;
+    std::tm date = {};
+    date.tm_mday = 78;
+    for (const auto& [error, code, clockCode] :
+         {std::tuple(port::notAvailable("why"), SYSTEM_SETTINGS_ERROR_IO_ERROR,
+                     ALARM_ERROR_CONNECTION_FAIL),
+          {port::notSupported("why"), SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED,
+           ALARM_ERROR_CONNECTION_FAIL},
+          {port::denied("why"), SYSTEM_SETTINGS_ERROR_PERMISSION_DENIED,
+           ALARM_ERROR_PERMISSION_DENIED}}) {
+        backend.fontSizeAnswer = error;
+        backend.nowAnswer = error;
         backend.fakeNetwork.change(
-            [&](FakeNetwork::Answers& answers) { answers.mobileData = failure.first; });
-        EXPECT_EQ(failure.second, mobileData());
-        EXPECT_EQ(failure.second, fontSize());
+            [&why = error](FakeNetwork::Answers& answers) { answers.mobileData = why; });
+        EXPECT_EQ(code, mobileData());
+        EXPECT_EQ(code, fontSize());
+        EXPECT_EQ(clockCode, alarm_get_current_time(&date));
         EXPECT_TRUE(on);
         EXPECT_EQ(77, size);
+        EXPECT_EQ(78, date.tm_mday);
     }
 }
 
@@ -89,14 +96,10 @@ TEST_F(SettingsStoresTest, ConfigurationIsReadByKey)
     EXPECT_EQ("test", lastOrigin(Question::SalesCode).source);
 }
 
-TEST_F(SettingsStoresTest, ConfigurationKeyOutsideAStoreIsNull)
+TEST_F(SettingsStoresTest, ConfigurationThatIsMissingOrOutsideAStoreIsNull)
 {
     for (const char* const key : {"", "db", "csc/salescode", "DB/csc/salescode", " db/a", "dbx/a"})
         EXPECT_EQ(nullptr, vconf_get_str(key)) << key;
-}
-
-TEST_F(SettingsStoresTest, MissingConfigurationIsNull)
-{
     backend.textAnswer = [](const std::string&) -> Answer<std::string> {
         return port::notAvailable("no such key");
     };
@@ -119,22 +122,6 @@ TEST_F(SettingsStoresTest, TimeIsHandedOutWhole)
     EXPECT_EQ(19800, date.tm_gmtoff);
     EXPECT_STREQ("IST", date.tm_zone);
     EXPECT_EQ("test", lastOrigin(Question::CurrentTime).source);
-}
-
-TEST_F(SettingsStoresTest, ClockThatCannotBeAskedLeavesTheTimeAlone)
-{
-    const std::pair<port::Error, int> failures[] = {
-        {port::notAvailable("why"), ALARM_ERROR_CONNECTION_FAIL},
-        {port::notSupported("why"), ALARM_ERROR_CONNECTION_FAIL},
-        {port::denied("why"), ALARM_ERROR_PERMISSION_DENIED},
-    };
-    std::tm date = {};
-    date.tm_mday = 77;
-    for (const auto& failure : failures) {
-        backend.nowAnswer = failure.first;
-        EXPECT_EQ(failure.second, alarm_get_current_time(&date));
-        EXPECT_EQ(77, date.tm_mday);
-    }
 }
 
 } // namespace

@@ -50,7 +50,7 @@ TEST_F(SimulatorNetworkTest, SwitchesAnswerWithTheirLines)
     expectAnswer(static_cast<FontSize>(7), line(3), backend->get<Question::FontSize>());
 }
 
-TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
+TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailableAndNoProblemOfTheFile)
 {
     describe("[network]\n");
     expectMissing(line(2) + ": [network] has no cellular", network.cellular());
@@ -60,10 +60,13 @@ TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailable)
     expectMissing(path + ": [settings] has no flight_mode", backend->get<Question::FlightMode>());
     expectMissing(path + ": [settings] has no packet_data", backend->get<Question::PacketData>());
     expectMissing(path + ": [settings] has no font_size", backend->get<Question::FontSize>());
+    expectMissing(path + ": [settings] has no language", backend->get<Question::Language>());
+    expectMissing(path + ": [device] has no model_name", backend->get<Question::ModelName>());
     expectMissing(path + ": [device] has no serial", backend->get<Question::DeviceSerial>());
     expectMissing(path + ": [storage] has no block_size", backend->internalStorage());
     expectMissing(path + ": no section [packages]", backend->packageVersion("a"));
     expectMissing(path + ": [settings] has no utc_offset", backend->now());
+    EXPECT_EQ("", backend->deviceFileProblem());
 }
 
 TEST_F(SimulatorNetworkTest, RadioMayBeMissingFromTheDevice)

@@ -83,15 +83,6 @@ TEST_F(SimulatorTest, EveryKeyIsAnsweredWithItsLine)
     EXPECT_EQ("", backend->deviceFileProblem());
 }
 
-TEST_F(SimulatorTest, AbsentKeyIsNotAvailableAndNoProblemOfTheFile)
-{
-    describe("");
-    EXPECT_EQ("error: " + path + ": [device] has no model_name", model());
-    EXPECT_EQ(path + ": [settings] has no language",
-              backend->get<Question::Language>().error().reason);
-    EXPECT_EQ("", backend->deviceFileProblem());
-}
-
 TEST_F(SimulatorTest, TextsAreTakenAsTheyStand)
 {
     describe("device.model_name = \"Ger\xc3\xa4t \\u00e9 \\\"x\\\" \"\n");

@@ -68,11 +68,18 @@ std::vector<std::string> textsOf(char** list)
     return texts;
 }
 
-TEST_F(TapiTest, NamesAreListedInOrder)
+TEST_F(TapiTest, NamesAreListedInOrderInListsThatStayAndAreNotMultiplied)
 {
-    EXPECT_THAT(textsOf(tel_get_cp_name_list()), ElementsAre("modem0", "modem1"));
+    char** const first = tel_get_cp_name_list();
     EXPECT_THAT(telephony.questions, ElementsAre("slots"));
     EXPECT_EQ("test", lastOrigin(Question::SimSlots).source);
+    telephony.slotsAnswer = answered(Names{"other"});
+    char** const second = tel_get_cp_name_list();
+    EXPECT_NE(first, second);
+    EXPECT_THAT(textsOf(second), ElementsAre("other"));
+    EXPECT_THAT(textsOf(first), ElementsAre("modem0", "modem1"));
+    telephony.slotsAnswer = answered(Names{"modem0", "modem1"});
+    EXPECT_EQ(first, tel_get_cp_name_list());
 }
 
 TEST_F(TapiTest, NoModemIsAListWithoutNames)
@@ -107,18 +114,6 @@ TEST_F(TapiTest, NoServiceIsNoList)
         EXPECT_EQ(nullptr, tel_get_cp_name_list());
         EXPECT_EQ(error.reason, lastOrigin(Question::SimSlots).reason);
     }
-}
-
-TEST_F(TapiTest, ListsStayAndAreNotMultiplied)
-{
-    char** const first = tel_get_cp_name_list();
-    telephony.slotsAnswer = answered(Names{"other"});
-    char** const second = tel_get_cp_name_list();
-    EXPECT_NE(first, second);
-    EXPECT_THAT(textsOf(second), ElementsAre("other"));
-    EXPECT_THAT(textsOf(first), ElementsAre("modem0", "modem1"));
-    telephony.slotsAnswer = answered(Names{"modem0", "modem1"});
-    EXPECT_EQ(first, tel_get_cp_name_list());
 }
 
 TEST_F(TapiTest, ModemIsOpenedByItsNameAndTheFirstOneWithout)
@@ -238,6 +233,7 @@ TEST_F(TapiHandleTest, ImsiComesInItsParts)
     EXPECT_STREQ("123456789", imsi.szMsin);
     telephony.imsiAnswer = answered(port::Imsi{"001", "01", "0123456789"});
     ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+    EXPECT_STREQ("001", imsi.szMcc);
     EXPECT_STREQ("01", imsi.szMnc);
     EXPECT_STREQ("0123456789", imsi.szMsin);
     EXPECT_EQ("test", lastOrigin(Question::SimIdentity).source);
@@ -343,11 +339,11 @@ TEST_F(TapiHandleTest, EveryVoicePreferenceHasItsNumber)
 
 TEST_F(TapiHandleTest, SmsReadinessIsOneOrZero)
 {
-    for (const bool isReady : {true, false}) {
-        telephony.smsAnswer = answered(isReady);
+    for (const int expected : {1, 0}) {
+        telephony.smsAnswer = answered(expected == 1);
         int ready = 7;
         ASSERT_EQ(0, tel_check_sms_device_status(handle, &ready));
-        EXPECT_EQ(isReady ? 1 : 0, ready);
+        EXPECT_EQ(expected, ready);
     }
 }
 

@@ -21,58 +21,35 @@ import jsonschema
 TREE = Path(__file__).resolve().parent.parent.parent
 SCHEMA = TREE / "docs" / "device-file.schema.json"
 
-# Each after "schema = 1".
-GOOD = [
-    "",
-    "[device]\ntelephony = false",
-    "[settings]\nfont_size = 7\nutc_offset = -3600",
-    "[settings]\nfont_size = 'huge'",
-    "[[slot]]\nmcc = '001'\nmnc = '01'\nnumber = 'null'",
-    "[[slot]]\niccid = '899990000000000001'\nsignal = 0\npin_retries = 10\naccess_technology = '5gnr'",
-    "[network]\nssid = '" + 32 * "a" + "'",
-    "[subscriptions]\ndata = 1\nvoice = 'ask_always'",
-    "[packages]\n'org.example.app' = ''",
-    "[fault]\ntelephony_init = 'empty'",
-    "[fault]\ntelephony_init = { delay_ms = 60000 }",
-    "[fault.vconf_get_str]\nerror = 'null'\ncall = 3",
-    "[fault]\nGetSerial = 'org.example.Error'",
-    "[fault]\nGetSerial = { error = 'not_a_string', delay_ms = 1 }",
-    "[fault]\ng_bus_get_sync = 'no_bus'",
-]
-BAD = [
-    "colour = 1",
-    "device = 1",
-    "[device]\ncolour = 1",
-    "[device]\nserial = 1",
-    "[device]\nserial = \"\\u0000\"",
-    "[device]\ntelephony = 'false'",
-    "[settings]\nfont_size = 4",
-    "[settings]\nfont_size = 'tiny'",
-    "[settings]\nutc_offset = 86400",
-    "[slot]",
-    "slot = [1]",
-    "[[slot]]\nmcc = '01'",
-    "[[slot]]\nmnc = '0001'",
-    "[[slot]]\nnumber = '+'",
-    "[[slot]]\ncp_name = ''",
-    "[[slot]]\niccid = '89999000000000001'",
-    "[[slot]]\nsignal = 101",
-    "[[slot]]\npin_retries = 11",
-    "[[slot]]\naccess_technology = '5G'",
-    "[network]\nssid = ''",
-    "[network]\nssid = '" + 33 * "a" + "'",
-    "[subscriptions]\ndata = 2",
-    "[storage]\nblocks = -1",
-    "[packages]\napp = 1",
-    "[fault]\ntelephony_inti = 'null'",
-    "[fault]\ntelephony_init = 'WIFI_ERROR_OPERATION_FAILED'",
-    "[fault]\ntelephony_init = -13",
-    "[fault]\ntelephony_init = { call = 1 }",
-    "[fault]\ntelephony_init = { delay_ms = 60001 }",
-    "[fault]\ntelephony_init = { delay_ms = 1, colour = 1 }",
-    "[fault]\nGetSerial = 'word'",
-    "[fault]\ng_bus_get_sync = { error = 'no_bus' }",
-]
+# Each after "schema = 1" and the line of its section.
+GOOD = {
+    "": [""],
+    "[device]": ["telephony = false"],
+    "[settings]": ["font_size = 7\nutc_offset = -3600", "font_size = 'huge'"],
+    "[[slot]]": ["mcc = '001'\nmnc = '01'\nnumber = 'null'", "access_technology = '5gnr'",
+                 "iccid = '899990000000000001'\nsignal = 0\npin_retries = 10"],
+    "[network]": ["ssid = '" + 32 * "a" + "'"],
+    "[subscriptions]": ["data = 1\nvoice = 'ask_always'"],
+    "[packages]": ["'org.example.app' = ''"],
+    "[fault]": ["telephony_init = 'empty'", "telephony_init = { delay_ms = 60000 }",
+                "vconf_get_str = { error = 'null', call = 3 }", "g_bus_get_sync = 'no_bus'",
+                "GetSerial = 'org.example.Error'", "GetSerial = { error = 'not_a_string', delay_ms = 1 }"],
+}
+BAD = {
+    "": ["colour = 1", "device = 1", "[slot]", "slot = [1]"],
+    "[device]": ["colour = 1", "serial = 1", 'serial = "\\u0000"', "telephony = 'false'"],
+    "[settings]": ["font_size = 4", "font_size = 'tiny'", "utc_offset = 86400"],
+    "[[slot]]": ["mcc = '01'", "mnc = '0001'", "number = '+'", "cp_name = ''", "signal = 101",
+                 "iccid = '89999000000000001'", "pin_retries = 11", "access_technology = '5G'"],
+    "[network]": ["ssid = ''", "ssid = '" + 33 * "a" + "'"],
+    "[subscriptions]": ["data = 2"],
+    "[storage]": ["blocks = -1"],
+    "[packages]": ["app = 1"],
+    "[fault]": ["telephony_inti = 'null'", "telephony_init = 'WIFI_ERROR_OPERATION_FAILED'",
+                "telephony_init = -13", "telephony_init = { call = 1 }",
+                "telephony_init = { delay_ms = 60001 }", "telephony_init = { delay_ms = 1, colour = 1 }",
+                "GetSerial = 'word'", "g_bus_get_sync = { error = 'no_bus' }"],
+}
 
 
 def printed(*arguments):
@@ -145,17 +122,14 @@ class DeviceSchema(unittest.TestCase):
                 by_schema, by_reader = self.judge(path)
                 self.assertEqual(by_reader, by_schema)
 
-    def judge_text(self, text):
+    def test_good_and_bad(self):
         with tempfile.TemporaryDirectory() as folder:
             path = Path(folder) / "device.toml"
-            path.write_text("schema = 1\n" + text + "\n")
-            return self.judge(path)
-
-    def test_good_and_bad(self):
-        for verdict, texts in (True, GOOD), (False, BAD):
-            for text in texts:
-                with self.subTest(text=text):
-                    self.assertEqual((verdict, verdict), self.judge_text(text))
+            for verdict, sections in (True, GOOD), (False, BAD):
+                for section, text in ((name, text) for name in sections for text in sections[name]):
+                    with self.subTest(section=section, text=text):
+                        path.write_text(f"schema = 1\n{section}\n{text}\n")
+                        self.assertEqual((verdict, verdict), self.judge(path))
 
     def test_errors_are_all_those_of_the_platforms_headers(self):
         declared = set()
