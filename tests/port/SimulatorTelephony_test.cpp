@@ -2,47 +2,31 @@
 // SIM slots of a device file.
 #include "support/Answer.h"
 #include "support/DeviceFileTest.h"
+#include "support/TelephonyQuestions.h"
 
-using port::Card;
 using port::CardStatus;
-using port::Error;
-using port::Imsi;
 using port::ServiceState;
 using port::Subscriptions;
 using port::Telephony;
-using testing::AllOf;
-using testing::Each;
 using testing::IsEmpty;
-using testing::SizeIs;
 using testing::StartsWith;
+using Kind = port::Error::Kind;
 
 namespace {
 
 class SimulatorTelephonyTest : public DeviceFileTest {
 protected:
-    // The kind of error of every question about a slot.
-    std::vector<Error::Kind> errorsOf(const std::string& name, const std::string& reason)
+    // Every question about a slot has such an error.
+    void expectErrors(Kind kind, const std::string& name, const std::string& reason)
     {
-        std::vector<Error::Kind> kinds;
-        const auto add = [&](const auto& answer) {
-            if (!answer) {
-                kinds.push_back(answer.error().kind);
-                EXPECT_THAT(answer.error().reason, StartsWith(reason));
-            }
-        };
-        add(telephony.card(name));
-        add(telephony.imsi(name));
-        add(telephony.number(name));
-        add(telephony.imei(name));
-        add(telephony.service(name));
-        add(telephony.roaming(name));
-        add(telephony.smsReady(name));
-        return kinds;
-    }
-
-    static auto allAre(Error::Kind kind)
-    {
-        return AllOf(SizeIs(7), Each(kind));
+        for (const auto& question : telephonyQuestions()) {
+            if (!question.aboutASlot)
+                continue;
+            const auto error = question.ask(telephony, name);
+            ASSERT_TRUE(error) << question.name;
+            EXPECT_EQ(kind, error->kind) << question.name;
+            EXPECT_THAT(error->reason, StartsWith(reason)) << question.name;
+        }
     }
 
     Telephony& telephony = backend->telephony();
@@ -66,9 +50,9 @@ TEST_F(SimulatorTelephonyTest, DeviceMayHaveNoTelephony)
 {
     describe("[device]\ntelephony = false\n[[slot]]\n");
     const std::string reason = line(3) + ": this device has no telephony";
-    expectError(Error::Kind::NotSupported, reason, telephony.slots());
-    expectError(Error::Kind::NotSupported, reason, telephony.subscriptions());
-    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::NotSupported));
+    expectError(Kind::NotSupported, reason, telephony.slots());
+    expectError(Kind::NotSupported, reason, telephony.subscriptions());
+    expectErrors(Kind::NotSupported, "cp0", reason);
 }
 
 TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
@@ -95,11 +79,9 @@ TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
 TEST_F(SimulatorTelephonyTest, AbsentKeysOfASlotAreNotAvailable)
 {
     describe("[[slot]]\n");
-    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::NotAvailable));
-    expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
-                telephony.card("cp0"));
-    expectError(Error::Kind::NotAvailable, line(2) + ": [[slot]] has no sim",
-                telephony.imsi("cp0"));
+    expectErrors(Kind::NotAvailable, "cp0", line(2) + ": [[slot]] has no ");
+    expectError(Kind::NotAvailable, line(2) + ": [[slot]] has no sim", telephony.card("cp0"));
+    expectError(Kind::NotAvailable, line(2) + ": [[slot]] has no sim", telephony.imsi("cp0"));
 }
 
 TEST_F(SimulatorTelephonyTest, ReportIsWhatTheFileSaysOfASlotInService)
@@ -127,27 +109,23 @@ TEST_F(SimulatorTelephonyTest, ReportIsWhatTheFileSaysOfASlotInService)
     const auto& blocked = reports.value()[1];
     const std::string reason = line(14) + ": the slot is not in service";
     EXPECT_EQ(port::ModemReport::Use::None, blocked.use);
-    expectError(Error::Kind::NotAvailable, reason, blocked.operatorName);
-    expectError(Error::Kind::NotAvailable, reason, blocked.signal);
+    expectError(Kind::NotAvailable, reason, blocked.operatorName);
+    expectError(Kind::NotAvailable, reason, blocked.signal);
     expectAnswer(0, line(15), blocked.pinTries);
-    expectError(Error::Kind::NotAvailable, line(13) + ": [[slot]] does not say", blocked.power);
+    expectError(Kind::NotAvailable, line(13) + ": [[slot]] does not say", blocked.power);
     const auto& off = reports.value()[2];
     expectAnswer(port::PowerState::Off, line(22), off.power);
-    expectError(Error::Kind::NoSim, line(22) + ": the SIM card is switched off", off.pinTries);
-    expectError(Error::Kind::Denied, line(24) + ": this slot is private", reports.value()[3].power);
+    expectError(Kind::NoSim, line(22) + ": the SIM card is switched off", off.pinTries);
+    expectError(Kind::Denied, line(24) + ": this slot is private", reports.value()[3].power);
 }
 
 TEST_F(SimulatorTelephonyTest, ImsiIsWholeOrNotAvailable)
 {
-    const std::string parts[] = {"mcc = '450'\n", "mnc = '05'\n", "msin = '1'\n"};
-    for (int missing = 0; missing < 3; ++missing) {
-        std::string facts = "[[slot]]\nsim = 'available'\n";
-        for (int i = 0; i < 3; ++i)
-            facts += i == missing ? "" : parts[i];
-        describe(facts);
-        expectError(Error::Kind::NotAvailable,
-                    line(2) + ": [[slot]] has no " +
-                        parts[missing].substr(0, parts[missing].find(' ')),
+    for (const auto& [missing, parts] : {std::pair("mcc", "mnc = '05'\nmsin = '1'\n"),
+                                         {"mnc", "mcc = '450'\nmsin = '1'\n"},
+                                         {"msin", "mcc = '450'\nmnc = '05'\n"}}) {
+        describe("[[slot]]\nsim = 'available'\n" + std::string(parts));
+        expectError(Kind::NotAvailable, line(2) + ": [[slot]] has no " + missing,
                     telephony.imsi("cp0"));
     }
 }
@@ -155,10 +133,8 @@ TEST_F(SimulatorTelephonyTest, ImsiIsWholeOrNotAvailable)
 TEST_F(SimulatorTelephonyTest, UnknownSlotIsNotAvailable)
 {
     describe("[[slot]]\nsim = 'available'\n");
-    for (const char* const name : {"cp1", "", "cp", "CP0"}) {
-        expectError(Error::Kind::NotAvailable, path + ": no slot " + name, telephony.card(name));
-        EXPECT_THAT(errorsOf(name, path + ": no slot "), allAre(Error::Kind::NotAvailable));
-    }
+    for (const std::string name : {"cp1", "", "cp", "CP0"})
+        expectErrors(Kind::NotAvailable, name, path + ": no slot " + name);
 }
 
 TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatusAndItsReason)
@@ -209,8 +185,8 @@ TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatusAndItsReason)
         describe("[[slot]]\nmcc = '450'\nmnc = '05'\nmsin = '1'\nnumber = '5'\n" +
                  std::string(row.key) + " = '" + row.value + "'\n");
         EXPECT_EQ(row.status, valueOf(telephony.card("cp0")).status);
-        expectError(Error::Kind::NoSim, line(7) + ": " + row.reason, telephony.imsi("cp0"));
-        expectError(Error::Kind::NoSim, line(7) + ": " + row.reason, telephony.number("cp0"));
+        expectError(Kind::NoSim, line(7) + ": " + row.reason, telephony.imsi("cp0"));
+        expectError(Kind::NoSim, line(7) + ": " + row.reason, telephony.number("cp0"));
     }
 }
 
@@ -244,7 +220,7 @@ TEST_F(SimulatorTelephonyTest, CardWithoutANumberIsNoError)
 TEST_F(SimulatorTelephonyTest, PrivateSlotDeniesEveryQuestion)
 {
     describe("[[slot]]\nsim = 'available'\ndenied = true\n[[slot]]\nsim = 'absent'\n");
-    EXPECT_THAT(errorsOf("cp0", path + ":"), allAre(Error::Kind::Denied));
+    expectErrors(Kind::Denied, "cp0", line(4) + ": this slot is private");
     EXPECT_TRUE(telephony.card("cp1"));
 }
 
@@ -272,9 +248,9 @@ TEST_F(SimulatorTelephonyTest, ProblemOfTheFileIsTheReasonOfEveryQuestion)
     describe("[[slot]]\nsim = 'here'\n");
     const std::string reason = backend->deviceFileProblem();
     EXPECT_THAT(reason, StartsWith(line(3) + ":7: "));
-    expectError(Error::Kind::NotAvailable, reason, telephony.slots());
-    expectError(Error::Kind::NotAvailable, reason, telephony.card("cp0"));
-    expectError(Error::Kind::NotAvailable, reason, telephony.subscriptions());
+    expectErrors(Kind::NotAvailable, "cp0", reason);
+    expectError(Kind::NotAvailable, reason, telephony.slots());
+    expectError(Kind::NotAvailable, reason, telephony.subscriptions());
 }
 
 TEST_F(SimulatorTelephonyTest, EditIsSeenByTheNextQuestion)
