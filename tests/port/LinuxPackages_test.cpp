@@ -15,6 +15,9 @@ using testing::StartsWith;
 
 namespace {
 
+const std::string STATUS_FILE = " </var/lib/dpkg/status>";
+const std::string CUT_OFF = "error: /var/lib/dpkg/status: it is cut off in the middle of a package";
+const char INSTALLED[] = "install ok installed";
 const std::string SHELL = "Package: shell\nStatus: install ok installed\nArchitecture: amd64\n"
                           "Version: 2:5.2.15-2+b8\nDescription: a shell\n"
                           " Package: hidden\n Status: install ok installed\n Version: 9\n\n";
@@ -26,7 +29,7 @@ std::string stanza(const std::string& name, const std::string& status, const std
 
 class LinuxPackagesTest : public testing::Test {
 protected:
-    // "VERSION <SOURCE>", "not installed" or "error: REASON".
+    // "VERSION <STATUS_FILE>", "not installed" or "error: REASON".
     std::string versionIn(const std::string& status, const std::string& name)
     {
         tree.write(DPKG_STATUS, status);
@@ -46,10 +49,10 @@ protected:
 
 TEST_F(LinuxPackagesTest, VersionOfAnInstalledPackageIsTold)
 {
-    const std::string status = stanza("aaa", "install ok installed", "1") + SHELL +
-                               stanza("zzz", "hold ok installed", "3");
-    EXPECT_EQ("2:5.2.15-2+b8 </var/lib/dpkg/status>", versionIn(status, "shell"));
-    EXPECT_EQ("1 </var/lib/dpkg/status>", version("aaa"));
+    const std::string status =
+        stanza("aaa", INSTALLED, "1") + SHELL + stanza("zzz", "hold ok installed", "3");
+    EXPECT_EQ("2:5.2.15-2+b8" + STATUS_FILE, versionIn(status, "shell"));
+    EXPECT_EQ("1" + STATUS_FILE, version("aaa"));
 }
 
 TEST_F(LinuxPackagesTest, OnlyAFullyInstalledPackageCounts)
@@ -63,56 +66,41 @@ TEST_F(LinuxPackagesTest, OnlyAFullyInstalledPackageCounts)
 TEST_F(LinuxPackagesTest, NameIsMatchedExactly)
 {
     tree.write(DPKG_STATUS, SHELL);
-    for (const std::string& name :
-         {std::string("shel"), std::string("shell2"), std::string("Shell"), std::string("hidden"),
-          std::string(""), std::string(" shell"), std::string("shell\nVersion: 1"),
-          std::string("../../etc/passwd"), std::string("a shell"), std::string("*"),
-          std::string("$(reboot)"), std::string("shell:amd64"), std::string(10000000, 'x')})
-        EXPECT_EQ("not installed", version(name)) << name.substr(0, 100);
+    for (const char* const name :
+         {"shel", "shell2", "Shell", "hidden", "", " shell", "shell\nVersion: 1",
+          "../../etc/passwd", "a shell", "*", "$(reboot)", "shell:amd64"})
+        EXPECT_EQ("not installed", version(name)) << name;
+    EXPECT_EQ("not installed", version(std::string(10000000, 'x')));
+    EXPECT_EQ("not installed", versionIn("", "shell"));
 }
 
 TEST_F(LinuxPackagesTest, ArchitectureThatIsInstalledTellsTheVersion)
 {
-    EXPECT_EQ("2 </var/lib/dpkg/status>",
-              versionIn(stanza("lib", "deinstall ok config-files", "1") +
-                            stanza("lib", "install ok installed", "2"),
-                        "lib"));
-}
-
-TEST_F(LinuxPackagesTest, EmptyDatabaseHasNoPackages)
-{
-    EXPECT_EQ("not installed", versionIn("", "shell"));
+    EXPECT_EQ("2" + STATUS_FILE, versionIn(stanza("lib", "deinstall ok config-files", "1") +
+                                               stanza("lib", INSTALLED, "2"),
+                                           "lib"));
 }
 
 TEST_F(LinuxPackagesTest, NoCutOfTheDatabaseEverGivesAFalseAnswer)
 {
-    const std::string whole = stanza("aaa", "install ok installed", "1.2.3") + SHELL;
+    const std::string whole = stanza("aaa", INSTALLED, "1.2.3") + SHELL;
     const std::size_t first = whole.find("\n\n") + 2;
     for (std::size_t length = 1; length < whole.size(); ++length) {
         const std::string cut = whole.substr(0, length);
         // A cut between two packages cannot be seen.
-        const std::string expected =
-            length == first
-                ? "not installed"
-                : "error: /var/lib/dpkg/status: it is cut off in the middle of a package";
-        EXPECT_EQ(expected, versionIn(cut, "shell")) << cut;
-        EXPECT_EQ(length < first
-                      ? "error: /var/lib/dpkg/status: it is cut off in the middle of a package"
-                      : "1.2.3 </var/lib/dpkg/status>",
-                  version("aaa"))
-            << cut;
+        EXPECT_EQ(length == first ? "not installed" : CUT_OFF, versionIn(cut, "shell")) << cut;
+        EXPECT_EQ(length < first ? CUT_OFF : "1.2.3" + STATUS_FILE, version("aaa")) << cut;
     }
 }
 
 TEST_F(LinuxPackagesTest, OddDatabasesAreTold)
 {
     EXPECT_EQ("error: /var/lib/dpkg/status: No such file or directory", version("shell"));
-    EXPECT_EQ("error: /var/lib/dpkg/status: it holds no version of shell",
-              versionIn("Package: shell\nStatus: install ok installed\n\n", "shell"));
-    EXPECT_EQ("error: /var/lib/dpkg/status: it holds no version of shell",
-              versionIn("Package: shell\nStatus: install ok installed\nVersion: \n\n", "shell"));
-    EXPECT_EQ("error: /var/lib/dpkg/status: it is cut off in the middle of a package",
-              versionIn(std::string(100000, '\x01'), "shell"));
+    for (const char* const end : {"\n", "Version: \n\n"})
+        EXPECT_EQ("error: /var/lib/dpkg/status: it holds no version of shell",
+                  versionIn("Package: shell\nStatus: install ok installed\n" + std::string(end),
+                            "shell"));
+    EXPECT_EQ(CUT_OFF, versionIn(std::string(100000, '\x01'), "shell"));
     tree.remove(DPKG_STATUS);
     tree.write(std::string(DPKG_STATUS) + "/x", "");
     EXPECT_EQ("error: /var/lib/dpkg/status: Is a directory", version("shell"));
@@ -120,9 +108,9 @@ TEST_F(LinuxPackagesTest, OddDatabasesAreTold)
 
 TEST_F(LinuxPackagesTest, FileThatDidNotChangeIsReadOnceAndNoFurtherThanNeeded)
 {
-    const std::string aaa = stanza("aaa", "install ok installed", "1");
+    const std::string aaa = stanza("aaa", INSTALLED, "1");
     const std::string half = stanza("half", "install ok unpacked", "1");
-    const std::string zzz = stanza("zzz", "install ok installed", "9");
+    const std::string zzz = stanza("zzz", INSTALLED, "9");
     const std::string whole = aaa + half + zzz;
     port::linux_backend::PackageIndex index;
     std::vector<std::size_t> reads;
@@ -152,8 +140,8 @@ TEST_F(LinuxPackagesTest, ChangedFileIsReadAnew)
 {
     LinuxPackages packages(tree.root());
     for (const char* const version : {"1", "2", "3"}) {
-        const std::string file = tree.write(
-            DPKG_STATUS, stanza("aaa", "install ok installed", version)); // all of one size
+        const std::string file =
+            tree.write(DPKG_STATUS, stanza("aaa", INSTALLED, version)); // all of one size
         EXPECT_EQ(version, packages.version("aaa").value().value);
         const timespec long_ago[2] = {{1000000000, 0}, {1000000000, 0}};
         ASSERT_EQ(0, utimensat(AT_FDCWD, file.c_str(), long_ago, 0));
@@ -165,8 +153,8 @@ TEST_F(LinuxPackagesTest, MoreThanAnIndexHoldsIsAnsweredAllTheSame)
 {
     std::string many;
     for (int i = 0; i < 9; ++i)
-        many += stanza("p" + std::to_string(i), "install ok installed", std::string(1000000, 'v'));
-    tree.write(DPKG_STATUS, many + stanza("last", "install ok installed", "1"));
+        many += stanza("p" + std::to_string(i), INSTALLED, std::string(1000000, 'v'));
+    tree.write(DPKG_STATUS, many + stanza("last", INSTALLED, "1"));
     LinuxPackages packages(tree.root());
     for (const char* const name : {"last", "p8", "p0", "last"})
         EXPECT_TRUE(packages.version(name).value().value) << name;

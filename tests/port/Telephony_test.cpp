@@ -92,28 +92,22 @@ TEST_F(TelephonyTest, ListHasOneHandlePerSlotInOrder)
     EXPECT_EQ(0, telephony_deinit(&list));
 }
 
-TEST_F(TelephonyTest, EveryListIsCountedUntilItIsReleased)
+TEST_F(TelephonyTest, EveryListIsCountedUntilItsReleaseEmptiesIt)
 {
     telephony_handle_list_s second = {};
     ASSERT_EQ(0, telephony_init(&list));
     ASSERT_EQ(0, telephony_init(&second));
     EXPECT_EQ(2U, port::liveTelephonyLists());
     EXPECT_EQ(4U, SlotHandles::live());
-    EXPECT_EQ(0, telephony_deinit(&list));
-    EXPECT_EQ(1U, port::liveTelephonyLists());
-    EXPECT_EQ(2U, SlotHandles::live());
-    EXPECT_EQ(0, telephony_deinit(&second));
-    EXPECT_EQ(0U, port::liveTelephonyLists());
-}
-
-TEST_F(TelephonyTest, ReleaseEmptiesTheListAndASecondOneOfACopyIsInvalid)
-{
-    open();
     telephony_handle_list_s copy = list;
     EXPECT_EQ(0, telephony_deinit(&list));
     EXPECT_EQ(0U, list.count);
     EXPECT_EQ(nullptr, list.handle);
     EXPECT_EQ(-22, telephony_deinit(&copy));
+    EXPECT_EQ(1U, port::liveTelephonyLists());
+    EXPECT_EQ(2U, SlotHandles::live());
+    EXPECT_EQ(0, telephony_deinit(&second));
+    EXPECT_EQ(0U, port::liveTelephonyLists());
 }
 
 TEST_F(TelephonyTest, ListThatWasNeverFilledIsNoError)
@@ -124,17 +118,13 @@ TEST_F(TelephonyTest, ListThatWasNeverFilledIsNoError)
     EXPECT_EQ(0U, list.count);
 }
 
-TEST_F(TelephonyTest, ForeignListIsInvalidAndLeftAlone)
+TEST_F(TelephonyTest, ForeignListIsInvalidAndLeftAloneAndSoIsNone)
 {
     telephony_h foreign[1] = {nullptr};
     list = {1, foreign};
     EXPECT_EQ(-22, telephony_deinit(&list));
     EXPECT_EQ(foreign, list.handle);
     EXPECT_EQ(1U, list.count);
-}
-
-TEST_F(TelephonyTest, NullListIsInvalid)
-{
     EXPECT_EQ(-22, telephony_init(nullptr));
     EXPECT_EQ(-22, telephony_deinit(nullptr));
     EXPECT_THAT(telephony.questions, IsEmpty());
@@ -162,28 +152,28 @@ TEST_F(TelephonyTest, ListThatCannotBeHadSaysWhyAndStaysUntouched)
     }
 }
 
-TEST_F(TelephonyListTest, ServiceStateIsTold)
+TEST_F(TelephonyListTest, EachReadIsOneQuestion)
 {
-    const port::ServiceState services[] = {port::ServiceState::InService,
-                                           port::ServiceState::OutOfService,
-                                           port::ServiceState::EmergencyOnly};
-    for (int number = 0; number < 3; ++number) {
-        telephony.serviceAnswer = answered(services[number]);
-        auto state = static_cast<telephony_network_service_state_e>(3);
-        ASSERT_EQ(0, telephony_network_get_service_state(handle, &state));
-        EXPECT_EQ(number, state);
-    }
+    EXPECT_EQ(0, telephony_sim_get_state(handle, &simState));
+    EXPECT_THAT(telephony.questions, ElementsAre("card modem0"));
 }
 
 TEST_F(TelephonyListTest, RoamingIsToldWhateverTheServiceIs)
 {
-    telephony.serviceAnswer = answered(port::ServiceState::OutOfService);
-    for (const bool roams : {true, false}) {
-        telephony.roamingAnswer = answered(roams);
-        bool roaming = !roams;
-        EXPECT_EQ(0, telephony_network_get_roaming_status(handle, &roaming));
-        EXPECT_EQ(roams, roaming);
-    }
+    const port::ServiceState services[] = {port::ServiceState::InService,
+                                           port::ServiceState::OutOfService,
+                                           port::ServiceState::EmergencyOnly};
+    for (int number = 0; number < 3; ++number)
+        for (const bool roams : {true, false}) {
+            telephony.serviceAnswer = answered(services[number]);
+            telephony.roamingAnswer = answered(roams);
+            auto service = static_cast<telephony_network_service_state_e>(3);
+            bool roaming = !roams;
+            EXPECT_EQ(0, telephony_network_get_service_state(handle, &service));
+            EXPECT_EQ(0, telephony_network_get_roaming_status(handle, &roaming));
+            EXPECT_EQ(number, service);
+            EXPECT_EQ(roams, roaming);
+        }
 }
 
 TEST_F(TelephonyListTest, TextsAreCopiesOfTheCallersOwn)
@@ -210,6 +200,25 @@ TEST_F(TelephonyListTest, CardWithoutANumberStoresNullAndIsAnErrorUnlessAFileAsk
     }
 }
 
+// The result of every read by a handle, none of which may store anything.
+std::vector<int> failAll(telephony_h handle)
+{
+    telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
+    telephony_network_service_state_e service = TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY;
+    bool roaming = true;
+    char* text = UNTOUCHED;
+    std::vector<int> results = {telephony_sim_get_state(handle, &state),
+                                telephony_sim_get_subscriber_number(handle, &text),
+                                telephony_modem_get_imei(handle, &text),
+                                telephony_network_get_service_state(handle, &service),
+                                telephony_network_get_roaming_status(handle, &roaming)};
+    EXPECT_EQ(UNTOUCHED, text);
+    EXPECT_EQ(TELEPHONY_SIM_STATE_LOCKED, state);
+    EXPECT_EQ(TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY, service);
+    EXPECT_TRUE(roaming);
+    return results;
+}
+
 TEST_F(TelephonyListTest, EveryErrorHasItsCodeAndLeavesTheSlotUntouched)
 {
     std::vector<std::pair<port::Error, int>> errors(std::begin(ERRORS), std::end(ERRORS));
@@ -220,38 +229,11 @@ TEST_F(TelephonyListTest, EveryErrorHasItsCodeAndLeavesTheSlotUntouched)
         telephony.imeiAnswer = error;
         telephony.serviceAnswer = error;
         telephony.roamingAnswer = error;
-        telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
-        telephony_network_service_state_e service = TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY;
-        bool roaming = true;
-        EXPECT_EQ(code, telephony_sim_get_state(handle, &state));
-        EXPECT_EQ(code, telephony_sim_get_subscriber_number(handle, &slot));
-        EXPECT_EQ(code, telephony_modem_get_imei(handle, &slot));
-        EXPECT_EQ(code, telephony_network_get_service_state(handle, &service));
-        EXPECT_EQ(code, telephony_network_get_roaming_status(handle, &roaming));
-        EXPECT_EQ(UNTOUCHED, slot);
-        EXPECT_EQ(TELEPHONY_SIM_STATE_LOCKED, state);
-        EXPECT_EQ(TELEPHONY_NETWORK_SERVICE_STATE_EMERGENCY_ONLY, service);
-        EXPECT_TRUE(roaming);
+        EXPECT_THAT(failAll(handle), Each(code));
         for (const Question question : {Question::SimCard, Question::PhoneNumber, Question::Imei,
                                         Question::NetworkService, Question::Roaming})
             EXPECT_EQ(error.reason, lastOrigin(question).reason);
     }
-}
-
-// The result of every read, by handle.
-std::vector<int> readAll(telephony_h handle)
-{
-    telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
-    telephony_network_service_state_e service = TELEPHONY_NETWORK_SERVICE_STATE_IN_SERVICE;
-    bool roaming = false;
-    char* text = UNTOUCHED;
-    std::vector<int> results = {telephony_sim_get_state(handle, &state),
-                                telephony_sim_get_subscriber_number(handle, &text),
-                                telephony_modem_get_imei(handle, &text),
-                                telephony_network_get_service_state(handle, &service),
-                                telephony_network_get_roaming_status(handle, &roaming)};
-    EXPECT_EQ(UNTOUCHED, text);
-    return results;
 }
 
 TEST_F(TelephonyTest, NullReleasedAndForeignHandlesAreInvalid)
@@ -264,7 +246,7 @@ TEST_F(TelephonyTest, NullReleasedAndForeignHandlesAreInvalid)
     int onTheStack = 0;
     for (const telephony_h handle :
          {telephony_h{}, released, otherKind, reinterpret_cast<telephony_h>(&onTheStack)})
-        EXPECT_THAT(readAll(handle), Each(-22));
+        EXPECT_THAT(failAll(handle), Each(-22));
     EXPECT_THAT(telephony.questions, IsEmpty());
     EXPECT_TRUE((port::Handles<TapiHandle*, port::SlotName>::close(modem)));
 }
@@ -277,12 +259,6 @@ TEST_F(TelephonyListTest, NullSlotsAreInvalid)
     EXPECT_EQ(-22, telephony_network_get_service_state(handle, nullptr));
     EXPECT_EQ(-22, telephony_network_get_roaming_status(handle, nullptr));
     EXPECT_THAT(telephony.questions, IsEmpty());
-}
-
-TEST_F(TelephonyListTest, EachReadIsOneQuestion)
-{
-    EXPECT_EQ(0, telephony_sim_get_state(handle, &simState));
-    EXPECT_THAT(telephony.questions, ElementsAre("card modem0"));
 }
 
 TEST_F(TelephonyListTest, MissingMemoryIsNamed)
