@@ -27,25 +27,21 @@ protected:
     port::Network& network = backend->network();
 };
 
-TEST_F(SimulatorNetworkTest, RadiosAnswerWithTheirLines)
+TEST_F(SimulatorNetworkTest, RadiosAndSwitchesAnswerWithTheirLines)
 {
     describe("[network]\ncellular = 'roaming_off'\nwifi = 'connected'\n"
-             "wifi_connection = 'association'\nbluetooth = 'disconnected'\n");
+             "wifi_connection = 'association'\nbluetooth = 'disconnected'\n"
+             "[settings]\nflight_mode = false\npacket_data = true\nmobile_data = false\n"
+             "data_roaming = true\nfont_size = 'huge'\n");
     expectAnswer(CellularState::RoamingOff, line(3), network.cellular());
     expectAnswer(LinkState::Connected, line(4), network.wifi());
     expectAnswer(WifiConnection::Association, line(5), network.wifiConnection());
     expectAnswer(LinkState::Disconnected, line(6), network.bluetooth());
-}
-
-TEST_F(SimulatorNetworkTest, SwitchesAnswerWithTheirLines)
-{
-    describe("[settings]\nflight_mode = false\npacket_data = true\nmobile_data = false\n"
-             "data_roaming = true\nfont_size = 'huge'\n");
-    expectAnswer(false, line(3), backend->get<Question::FlightMode>());
-    expectAnswer(true, line(4), backend->get<Question::PacketData>());
-    expectAnswer(false, line(5), backend->get<Question::MobileData>());
-    expectAnswer(true, line(6), backend->get<Question::DataRoaming>());
-    expectAnswer(FontSize::Huge, line(7), backend->get<Question::FontSize>());
+    expectAnswer(false, line(8), backend->get<Question::FlightMode>());
+    expectAnswer(true, line(9), backend->get<Question::PacketData>());
+    expectAnswer(false, line(10), backend->get<Question::MobileData>());
+    expectAnswer(true, line(11), backend->get<Question::DataRoaming>());
+    expectAnswer(FontSize::Huge, line(12), backend->get<Question::FontSize>());
     describe("[settings]\nfont_size = 7\n"); // beyond those that have names
     expectAnswer(static_cast<FontSize>(7), line(3), backend->get<Question::FontSize>());
 }

@@ -111,21 +111,17 @@ TEST(WifiInitializationTest, WorksWhenTheRadioCameLater)
               }));
 }
 
-TEST_F(WifiTest, NullCallbackIsInvalid)
+TEST_F(WifiTest, NullCallbackIsInvalidAndChangesThatCannotBeWatchedFail)
 {
     EXPECT_EQ(WIFI_ERROR_INVALID_PARAMETER, wifi_set_device_state_changed_cb(nullptr, this));
     EXPECT_EQ(WIFI_ERROR_INVALID_PARAMETER, wifi_set_connection_state_changed_cb(nullptr, this));
     EXPECT_EQ(0, network.watches());
-}
-
-TEST_F(WifiTest, ChangesThatCannotBeWatchedFail)
-{
     network.watchable = false;
     EXPECT_EQ(WIFI_ERROR_OPERATION_FAILED, wifi_set_device_state_changed_cb(onDevice, this));
     network.watchable = true;
 }
 
-TEST_F(WifiTest, StatesAreToldWithThePlatformsNumbers)
+TEST_F(WifiTest, StatesAreToldWithThePlatformsNumbersUntilUnset)
 {
     EXPECT_EQ(0, wifi_set_connection_state_changed_cb(onConnection, this));
     EXPECT_EQ(0, wifi_set_device_state_changed_cb(onDevice, this));
@@ -144,12 +140,7 @@ TEST_F(WifiTest, StatesAreToldWithThePlatformsNumbers)
     }
     network.change([](Answers& answers) { answers.wifi = answered(LinkState::Connected); });
     EXPECT_THAT(taken(), ElementsAre("device 1"));
-}
 
-TEST_F(WifiTest, NothingIsToldAfterUnset)
-{
-    EXPECT_EQ(0, wifi_set_connection_state_changed_cb(onConnection, this));
-    EXPECT_EQ(0, wifi_set_device_state_changed_cb(onDevice, this));
     network.change([](Answers& answers) {
         answers.wifi = answered(LinkState::Deactivated);
         answers.wifiConnection = answered(WifiConnection::Failure);
