@@ -21,7 +21,6 @@
 using testing::AllOf;
 using testing::HasSubstr;
 using testing::Not;
-using testing::StartsWith;
 
 namespace {
 

@@ -12,7 +12,6 @@ using port::devicefile::getValue;
 using port::devicefile::parsePath;
 using testing::ElementsAre;
 using testing::HasSubstr;
-using testing::StartsWith;
 
 namespace {
 

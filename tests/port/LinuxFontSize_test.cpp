@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The size of texts, from a made-up setting of the desktop.
 #include <cstdlib>
-#include <limits>
 
 #include <gmock/gmock.h>
 

@@ -11,7 +11,6 @@
 
 using port::linux_backend::DPKG_STATUS;
 using port::linux_backend::LinuxPackages;
-using testing::StartsWith;
 
 namespace {
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Counts without an atomic, so that a mutex that does not exclude loses counts; the thread sanitizer
 // sees every unordered access.
-#include <atomic>
 #include <string>
 #include <thread>
 

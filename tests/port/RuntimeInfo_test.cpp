@@ -3,7 +3,6 @@
 #include <runtime_info.h>
 
 #include <cstring>
-#include <string>
 #include <utility>
 #include <vector>
 

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 // Changes of a device file, and who is told of them.
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <string>
