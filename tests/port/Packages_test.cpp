@@ -41,6 +41,7 @@ protected:
         EXPECT_EQ(nullptr, none);
         EXPECT_EQ(code, package_manager_get_package_size_info("app", nullptr, nullptr));
         EXPECT_EQ(reason, lastOrigin(Question::PackageVersion).reason);
+        EXPECT_FALSE(lastOrigin(Question::PackageVersion).available);
     }
 
     FakedBackend backend;
