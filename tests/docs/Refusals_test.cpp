@@ -10,6 +10,7 @@
 #include <map>
 #include <regex>
 #include <set>
+#include <sstream>
 
 #include <gio/gio.h>
 #include <gmock/gmock.h>
@@ -23,31 +24,16 @@
 
 namespace {
 
-const char DEVICE[] = R"(schema = 1
-device = { platform_id = "id", platform_name = "Tizen", platform_version = "2.4", model_name = "model" }
-settings.device_name = "name"
-settings.language = "ko_KR.UTF-8"
-settings.sales_code = "KOO"
-settings.flight_mode = true
-settings.data_roaming = true
-settings.mobile_data = true
-subscriptions = { network = 0, data = 0, voice = "slot0" }
-network = { cellular = "available", wifi = "connected", bluetooth = "disconnected" }
-storage = { block_size = 4096, fragment_size = 4096, blocks = 409600, available_blocks = 409600 }
-packages."org.example.clock" = "1.2.3"
-[[slot]]
-sim = "available"
-mcc = "450"
-mnc = "05"
-msin = "0123456789"
-number = "+821055500100"
-imei = "490154203237518"
-service = "in_service"
-roaming = true
-sms = true
-)";
 const char TIME_ZONE[] = "UTC-9"; // nine hours east
 const char MADE_UP_IMEI[] = "\"324000000000000\"";
+
+// Every switch is on: no answer is what a refusal leaves.
+std::string switchedOn()
+{
+    std::ostringstream device;
+    device << std::ifstream(DEVICE_FILE).rdbuf();
+    return std::regex_replace(device.str(), std::regex("= false"), "= true");
+}
 
 // What is returned and what becomes of the output, in the words of the document.
 using Answer = std::pair<std::string, std::string>;
@@ -161,13 +147,14 @@ public:
         for (const auto& [call, error] : calls)
             if (call != "GetSerial") // which is asked over the bus
                 faults_ += call + " = \"" + error + "\"\n";
-        write(DEVICE);
+        write(switchedOn_);
     }
 
     // The same without flight mode, and with Wi-Fi on or off.
     void describeOutOfFlightMode(bool wifi)
     {
-        const std::string facts = replaced(DEVICE, "flight_mode = true", "flight_mode = false");
+        const std::string facts =
+            replaced(switchedOn_, "flight_mode = true", "flight_mode = false");
         write(wifi ? facts : replaced(facts, "wifi = \"connected\"", "wifi = \"deactivated\""));
     }
 
@@ -179,6 +166,7 @@ private:
     }
 
     const TemporaryTree tree_;
+    const std::string switchedOn_ = switchedOn();
     std::string faults_;
 };
 
