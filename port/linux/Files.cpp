@@ -2,6 +2,7 @@
 #include "Files.h"
 
 #include <algorithm>
+#include <filesystem>
 #include <sstream>
 
 #include "../common/GLibTypes.h"
@@ -40,6 +41,17 @@ Result<Fact> readFirst(const std::string& root, Places places, TextCheck check)
         problems += (problems.empty() ? "" : ", ") + std::string(place) + ": " + problem;
     }
     return notAvailable(problems);
+}
+
+std::vector<std::string> entriesOf(const std::string& folder)
+{
+    std::vector<std::string> entries;
+    std::error_code ignored;
+    for (std::filesystem::directory_iterator entry(folder, ignored), end; !ignored && entry != end;
+         entry.increment(ignored))
+        entries.push_back(entry->path().string());
+    std::sort(entries.begin(), entries.end());
+    return entries;
 }
 
 std::optional<std::string> osReleaseVariable(const std::string& content, const std::string& name)

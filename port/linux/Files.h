@@ -6,6 +6,7 @@
 #include <initializer_list>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "../backend/Result.h"
 
@@ -28,6 +29,9 @@ using TextCheck = std::string (*)(const std::string& text);
 /// than 64 KiB or holds nothing is passed over, and so is a text that `check` refuses; the
 /// error says why each of them was.
 Result<Fact> readFirst(const std::string& root, Places places, TextCheck check = nullptr);
+
+/// The entries of a folder as paths, in a fixed order; none when it is not there.
+std::vector<std::string> entriesOf(const std::string& folder);
 
 /// A variable of an os-release(5) file, unquoted; nothing when it is missing, empty or malformed.
 std::optional<std::string> osReleaseVariable(const std::string& content, const std::string& name);

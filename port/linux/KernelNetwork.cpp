@@ -20,18 +20,6 @@ constexpr char INTERFACES[] = "/sys/class/net";
 constexpr char ADAPTER_FOLDER[] = "/sys/class/bluetooth";
 constexpr char MODEM_FOLDER[] = "/sys/class/wwan";
 
-// The entries of a folder, in a fixed order; none when it is not there.
-std::vector<std::string> entriesOf(const std::string& folder)
-{
-    std::vector<std::string> entries;
-    std::error_code ignored;
-    for (fs::directory_iterator entry(folder, ignored), end; !ignored && entry != end;
-         entry.increment(ignored))
-        entries.push_back(entry->path().string());
-    std::sort(entries.begin(), entries.end());
-    return entries;
-}
-
 bool exists(const std::string& path)
 {
     std::error_code ignored;
