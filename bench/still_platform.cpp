@@ -34,7 +34,7 @@ char secondName[] = "modem1";
 char* names[] = {firstName, secondName, nullptr};
 package_info_s package;
 
-// What is answered to a slot of each type; the first of its kind where nothing is said: in service, the first SIM.
+// The answer for each type of slot: by default the first of its kind, as in service, or the first SIM.
 template <class Value>
 const Value ANSWER{};
 template <>

@@ -54,7 +54,7 @@ struct Sims {
 
 Sims askSims();
 
-/// What the port tells, as a text, a number or a switch.
+/// Turns what the port tells into a text, a number or a switch.
 ValueOrReason answerOf(const coresystem_port::Answer& told);
 
 /// Why no slot answered a question whose origins are these: no telephony, no usable card, or the

@@ -161,7 +161,7 @@ public:
 
     // No call of the platform asks for what follows.
 
-    /// Of every slot, in the order of slots(), all of one moment.
+    /// Gives one report a slot, in the order of slots(), all of one moment.
     virtual Result<std::vector<ModemReport>> reports()
     {
         return noTelephony();

@@ -24,7 +24,7 @@ constexpr Names NETWORK_INTERFACES = {NM_DBUS_INTERFACE,
                                       NM_DBUS_INTERFACE_SETTINGS_CONNECTION,
                                       NM_DBUS_INTERFACE_DEVICE_WIRELESS,
                                       NM_DBUS_INTERFACE_ACCESS_POINT};
-// What changes all the time on a radio, and decides nothing.
+// Properties that change all the time on a radio and decide nothing.
 constexpr Names NETWORK_NOISE = {"AccessPoints", "Bitrate", "LastScan", "LastSeen", "Strength"};
 // The object manager stands above the service's main object.
 constexpr ObjectService NETWORKS = {NETWORK_MANAGER,

@@ -285,7 +285,7 @@ static_assert(MM_MODEM_ACCESS_TECHNOLOGY_POTS ==
                       1U << static_cast<unsigned>(AccessTechnology::LteNbIot),
               "access technologies are numbered as ModemManager's bits are");
 
-// Of several at once the newest: 5G that leans on LTE is 5G.
+// Takes the newest of several: 5G that leans on LTE is 5G.
 Result<AccessTechnology> technologyOf(const Modem& modem)
 {
     const Result<std::uint32_t> all = modem.accessTechnologies();
@@ -385,7 +385,7 @@ Result<Sourced<T>> sourced(const SlotName& name, const Result<T>& answer)
     return Sourced<T>{answer.value(), sourceOf(name)};
 }
 
-// What is there only while a slot's modem has a network.
+// Reads what a slot has only while its modem has a network.
 template <typename T>
 Result<Sourced<T>> ofNetwork(const Slot& slot, Result<T> (*read)(const Modem&))
 {

@@ -17,7 +17,7 @@ struct Face {
     Values known;
     const Values& defaults; // of the interface: the properties of which nothing is known
 
-    /// Of a property that the interface has; lives as long as this does.
+    /// The value of a property that the interface has; lives as long as this does.
     GVariant* value(const std::string& property) const;
     Values all() const;
 };
@@ -64,7 +64,7 @@ struct Request {
     std::string member; // a method, or the property that is to be set
     GVariant* arguments;
 
-    /// Of a property of the interface, which the object must have.
+    /// The value of a property of the interface, which the object must have.
     GVariant* value(const std::string& property) const;
 };
 

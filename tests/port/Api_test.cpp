@@ -47,7 +47,7 @@ void note(Lists& lists, const Name (&names)[count])
     lists[beginning] = all.substr(1);
 }
 
-// What a call answers in place of an error has no number.
+// These stand for what a call answers in place of an error; they have no number.
 constexpr struct {
 } OR_NULL, OR_EMPTY;
 template <class None>
