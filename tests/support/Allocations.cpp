@@ -11,8 +11,6 @@ extern "C" {
 // Reached from the program's own calls of free and strdup (the linker's --wrap).
 void __real_free(void* memory);
 char* __real_strdup(const char* text);
-void __wrap_free(void* memory);
-char* __wrap_strdup(const char* text);
 }
 
 namespace {
@@ -80,11 +78,6 @@ char* Ledger::handOut(const std::string& text)
     return copy;
 }
 
-void Ledger::addCopy(const char* text)
-{
-    add(text, "copy: ");
-}
-
 void Ledger::add(const char* text, const char* owner)
 {
     const AllocationPause pause;
@@ -137,19 +130,19 @@ std::string Ledger::origin(const char* text) const
     return entry != live_.end() ? entry->second : "";
 }
 
-void __wrap_free(void* memory)
+extern "C" void __wrap_free(void* memory)
 {
     ledger().remove(memory);
     __real_free(memory);
 }
 
-char* __wrap_strdup(const char* text)
+extern "C" char* __wrap_strdup(const char* text)
 {
     if (failsNow(Allocation::STRDUP))
         return nullptr;
     char* const copy = __real_strdup(text);
     if (state.pauses == 0)
-        ledger().addCopy(copy);
+        ledger().add(copy, "copy: ");
     return copy;
 }
 

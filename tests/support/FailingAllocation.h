@@ -56,12 +56,11 @@ public:
     // Frees what nobody has freed yet and tells what it was: for what the library keeps on purpose.
     std::vector<std::string> freeAll();
 
-    void addCopy(const char* text);
+    void add(const char* text, const char* owner);
     void remove(const void* address);
     void clear();
 
 private:
-    void add(const char* text, const char* owner);
     std::vector<std::string> texts() const;
 
     mutable std::mutex mutex_;

@@ -10,20 +10,9 @@
 
 using namespace fake;
 
-// Reached from the program's own calls (the linker's --wrap).
 extern "C" {
-void __wrap_g_type_init(void);
-GDBusConnection* __wrap_g_bus_get_sync(GBusType type, GCancellable* cancellable, GError** error);
-GDBusMessage* __wrap_g_dbus_connection_send_message_with_reply_sync(
-    GDBusConnection* connection, GDBusMessage* message, GDBusSendMessageFlags flags, gint timeout,
-    volatile guint32* serial, GCancellable* cancellable, GError** error);
-gboolean __wrap_g_dbus_connection_flush_sync(GDBusConnection* connection, GCancellable* cancellable,
-                                             GError** error);
 gboolean __real_g_dbus_message_to_gerror(GDBusMessage* message, GError** error);
-gboolean __wrap_g_dbus_message_to_gerror(GDBusMessage* message, GError** error);
 void __real_g_error_free(GError* error);
-// Visible, as the linker takes the bus library's own use for one of this: it never gets here.
-__attribute__((visibility("default"))) void __wrap_g_error_free(GError* error);
 }
 
 namespace {
@@ -208,6 +197,9 @@ void FakeBus::releaseAll()
     errors_.clear();
 }
 
+// Reached from the program's own calls (the linker's --wrap).
+extern "C" {
+
 void __wrap_g_type_init()
 {
     recordCall("g_type_init");
@@ -251,8 +243,11 @@ gboolean __wrap_g_dbus_message_to_gerror(GDBusMessage* message, GError** error)
     return isError;
 }
 
-void __wrap_g_error_free(GError* error)
+// Visible, as the linker takes the bus library's own use for one of this: it never gets here.
+__attribute__((visibility("default"))) void __wrap_g_error_free(GError* error)
 {
     bus().forgetError(error);
     __real_g_error_free(error);
 }
+
+} // extern "C"

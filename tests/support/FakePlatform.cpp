@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "FakePlatform.h"
 
-#include <algorithm>
+#include <climits>
+#include <cstdarg>
 #include <cstdio>
-
-#include <gtest/gtest.h>
 
 #include <ITapiCall.h>
 #include <ITapiNetText.h>
@@ -194,17 +193,6 @@ FakePlatform::Answer FakePlatform::answerTo(const std::string& call)
     return {-1, {}};
 }
 
-void fake::reportWrongType(const std::string& call)
-{
-    ADD_FAILURE() << "the answer to " << call << " has another type than its slot";
-}
-
-std::any FakePlatform::valueOf(const std::string& call)
-{
-    const std::lock_guard<std::mutex> lock(mutex_);
-    return answers_[call].value;
-}
-
 Texts FakePlatform::liveHandles() const
 {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -356,12 +344,10 @@ int __dlog_print(log_id_t id, int priority, const char* tag, const char* format,
 int telephony_init(telephony_handle_list_s* list)
 {
     const AllocationPause pause;
-    const int result = platform().call("telephony_init");
-    const std::any value = platform().valueOf("telephony_init()");
-    if (const auto* const count = std::any_cast<unsigned int>(&value))
-        *list = platform().openList(*count);
-    else if (value.has_value())
-        reportWrongType("telephony_init()");
+    unsigned int count = UINT_MAX;
+    const int result = platform().reply("telephony_init", &count);
+    if (count != UINT_MAX)
+        *list = platform().openList(count);
     return result;
 }
 
@@ -512,7 +498,6 @@ int package_manager_get_package_size_info(const char* package_id,
 
 // The program's own calls of time() come here (the linker's --wrap).
 std::time_t __real_time(std::time_t* slot);
-std::time_t __wrap_time(std::time_t* slot);
 
 std::time_t __wrap_time(std::time_t* slot)
 {

@@ -2,17 +2,13 @@
 // A recording fake of everything the library imports: the platform's C functions and the utility
 // library. It is linked with the library's objects in place of both.
 //
-// Records all calls as one ordered sequence of events; the platform's answers are set by
-// the test. A call whose answer was not set fails the test, and so does a log line that breaks the
-// rules that hold for every line.
-//
-// A new platform function takes one row in platform_replies.def, or, where it does more than answer, a
-// definition in FakePlatform.cpp.
+// Records all calls as one ordered sequence of events; a call whose answer was not set fails the
+// test, and so does a log line that breaks the rules that hold for every line. A function that only
+// answers takes one row in platform_replies.def.
 #ifndef CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
 #define CORESYSTEM_TESTS_SUPPORT_FAKE_PLATFORM_H
 
 #include <any>
-#include <cstdarg>
 #include <cstring>
 #include <ctime>
 #include <functional>
@@ -25,6 +21,7 @@
 #include <string>
 #include <vector>
 
+#include <gtest/gtest.h>
 #include <package_info.h>
 #include <runtime_info.h>
 #include <tapi_common.h>
@@ -65,9 +62,7 @@ typedef std::vector<std::string> Texts;
 // Operations on it may be called from any thread; the settings are for one thread at a time.
 class FakePlatform {
 public:
-    // Forgets all events, answers and settings, and empties the ledger.
-    void reset();
-    // Forgets the events only.
+    void reset(); // the ledger, too
     void forgetEvents();
 
     // \name What it answers
@@ -118,7 +113,6 @@ public:
     // The same for a function that hands a value out through `slot`.
     template <class Value, class... Arguments>
     int reply(const char* function, Value* slot, const Arguments&... arguments);
-    std::any valueOf(const std::string& call);
     telephony_handle_list_s openList(unsigned int count);
     void closeList(const telephony_handle_list_s& list);
     void addHandle(const std::string& handle);
@@ -185,9 +179,6 @@ int FakePlatform::call(const char* function, const Arguments&... arguments)
     return answerTo(callText(function, arguments...)).result;
 }
 
-// Fails the test.
-void reportWrongType(const std::string& call);
-
 // Whether the value suits the slot; it is stored if so.
 template <class Value>
 bool store(const std::any& value, Value* slot)
@@ -218,7 +209,7 @@ int FakePlatform::reply(const char* function, Value* slot, const Arguments&... a
     const std::string call = callText(function, arguments...);
     const Answer answer = answerTo(call);
     if (answer.value.has_value() && !store(answer.value, slot))
-        reportWrongType(call);
+        ADD_FAILURE() << "the answer to " << call << " has another type than its slot";
     return answer.result;
 }
 

@@ -97,6 +97,9 @@ std::string rowName(const testing::TestParamInfo<Row>& info)
 
 class LoggedCallTest : public PlatformTest, public testing::WithParamInterface<LoggedCall> {};
 
+#define LOGGED_CALLS(name, calls) \
+    INSTANTIATE_TEST_SUITE_P(name, LoggedCallTest, testing::ValuesIn(calls), rowName<LoggedCall>)
+
 } // namespace fake
 
 #endif

@@ -55,22 +55,6 @@ std::set<std::string> distinct(const Rows& rows, std::size_t index)
     return {all.begin(), all.end()};
 }
 
-bool consistsOf(const std::string& text, const std::string& characters)
-{
-    return text.find_first_not_of(characters) == std::string::npos;
-}
-
-const std::string DIGITS = "0123456789";
-const std::string LOWER = "abcdefghijklmnopqrstuvwxyz";
-const std::string UPPER = "ABCDEFGHIJKLMNOPQRSTUVWXYZ";
-
-void expectShape(const Rows& rows, std::size_t index, std::size_t length,
-                 const std::string& characters)
-{
-    for (const std::string& cell : column(rows, index))
-        EXPECT_TRUE(cell.size() == length && consistsOf(cell, characters)) << cell;
-}
-
 } // namespace
 
 // The columns that nothing searches exist in the rows only.
@@ -98,61 +82,13 @@ TEST(TableRows, EveryCellStandsInItsPlace)
     expectCells(LanguageCodeTable::UPPER_CASE, column(LANGUAGE_CODES, 1));
 }
 
-TEST(TableRows, CountsAreThoseOfTheRows)
-{
-    EXPECT_EQ(MccCountryTable::ROWS, MCC_COUNTRIES.size());
-    EXPECT_EQ(ServiceCountryTable::ROWS, SERVICE_COUNTRIES.size());
-    EXPECT_EQ(CallingCodeTable::ROWS, CALLING_CODES.size());
-    EXPECT_EQ(Alpha3CountryTable::ROWS, ALPHA3_COUNTRIES.size());
-    EXPECT_EQ(MoSupportMccTable::ROWS, MO_SUPPORT_MCCS.size());
-    EXPECT_EQ(LanguageCodeTable::ROWS, LANGUAGE_CODES.size());
-}
-
 // What is true of the rows as a whole, and stays so when one is added.
-
-TEST(TableFacts, CellsHaveTheirShape)
-{
-    for (const Rows* rows :
-         {&MCC_COUNTRIES, &SERVICE_COUNTRIES, &CALLING_CODES, &ALPHA3_COUNTRIES, &MO_SUPPORT_MCCS})
-        expectShape(*rows, 0, 3, DIGITS);
-    expectShape(MCC_COUNTRIES, 1, 2, LOWER);
-    expectShape(MO_SUPPORT_MCCS, 1, 2, LOWER);
-    expectShape(ALPHA3_COUNTRIES, 1, 3, UPPER);
-    expectShape(LANGUAGE_CODES, 0, 3, LOWER);
-    expectShape(LANGUAGE_CODES, 1, 2, UPPER);
-    expectShape(SERVICE_COUNTRIES, 1, 5, LOWER + "_" + UPPER);
-}
-
-TEST(TableFacts, CallingCodesAreOneToThreeDigitsWithoutLeadingZero)
-{
-    for (const std::string& code : column(CALLING_CODES, 1))
-        EXPECT_TRUE(consistsOf(code, DIGITS) && code.size() >= 1 && code.size() <= 3 &&
-                    code[0] != '0')
-            << code;
-}
 
 TEST(TableFacts, MoSupportRowsAreCopiesOfMccCountries)
 {
     for (const Row& row : MO_SUPPORT_MCCS)
         EXPECT_NE(std::find(MCC_COUNTRIES.begin(), MCC_COUNTRIES.end(), row), MCC_COUNTRIES.end())
             << row[0];
-}
-
-TEST(TableFacts, NamesArePrintableAscii)
-{
-    for (const std::string& name : column(MCC_COUNTRIES, 2))
-        EXPECT_TRUE(!name.empty() && std::all_of(name.begin(), name.end(), [](char c) {
-            return c >= ' ' && c <= '~';
-        })) << name;
-}
-
-TEST(TableFacts, LocalesAreLanguageUnderscoreCountry)
-{
-    for (const std::string& locale : column(SERVICE_COUNTRIES, 1)) {
-        EXPECT_TRUE(consistsOf(locale.substr(0, 2), LOWER)) << locale;
-        EXPECT_EQ(locale[2], '_') << locale;
-        EXPECT_TRUE(consistsOf(locale.substr(3), UPPER)) << locale;
-    }
 }
 
 TEST(TableFacts, OnlyMcc340HasTwoRows)

@@ -10,7 +10,6 @@ namespace {
 
 struct Network {
     std::string name; // of the method
-    int (ConnectionManager::*read)();
     CoreSystemInternals::StateRead ask;
     std::string function; // of the platform
     Texts states;
@@ -50,13 +49,12 @@ const Texts CELLULAR_STATES =
                           "AVAILABLE", "CONNECTED"});
 const Texts OTHER_STATES = {"DEACTIVATED", "DISCONNECTED", "CONNECTED"};
 const Network NETWORKS[] = {
-    {"GetCellularNetworkState", &ConnectionManager::GetCellularNetworkState,
-     CoreSystemInternals::GET_CELLULAR_STATE, "connection_get_cellular_state", CELLULAR_STATES},
-    {"GetWifiNetworkState", &ConnectionManager::GetWifiNetworkState,
-     CoreSystemInternals::GET_WIFI_STATE, "connection_get_wifi_state",
+    {"GetCellularNetworkState", CoreSystemInternals::GET_CELLULAR_STATE,
+     "connection_get_cellular_state", CELLULAR_STATES},
+    {"GetWifiNetworkState", CoreSystemInternals::GET_WIFI_STATE, "connection_get_wifi_state",
      statesOf("WIFI", OTHER_STATES)},
-    {"GetBTNetworkState", &ConnectionManager::GetBTNetworkState, CoreSystemInternals::GET_BT_STATE,
-     "connection_get_bt_state", statesOf("BT", OTHER_STATES)},
+    {"GetBTNetworkState", CoreSystemInternals::GET_BT_STATE, "connection_get_bt_state",
+     statesOf("BT", OTHER_STATES)},
 };
 const Network& CELLULAR = NETWORKS[0];
 const Network& WIFI = NETWORKS[1];
@@ -64,13 +62,6 @@ const Network& BLUETOOTH = NETWORKS[2];
 
 // Every state that the platform lists, and some that it does not.
 const int STATES[] = {0, 1, 2, 3, 4, 5, 6, 7, -1, INT32_MAX, INT32_MIN};
-const int CONNECTION_FAILURES[] = {-22, -12, -13, -29294591, -1, 1, INT32_MIN};
-
-ConnectionManager& manager()
-{
-    return *CoreSystemInternals::instance<ConnectionManager>();
-}
-
 Texts facadeTrace(const std::string& method)
 {
     return Texts{CORE_SYSTEM.debug(method, "CoreSystem " + method)} + CONNECTION_MANAGER.access();
@@ -80,22 +71,14 @@ std::vector<LoggedCall> stateCalls()
 {
     std::vector<LoggedCall> calls;
     for (const Network& network : NETWORKS)
-        for (const int state : STATES) {
-            const std::string name =
-                network.name + std::to_string(static_cast<unsigned int>(state));
-            const auto add = [&](const std::string& way, const Texts& trace, const auto& read) {
-                calls.push_back({way + name,
-                                 [=] {
-                                     network.answer(state);
-                                     EXPECT_EQ(read(), state);
-                                     EXPECT_THAT(platform().liveHandles(), IsEmpty());
-                                 },
-                                 trace});
-            };
-            add("", network.trace(state), [=] { return (manager().*network.read)(); });
-            add("Facade", facadeTrace(network.name) + network.trace(state),
-                [=] { return (coreSystem().*network.ask)(); });
-        }
+        for (const int state : STATES)
+            calls.push_back({network.name + std::to_string(static_cast<unsigned int>(state)),
+                             [=] {
+                                 network.answer(state);
+                                 EXPECT_EQ((coreSystem().*network.ask)(), state);
+                                 EXPECT_THAT(platform().liveHandles(), IsEmpty());
+                             },
+                             facadeTrace(network.name) + network.trace(state)});
     return calls;
 }
 
@@ -126,12 +109,6 @@ std::vector<LoggedCall> connectedCalls()
         calls.push_back({name,
                          [=] {
                              answerAll(cellular, wifi, bluetooth);
-                             EXPECT_EQ(manager().IsNetworkConnected(checkWifi, checkBT), answer);
-                         },
-                         trace});
-        calls.push_back({"Facade" + name,
-                         [=] {
-                             answerAll(cellular, wifi, bluetooth);
                              EXPECT_EQ(coreSystem().IsNetworkConnected(checkWifi, checkBT), answer);
                          },
                          facadeTrace("IsNetworkConnected") + trace});
@@ -146,10 +123,8 @@ std::vector<LoggedCall> connectedCalls()
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(NetworkStates, LoggedCallTest, testing::ValuesIn(stateCalls()),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(NetworkConnected, LoggedCallTest, testing::ValuesIn(connectedCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(NetworkStates, stateCalls());
+LOGGED_CALLS(NetworkConnected, connectedCalls());
 
 class NetworkTest : public PlatformTest {};
 
@@ -160,10 +135,10 @@ TEST_F(NetworkTest, ResultCodesPlayNoPartAndWhatIsNotReadIsZero)
     for (const Network& network : NETWORKS) {
         const auto expectState = [&](int state, const std::string& handle) {
             platform().forgetEvents();
-            EXPECT_EQ((connections.*network.read)(), state);
-            EXPECT_EQ(platform().trace(), network.trace(state, handle));
+            EXPECT_EQ((system.*network.ask)(), state);
+            EXPECT_EQ(platform().trace(), facadeTrace(network.name) + network.trace(state, handle));
         };
-        for (const int code : CONNECTION_FAILURES) {
+        for (const int code : {-22, 1}) {
             network.answer(2, code);
             platform().answer("connection_destroy(connection)", code);
             expectState(2, "connection");
@@ -190,15 +165,6 @@ TEST_F(NetworkTest, OnlyConnectedNetworksThatAreCheckedCount)
                                       (checkBT && bluetooth == 2))
                             << cellular << wifi << bluetooth << checkWifi << checkBT;
                     }
-}
-
-TEST_F(NetworkTest, NothingIsConnectedWhereNoHandleIsToBeHad)
-{
-    platform().answer("connection_create()", -12);
-    for (const Network& network : NETWORKS)
-        platform().answer(network.readCall("no connection"), -22);
-    platform().answer("connection_destroy(no connection)", -22);
-    EXPECT_FALSE(connections.IsNetworkConnected(true, true));
 }
 
 TEST_F(NetworkTest, ManyThreadsMayAskAtOnce)

@@ -1,7 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 // The country questions: the searches of SimManager, and the facade's ways to them.
-#include <stdexcept>
-
 #include "support/PlatformTest.h"
 #include "support/Together.h"
 
@@ -13,7 +11,6 @@ namespace {
 
 struct Converter {
     std::string name;
-    void (SimManager::*search)(const char* key, char** slot);
     void (CoreSystem::*question)(const char* key, char** slot);
     std::string keyName;
     std::string key;
@@ -23,13 +20,8 @@ struct Converter {
     std::string success = "success to get ";
 };
 
-std::ostream& operator<<(std::ostream& out, const Converter& converter)
-{
-    return out << converter.name;
-}
-
 // An entry that names another method and a success that is marked are meant.
-#define CONVERTER(name) #name, &SimManager::name, &CoreSystem::name
+#define CONVERTER(name) #name, &CoreSystem::name
 const std::vector<Converter> CONVERTERS = {
     {CONVERTER(GetCountryCodeFromMcc), "mcc", "450", "kr", "countrycode", "GetMccToCountryCode"},
     {CONVERTER(GetCountryNameFromMcc), "mcc", "450", "Korea, South", "countryName"},
@@ -56,58 +48,23 @@ Texts missedTrace(const Converter& row, const std::string& key)
             SIM_MANAGER.error(row.name, "fail to get " + row.valueName)};
 }
 
-// Keys that no table holds.
+// Keys that no table holds; the tables' own tests ask for more.
 Texts strangeKeys(const std::string& key)
 {
     std::string everyByte;
     for (int byte = 1; byte < 256; ++byte)
         everyByte += static_cast<char>(byte);
-    Texts keys = {"-",
-                  "-1",
-                  "12",
-                  "99999999999999999999",
-                  "abc",
-                  "no digits here",
-                  "%s%n",
-                  "\xc3\xa9",
-                  "\xff\xfe\xfd\xfc",
-                  everyByte};
-    for (const char* before : {" ", "0", "+"})
-        keys.push_back(before + key);
-    for (const char* after : {" ", "0", "\n"})
-        keys.push_back(key + after);
-    keys.push_back(std::string(10 << 20, '4')); // long enough for any buffer
-    return keys;
-}
-
-// The slot's content after a question that begins with `preset` in it.
-template <class Target>
-char* ask(Target& target, void (Target::*question)(const char*, char**), const char* key,
-          char* preset = nullptr)
-{
-    char* slot = preset;
-    (target.*question)(key, &slot);
-    return slot;
+    return {"-1", "%s%n", everyByte, " " + key, key + "0", std::string(10 << 20, '4')};
 }
 
 typedef void (CoreSystem::*Question)(const char* key, char** slot);
 
+// The slot's content after a question that begins with `preset` in it.
 char* ask(Question question, const char* key, char* preset = nullptr)
 {
-    return ask(coreSystem(), question, key, preset);
-}
-
-// A converter as SimManager has it, and as the facade has it.
-typedef std::function<char*(const std::string& key, char* preset)> Way;
-
-std::vector<Way> waysOf(const Converter& row)
-{
-    return {[row](const std::string& key, char* preset) {
-                return ask(simManager(), row.search, key.c_str(), preset);
-            },
-            [row](const std::string& key, char* preset) {
-                return ask(row.question, key.c_str(), preset);
-            }};
+    char* slot = preset;
+    (coreSystem().*question)(key, &slot);
+    return slot;
 }
 
 Texts entryLine(const std::string& method)
@@ -136,28 +93,23 @@ std::vector<LoggedCall> converterCalls()
 {
     std::vector<LoggedCall> calls;
     for (const Converter& row : CONVERTERS) {
-        const Texts found = foundTrace(row, row.key, row.value);
-        const Texts missed = missedTrace(row, "KR 9");
         const Texts entry = entryLine(row.name);
-        const auto searched = [&](const Texts& trace, const std::string& value) {
-            return entry + SIM_MANAGER.access() + trace +
-                   Texts{CORE_SYSTEM.debug(row.name, row.valueName + " : " + value)};
-        };
-        const auto add = [&](const std::string& name, std::size_t way, const std::string& key,
-                             const Texts& trace) {
-            const Way ask = waysOf(row)[way];
+        const auto add = [&](const std::string& name, const std::string& key, const Texts& trace,
+                             const std::string& value) {
             const auto run = [=] {
-                char* const value = ask(key, nullptr);
-                EXPECT_EQ(value != nullptr, key == row.key);
-                std::free(value);
+                char preset = 'p';
+                char* const answer = ask(row.question, key.c_str(), &preset);
+                EXPECT_EQ(answer != nullptr ? answer : "(null)", value);
+                EXPECT_EQ(ledger().live(), answer ? Texts{"copy: " + row.value} : Texts());
+                std::free(answer); // the caller's
             };
-            calls.push_back({name, run, trace});
+            const std::string line = row.valueName + " : " + value;
+            calls.push_back({row.name + name, run,
+                             entry + SIM_MANAGER.access() + trace +
+                                 Texts{CORE_SYSTEM.debug(row.name, line)}});
         };
-        add("Sim" + row.name + "Found", 0, row.key, found);
-        add("Sim" + row.name + "Missed", 0, "KR 9", missed);
-        add("Sim" + row.name + "EmptyKey", 0, "", missedTrace(row, ""));
-        add(row.name + "Found", 1, row.key, searched(found, row.value));
-        add(row.name + "Missed", 1, "KR 9", searched(missed, "(null)"));
+        add("Found", row.key, foundTrace(row, row.key, row.value), row.value);
+        add("Missed", "KR 9", missedTrace(row, "KR 9"), "(null)");
         const Texts refusal = entry + emptyKeyError(row.name, row.keyName);
         calls.push_back(refusedCall(row.name + "EmptyKey", row.question, "", refusal));
         calls.push_back(refusedCall(row.name + "NullKey", row.question, nullptr, refusal));
@@ -165,24 +117,15 @@ std::vector<LoggedCall> converterCalls()
     return calls;
 }
 
-// The chained questions.
-
 const char* const NAME = "GetCountryNameFromCountryCallingCode";
 const char* const ALPHA2 = "GetCountryNameAlpha2FromCountryCallingCode";
 const Question ASK_NAME = &CoreSystem::GetCountryNameFromCountryCallingCode;
 const Question ASK_ALPHA2 = &CoreSystem::GetCountryNameAlpha2FromCountryCallingCode;
 
-const Converter& converter(const std::string& name)
-{
-    for (const Converter& row : CONVERTERS)
-        if (row.name == name)
-            return row;
-    throw std::logic_error(name);
-}
-
 std::vector<LoggedCall> chainedCalls()
 {
-    const Converter& toMcc = converter("GetMccFromCountryCallingCode");
+    const Converter& toName = CONVERTERS[1];
+    const Converter& toMcc = CONVERTERS[5];
     const Texts found = SIM_MANAGER.access() + foundTrace(toMcc, "596", "340");
     const Texts missed = SIM_MANAGER.access() + missedTrace(toMcc, "999");
     // Names another method than the one that was asked.
@@ -190,7 +133,7 @@ std::vector<LoggedCall> chainedCalls()
     std::vector<LoggedCall> calls = {
         {"NameOfCallingCodeFound", [] { std::free(ask(ASK_NAME, "596")); },
          entryLine(NAME) + found + step + SIM_MANAGER.access() +
-             foundTrace(converter("GetCountryNameFromMcc"), "340", "Guadeloupe (France)") +
+             foundTrace(toName, "340", "Guadeloupe (France)") +
              Texts{CORE_SYSTEM.debug(NAME, "countryName : Guadeloupe (France)")}},
         {"Alpha2OfCallingCodeFound", [] { EXPECT_THAT(ask(ASK_ALPHA2, "596"), StrEq("mq")); },
          entryLine(ALPHA2) + found + Texts{CORE_SYSTEM.debug(ALPHA2, "countryNameAlpha2 : mq")}},
@@ -207,7 +150,7 @@ std::vector<LoggedCall> chainedCalls()
     return calls;
 }
 
-// The predicates. An MCC may be asked for as const and as mutable.
+// An MCC may be asked for as const and as mutable.
 
 typedef bool (*Predicate)(const char* key);
 
@@ -215,12 +158,7 @@ const Predicate IS_VALID = [](const char* mcc) { return coreSystem().IsValidMcc(
 const Predicate IS_VALID_MUTABLE = [](const char* mcc) {
     return coreSystem().IsValidMcc(const_cast<char*>(mcc));
 };
-const Predicate IS_VALID_OF_SIM = [](const char* mcc) { return simManager().IsValidMcc(mcc); };
 const Predicate IS_MO_SUPPORT = [](const char* mcc) { return coreSystem().IsMoSupportMcc(mcc); };
-const Predicate IS_MO_SUPPORT_OF_SIM = [](const char* mcc) {
-    return simManager().IsMoSupportMcc(mcc);
-};
-
 LoggedCall predicateCall(const std::string& name, Predicate ask, const char* mcc, bool answer,
                          const Texts& trace)
 {
@@ -243,10 +181,6 @@ std::vector<LoggedCall> predicateCalls()
     const Texts entry = entryLine("IsValidMcc");
     const Texts refusal = entry + emptyKeyError("IsValidMcc", "mcc");
     std::vector<LoggedCall> calls = {
-        predicateCall("SimValidMcc", IS_VALID_OF_SIM, "412", true, validity("412", true)),
-        predicateCall("SimInvalidMcc", IS_VALID_OF_SIM, "4120", false, validity("4120", false)),
-        predicateCall("SimEmptyMcc", IS_VALID_OF_SIM, "", false, validity("", false)),
-        predicateCall("SimMoSupport", IS_MO_SUPPORT_OF_SIM, "505", true, moAsked),
         predicateCall("MoSupport", IS_MO_SUPPORT, "505", true, SIM_MANAGER.access() + moAsked),
         predicateCall("MoSupportEmpty", IS_MO_SUPPORT, "", false, emptyKeyError(mo, "mcc")),
         predicateCall("MoSupportNull", IS_MO_SUPPORT, nullptr, false, emptyKeyError(mo, "mcc")),
@@ -262,79 +196,58 @@ std::vector<LoggedCall> predicateCalls()
     return calls;
 }
 
-std::vector<LoggedCall> countryCalls()
-{
-    std::vector<LoggedCall> all;
-    for (const auto& calls : {converterCalls(), chainedCalls(), predicateCalls()})
-        all.insert(all.end(), calls.begin(), calls.end());
-    return all;
-}
-
-INSTANTIATE_TEST_SUITE_P(Country, LoggedCallTest, testing::ValuesIn(countryCalls()),
-                         rowName<LoggedCall>);
-
-class ConverterTest : public PlatformTest, public testing::WithParamInterface<Converter> {
-protected:
-    const Converter& row = GetParam();
-    char preset = 'p';
-};
-
-INSTANTIATE_TEST_SUITE_P(Every, ConverterTest, testing::ValuesIn(CONVERTERS), rowName<Converter>);
-
-TEST_P(ConverterTest, AnswerIsCopyThatTheCallerFrees)
-{
-    for (const Way& ask : waysOf(row)) {
-        char* const value = ask(row.key, &preset);
-        EXPECT_THAT(value, StrEq(row.value));
-        EXPECT_EQ(ledger().live(), Texts{"copy: " + row.value});
-        std::free(value);
-        EXPECT_THAT(ledger().live(), IsEmpty());
-    }
-}
-
-TEST_P(ConverterTest, UnknownKeysGiveNull)
-{
-    for (const int mode : {0, 1}) {
-        platform().debugMode = mode;
-        for (const std::string& key : strangeKeys(row.key))
-            for (const Way& ask : waysOf(row))
-                EXPECT_EQ(ask(key, &preset), nullptr) << key.substr(0, 100);
-    }
-    EXPECT_EQ(ask(simManager(), row.search, "", &preset), nullptr);
-    EXPECT_THAT(ledger().live(), IsEmpty());
-}
-
-TEST_P(ConverterTest, FailedCopyGivesNull)
-{
-    platform().debugMode = 1;
-    for (const Way& ask : waysOf(row)) {
-        platform().forgetEvents();
-        const FailingAllocation failure(Allocation::STRDUP);
-        EXPECT_EQ(ask(row.key, &preset), nullptr);
-        EXPECT_TRUE(failure.happened());
-        EXPECT_THAT(platform().trace(), testing::IsSupersetOf(foundTrace(row, row.key, "(null)")));
-    }
-}
-
-TEST_P(ConverterTest, FacadesSlotIsWrittenAfterTheSearch)
-{
-    const Question question = row.question;
-    char* slot = &preset;
-    const char* seen = nullptr;
-    platform().debugMode = 1;
-    platform().onEvent = [&](const Event& event) {
-        if (event.text == foundTrace(row, row.key, row.value).back())
-            seen = slot;
-    };
-    (system.*question)(row.key.c_str(), &slot);
-    EXPECT_EQ(seen, &preset);
-    std::free(slot);
-}
+LOGGED_CALLS(Converters, converterCalls());
+LOGGED_CALLS(CallingCodes, chainedCalls());
+LOGGED_CALLS(Predicates, predicateCalls());
 
 class CountryTest : public PlatformTest {
 protected:
     char preset = 'p';
 };
+
+TEST_F(CountryTest, UnknownKeysGiveNullAndKeepNothing)
+{
+    for (const int mode : {0, 1})
+        for (const Converter& row : CONVERTERS) {
+            platform().debugMode = mode;
+            for (const std::string& key : strangeKeys(row.key))
+                EXPECT_EQ(ask(row.question, key.c_str(), &preset), nullptr)
+                    << row.name << key.substr(0, 100);
+        }
+    for (const std::string& code : strangeKeys("596"))
+        for (const Question question : {ASK_NAME, ASK_ALPHA2})
+            EXPECT_EQ(ask(question, code.c_str(), &preset), &preset) << code.substr(0, 100);
+    EXPECT_THAT(ledger().live(), IsEmpty());
+}
+
+TEST_F(CountryTest, FailedCopyGivesNull)
+{
+    platform().debugMode = 1;
+    for (const Converter& row : CONVERTERS) {
+        platform().forgetEvents();
+        const FailingAllocation failure(Allocation::STRDUP);
+        EXPECT_EQ(ask(row.question, row.key.c_str(), &preset), nullptr);
+        EXPECT_TRUE(failure.happened());
+        EXPECT_THAT(platform().trace(), testing::IsSupersetOf(foundTrace(row, row.key, "(null)")));
+    }
+}
+
+TEST_F(CountryTest, SlotIsWrittenAfterTheSearch)
+{
+    for (const Converter& row : CONVERTERS) {
+        const Question question = row.question;
+        char* slot = &preset;
+        const char* seen = nullptr;
+        platform().debugMode = 1;
+        platform().onEvent = [&](const Event& event) {
+            if (event.text == foundTrace(row, row.key, row.value).back())
+                seen = slot;
+        };
+        (system.*question)(row.key.c_str(), &slot);
+        EXPECT_EQ(seen, &preset) << row.name;
+        std::free(slot);
+    }
+}
 
 TEST_F(CountryTest, NameIsCopyAndItsMccIsKept)
 {
@@ -350,17 +263,6 @@ TEST_F(CountryTest, Alpha2IsTheTablesOwnTextAndItsMccIsKept)
     EXPECT_EQ(ask(ASK_ALPHA2, "590", &preset), answer);
     EXPECT_EQ(ledger().origin(answer), "");
     EXPECT_EQ(ledger().live(), (Texts{"copy: 340", "copy: 340"}));
-}
-
-TEST_F(CountryTest, UnknownCallingCodesLeaveTheSlotAndKeepNothing)
-{
-    for (const int mode : {0, 1}) {
-        platform().debugMode = mode;
-        for (const std::string& code : strangeKeys("596"))
-            for (const Question question : {ASK_NAME, ASK_ALPHA2})
-                EXPECT_EQ(ask(question, code.c_str(), &preset), &preset) << code.substr(0, 100);
-    }
-    EXPECT_THAT(ledger().live(), IsEmpty());
 }
 
 TEST_F(CountryTest, FailedCopyOfTheChainedMccLeavesTheSlot)
@@ -382,12 +284,15 @@ TEST_F(CountryTest, FailedCopyOfTheChainedNameGivesNull)
 TEST_F(CountryTest, StrangeMccsAreInvalidAndSupportMo)
 {
     for (const std::string& key : strangeKeys("412")) {
-        for (const Predicate isValid : {IS_VALID, IS_VALID_MUTABLE, IS_VALID_OF_SIM})
-            EXPECT_FALSE(isValid(key.c_str())) << key.substr(0, 100);
+        EXPECT_FALSE(IS_VALID(key.c_str())) << key.substr(0, 100);
         EXPECT_TRUE(IS_MO_SUPPORT(key.c_str()));
-        EXPECT_TRUE(IS_MO_SUPPORT_OF_SIM(key.c_str()));
     }
-    EXPECT_TRUE(sim.IsMoSupportMcc("")); // the facade alone refuses it
+    // The facade alone refuses an empty key.
+    EXPECT_FALSE(sim.IsValidMcc(""));
+    EXPECT_TRUE(sim.IsMoSupportMcc(""));
+    char* slot = &preset;
+    sim.GetMccFromCountryCode("", &slot);
+    EXPECT_EQ(slot, nullptr);
 }
 
 TEST_F(CountryTest, ManyThreadsMayAskAtOnce)

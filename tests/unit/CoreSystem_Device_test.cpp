@@ -18,11 +18,6 @@ struct DeviceQuestion {
     bool copies;          // hands out a copy, and keeps the slot on failure
 };
 
-std::ostream& operator<<(std::ostream& out, const DeviceQuestion& question)
-{
-    return out << question.name;
-}
-
 const DeviceQuestion QUESTIONS[] = {
     {"GetDeviceName", &CoreSystem::GetDeviceName, "system_settings_get_value_string(21)",
      "CoreSystem::GetDeviceName", "deviceName : ", true, false},
@@ -39,10 +34,6 @@ const DeviceQuestion QUESTIONS[] = {
      "system_info_get_platform_string(tizen.org/system/model_name)", "CoreSystem::GetModelName",
      "Model Name : ", false, false},
 };
-
-// Every code that the platform documents, and some that it does not.
-const int DEVICE_FAILURES[] = {-22, -12, -5, -13,       -1073741822, -38141953,
-                               -1,  1,   4,  INT32_MAX, INT32_MIN};
 
 std::string resultLine(const DeviceQuestion& question, const std::string& value, int code)
 {
@@ -106,69 +97,62 @@ std::vector<LoggedCall> loggedCalls()
                              trace});
         };
         fails("AnsweredNull", 0, false, answeredTrace(question, "(null)"));
-        for (const int code : DEVICE_FAILURES)
+        for (const int code : {-22, -1, 1})
             fails("Failed" + std::to_string(static_cast<unsigned int>(code)), code, question.copies,
                   failedTrace(question, code));
     }
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(Device, LoggedCallTest, testing::ValuesIn(loggedCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(Device, loggedCalls());
 
-class DeviceQuestionTest : public PlatformTest, public testing::WithParamInterface<DeviceQuestion> {
+class DeviceTest : public PlatformTest {
 protected:
-    const DeviceQuestion& question = GetParam();
+    const DeviceQuestion& tizenId = QUESTIONS[1];
     char preset = 'p';
 };
 
-INSTANTIATE_TEST_SUITE_P(Every, DeviceQuestionTest, testing::ValuesIn(QUESTIONS),
-                         rowName<DeviceQuestion>);
-
-TEST_P(DeviceQuestionTest, OddValuesPassThroughUnchanged)
+TEST_F(DeviceTest, OddValuesPassThroughUnchanged)
 {
-    for (const std::string& odd : {std::string(), std::string("%s%n"),
-                                   std::string("\xff\xc3\xa9\n"), std::string(10 << 20, 'n')})
-        for (const int mode : {0, 1}) {
-            platform().debugMode = mode;
-            expectValue(question, odd);
-        }
+    for (const DeviceQuestion& question : QUESTIONS)
+        for (const std::string& odd : {std::string(), std::string("%s%n"),
+                                       std::string("\xff\xc3\xa9\n"), std::string(10 << 20, 'n')})
+            for (const int mode : {0, 1}) {
+                platform().debugMode = mode;
+                expectValue(question, odd);
+            }
 }
 
-TEST_P(DeviceQuestionTest, SlotAfterFailureIsWhatThePlatformLeftThere)
+TEST_F(DeviceTest, SlotAfterFailureIsWhatThePlatformLeftThere)
 {
     char remains[] = "remains";
-    platform().answer(question.call, -5, static_cast<char*>(remains));
-    EXPECT_EQ(ask(question, -5, &preset), question.copies ? &preset : remains);
-    EXPECT_STREQ(remains, "remains");
+    for (const DeviceQuestion& question : QUESTIONS) {
+        platform().answer(question.call, -5, static_cast<char*>(remains));
+        EXPECT_EQ(ask(question, -5, &preset), question.copies ? &preset : remains) << question.name;
+        EXPECT_STREQ(remains, "remains");
+    }
 }
 
-class TizenIdTest : public PlatformTest {
-protected:
-    const DeviceQuestion& question = QUESTIONS[1];
-    char preset = 'p';
-};
-
-TEST_F(TizenIdTest, FailedCopyGivesNullAndFreesThePlatformsString)
+TEST_F(DeviceTest, FailedCopyOfTheIdentifierGivesNullAndFreesThePlatformsString)
 {
-    platform().answer(question.call, 0, std::string("an identifier"));
+    platform().answer(tizenId.call, 0, std::string("an identifier"));
     platform().debugMode = 1;
     const FailingAllocation failure(Allocation::STRDUP);
-    EXPECT_EQ(ask(question, 0, &preset), nullptr);
+    EXPECT_EQ(ask(tizenId, 0, &preset), nullptr);
     EXPECT_TRUE(failure.happened());
     EXPECT_THAT(ledger().live(), IsEmpty());
-    EXPECT_EQ(platform().trace(), answeredTrace(question, "(null)"));
+    EXPECT_EQ(platform().trace(), answeredTrace(tizenId, "(null)"));
 }
 
-TEST_F(TizenIdTest, TagAndModeMayChangeDuringTheCall)
+TEST_F(DeviceTest, TagAndModeMayChangeDuringTheCall)
 {
-    platform().answer(question.call, -5);
+    platform().answer(tizenId.call, -5);
     platform().onEvent = [](const Event& event) {
         if (event.kind == Event::Kind::CALL)
             platform().tag = "Late";
     };
     platform().debugMode = 1;
-    ask(question, -5, &preset);
+    ask(tizenId, -5, &preset);
     EXPECT_THAT(platform().lines(), testing::ElementsAre(Field(&LogLine::tag, "CoreSystem"),
                                                          Field(&LogLine::tag, "Late")));
 }

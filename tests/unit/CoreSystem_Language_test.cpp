@@ -92,8 +92,7 @@ const LoggedCall LANGUAGE_CALLS[] = {
     call("LanguageReadGaveNull", 0, "", false, readingTrace(0, 2) + notConverted("EN")),
 };
 
-INSTANTIATE_TEST_SUITE_P(Language, LoggedCallTest, testing::ValuesIn(LANGUAGE_CALLS),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(Language, LANGUAGE_CALLS);
 
 class LanguageTest : public PlatformTest {};
 
@@ -104,36 +103,18 @@ TEST_F(LanguageTest, LanguagePartIsUpperCasedOrConverted)
         bool convert;
         std::string code;
     } rows[] = {
-        {"en_US.UTF-8", false, "EN"},
-        {"ko_KR.UTF-8", false, "KO"},
-        {"de_DE.UTF-8", false, "DE"},
         {"azAZ_x", false, "AZAZ"},
         {"a_b_c", false, "A"},
-        {"en_US.UTF-8", true, "eng"},
-        {"ko_KR.UTF-8", true, "kor"},
         {"LG_x", true, "lug"},
-        {"hi_IN", true, "hin"},
         {"ie", true, "ine"},
         // Without the separator all of it is the language, and before it is what begins with it.
-        {"C", false, "C"},
         {"c.utf-8", false, "C.UTF-8"},
         {"", false, ""},
         {"", true, UNTOUCHED},
-        {"_x", false, ""},
         {"_", false, ""},
     };
     for (const auto& row : rows)
         EXPECT_EQ(languageCodeOf(row.setting, row.convert), row.code) << row.setting;
-}
-
-TEST_F(LanguageTest, FailedReadAnswersWithTheDefaultAndItsCode)
-{
-    for (const int code : {-5, -22, -13, -1073741822, 1, 0}) { // 0: the string is null
-        platform().answer(READ, code);
-        EXPECT_EQ(languageCode(false, code), "EN");
-        EXPECT_EQ(languageCode(true, code), "eng");
-        EXPECT_THAT(platform().lines(), IsEmpty());
-    }
 }
 
 TEST_F(LanguageTest, LanguageThatTheTableLacksLeavesTheSlot)
@@ -217,11 +198,9 @@ TEST_F(LanguageTest, TagPositionIsThatOfTheFirstOccurrence)
 {
     const auto positionOf = &CoreSystemInternals::tagStartPosition;
     EXPECT_EQ(positionOf("en_US", "_"), 2);
-    EXPECT_EQ(positionOf("_a_b", "_"), 0);
     EXPECT_EQ(positionOf("a__b", "__"), 1);
     EXPECT_EQ(positionOf("abc", "_"), -1);
     EXPECT_EQ(positionOf("", "_"), -1);
-    EXPECT_EQ(positionOf("abc", ""), 0);
     platform().debugMode = 1;
     EXPECT_EQ(positionOf("a<b>", "<b>"), 1);
     EXPECT_EQ(platform().trace().back(),
@@ -240,24 +219,17 @@ TEST_F(LanguageTest, ValueReachesFromStartToEndInclusive)
     } rows[] = {
         {"abcdef", 0, 1, "ab"},
         {"abcdef", 2, 2, "c"},
-        {"abcdef", 3, 5, "def"},
         {"abcdef", 3, 2, ""},
-        {"abcdef", 0, -1, ""},
         // A negative length means the whole rest.
         {"abcdef", 0, -2, "abcdef"},
-        {"abcdef", 3, 0, "def"},
         {"abcdef", 1, least, "bcdef"},
         // The value ends with the text.
-        {"abcdef", 4, 100, "ef"},
         {"abcdef", 4, most, "ef"},
         {"abcdef", 6, 8, ""},
-        {"", 0, 0, ""},
         // A start outside the text.
         {"abcdef", 7, 8, ""},
-        {"abcdef", most, most, ""},
         {"abcdef", -1, 3, ""},
         {"abcdef", least, most, ""},
-        {"", 1, 1, ""},
     };
     for (const auto& [text, start, end, value] : rows)
         EXPECT_EQ(CoreSystemInternals::valueFromPosition(text, start, end), value)

@@ -120,25 +120,11 @@ SimCalls existsCalls()
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(SimAvailable, LoggedCallTest, testing::ValuesIn(availableCalls()),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(DualSim, LoggedCallTest, testing::ValuesIn(dualCalls()),
-                         rowName<LoggedCall>);
-INSTANTIATE_TEST_SUITE_P(SimExists, LoggedCallTest, testing::ValuesIn(existsCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(SimAvailable, availableCalls());
+LOGGED_CALLS(DualSim, dualCalls());
+LOGGED_CALLS(SimExists, existsCalls());
 
 class CoreSystemSimTest : public PlatformTest {};
-
-TEST_F(CoreSystemSimTest, ChangeBetweenTwoQuestionsIsSeen)
-{
-    for (const int state : {ABSENT, AVAILABLE, LOCKED, AVAILABLE, 3}) {
-        setStates({state, AVAILABLE});
-        EXPECT_EQ(CoreSystemInternals::isDualSimAvailable(), state == AVAILABLE);
-        setStates({state});
-        EXPECT_EQ(system.IsSimAvailable(), state == AVAILABLE);
-        EXPECT_EQ(system.IsSimExist(), state == AVAILABLE);
-    }
-}
 
 TEST_F(CoreSystemSimTest, CardThatGoesBetweenTwoSlotTestsIsNotAvailable)
 {
@@ -148,15 +134,6 @@ TEST_F(CoreSystemSimTest, CardThatGoesBetweenTwoSlotTestsIsNotAvailable)
             setState(1, ABSENT);
     };
     EXPECT_FALSE(CoreSystemInternals::isDualSimAvailable());
-}
-
-TEST_F(CoreSystemSimTest, EveryFailureCodeOfTelephonyIsOneAnswer)
-{
-    for (const int code : PLATFORM_FAILURES) {
-        setNoTelephony(code);
-        EXPECT_FALSE(system.IsSimAvailable());
-        EXPECT_FALSE(CoreSystemInternals::isDualSimAvailable());
-    }
 }
 
 } // namespace

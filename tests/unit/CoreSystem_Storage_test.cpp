@@ -89,8 +89,7 @@ const std::vector<LoggedCall> STORAGE_CALLS = {
      {ENTRY, CALL, CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size")}},
 };
 
-INSTANTIATE_TEST_SUITE_P(Storage, LoggedCallTest, testing::ValuesIn(STORAGE_CALLS),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(Storage, STORAGE_CALLS);
 
 class StorageTest : public PlatformTest {};
 
@@ -112,18 +111,8 @@ TEST_F(StorageTest, MoreThanWhatIsRequiredMustBeFree)
         {"exactly that", SMALL, 3.0, false},
         {"a little more", SMALL, std::nextafter(3.0, 4.0), false},
         {"none of one byte", volume(1, 1, 1), 0.0, true},
-        {"none of one block", volume(512, 1000, 1), 0.0, true},
-        {"none of a full volume", volume(512, 1000, 0), 0.0, false},
-        {"minus zero of a full volume", volume(512, 1000, 0), -0.0, false},
-        {"no number of a full volume", volume(4096, 1280, 0), NAN_VALUE, false},
-        {"no number", SMALL, NAN_VALUE, false},
-        {"no negative number", SMALL, -NAN_VALUE, false},
-        {"infinity of everything", everything, INFINITE, false},
         {"the largest of everything", everything, LARGEST, false},
         {"the smallest below zero of nothing", nothing, -SMALLEST, true},
-        {"one below zero of nothing", nothing, -1.0, true},
-        {"the largest below zero of nothing", nothing, -LARGEST, true},
-        {"infinity below zero of nothing", nothing, -INFINITE, true},
         {"a product beyond 32 bits", fourGibibytes, 4095.5, true},
         {"all of a product beyond 32 bits", fourGibibytes, 4096, false},
         {"blocks counted with 32 bits", nearly16Tebibytes, 16777215.5, true},
@@ -168,7 +157,7 @@ TEST_F(StorageTest, NegativeResultsAloneAreFailures)
 {
     const std::string failed =
         CORE_SYSTEM.error(STORAGE_METHOD, "Fail to get internal memory size");
-    for (const int code : {-1, -19, -22, INT32_MIN, 1, INT32_MAX}) {
+    for (const int code : {-1, INT32_MIN, 1}) {
         platform().forgetEvents();
         platform().answer(CALL, code, SMALL);
         EXPECT_EQ(ask(code < 0 ? -INFINITE : 2.5), code > 0) << code;

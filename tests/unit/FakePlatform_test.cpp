@@ -1,8 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 // The fake itself: a test that stands on it must fail when it should.
-#include <cstring>
-#include <ctime>
-
 #include <gtest/gtest-spi.h>
 
 #include <CoreLogger.h>
@@ -18,7 +15,6 @@
 
 using namespace fake;
 using testing::ElementsAre;
-using testing::IsEmpty;
 
 class FakePlatformTest : public PlatformTest {};
 
@@ -70,10 +66,6 @@ TEST_F(FakePlatformTest, AnswerOfAnotherTypeFailsTheTest)
     int value = 0;
     EXPECT_NONFATAL_FAILURE(platform().reply("read", &value), "another type than its slot");
     EXPECT_EQ(value, 0);
-    platform().answer("telephony_init()", 0, 2);
-    telephony_handle_list_s list = {0, nullptr};
-    EXPECT_NONFATAL_FAILURE(telephony_init(&list), "another type than its slot");
-    EXPECT_EQ(list.handle, nullptr);
 }
 
 TEST_F(FakePlatformTest, SecondReleaseOfListFailsTheTest)
@@ -106,18 +98,4 @@ TEST_F(FakePlatformTest, SecondReleaseOfModemFailsTheTest)
         EXPECT_EQ(tel_deinit(handle), 0);
     EXPECT_THAT(platform().liveHandles(), ElementsAre("modem null"));
     EXPECT_NONFATAL_FAILURE(tel_deinit(handle), "modem cp0 was released but is not open");
-}
-
-TEST_F(FakePlatformTest, LedgerTellsOwnersApart)
-{
-    char* const handedOut = ledger().handOut("a");
-    char* const copied = strdup("b");
-    EXPECT_EQ(ledger().origin(handedOut), "platform: a");
-    EXPECT_EQ(ledger().origin(copied), "copy: b");
-    EXPECT_THAT(ledger().live(), ElementsAre("copy: b", "platform: a"));
-    std::free(handedOut);
-    EXPECT_THAT(ledger().live(), ElementsAre("copy: b"));
-    std::free(copied);
-    EXPECT_THAT(ledger().live(), IsEmpty());
-    std::free(nullptr);
 }

@@ -123,12 +123,6 @@ char* readSlot(const IdentityRead& read, unsigned int count, int slot, int expec
     return value;
 }
 
-void expectFailure(const IdentityRead& read)
-{
-    char preset = 'p';
-    EXPECT_EQ(readSlot(read, 2, 0, read.failure(), &preset), nullptr);
-}
-
 LoggedCall slotCallOf(const IdentityRead& read, const std::string& name, int slot,
                       unsigned int count, const Card& card)
 {
@@ -151,7 +145,6 @@ std::vector<LoggedCall> slotCalls(const IdentityRead& read)
     std::vector<LoggedCall> calls = {
         slotCallOf(read, "InOnlySlot", 0, 1, KOREAN_CARD),
         slotCallOf(read, "InSecondSlot", 1, 2, AMERICAN_CARD),
-        slotCallOf(read, "InMiddleSlot", 1, 3, AMERICAN_CARD),
         slotCallOf(read, "OfEmptyCard", 0, 1, {"", "", "", ""}),
     };
     const auto fails = [&](const std::string& name, const Texts& trace, const auto& prepare) {
@@ -159,16 +152,13 @@ std::vector<LoggedCall> slotCalls(const IdentityRead& read)
                          [=] {
                              setSlots({KOREAN_CARD, AMERICAN_CARD});
                              prepare();
-                             expectFailure(read);
+                             char preset = 'p';
+                             EXPECT_EQ(readSlot(read, 2, 0, read.failure(), &preset), nullptr);
                              EXPECT_THAT(ledger().freeAll(), IsEmpty());
                          },
                          trace});
     };
-    const Texts unavailable = slotUnavailable(read, 0, 2);
-    fails("WithoutCard", unavailable, [] { setState(0, 0); });
-    fails("LockedCard", unavailable, [] { setState(0, 1); });
-    fails("UnknownState", unavailable, [] { setState(0, 7); });
-    fails("StateReadFailed", unavailable, [] { setState(0, 2, -13); });
+    fails("WithoutCard", slotUnavailable(read, 0, 2), [] { setState(0, 0); });
     const Texts failed = slotFailed(read, 0, 2);
     fails("Refused", failed, [=] { platform().answer(readCall(read, 0), -13); });
     fails("RefusedAboveZero", failed, [=] { platform().answer(readCall(read, 0), 4); });
@@ -189,15 +179,10 @@ std::vector<LoggedCall> slotCalls(const IdentityRead& read)
 
 // \name The first slot
 
-int askFirst(const IdentityRead& read, char** value)
-{
-    return (coreSystem().*read.readFirst)(value);
-}
-
 char* readFirst(const IdentityRead& read, int expectedResult, char* preset = nullptr)
 {
     char* value = preset;
-    EXPECT_EQ(askFirst(read, &value), expectedResult);
+    EXPECT_EQ((coreSystem().*read.readFirst)(&value), expectedResult);
     EXPECT_THAT(platform().liveHandles(), IsEmpty());
     return value;
 }
@@ -373,8 +358,7 @@ std::vector<LoggedCall> identityCalls()
     return all;
 }
 
-INSTANTIATE_TEST_SUITE_P(SimIdentity, LoggedCallTest, testing::ValuesIn(identityCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(SimIdentity, identityCalls());
 
 class IdentityReadTest : public PlatformTest, public testing::WithParamInterface<IdentityRead> {
 protected:
@@ -426,19 +410,6 @@ TEST_P(IdentityReadTest, ValueOfFailedReadIsNeitherTakenNorFormatted)
     EXPECT_EQ(readSlot(read, 1, 0, read.failure(), &preset), nullptr);
     EXPECT_FALSE(isIdentityTold(KOREAN_CARD));
     EXPECT_EQ(ledger().freeAll(), keptBySim(read, {KOREAN_CARD}));
-}
-
-TEST_P(IdentityReadTest, EveryFailureCodeIsOneResult)
-{
-    for (const int code : PLATFORM_FAILURES) {
-        platform().reset();
-        setSlots({KOREAN_CARD, AMERICAN_CARD});
-        platform().answer(readCall(read, 0), code);
-        expectFailure(read);
-        platform().reset();
-        setNoTelephony(code);
-        expectNoAnswer(read, read.failureWithoutList);
-    }
 }
 
 TEST_P(IdentityReadTest, FailedCopyOfOneSlotIsStillAnAnswer)
@@ -507,26 +478,11 @@ TEST_P(IdentityReadTest, IntermediateCopyIsFreedSlotBySlot)
     ledger().freeAll();
 }
 
-TEST_P(IdentityReadTest, UnreadableCardYieldsToTheNextSlot)
-{
-    setSlots({KOREAN_CARD, AMERICAN_CARD});
-    platform().answer(readCall(read, 0), -1);
-    EXPECT_EQ(readFirst(read, 0), read.valueOf(AMERICAN_CARD));
-    ledger().freeAll();
-}
-
-TEST_P(IdentityReadTest, ResultIsOfTheLastSlotsRead)
-{
-    setSlots({NO_CARD, NO_CARD, KOREAN_CARD});
-    platform().answer(readCall(read, 2), -22);
-    expectNoAnswer(read, read.failure());
-}
-
 TEST_P(IdentityReadTest, NoSlotsLeaveWhatTheCallerHolds)
 {
     setSlotCount(0);
     char* answer = &preset;
-    EXPECT_EQ(askFirst(read, &answer), read.failureWithoutList);
+    EXPECT_EQ((system.*read.readFirst)(&answer), read.failureWithoutList);
     EXPECT_EQ(answer, &preset);
     EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 0"));
     answers.values = {&preset};
@@ -631,12 +587,6 @@ TEST_F(NumberReadTest, NumberIsCopiedAsItIs)
         EXPECT_EQ(readSlot(IDENTITY_READS.back(), 1, 0, 0), number);
         ledger().freeAll();
     }
-}
-
-TEST_F(NumberReadTest, FailureIsThePlatformsCode)
-{
-    EXPECT_EQ(static_cast<int>(TELEPHONY_ERROR_SIM_NOT_AVAILABLE), SIM_NOT_AVAILABLE);
-    EXPECT_EQ(static_cast<unsigned int>(SIM_NOT_AVAILABLE), 0xFDA01001u);
 }
 
 } // namespace

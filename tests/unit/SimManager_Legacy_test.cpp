@@ -327,8 +327,7 @@ LegacyCalls legacyCalls()
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(Legacy, LoggedCallTest, testing::ValuesIn(legacyCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(Legacy, legacyCalls());
 
 class LegacyTest : public PlatformTest {};
 

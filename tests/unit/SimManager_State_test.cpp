@@ -22,9 +22,7 @@ const StateName STATES[] = {
     {2, "TELEPHONY_SIM_STATE_AVAILABLE"},
     {3, "TELEPHONY_SIM_STATE_UNKNOWN"},
     {4, "-"},
-    {7, "-"},
     {-1, "-"},
-    {INT32_MIN, "-"},
 };
 
 // Takes a list into a structure that holds another one; what happened to it.
@@ -202,25 +200,9 @@ StateCalls simStateCalls()
     return calls;
 }
 
-INSTANTIATE_TEST_SUITE_P(SimState, LoggedCallTest, testing::ValuesIn(simStateCalls()),
-                         rowName<LoggedCall>);
+LOGGED_CALLS(SimState, simStateCalls());
 
 class SimStateTest : public PlatformTest {};
-
-TEST_F(SimStateTest, EveryFailureCodeIsFailure)
-{
-    telephony_handle_list_s list = {0, nullptr};
-    for (const int code : PLATFORM_FAILURES) {
-        setNoTelephony(code);
-        EXPECT_FALSE(sim.SuccessToInitTelephonyHandle(&list)) << code;
-        setState(0, AVAILABLE, code);
-        EXPECT_FALSE(sim.IsSimAvailable(openList(1), 0)) << code;
-        platform().answer(stateCall(0), code);
-        telephony_sim_state_e state = TELEPHONY_SIM_STATE_LOCKED;
-        EXPECT_TRUE(sim.GetSimState(openList(1).handle, &state)) << code;
-        EXPECT_EQ(state, TELEPHONY_SIM_STATE_LOCKED);
-    }
-}
 
 TEST_F(SimStateTest, StateThatWasNotToldIsNotAvailable)
 {

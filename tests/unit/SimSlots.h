@@ -18,10 +18,6 @@
 
 namespace fake {
 
-// Result codes of the platform, listed and not.
-const int PLATFORM_FAILURES[] = {-22, -13,       -1073741822, -39845887, -39841791,
-                                 -1,  INT32_MIN, 1,           INT32_MAX};
-
 // \name The device
 // The modem of slot N is "cpN".
 
