@@ -104,9 +104,9 @@ std::vector<LoggedCall> converterCalls()
                 std::free(answer); // the caller's
             };
             const std::string line = row.valueName + " : " + value;
-            calls.push_back({row.name + name, run,
-                             entry + SIM_MANAGER.access() + trace +
-                                 Texts{CORE_SYSTEM.debug(row.name, line)}});
+            calls.push_back(
+                {row.name + name, run,
+                 entry + SIM_MANAGER.access() + trace + Texts{CORE_SYSTEM.debug(row.name, line)}});
         };
         add("Found", row.key, foundTrace(row, row.key, row.value), row.value);
         add("Missed", "KR 9", missedTrace(row, "KR 9"), "(null)");
