@@ -18,6 +18,8 @@
 #include <system_settings.h>
 #include <vconf.h>
 
+#include "FakeBus.h"
+
 using namespace fake;
 
 struct telephony_data {
@@ -167,6 +169,7 @@ void FakePlatform::reset()
     cardChanged = 0;
     onEvent = nullptr;
     clearFormatBuffers();
+    bus().reset();
     ledger().clear();
 }
 

@@ -62,7 +62,7 @@ typedef std::vector<std::string> Texts;
 // Operations on it may be called from any thread; the settings are for one thread at a time.
 class FakePlatform {
 public:
-    void reset(); // the ledger, too
+    void reset(); // the bus and the ledger, too
     void forgetEvents();
 
     // \name What it answers

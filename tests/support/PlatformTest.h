@@ -49,6 +49,8 @@ const SourceFile SIM_MANAGER{"SimManager"};
 const SourceFile CONNECTION_MANAGER{"ConnectionManager"};
 const SourceFile D_BUS_MANAGER{"DBusManager", "Logger"};
 
+const std::string ODD_TEXTS[] = {"", "%s%n", "\xff\xc3\xa9 \n", std::string(10 << 20, 'n')};
+
 inline Texts operator+(Texts texts, const Texts& more)
 {
     texts.insert(texts.end(), more.begin(), more.end());

@@ -153,8 +153,7 @@ class PackagesTest : public PlatformTest {};
 
 TEST_F(PackagesTest, OddVersionsPassThroughUnchanged)
 {
-    for (const std::string& odd :
-         {std::string(), std::string("%s%n"), std::string("\xff\n"), std::string(10 << 20, '9')})
+    for (const std::string& odd : ODD_TEXTS)
         for (const int mode : {0, 1}) {
             platform().debugMode = mode;
             install(odd);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Flight mode, data roaming, mobile data, sales code, font size and the current time.
 #include <cstring>
+#include <map>
 
 #include "support/PlatformTest.h"
 
@@ -14,17 +15,10 @@ struct Switch {
     std::string call;
     std::string text; // before " ON" or " OFF"
 
-    std::string entryLine() const
-    {
-        return CORE_SYSTEM.debug(name, "CoreSystem::" + name);
-    }
     Texts trace(bool isOn) const
     {
-        return {entryLine(), call, CORE_SYSTEM.debug(name, text + (isOn ? " ON" : " OFF"))};
-    }
-    bool answer() const
-    {
-        return (coreSystem().*ask)();
+        return {CORE_SYSTEM.debug(name, "CoreSystem::" + name), call,
+                CORE_SYSTEM.debug(name, text + (isOn ? " ON" : " OFF"))};
     }
 };
 
@@ -46,7 +40,8 @@ std::vector<LoggedCall> switchCalls()
                 calls.push_back({row.name + read + (code ? "Code" + std::to_string(code + 22) : ""),
                                  [=] {
                                      platform().answer(row.call, code, value);
-                                     EXPECT_EQ(row.answer(), isOn); // whatever the result
+                                     EXPECT_EQ((coreSystem().*row.ask)(),
+                                               isOn); // whatever the result
                                  },
                                  row.trace(isOn)});
             }
@@ -76,57 +71,31 @@ const std::vector<LoggedCall> SALES_CODE_CALLS = {
 
 const std::string FONT_SIZE_CALL = "system_settings_get_value_int(3)";
 
-struct FontSize {
-    int value;
-    std::string text; // of the result line; empty for none
-};
-
-const FontSize FONT_SIZES[] = {
-    {-1, ""},
-    {0, "FontSize is small"},
-    {1, "FontSize is normal"},
-    {2, "FontSize is large"},
-    {3, "FontSize is huge"},
-    {4, "FontSize is giant"},
-    {5, ""},
-};
-
-Texts fontSizeTrace(const FontSize& row)
-{
-    Texts trace = {CORE_SYSTEM.debug("GetFontSize", "CoreSystem::GetFontSize"), FONT_SIZE_CALL};
-    if (!row.text.empty())
-        trace.push_back(CORE_SYSTEM.debug("GetFontSize", row.text));
-    return trace;
-}
-
-// The content of a slot that held something else before.
-int fontSize(int expectedCode)
-{
-    int slot = 99;
-    EXPECT_EQ(CoreSystemInternals::fontSize(&slot), expectedCode);
-    return slot;
-}
+// The text of the result line; of no other size there is a line.
+const std::map<int, std::string> FONT_SIZES = {
+    {0, "small"}, {1, "normal"}, {2, "large"}, {3, "huge"}, {4, "giant"}};
 
 std::vector<LoggedCall> fontSizeCalls()
 {
     std::vector<LoggedCall> calls;
-    const auto add = [&](const std::string& name, int code, const FontSize& row,
-                         const std::any& written) {
+    const auto add = [&](const std::string& name, int code, int size, const std::any& written) {
+        Texts trace = {CORE_SYSTEM.debug("GetFontSize", "CoreSystem::GetFontSize"), FONT_SIZE_CALL};
+        if (FONT_SIZES.count(size) > 0)
+            trace.push_back(CORE_SYSTEM.debug("GetFontSize", "FontSize is " + FONT_SIZES.at(size)));
         calls.push_back({"GetFontSize" + name,
                          [=] {
                              platform().answer(FONT_SIZE_CALL, code, written);
-                             EXPECT_EQ(fontSize(code), row.value);
+                             int slot = 99;
+                             EXPECT_EQ(CoreSystemInternals::fontSize(&slot), code);
+                             EXPECT_EQ(slot, size);
                          },
-                         fontSizeTrace(row)});
+                         trace});
     };
-    for (const FontSize& row : FONT_SIZES)
-        for (const int code : {0, -5})
-            add(std::to_string(static_cast<unsigned int>(row.value)) + (code ? "Failed" : ""), code,
-                row, row.value);
-    for (const int code : {-22, 1}) { // what cannot be read is zero, unless it is written
-        const std::string name = "Failure" + std::to_string(static_cast<unsigned int>(code));
-        add(name, code, FONT_SIZES[1], {});
-        add(name + "Written", code, FONT_SIZES[4], 3);
+    // What cannot be read is zero, unless it is written.
+    for (const int code : {0, -22, 1}) {
+        for (const int size : {-1, 0, 1, 2, 3, 4, 5})
+            add(std::to_string(size + 1) + "Code" + std::to_string(code + 22), code, size, size);
+        add("UnwrittenCode" + std::to_string(code + 22), code, 0, {});
     }
     return calls;
 }
@@ -144,15 +113,6 @@ auto fieldsOf(const std::tm& time)
                            static_cast<const void*>(time.tm_zone)); // not its text
 }
 
-// The content of a slot that held something else before.
-std::tm currentTime(int expectedCode)
-{
-    std::tm slot;
-    std::memset(&slot, 0x7f, sizeof slot);
-    EXPECT_EQ(CoreSystemInternals::currentTime(&slot), expectedCode);
-    return slot;
-}
-
 Texts timeTrace(const std::string& text)
 {
     return {CORE_SYSTEM.debug("GetCurrentTime", "CoreSystem::GetCurrentTime"), TIME_CALL,
@@ -167,7 +127,10 @@ std::vector<LoggedCall> timeCalls()
         calls.push_back({"GetCurrentTime" + name,
                          [=] {
                              platform().answer(TIME_CALL, code, written);
-                             EXPECT_EQ(fieldsOf(currentTime(code)), fieldsOf(expected));
+                             std::tm slot;
+                             std::memset(&slot, 0x7f, sizeof slot);
+                             EXPECT_EQ(CoreSystemInternals::currentTime(&slot), code);
+                             EXPECT_EQ(fieldsOf(slot), fieldsOf(expected));
                          },
                          timeTrace(text)});
     };
@@ -190,8 +153,7 @@ class SettingsTest : public PlatformTest {};
 
 TEST_F(SettingsTest, OddSalesCodesPassThroughUnchanged)
 {
-    for (const std::string& odd :
-         {std::string(), std::string("%s%n"), std::string(" \n\xff"), std::string(10 << 20, 'c')}) {
+    for (const std::string& odd : ODD_TEXTS) {
         platform().answer(SALES_CODE_CALL, 0, odd);
         EXPECT_TRUE(system.GetCSC() == odd);
         ledger().freeAll();

@@ -87,7 +87,6 @@ public:
     {
         const std::string result = code == 0 ? SERIAL : "(null)";
         const auto run = [=] {
-            bus().reset();
             arrange();
             const char* slot = "preset";
             EXPECT_EQ(coreSystem().GetDeviceUniqueID(&slot), code);
@@ -146,22 +145,12 @@ SerialCalls serialCalls()
 
 LOGGED_CALLS(Serial, serialCalls());
 
-class DBusManagerTest : public PlatformTest {
-protected:
-    DBusManagerTest()
-    {
-        bus().reset();
-    }
-    ~DBusManagerTest() override
-    {
-        bus().reset();
-    }
-};
+class DBusManagerTest : public PlatformTest {};
 
 TEST_F(DBusManagerTest, OddSerialsPassThroughUnchanged)
 {
-    for (const std::string& odd : {std::string(), std::string("%s%n"), std::string(" \n"),
-                                   std::string("\xc3\xa9"), std::string(10 << 20, 's')})
+    for (const std::string& odd :
+         {ODD_TEXTS[0], ODD_TEXTS[1], std::string("\xc3\xa9 \n"), ODD_TEXTS[3]})
         for (const int mode : {0, 1}) {
             platform().debugMode = mode;
             bus().answerText(odd);
@@ -197,7 +186,6 @@ TEST_F(DBusManagerTest, FailedCopyGivesNull)
 {
     const Texts parsed = REPLIED + Texts{debugLine(PARSE, "Success to get deviceUniqueID: text ")};
     for (const int skipped : {0, 1}) { // the parser's copy, and the caller's
-        bus().reset();
         platform().reset();
         platform().debugMode = 1;
         bus().answerText("text");

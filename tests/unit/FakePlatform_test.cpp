@@ -11,6 +11,7 @@
 #include <tapi_common.h>
 #include <telephony.h>
 
+#include "support/FakeBus.h"
 #include "support/PlatformTest.h"
 
 using namespace fake;
@@ -98,4 +99,28 @@ TEST_F(FakePlatformTest, SecondReleaseOfModemFailsTheTest)
         EXPECT_EQ(tel_deinit(handle), 0);
     EXPECT_THAT(platform().liveHandles(), ElementsAre("modem null"));
     EXPECT_NONFATAL_FAILURE(tel_deinit(handle), "modem cp0 was released but is not open");
+}
+
+TEST_F(FakePlatformTest, SecondReleaseOfBusObjectFailsTheTest)
+{
+    bus().answerText("text");
+    GDBusMessage* const call = g_dbus_message_new_method_call("a.b", "/c", "d.e", "F");
+    GDBusMessage* const answer = bus().send(call, nullptr);
+    g_object_unref(answer);
+    EXPECT_NONFATAL_FAILURE(g_object_unref(answer), "the reply was released too often");
+    g_object_unref(call);
+}
+
+TEST_F(FakePlatformTest, ErrorsAreHeldUntilTheyAreFreed)
+{
+    GError* error = nullptr;
+    bus().giveError({G_IO_ERROR, 7, "text"}, &error);
+    EXPECT_THAT(bus().held(), ElementsAre("error"));
+    g_error_free(error);
+    EXPECT_NONFATAL_FAILURE(bus().forgetError(error), "an error was freed that is not held");
+}
+
+TEST_F(FakePlatformTest, WhatGLibFindsWrongFailsTheTest)
+{
+    EXPECT_NONFATAL_FAILURE(g_critical("wrong argument"), "wrong argument");
 }

@@ -25,17 +25,6 @@ const StateName STATES[] = {
     {-1, "-"},
 };
 
-// Takes a list into a structure that holds another one; what happened to it.
-void expectTaken(unsigned int count)
-{
-    telephony_handle_list_s list = {7, nullptr};
-    EXPECT_TRUE(simManager().SuccessToInitTelephonyHandle(&list));
-    EXPECT_EQ(list.count, count);
-    EXPECT_NE(list.handle, nullptr);
-    EXPECT_EQ(callText("", list.handle[count - 1]), slotCall("", static_cast<int>(count) - 1));
-    EXPECT_THAT(platform().liveHandles(), ElementsAre(listName(count)));
-}
-
 void expectNotTaken(const Texts& live)
 {
     telephony_h preset = nullptr;
@@ -56,11 +45,6 @@ public:
 
 void addListCalls(StateCalls& calls)
 {
-    for (const unsigned int count : {1u, 2u})
-        calls.add("ListTaken" + std::to_string(count), listTaken(count), [=] {
-            setSlotCount(count);
-            expectTaken(count);
-        });
     calls.add("ListRefused", noListTaken(), [] {
         setNoTelephony(-22);
         expectNotTaken({});
@@ -74,13 +58,6 @@ void addListCalls(StateCalls& calls)
         setSlotCount(0);
         expectNotTaken({"list of 0"});
     });
-    calls.add("ListReleased", listReleased(2), [] {
-        setSlotCount(2);
-        const telephony_handle_list_s list = openList(2);
-        simManager().DeleteTelephonyHandle(list);
-        EXPECT_EQ(list.count, 2u);
-        EXPECT_THAT(platform().liveHandles(), IsEmpty());
-    });
     calls.add("ListReleaseRefused", listReleased(2), [] {
         platform().answer("telephony_deinit(list of 2)", -22);
         simManager().DeleteTelephonyHandle(openList(2));
@@ -92,12 +69,12 @@ void addListCalls(StateCalls& calls)
     });
 }
 
-void addAvailability(StateCalls& calls, const std::string& name, int slot, int state, int code)
+// What succeeds does so for the facade.
+void addFailedAvailability(StateCalls& calls, const std::string& name, int code)
 {
-    const bool available = state == AVAILABLE && code == 0;
-    calls.add(name, availabilityAsked(slot, 3, available), [=] {
-        setState(slot, state, code);
-        EXPECT_EQ(simManager().IsSimAvailable(openList(3), slot), available);
+    calls.add(name, availabilityAsked(0, 3, false), [=] {
+        setState(0, AVAILABLE, code);
+        EXPECT_FALSE(simManager().IsSimAvailable(openList(3), 0));
         EXPECT_THAT(platform().liveHandles(), ElementsAre("list of 3"));
     });
 }
@@ -184,16 +161,13 @@ StateCalls simStateCalls()
     StateCalls calls;
     addListCalls(calls);
     addExistenceCalls(calls);
-    for (const int slot : {0, 1, 2})
-        addAvailability(calls, "AvailableInSlot" + std::to_string(slot), slot, AVAILABLE, 0);
-    addAvailability(calls, "AvailableButReadFailed", 0, AVAILABLE, -13);
-    addAvailability(calls, "AvailableButReadFailedAboveZero", 0, AVAILABLE, 1);
+    addFailedAvailability(calls, "AvailableButReadFailed", -13);
+    addFailedAvailability(calls, "AvailableButReadFailedAboveZero", 1);
     addStateRead(calls, "StateReadFailed", AVAILABLE, -13);
     addStateRead(calls, "StateReadFailedAboveZero", 0, 1);
     int row = 0;
     for (const auto& [state, name] : STATES) {
         const std::string suffix = "ByState" + std::to_string(row++);
-        addAvailability(calls, "Available" + suffix, 1, state, 0);
         addStateRead(calls, "StateRead" + suffix, state, 0);
         addExistence(calls, "Exists" + suffix, state == AVAILABLE, {{0, state, name}});
     }
