@@ -165,9 +165,9 @@ public:
     // A wifi event, with a line of its own where it has one.
     void addWifi(const std::string& function, int state, const std::string& line = "")
     {
-        Texts trace = {CONNECTION_MANAGER.debug(function, function)};
-        if (!line.empty())
-            trace.push_back(CONNECTION_MANAGER.debug(function, line));
+        const Texts told = {CONNECTION_MANAGER.debug(function, line)};
+        const Texts trace =
+            Texts{CONNECTION_MANAGER.debug(function, function)} + (line.empty() ? Texts() : told);
         if (function == DEVICE)
             add("WifiDeviceState" + numberName(state), callText("WifiDevice", state, "first"),
                 trace, [=] { wifiDeviceEvent(state); });

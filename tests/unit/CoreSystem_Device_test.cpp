@@ -3,7 +3,6 @@
 #include "support/PlatformTest.h"
 
 using namespace fake;
-using testing::Field;
 using testing::IsEmpty;
 
 namespace {
@@ -141,19 +140,6 @@ TEST_F(DeviceTest, FailedCopyOfTheIdentifierGivesNullAndFreesThePlatformsString)
     EXPECT_TRUE(failure.happened());
     EXPECT_THAT(ledger().live(), IsEmpty());
     EXPECT_EQ(platform().trace(), answeredTrace(tizenId, "(null)"));
-}
-
-TEST_F(DeviceTest, TagAndModeMayChangeDuringTheCall)
-{
-    platform().answer(tizenId.call, -5);
-    platform().onEvent = [](const Event& event) {
-        if (event.kind == Event::Kind::CALL)
-            platform().tag = "Late";
-    };
-    platform().debugMode = 1;
-    ask(tizenId, -5, &preset);
-    EXPECT_THAT(platform().lines(), testing::ElementsAre(Field(&LogLine::tag, "CoreSystem"),
-                                                         Field(&LogLine::tag, "Late")));
 }
 
 } // namespace

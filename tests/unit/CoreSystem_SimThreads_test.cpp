@@ -103,16 +103,6 @@ TEST_F(SimThreadsTest, EveryQuestionMayBeAskedOnAnyThread)
     ledger().freeAll();
 }
 
-TEST_F(SimThreadsTest, LinesOfManyThreadsHideTheIdentity)
-{
-    setWholeDevice();
-    platform().debugMode = 1;
-    together(THREADS, [](int) { askIdentity(*CoreSystem::GetInstance()); });
-    EXPECT_FALSE(isIdentityTold(KOREAN_CARD));
-    EXPECT_FALSE(isIdentityTold(AMERICAN_CARD));
-    ledger().freeAll();
-}
-
 // A roaming question keeps every other read of SIM data out, from its beginning to its end.
 TEST_F(SimThreadsTest, LockedQuestionIsNotInterrupted)
 {

@@ -73,21 +73,6 @@ TEST_F(LogTest, QuietDebugLineCostsTwoLoggerCallsAndEvaluatesNothing)
     EXPECT_EQ(platform().events().size(), 2u);
 }
 
-TEST_F(LogTest, ErrorLineDoesNotAskForTheMode)
-{
-    ERROR_LINE("text");
-    EXPECT_THAT(platform().texts(Event::Kind::LOGGER), ElementsAre("GetInstance", "HasLogTag"));
-}
-
-TEST_F(LogTest, OnlyModeOneIsDebugMode)
-{
-    for (const int mode : {0, 2, -1, 256, 257}) {
-        platform().debugMode = mode;
-        DEBUG_LINE("text");
-    }
-    EXPECT_EQ(platform().trace(), Texts());
-}
-
 TEST_F(LogTest, TagIsChosenAnewForEachLine)
 {
     ERROR_LINE("no tag yet");
@@ -126,13 +111,6 @@ TEST_F(LogTest, EmptyMessageIsEncipheredToo)
     EXPECT_THAT(platform().texts(Event::Kind::CIPHER), ElementsAre("Encrypt()"));
 }
 
-TEST_F(LogTest, ErrorTextsAreNotCut)
-{
-    const std::string message(5000, 'e');
-    ERROR_LINE("%s", message.c_str());
-    EXPECT_EQ(platform().lines().at(0).text, message);
-}
-
 TEST_F(LogTest, FileNameIsWhatFollowsTheLastSlash)
 {
     const auto nameOf = [](const char* path) {
@@ -142,16 +120,6 @@ TEST_F(LogTest, FileNameIsWhatFollowsTheLastSlash)
     EXPECT_EQ(nameOf("/a/b/c.cpp"), "c.cpp");
     EXPECT_EQ(nameOf("CoreSystem.cpp"), "CoreSystem.cpp");
     EXPECT_EQ(nameOf("a/"), "");
-}
-
-TEST_F(LogTest, FailingCipherLosesTheLineOnly)
-{
-    platform().debugMode = 1;
-    platform().cipherThrows = true;
-    DEBUG_LINE("lost");
-    platform().cipherThrows = false;
-    DEBUG_LINE("kept");
-    EXPECT_THAT(platform().trace(), ElementsAre("debug Log_test.cpp TestBody: kept"));
 }
 
 TEST_F(LogTest, FailedAllocationLosesTheLineOnly)

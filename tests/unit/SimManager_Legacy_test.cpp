@@ -7,7 +7,6 @@
 #include "SimSlots.h"
 
 using namespace fake;
-using testing::Each;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
@@ -208,10 +207,8 @@ void addStatusCalls(LegacyCalls& calls)
     addStatus(calls, "CompletedInFirstSlot", 0, 3, 0, "3");
     addStatus(calls, "CompletedInSecondSlot", 1, 3, 1, "3");
     addStatus(calls, "Unknown", 0, TAPI_SIM_STATUS_UNKNOWN, -7, "ff");
-    addStatus(calls, "Absent", 1, TAPI_SIM_STATUS_CARD_NOT_PRESENT, 0, "1");
     addStatus(calls, "Initialising", 1, TAPI_SIM_STATUS_SIM_INITIALIZING, 0, "2");
     addStatus(calls, "ThatThePlatformLacks", 0, 0x7ffffff3, 0, "7ffffff3");
-    addStatus(calls, "BelowZero", 0, -1, 0, "ffffffff");
     const std::string names = "tel_get_cp_name_list()";
     const Texts read = {names, initCall(0), initInfoCall(0)};
     addStatusFailure(calls, "ReadFailed", 0, read, {"modem cp0"},
@@ -229,7 +226,6 @@ void addStatusCalls(LegacyCalls& calls)
     addStatusFailure(calls, "OfSlotAfterTheNames", 2, {names, "tel_init(null)"}, {},
                      [] { platform().answer("tel_init(null)", -1); });
     addStatusFailure(calls, "OfSlotBelowZero", -1, {}, {}, [] {});
-    addStatusFailure(calls, "OfLeastSlot", INT32_MIN, {}, {}, [] {});
 }
 
 // Begins with texts in the three strings; what they hold then.
@@ -306,13 +302,6 @@ void addNumberCalls(LegacyCalls& calls)
                       EXPECT_FALSE(target.GetPhoneNumber(openList(1).handle, &number));
                       EXPECT_EQ(number, &preset);
                   });
-    const std::string ofNull = "telephony_sim_get_subscriber_number(no slot)";
-    calls.add("GetPhoneNumberOfNullHandle", Texts{ofNull} + failed, [=](auto& target) {
-        platform().answer(ofNull, -22);
-        telephony_h none = nullptr;
-        char* number = nullptr;
-        EXPECT_FALSE(target.GetPhoneNumber(&none, &number));
-    });
 }
 
 LegacyCalls legacyCalls()
@@ -338,18 +327,6 @@ TEST_F(LegacyTest, OnlyCompletedInitialisationIsAvailable)
         platform().answer(initInfoCall(1), 0, status);
         EXPECT_EQ(statusOf(system, 1, status == 3, 99), status);
     }
-}
-
-TEST_F(LegacyTest, EveryCallByNameOpensAHandleOfItsOwn)
-{
-    platform().answer(initCall(0), 0);
-    platform().answer(modemCall("tel_check_sms_device_status", 0), 0, 1);
-    for (std::size_t calls = 1; calls <= 3; ++calls) {
-        int ready = 0;
-        EXPECT_TRUE(system.CheckSmsEnabled(nameOf("cp0"), &ready));
-        EXPECT_EQ(platform().liveHandles().size(), calls);
-    }
-    EXPECT_THAT(platform().liveHandles(), Each("modem cp0"));
 }
 
 TEST_F(LegacyTest, ImsiPartsAreGivenAsTheyStand)

@@ -137,13 +137,6 @@ TYPED_TEST(SingletonTest, FirstCallConstructsUnderItsLockAndLaterOnesFindTheInst
     EXPECT_TRUE(platform().events().empty());
 }
 
-TYPED_TEST(SingletonTest, QuietModeStillTakesTheLock)
-{
-    platform().debugMode = 0;
-    TypeParam::GetInstance();
-    EXPECT_EQ(platform().trace(), (Texts{this->source.lock(), "un" + this->source.lock()}));
-}
-
 TYPED_TEST(SingletonTest, FailedAllocationGivesNullAndIsTriedAgain)
 {
     const std::string failed = this->source.className + "() failed.";
