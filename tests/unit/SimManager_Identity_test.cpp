@@ -151,8 +151,6 @@ std::vector<LoggedCall> slotCalls(const IdentityRead& read)
           [] { platform().setModems(std::nullopt); });
     fails("WithoutModem", begin + Texts{initCall(0)} + failureLogged(read),
           [] { platform().answer(initCall(0), -1); });
-    fails("RefusedButFilled", failed,
-          [] { platform().answer(imsiCall(0), -1, imsiInfo(KOREAN_CARD)); });
     return calls;
 }
 
@@ -372,13 +370,16 @@ TEST_P(IdentityReadTest, SecretsAreNeverFormatted)
 
 TEST_P(IdentityReadTest, ValueOfFailedReadIsNeitherTakenNorFormatted)
 {
-    platform().debugMode = 1;
-    setSlots({KOREAN_CARD});
-    platform().answer(readCall(read, 0), -1,
-                      read.isNumber ? std::any(value) : std::any(imsiInfo(KOREAN_CARD)));
-    EXPECT_EQ(readSlot(read, 1, 0, read.failure(), &preset), nullptr);
-    EXPECT_FALSE(isIdentityTold(KOREAN_CARD));
-    EXPECT_EQ(ledger().freeAll(), keptBySim(read, {KOREAN_CARD}));
+    for (const int code : {-13, 4}) {
+        platform().reset();
+        platform().debugMode = 1;
+        setSlots({KOREAN_CARD});
+        platform().answer(readCall(read, 0), code,
+                          read.isNumber ? std::any(value) : std::any(imsiInfo(KOREAN_CARD)));
+        EXPECT_EQ(readSlot(read, 1, 0, read.failure(), &preset), nullptr);
+        EXPECT_FALSE(isIdentityTold(KOREAN_CARD));
+        EXPECT_EQ(ledger().freeAll(), keptBySim(read, {KOREAN_CARD}));
+    }
 }
 
 TEST_P(IdentityReadTest, FailedCopyOfOneSlotIsStillAnAnswer)
