@@ -98,8 +98,9 @@ void Ledger::clear()
     live_.clear();
 }
 
-std::vector<std::string> Ledger::texts() const
+std::vector<std::string> Ledger::live() const
 {
+    const std::lock_guard<std::mutex> lock(mutex_);
     std::vector<std::string> texts;
     for (const auto& entry : live_)
         texts.push_back(entry.second);
@@ -107,19 +108,12 @@ std::vector<std::string> Ledger::texts() const
     return texts;
 }
 
-std::vector<std::string> Ledger::live() const
-{
-    const std::lock_guard<std::mutex> lock(mutex_);
-    return texts();
-}
-
 std::vector<std::string> Ledger::freeAll()
 {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    const std::vector<std::string> freed = texts();
+    const std::vector<std::string> freed = live();
     for (const auto& entry : live_)
         __real_free(reinterpret_cast<void*>(~entry.first));
-    live_.clear();
+    clear();
     return freed;
 }
 

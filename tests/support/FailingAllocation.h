@@ -61,8 +61,6 @@ public:
     void clear();
 
 private:
-    std::vector<std::string> texts() const;
-
     mutable std::mutex mutex_;
     std::map<std::uintptr_t, std::string> live_;
 };

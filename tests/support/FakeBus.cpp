@@ -85,14 +85,16 @@ void FakeBus::answerNothing(const std::optional<Error>& error)
     callError_ = error;
 }
 
-void FakeBus::answer(GVariant* body, GDBusMessageType type)
+void FakeBus::answer(GVariant* body, GDBusMessageType type, const char* errorName)
 {
     const auto kept = body != nullptr
                           ? std::shared_ptr<GVariant>(g_variant_ref_sink(body), &g_variant_unref)
                           : nullptr;
-    makeReply_ = [kept, type] {
+    makeReply_ = [kept, type, errorName] {
         GDBusMessage* const reply = g_dbus_message_new();
         g_dbus_message_set_message_type(reply, type);
+        if (errorName != nullptr)
+            g_dbus_message_set_error_name(reply, errorName);
         if (kept != nullptr)
             g_dbus_message_set_body(reply, kept.get());
         return reply;
@@ -102,17 +104,6 @@ void FakeBus::answer(GVariant* body, GDBusMessageType type)
 void FakeBus::answerText(const std::string& serial)
 {
     answer(g_variant_new("(s)", serial.c_str()));
-}
-
-void FakeBus::answerError(const std::string& name, const std::string& message)
-{
-    makeReply_ = [name, message] {
-        GDBusMessage* const reply = g_dbus_message_new();
-        g_dbus_message_set_message_type(reply, G_DBUS_MESSAGE_TYPE_ERROR);
-        g_dbus_message_set_error_name(reply, name.c_str());
-        g_dbus_message_set_body(reply, g_variant_new("(s)", message.c_str()));
-        return reply;
-    };
 }
 
 std::vector<std::string> FakeBus::held() const

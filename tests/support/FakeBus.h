@@ -34,9 +34,9 @@ public:
     // \name What it answers
     void refuseConnection(const std::optional<Error>& error);
     void answerNothing(const std::optional<Error>& error);
-    void answer(GVariant* body, GDBusMessageType type = G_DBUS_MESSAGE_TYPE_METHOD_RETURN);
+    void answer(GVariant* body, GDBusMessageType type = G_DBUS_MESSAGE_TYPE_METHOD_RETURN,
+                const char* errorName = nullptr);
     void answerText(const std::string& serial);
-    void answerError(const std::string& name, const std::string& message);
 
     bool producesErrors = true; // of an error reply
 

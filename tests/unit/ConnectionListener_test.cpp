@@ -68,18 +68,18 @@ private:
     std::mutex mutex_;
 };
 
-const Texts SET_CALLS = {"wifi_initialize()",
-                         "wifi_set_device_state_changed_cb()",
-                         "wifi_set_connection_state_changed_cb()",
-                         "runtime_info_set_changed_cb(1)",
-                         "runtime_info_set_changed_cb(9)",
-                         "runtime_info_set_changed_cb(0)"};
-const Texts UNSET_CALLS = {"wifi_initialize()",
-                           "wifi_unset_device_state_changed_cb()",
-                           "wifi_unset_connection_state_changed_cb()",
-                           "runtime_info_unset_changed_cb(1)",
-                           "runtime_info_unset_changed_cb(9)",
-                           "runtime_info_unset_changed_cb(0)"};
+Texts registrationCalls(const std::string& step)
+{
+    return {"wifi_initialize()",
+            "wifi_" + step + "_device_state_changed_cb()",
+            "wifi_" + step + "_connection_state_changed_cb()",
+            "runtime_info_" + step + "_changed_cb(1)",
+            "runtime_info_" + step + "_changed_cb(9)",
+            "runtime_info_" + step + "_changed_cb(0)"};
+}
+
+const Texts SET_CALLS = registrationCalls("set");
+const Texts UNSET_CALLS = registrationCalls("unset");
 const std::string LISTENER_METHOD = "SetConnectionEventListener";
 const Texts SET_TRACE =
     SET_CALLS + Texts{CONNECTION_MANAGER.notice(LISTENER_METHOD, "Set Connection Change Callback")};

@@ -144,9 +144,6 @@ TEST_F(StorageTest, FreeSpaceIsThatOfOrdinaryUsersInBlocksOfTheirOwnSize)
     struct statvfs fs = volume(1 << 20, 7, 3);
     fs.f_frsize = 1 << 10;
     fs.f_bfree = 5;
-    fs.f_files = 11;
-    fs.f_ffree = 13;
-    fs.f_favail = 17;
     EXPECT_FALSE(isAvailable(fs, 3));
     EXPECT_EQ(platform().trace(),
               trace("Total Memory : 7168.000000 byte, Avail Memory : 3145728.000000 byte",

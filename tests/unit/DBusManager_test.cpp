@@ -110,7 +110,10 @@ public:
 SerialCalls serialCalls()
 {
     const std::string send = "g_dbus_connection_send_message_with_reply_sync()";
-    const std::string denied = "org.freedesktop.DBus.Error.AccessDenied";
+    const auto deny = [] {
+        bus().answer(g_variant_new("(s)", "not for you"), G_DBUS_MESSAGE_TYPE_ERROR,
+                     "org.freedesktop.DBus.Error.AccessDenied");
+    };
     const auto refusedWith = [](const FakeBus::Error& error, const std::string& line) {
         return REFUSED + Texts{detailLine(INIT, "g_bus_get_sync()", error.code, error.message),
                                errorLine(INIT, "[dbus] " + line)};
@@ -131,12 +134,14 @@ SerialCalls serialCalls()
     calls.add("Unanswered", 2, unansweredWith(NO_SERVICE), [] { bus().answerNothing(NO_SERVICE); });
     // A time-out of the call is an absent reply.
     calls.add("TimedOut", 2, unansweredWith(TIMED_OUT), [] { bus().answerNothing(TIMED_OUT); });
-    calls.add("ErrorReply", 2,
-              ERROR_REPLIED + Texts{detailLine(PARSE, "g_dbus_message_to_gerror()", 9,
-                                               "GDBus.Error:" + denied + ": not for you")},
-              [=] { bus().answerError(denied.c_str(), "not for you"); });
+    calls.add(
+        "ErrorReply", 2,
+        ERROR_REPLIED +
+            Texts{detailLine(PARSE, "g_dbus_message_to_gerror()", 9,
+                             "GDBus.Error:org.freedesktop.DBus.Error.AccessDenied: not for you")},
+        deny);
     calls.add("ErrorReplyWithoutDetail", 2, ERROR_REPLIED, [=] {
-        bus().answerError(denied.c_str(), "not for you");
+        deny();
         bus().producesErrors = false;
     });
     calls.add("ReplyWithoutBody", 2, REPLIED, [] { bus().answer(nullptr); });

@@ -5,7 +5,6 @@
 #include <CoreLogger.h>
 #include <CoreMutex.h>
 #include <CoreMutexLock.h>
-#include <CoreUtil.h>
 #include <dlog.h>
 #include <system_info.h>
 #include <tapi_common.h>

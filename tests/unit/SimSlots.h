@@ -5,7 +5,6 @@
 #define CORESYSTEM_TESTS_UNIT_SIM_SLOTS_H
 
 #include <algorithm>
-#include <climits>
 #include <cstring>
 #include <optional>
 #include <string>

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 // The access pattern that all singleton classes share.
-#include <thread>
 #include <type_traits>
 
 #include "support/PlatformTest.h"
