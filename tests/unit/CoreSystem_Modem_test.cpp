@@ -157,8 +157,6 @@ std::vector<LoggedCall> imeiCalls()
     };
 }
 
-// \name Roaming
-
 const auto serviceCall = [](int slot) {
     return slotCall("telephony_network_get_service_state", slot);
 };

@@ -13,8 +13,6 @@ namespace {
 
 typedef std::vector<std::optional<Card>> Slots;
 
-// \name What was done
-
 // A value as the lines show it, "" of one that they do not.
 std::string shown(const IdentityRead& read, const std::string& value)
 {
@@ -110,8 +108,6 @@ Texts kept(const IdentityRead& read, const std::vector<Card>& cards)
     return read.isSecret ? keptBySim(read, cards) : copies(read, cards);
 }
 
-// \name One slot
-
 // Reads with a slot that holds `preset`; what the slot holds then.
 char* readSlot(const IdentityRead& read, unsigned int count, int slot, int expectedResult,
                char* preset = nullptr)
@@ -153,8 +149,6 @@ std::vector<LoggedCall> slotCalls(const IdentityRead& read)
           [] { platform().answer(initCall(0), -1); });
     return calls;
 }
-
-// \name The first slot
 
 char* readFirst(const IdentityRead& read, int expectedResult, char* preset = nullptr)
 {
@@ -230,8 +224,6 @@ std::vector<LoggedCall> firstCalls(const IdentityRead& read)
           [] { setNoTelephony(); });
     return calls;
 }
-
-// \name Every slot
 
 const int UNTOUCHED_COUNT = 77;
 

@@ -17,7 +17,6 @@
 
 namespace fake {
 
-// \name The device
 // The modem of slot N is "cpN".
 
 struct Card {
@@ -127,8 +126,6 @@ inline telephony_handle_list_s openList(unsigned int count)
     return platform().openList(count);
 }
 
-// \name What was done
-
 const std::string SIM_ACCESS = "CORE_MUTEX_NAME_SIM_ACCESS";
 
 // Locked around one platform call only.
@@ -184,8 +181,6 @@ inline Texts accessed(const Texts& step)
 {
     return SIM_MANAGER.access() + step;
 }
-
-// \name What must not be told
 
 // Whether the text was formatted or logged anywhere.
 inline bool isTold(const std::string& secret)
