@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Every lookup, over every key there is and many that there are not, against a plain scan of the
 // checked-in rows.
+#include <map>
 #include <set>
 
 #include "Csv.h"
@@ -143,6 +144,54 @@ TEST_F(LookupTest, EveryKeyIsAnsweredAsPlainScanDoes)
             ASSERT_EQ(lookup.answer(key), lookup.expected(key)) << lookup.name << ' ' << key;
             platform().forgetEvents();
         }
+}
+
+// Callers rely on which of several rows answers, and on what the tables lack.
+TEST_F(LookupTest, AnswersThatMustStay)
+{
+    const char* const name = "NameOfCallingCodeIsThatOfItsFirstMcc";
+    const char* const alpha2 = "Alpha2OfCallingCodeIsThatOfTheLastRow";
+    const Row rows[] = {
+        {"GetMccFromCountryCode", "kh", "456"},
+        {"GetMccFromCountryCode", "KH", NONE},
+        {"GetMccFromCountryCode", "CN", NONE},
+        {"GetMccFromCountryCode", "", NONE},
+        {"GetMccFromCountryCallingCode", "1", "544"},
+        {"GetMccFromCountryCallingCode", "7", "401"},
+        {"GetMccFromCountryCallingCode", "590", "340"},
+        {"GetMccFromCountryCallingCode", "596", "340"},
+        {"GetMccFromCountryCallingCode", "+1", NONE},
+        {"GetMccFromCountryCallingCode", "001", NONE},
+        {"GetCountryCodeFromMcc", "340", "gp"},
+        {"GetCountryNameFromMcc", "340", "Guadeloupe (France)"},
+        {name, "596", "Guadeloupe (France)"},
+        {alpha2, "596", "mq"},
+        {alpha2, "590", "mq"},
+        {alpha2, "1", "as"},
+        {"GetAlpha3CountryCodeFromMcc", "659", "SSD"},
+        {"GetCountryCodeFromMcc", "659", NONE},
+        {"GetCountryNameFromMcc", "659", NONE},
+        {"GetCountryCallingCodeFromMcc", "659", NONE},
+        {"GetServiceCountryCodeFromMcc", "659", NONE},
+        {"GetServiceCountryCodeFromMcc", "406", "hi_IN"},
+        {"GetCountryCodeFromMcc", "406", NONE},
+        {"IsValidMcc", "406", "no"},
+        {"IsValidMcc", "412", "yes"},
+        {"IsValidMcc", "4120", "no"},
+        {"IsValidMcc", "", "no"},
+        {"IsMoSupportMcc", "505", "yes"},
+        {"IsMoSupportMcc", "999", "yes"},
+        {"IsMoSupportMcc", "", "yes"},
+        {"CoreSystemIsMoSupportMcc", "123", "yes"},
+        {"CoreSystemIsMoSupportMcc", "", "no"},
+        {"GetISO639LangCodeFromDeviceLang", "KO", "kor"},
+        {"GetISO639LangCodeFromDeviceLang", "DE", NONE},
+    };
+    std::map<std::string, Answer> answers;
+    for (const Lookup& lookup : lookups())
+        answers[lookup.name] = lookup.answer;
+    for (const Row& row : rows)
+        EXPECT_EQ(answers.at(row[0])(row[1]), row[2]) << row[0] << ' ' << row[1];
 }
 
 } // namespace

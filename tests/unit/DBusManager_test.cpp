@@ -165,6 +165,17 @@ TEST_F(DBusManagerTest, OddSerialsPassThroughUnchanged)
         }
 }
 
+TEST_F(DBusManagerTest, EachAnswerIsACopyThatTheCallerFrees)
+{
+    bus().answerText("SN");
+    char* const first = ask(0);
+    char* const second = ask(0);
+    EXPECT_NE(first, second);
+    EXPECT_STREQ(first, second);
+    std::free(first);
+    std::free(second);
+}
+
 TEST_F(DBusManagerTest, TimeOutIsToldByTheTextAloneWhereverItStands)
 {
     const auto expectCode = [](const std::string& message, int code, GQuark domain, int number) {

@@ -329,6 +329,17 @@ TEST_F(LegacyTest, OnlyCompletedInitialisationIsAvailable)
     }
 }
 
+TEST_F(LegacyTest, EveryCallByNameOpensAHandleOfItsOwn)
+{
+    platform().answer(initCall(0), 0);
+    platform().answer(modemCall("tel_check_sms_device_status", 0), 0, 1);
+    for (std::size_t calls = 1; calls <= 3; ++calls) {
+        int ready = 0;
+        EXPECT_TRUE(system.CheckSmsEnabled(nameOf("cp0"), &ready));
+        EXPECT_EQ(platform().liveHandles(), Texts(calls, "modem cp0"));
+    }
+}
+
 TEST_F(LegacyTest, ImsiPartsAreGivenAsTheyStand)
 {
     for (const Card& card : {KOREAN_CARD, AMERICAN_CARD, Card{"", "", "", ""},
