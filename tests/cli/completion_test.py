@@ -78,6 +78,8 @@ def check(shell, program):
         everywhere = everywhere or [option for option in options if option != "--version"]
         shell.expect(subcommands, *command, "")
         shell.expect([*options, *everywhere], *command, "--")
+    facts = subprocess.run([program, "get", "--list"], stdout=subprocess.PIPE, text=True, check=True)
+    shell.expect(facts.stdout.split(), "get", "")
     shell.expect(["language_code"], "--device", "phone.toml", "get", "lang")
     shell.expect(["phone.toml"], "info", "--device", "")
     shell.expect(["--color=never"], "info", "--color=n")

@@ -9,8 +9,8 @@ those of standard error behind "! ", and the exit code in brackets unless it is 
 regular expression for the whole line; "\\ no newline" says that the output did not end in one; the number of a line in
 a device file may be a "#". Other lines, up to the first command, are comments.
 
-The commands run in an empty directory with links to the device files (devices/), the completion (completion/) and the
-tests' tools (support/), and in an environment that hides this machine's own services. The shell function "filled"
+The commands run in an empty directory with links to the device files (devices/) and the tests' tools
+(support/), and in an environment that hides this machine's own services. The shell function "filled"
 fills lines with what was one value a line, as JSON is.
 """
 import argparse
@@ -100,7 +100,6 @@ def main():
     with tempfile.TemporaryDirectory() as directory:
         Path(directory, "devices").symlink_to(TREE / "tests/devices")
         Path(directory, "support").symlink_to(TREE / "tests/support")
-        Path(directory, "completion").symlink_to(TREE / "cli/completion")
         variables = environment(options.command.resolve(), directory)
         for shell_command, expected in steps:
             actual = run(shell_command, directory, variables)

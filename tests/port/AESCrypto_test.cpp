@@ -207,13 +207,6 @@ TEST_F(AESCryptoTest, FilesThatAreNoKeyFilesAreNamedAtOnce)
     EXPECT_EQ("key file " + big + ": larger than 4096 bytes", loadProblem(big));
 }
 
-TEST_F(AESCryptoTest, KeyFileOfTheEnvironmentIsUsed)
-{
-    const std::string output = probeWithKey(tree.write("/key", HEX_KEY));
-    EXPECT_THAT(output, HasSubstr("\nconfigured=1\nproblem=\n"));
-    EXPECT_EQ("balance", open(encipheredIn(output)));
-}
-
 TEST_F(AESCryptoTest, UnusableKeyFileOfTheEnvironmentIsNeverReplaced)
 {
     const std::string key = tree.write("/key", HEX_KEY.substr(2));

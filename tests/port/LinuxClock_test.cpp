@@ -39,17 +39,6 @@ TEST_F(LinuxClockTest, TimeIsThatOfTheZone)
     EXPECT_EQ("2024-07-03 17:45:00 Wed day 185 +0545 20700", shown(SUMMER_2024));
 }
 
-TEST_F(LinuxClockTest, NowIsNow)
-{
-    const std::time_t before = std::time(nullptr);
-    const auto answer = port::linux_backend::localTime(std::time(nullptr));
-    ASSERT_TRUE(answer);
-    std::tm local = answer.value().value;
-    const std::time_t told = std::mktime(&local);
-    EXPECT_LE(before, told);
-    EXPECT_LE(told, std::time(nullptr));
-}
-
 TEST_F(LinuxClockTest, YearBeyondTheCalendarIsTold)
 {
     if (sizeof(std::time_t) < 8)

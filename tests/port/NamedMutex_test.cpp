@@ -32,14 +32,6 @@ void expectExclusion(int threads, Work countOnce)
     EXPECT_EQ(threads * 200, count);
 }
 
-TEST(NamedMutexTest, ScopedLocksOfOneNameExclude)
-{
-    expectExclusion(8, [](int, int& count) {
-        const CoreMutexLock lock("NamedMutexTest::scoped");
-        countSlowly(count);
-    });
-}
-
 TEST(NamedMutexTest, BothClassesMeanTheSameMutex)
 {
     expectExclusion(8, [](int number, int& count) {

@@ -19,14 +19,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-TEST(BackendChoiceTest, ThisMachineAnswersUnlessADeviceFileIsNamed)
-{
-    EXPECT_THAT(outputOf("env -u CORESYSTEM_DEVICE " QUOTED_ENVIRONMENT_PROBE),
-                StartsWith("backend=linux\n"));
-    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE= " QUOTED_ENVIRONMENT_PROBE),
-                StartsWith("backend=linux\n"));
-}
-
 TEST(BackendChoiceTest, NamedDeviceFileIsNeverReplacedByThisMachine)
 {
     EXPECT_THAT(outputOf("CORESYSTEM_DEVICE=/nowhere.toml " QUOTED_ENVIRONMENT_PROBE),

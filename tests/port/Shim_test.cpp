@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The platform's C functions over a device file.
-#include <algorithm>
 #include <cstdlib>
 #include <cstring>
-#include <string>
 #include <thread>
 
 #include <dlog.h>
@@ -15,16 +13,11 @@
 #include "shim/Call.h"
 #include "support/CapturedStandardError.h"
 #include "support/TemporaryTree.h"
-#include "support/Together.h"
 
 using coresystem_port::lastOrigin;
-using coresystem_port::Origin;
 using coresystem_port::Question;
-using testing::AllOf;
-using testing::EndsWith;
 using testing::HasSubstr;
 using testing::MatchesRegex;
-using testing::StartsWith;
 
 namespace {
 
@@ -85,15 +78,6 @@ const Information INFORMATION[] = {
     {"tizen.org/feature/platform.version", "1.2", Question::PlatformVersion},
     {"tizen.org/system/model_name", "model", Question::ModelName},
 };
-struct Setting {
-    system_settings_key_e key;
-    const char* value;
-    Question question;
-};
-const Setting SETTINGS[] = {
-    {SYSTEM_SETTINGS_KEY_DEVICE_NAME, "phone", Question::DeviceName},
-    {SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, "de_DE.UTF-8", Question::Language},
-};
 
 char* const UNTOUCHED = reinterpret_cast<char*>(1);
 
@@ -132,16 +116,6 @@ TEST_F(ShimTest, EveryInformationKeyIsAnswered)
     }
 }
 
-TEST_F(ShimTest, EverySettingIsAnswered)
-{
-    for (const Setting& row : SETTINGS) {
-        ASSERT_EQ(0, system_settings_get_value_string(row.key, &slot));
-        EXPECT_STREQ(row.value, slot);
-        EXPECT_TRUE(lastOrigin(row.question).available);
-        free(std::exchange(slot, nullptr));
-    }
-}
-
 TEST_F(ShimTest, EachCallHandsOutACopyOfItsOwn)
 {
     char* second = nullptr;
@@ -151,13 +125,6 @@ TEST_F(ShimTest, EachCallHandsOutACopyOfItsOwn)
     std::strcpy(slot, "xx");
     EXPECT_STREQ("id", second);
     free(second);
-}
-
-TEST_F(ShimTest, EmptyTextOfTheDeviceFileIsAnAnswer)
-{
-    describe("[settings]\nlanguage = ''\n");
-    ASSERT_EQ(0, system_settings_get_value_string(SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE, &slot));
-    EXPECT_STREQ("", slot);
 }
 
 TEST_F(ShimTest, NullArgumentsAreInvalid)
@@ -175,33 +142,11 @@ TEST_F(ShimTest, UnknownInformationKeysAreInvalid)
         EXPECT_EQ(-22, failedInformation(key)) << key;
 }
 
-TEST_F(ShimTest, SettingsOfAnotherTypeAreInvalid)
-{
-    for (const int key :
-         {SYSTEM_SETTINGS_KEY_FONT_SIZE, SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED,
-          SYSTEM_SETTINGS_KEY_LOCK_STATE})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSetting(key)) << key;
-}
-
-TEST_F(ShimTest, NumbersOutsideTheEnumerationAreInvalid)
-{
-    for (const int key :
-         {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 30, 31, 32, 1000, -2147483647})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSetting(key)) << key;
-}
-
-TEST_F(ShimTest, TextSettingsThatNoDeviceHasAreNotSupported)
-{
-    for (const int key : {SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE, SYSTEM_SETTINGS_KEY_FONT_TYPE,
-                          SYSTEM_SETTINGS_KEY_LOCALE_COUNTRY, SYSTEM_SETTINGS_KEY_LOCALE_TIMEZONE,
-                          SYSTEM_SETTINGS_KEY_SOUND_NOTIFICATION})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedSetting(key)) << key;
-}
-
 // The result of a read that must leave its value alone. An application may be built against headers
 // with more keys than these.
-template <typename Read, typename Key, typename Value>
-__attribute__((no_sanitize("undefined"))) int failedRead(Read read, int key, Value before)
+template <typename Key, typename Value>
+__attribute__((no_sanitize("undefined"))) int failedRead(int (*read)(Key, Value*), int key,
+                                                         Value before)
 {
     Value value = before;
     Key number{};
@@ -211,36 +156,36 @@ __attribute__((no_sanitize("undefined"))) int failedRead(Read read, int key, Val
     return result;
 }
 
-int failedSwitch(int key)
+TEST_F(ShimTest, OtherKeysAreInvalidOrOfNoDevice)
 {
-    return failedRead<decltype(system_settings_get_value_bool)*, system_settings_key_e>(
-        system_settings_get_value_bool, key, true);
-}
-
-int failedNumber(int key)
-{
-    return failedRead<decltype(system_settings_get_value_int)*, system_settings_key_e>(
-        system_settings_get_value_int, key, 77);
-}
-
-TEST_F(ShimTest, SwitchesAndNumbersHaveKeysOfTheirOwn)
-{
-    for (const int key : {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_FONT_SIZE),
-                          static_cast<int>(SYSTEM_SETTINGS_KEY_DEVICE_NAME),
-                          static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 1000})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedSwitch(key)) << key;
-    for (const int key : {-1, static_cast<int>(SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED),
-                          static_cast<int>(SYSTEM_SETTINGS_KEY_DEVICE_NAME),
-                          static_cast<int>(SYSTEM_SETTINGS_KEY_MAX), 1000})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, failedNumber(key)) << key;
-}
-
-TEST_F(ShimTest, SwitchesAndNumbersThatNoDeviceHasAreNotSupported)
-{
-    for (const int key : {5, 7, 14, 17, 18, 19, 20, 22, 23, 24})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedSwitch(key)) << key;
-    for (const int key : {9, 16, 25, 27, 28})
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, failedNumber(key)) << key;
+    const auto text = failedSetting;
+    const auto flag = [](int key) { return failedRead(system_settings_get_value_bool, key, true); };
+    const auto number = [](int key) { return failedRead(system_settings_get_value_int, key, 77); };
+    constexpr int MAX = SYSTEM_SETTINGS_KEY_MAX;
+    constexpr int NAME = SYSTEM_SETTINGS_KEY_DEVICE_NAME;
+    constexpr int SIZE = SYSTEM_SETTINGS_KEY_FONT_SIZE;
+    constexpr int DATA = SYSTEM_SETTINGS_KEY_3G_DATA_NETWORK_ENABLED;
+    const struct {
+        std::function<int(int)> read;
+        std::vector<int> ofAnotherType;
+        std::vector<int> ofNoDevice;
+    } rows[] = {
+        {text,
+         {SIZE, DATA, SYSTEM_SETTINGS_KEY_LOCK_STATE, 30, 31, 32, -2147483647},
+         {SYSTEM_SETTINGS_KEY_INCOMING_CALL_RINGTONE, SYSTEM_SETTINGS_KEY_FONT_TYPE,
+          SYSTEM_SETTINGS_KEY_LOCALE_COUNTRY, SYSTEM_SETTINGS_KEY_LOCALE_TIMEZONE,
+          SYSTEM_SETTINGS_KEY_SOUND_NOTIFICATION}},
+        {flag, {SIZE, NAME}, {5, 7, 14, 17, 18, 19, 20, 22, 23, 24}},
+        {number, {DATA, NAME}, {9, 16, 25, 27, 28}},
+    };
+    for (const auto& [read, ofAnotherType, ofNoDevice] : rows) {
+        for (const int key : {-1, MAX, 1000})
+            EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, read(key)) << key;
+        for (const int key : ofAnotherType)
+            EXPECT_EQ(SYSTEM_SETTINGS_ERROR_INVALID_PARAMETER, read(key)) << key;
+        for (const int key : ofNoDevice)
+            EXPECT_EQ(SYSTEM_SETTINGS_ERROR_NOT_SUPPORTED, read(key)) << key;
+    }
 }
 
 TEST_F(ShimTest, AbsentFactIsAnIoErrorWithAReason)
@@ -252,8 +197,8 @@ TEST_F(ShimTest, AbsentFactIsAnIoErrorWithAReason)
         EXPECT_THAT(lastOrigin(row.question).reason, HasSubstr("[device] has no "));
         EXPECT_EQ("", lastOrigin(row.question).source);
     }
-    for (const Setting& row : SETTINGS)
-        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_IO_ERROR, failedSetting(row.key)) << row.key;
+    for (const int key : {SYSTEM_SETTINGS_KEY_DEVICE_NAME, SYSTEM_SETTINGS_KEY_LOCALE_LANGUAGE})
+        EXPECT_EQ(SYSTEM_SETTINGS_ERROR_IO_ERROR, failedSetting(key)) << key;
 }
 
 TEST_F(ShimTest, BackendsErrorsHaveThePlatformsNumbers)
@@ -305,46 +250,6 @@ TEST_F(ShimTest, MissingMemoryIsNamed)
     noMemory = true;
     EXPECT_EQ(SYSTEM_INFO_ERROR_OUT_OF_MEMORY, failedInformation("tizen.org/system/tizenid"));
     EXPECT_EQ(SYSTEM_SETTINGS_ERROR_OUT_OF_MEMORY, failedSetting(SYSTEM_SETTINGS_KEY_DEVICE_NAME));
-}
-
-TEST_F(ShimTest, BadDeviceFileIsToldToTheLogOnce)
-{
-    describe("[device]\ncolour = 'red'\n");
-    const std::string problem = tree().path("/device.toml:3:1: unknown key \"colour\" in [device]");
-    CapturedStandardError log;
-    for (const Information& row : INFORMATION)
-        EXPECT_EQ(SYSTEM_INFO_ERROR_IO_ERROR, failedInformation(row.key));
-    EXPECT_EQ(problem, coresystem_port::deviceFileProblem());
-    const std::string lines = log.take();
-    EXPECT_THAT(lines, AllOf(StartsWith("E/coresystem-port("), EndsWith("): " + problem + "\n")));
-    EXPECT_EQ(1, std::count(lines.begin(), lines.end(), '\n'));
-}
-
-TEST_F(ShimTest, ThreadsMayAskWhileTheFileChanges)
-{
-    coresystem_port::setLogSink(coresystem_port::LogSink::None); // of half-written files
-    together(8, [this](int number) {
-        for (int round = 0; round < 50; ++round) {
-            if (number == 0)
-                describe("[device]\nmodel_name = '" + std::string(round % 2 == 0 ? "even" : "odd") +
-                         "'\n");
-            char* model = nullptr;
-            if (system_info_get_platform_string("tizen.org/system/model_name", &model) == 0) {
-                const std::string text = model;
-                ASSERT_TRUE(text == "model" || text == "even" || text == "odd") << text;
-            }
-            free(model);
-        }
-    });
-}
-
-TEST_F(ShimTest, PortTellsWhatAnswers)
-{
-    EXPECT_EQ("simulator", coresystem_port::backendName());
-    EXPECT_EQ(tree().path("/device.toml"), coresystem_port::deviceFile());
-    EXPECT_EQ("", coresystem_port::deviceFileProblem());
-    ASSERT_EQ(1U, coresystem_port::findServices().size());
-    EXPECT_TRUE(coresystem_port::findServices()[0].found);
 }
 
 TEST_F(ShimTest, LogLineIsFormattedAndCounted)

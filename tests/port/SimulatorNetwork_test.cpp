@@ -54,10 +54,6 @@ TEST_F(SimulatorNetworkTest, AbsentKeysAreNotAvailableAndNoProblemOfTheFile)
     expectMissing(line(2) + ": [network] has no wifi", network.wifiConnection());
     expectMissing(line(2) + ": [network] has no bluetooth", network.bluetooth());
     expectMissing(path + ": [settings] has no flight_mode", backend->get<Question::FlightMode>());
-    expectMissing(path + ": [settings] has no packet_data", backend->get<Question::PacketData>());
-    expectMissing(path + ": [settings] has no font_size", backend->get<Question::FontSize>());
-    expectMissing(path + ": [settings] has no language", backend->get<Question::Language>());
-    expectMissing(path + ": [device] has no model_name", backend->get<Question::ModelName>());
     expectMissing(path + ": [device] has no serial", backend->get<Question::DeviceSerial>());
     expectMissing(path + ": [storage] has no block_size", backend->internalStorage());
     expectMissing(path + ": no section [packages]", backend->packageVersion("a"));
@@ -142,12 +138,7 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
 {
     describe("[network]\nwifi = 'on'\n");
     const std::string problem = backend->deviceFileProblem();
-    expectMissing(problem, network.cellular());
-    expectMissing(problem, network.wifi());
     expectMissing(problem, network.wifiConnection());
-    expectMissing(problem, backend->get<Question::FlightMode>());
-    expectMissing(problem, backend->internalStorage());
-    expectMissing(problem, backend->packageVersion("a"));
     expectMissing(problem, backend->now());
 }
 

@@ -228,11 +228,6 @@ TEST_F(SimulatorSchemaTest, NoFileTakesLong)
 
 TEST_F(SimulatorSchemaTest, PackagesHaveNamesOfTheirOwn)
 {
-    describe("[packages]\n\"org.example.app\" = '1.2'\n'with blank' = ''\n");
-    expectAnswer("1.2", line(3), file.get<std::string>("packages", "org.example.app"));
-    expectAnswer("", line(4), file.get<std::string>("packages", "with blank"));
-    ASSERT_TRUE(file.device());
-    EXPECT_EQ(nullptr, file.device().value()->section("packages").find("other"));
     expectRefused("[packages]", "app", {"1"}, "be a text in quotes");
     expectRefused("[packages]", "app", {"\"1\\u0000\""}, "not hold a NUL");
     EXPECT_THAT(problemOf("[packages]\norg.app = '1'\n"),

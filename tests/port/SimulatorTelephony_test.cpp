@@ -8,7 +8,6 @@ using port::CardStatus;
 using port::ServiceState;
 using port::Subscriptions;
 using port::Telephony;
-using testing::IsEmpty;
 using testing::StartsWith;
 using Kind = port::Error::Kind;
 
@@ -251,17 +250,6 @@ TEST_F(SimulatorTelephonyTest, ProblemOfTheFileIsTheReasonOfEveryQuestion)
     expectErrors(Kind::NotAvailable, "cp0", reason);
     expectError(Kind::NotAvailable, reason, telephony.slots());
     expectError(Kind::NotAvailable, reason, telephony.subscriptions());
-}
-
-TEST_F(SimulatorTelephonyTest, EditIsSeenByTheNextQuestion)
-{
-    describe("[[slot]]\nsim = 'absent'\n");
-    EXPECT_EQ(CardStatus::Absent, telephony.card("cp0").value().value.status);
-    describe("[[slot]]\nsim = 'available'\n");
-    EXPECT_EQ(CardStatus::Ready, telephony.card("cp0").value().value.status);
-    describe("");
-    EXPECT_THAT(telephony.slots().value().value, IsEmpty());
-    EXPECT_FALSE(telephony.card("cp0"));
 }
 
 } // namespace

@@ -69,20 +69,6 @@ protected:
     }
 };
 
-TEST_F(SimulatorTest, EveryKeyIsAnsweredWithItsLine)
-{
-    describe("[device]\nplatform_id = 'a'\nplatform_name = 'b'\nplatform_version = 'c'\n"
-             "model_name = 'd'\nserial = 'e'\n[settings]\ndevice_name = 'f'\nlanguage = 'g'\n");
-    expectAnswer("a", line(3), backend->get<Question::PlatformId>());
-    expectAnswer("b", line(4), backend->get<Question::PlatformName>());
-    expectAnswer("c", line(5), backend->get<Question::PlatformVersion>());
-    expectAnswer("d", line(6), backend->get<Question::ModelName>());
-    expectAnswer("e", line(7), backend->get<Question::DeviceSerial>());
-    expectAnswer("f", line(9), backend->get<Question::DeviceName>());
-    expectAnswer("g", line(10), backend->get<Question::Language>());
-    EXPECT_EQ("", backend->deviceFileProblem());
-}
-
 TEST_F(SimulatorTest, TextsAreTakenAsTheyStand)
 {
     describe("device.model_name = \"Ger\xc3\xa4t \\u00e9 \\\"x\\\" \"\n");
