@@ -4,7 +4,6 @@
 #include <filesystem>
 
 #include <gmock/gmock.h>
-#include <unistd.h>
 
 #include "devicefile/DeviceSearch.h"
 #include "support/Child.h"
