@@ -5,8 +5,6 @@
 #include <cctype>
 #include <cstdlib>
 #include <filesystem>
-#include <set>
-#include <string>
 
 #include <gmock/gmock.h>
 #include <openssl/err.h>

@@ -3,8 +3,6 @@
 // recorded interface holds those of the types of its own methods.
 #include <algorithm>
 #include <map>
-#include <string>
-#include <vector>
 
 #include <ITapiSim.h>
 #include <gmock/gmock.h>

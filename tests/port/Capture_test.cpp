@@ -49,8 +49,7 @@ std::map<std::string, std::string> valuesOf(const std::string& text)
     std::map<std::string, std::string> values;
     const auto entries = port::devicefile::listEntries(text, "captured");
     for (const auto& entry : entries.value())
-        values[entry.path()] =
-            port::devicefile::getValue(text, "captured", entry.path()).value();
+        values[entry.path()] = port::devicefile::getValue(text, "captured", entry.path()).value();
     return values;
 }
 

@@ -3,7 +3,6 @@
 #include <csignal>
 #include <filesystem>
 #include <fstream>
-#include <set>
 #include <sstream>
 
 #include <fcntl.h>

@@ -3,8 +3,6 @@
 
 #include <cstdio>
 #include <cstring>
-#include <set>
-#include <string>
 
 #include <gmock/gmock.h>
 

@@ -75,10 +75,7 @@ std::string oddWith(const std::string& part, const std::string& by)
 TEST(DeviceTextTest, OnlyTheValuesBytesChange)
 {
     const struct {
-        const char* path;
-        const char* value;
-        const char* was;
-        const char* is;
+        const char *path, *value, *was, *is;
     } rows[] = {
         {"settings.device_name", "Bad 浴室", "'Küche'", "'Bad 浴室'"},
         {"settings.device_name", "Anna's", "'Küche'", "\"Anna's\""},

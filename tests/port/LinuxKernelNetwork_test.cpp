@@ -51,9 +51,7 @@ TEST_F(LinuxKernelNetworkTest, MachineWithoutWifiHasNone)
 TEST_F(LinuxKernelNetworkTest, WifiFollowsItsInterface)
 {
     const struct {
-        const char* flags;
-        const char* carrier;
-        const char* state;
+        const char *flags, *carrier, *state;
         LinkState link;
         WifiConnection connection;
     } rows[] = {

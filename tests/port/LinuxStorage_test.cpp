@@ -48,29 +48,20 @@ TEST(LinuxStorageTest, FolderThatCannotBeLookedAtIsTold)
     EXPECT_EQ(tooLong + ": File name too long", LinuxStorage(tooLong).internal().error().reason);
 }
 
-TEST(LinuxStorageTest, SizesBeyondThirtyTwoBitsAreKept)
+TEST(LinuxStorageTest, BlocksAreCountedInFragmentsAndNeverCut)
 {
-    struct statvfs64 volume = {};
-    volume.f_bsize = 4096;
-    volume.f_frsize = 4096;
-    volume.f_blocks = 3 * TIB / 4096 * 2;
-    volume.f_bavail = 3 * TIB / 4096;
-    const VolumeSize size = volumeSizeOf(volume);
-    EXPECT_EQ(6 * TIB, size.fragmentSize * size.blocks);
-    EXPECT_EQ(3 * TIB, size.blockSize * size.availableBlocks);
-
-    volume.f_blocks = 16 * 1024 * TIB / 512;
-    EXPECT_EQ(volume.f_blocks, volumeSizeOf(volume).blocks);
-}
-
-TEST(LinuxStorageTest, AvailableBlocksAreCountedInFragments)
-{
-    struct statvfs64 volume = {};
-    volume.f_bsize = 1048576; // as a network file system says
-    volume.f_frsize = 4096;
-    volume.f_bavail = 10;
-    const VolumeSize size = volumeSizeOf(volume);
-    EXPECT_EQ(40960U, size.blockSize * size.availableBlocks);
+    for (const std::uint64_t blockSize : {4096, 1048576}) { // as a network file system says
+        struct statvfs64 volume = {};
+        volume.f_bsize = blockSize;
+        volume.f_frsize = 4096;
+        volume.f_blocks = 6 * TIB / 4096;
+        volume.f_bavail = 3 * TIB / 4096 + 10;
+        const VolumeSize size = volumeSizeOf(volume);
+        EXPECT_EQ(6 * TIB, size.fragmentSize * size.blocks);
+        EXPECT_EQ(3 * TIB + 40960, size.blockSize * size.availableBlocks);
+        volume.f_blocks = 16 * 1024 * TIB / 512;
+        EXPECT_EQ(volume.f_blocks, volumeSizeOf(volume).blocks);
+    }
 }
 
 TEST(LinuxStorageTest, VolumeOfNoBytesIsAnAnswer)

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The package functions over a backend that answers what a test says.
 #include <cstdlib>
-#include <string>
-#include <vector>
 
 #include <gmock/gmock.h>
 #include <package_manager.h>

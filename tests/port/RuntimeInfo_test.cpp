@@ -3,8 +3,6 @@
 #include <runtime_info.h>
 
 #include <cstring>
-#include <utility>
-#include <vector>
 
 #include <gio/gio.h>
 #include <gmock/gmock.h>

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Settings, configuration store and clock over a backend that answers what a test says.
 #include <cstdlib>
-#include <tuple>
 
 #include <app_alarm.h>
 #include <gmock/gmock.h>

@@ -13,17 +13,10 @@ using testing::AllOf;
 using testing::AnyOf;
 using testing::HasSubstr;
 using testing::Not;
-using testing::StartsWith;
 
 namespace {
 
 namespace fs = std::filesystem;
-
-TEST(BackendChoiceTest, NamedDeviceFileIsNeverReplacedByThisMachine)
-{
-    EXPECT_THAT(outputOf("CORESYSTEM_DEVICE=/nowhere.toml " QUOTED_ENVIRONMENT_PROBE),
-                StartsWith("backend=simulator\n"));
-}
 
 TEST(BackendChoiceTest, SetUserIdProcessIgnoresTheEnvironment)
 {

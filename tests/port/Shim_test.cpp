@@ -68,8 +68,7 @@ protected:
 };
 
 struct Information {
-    const char* key;
-    const char* value;
+    const char *key, *value;
     Question question;
 };
 const Information INFORMATION[] = {

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Radios, switches, storage, packages, configuration and clock of a device file.
 #include <ctime>
-#include <tuple>
 
 #include "simulator/Clock.h"
 #include "support/DeviceFileTest.h"

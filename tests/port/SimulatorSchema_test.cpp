@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Valid and invalid device files, and the message about each mistake.
 #include <ctime>
-#include <functional>
+#include <sstream>
 
 #include "devicefile/DeviceFile.h"
 #include "port/facts/Facts.h"
@@ -77,38 +77,35 @@ TEST_F(SimulatorSchemaTest, NamesAreListedWhenOneIsUnknown)
 
 TEST_F(SimulatorSchemaTest, EveryNameIsTaken)
 {
+    const char* const RADIO = "deactivated disconnected connected not_supported";
     const struct {
-        const char* section;
-        const char* key;
-        std::vector<const char*> names;
+        const char *section, *key, *names;
     } rows[] = {
-        {"settings", "font_size", {"small", "normal", "large", "huge", "giant"}},
-        {"network",
-         "cellular",
-         {"out_of_service", "flight_mode", "roaming_off", "call_only_available", "available",
-          "connected", "not_supported"}},
-        {"network", "wifi", {"deactivated", "disconnected", "connected", "not_supported"}},
-        {"network", "bluetooth", {"deactivated", "disconnected", "connected", "not_supported"}},
-        {"network",
-         "wifi_connection",
-         {"failure", "disconnected", "association", "configuration", "connected", "not_supported"}},
-        {"subscriptions", "voice", {"unknown", "current_network", "ask_always", "slot0", "slot1"}},
-        {"subscriptions", "network", {"unknown"}},
-        {"subscriptions", "data", {"unknown"}},
+        {"settings", "font_size", "small normal large huge giant"},
+        {"network", "cellular",
+         "out_of_service flight_mode roaming_off call_only_available available connected "
+         "not_supported"},
+        {"network", "wifi", RADIO},
+        {"network", "bluetooth", RADIO},
+        {"network", "wifi_connection",
+         "failure disconnected association configuration connected not_supported"},
+        {"subscriptions", "voice", "unknown current_network ask_always slot0 slot1"},
+        {"subscriptions", "network", "unknown"},
+        {"subscriptions", "data", "unknown"},
     };
-    for (const auto& row : rows)
-        for (std::size_t i = 0; i < row.names.size(); ++i) {
-            const std::string name = row.names[i];
+    for (const auto& row : rows) {
+        std::istringstream names(row.names);
+        std::int64_t number = std::string(row.names) == "unknown" ? -1 : 0;
+        for (std::string name; names >> name; ++number) {
             describe("[" + std::string(row.section) + "]\n" + row.key + " = '" + name + "'\n");
             const auto value = file.get<std::int64_t>(row.section, row.key);
             ASSERT_EQ("", backend->deviceFileProblem());
             if (name == "not_supported")
                 EXPECT_EQ(port::Error::Kind::NotSupported, value.error().kind);
-            else if (row.names.size() == 1)
-                EXPECT_EQ(-1, value.value().value);
             else
-                EXPECT_EQ(static_cast<std::int64_t>(i), value.value().value) << name;
+                EXPECT_EQ(number, value.value().value) << name;
         }
+    }
 }
 
 TEST_F(SimulatorSchemaTest, DigitsAreCounted)
@@ -302,9 +299,7 @@ TEST_F(SimulatorSchemaTest, FaultsTableSaysWhatHappens)
 TEST(PrivacyTest, WhatIsPrivateIsMaskedByCharacters)
 {
     constexpr struct {
-        const char* text;
-        const char* masked;
-        const char* zeroed;
+        const char *text, *masked, *zeroed;
     } ROWS[] = {
         {"", "", ""},
         {"1234", "****", "0000"},

@@ -2,8 +2,6 @@
 #include <algorithm>
 #include <filesystem>
 #include <mutex>
-#include <set>
-#include <vector>
 
 #include <sys/stat.h>
 #include <unistd.h>

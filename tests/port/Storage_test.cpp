@@ -36,16 +36,11 @@ protected:
         size.f_bavail = 78;
     }
 
-    int read()
-    {
-        return sizeOf(&size);
-    }
-
     // A read that leaves the structure alone.
     int failure(const Answer<port::VolumeSize>& answer)
     {
         backend.storageAnswer = answer;
-        const int result = read();
+        const int result = sizeOf(&size);
         EXPECT_EQ(77U, size.f_bsize);
         EXPECT_EQ(78U, size.f_bavail);
         return result;
@@ -60,7 +55,7 @@ TYPED_TEST_SUITE(StorageTest, Structures, );
 
 TYPED_TEST(StorageTest, EveryFieldIsFilled)
 {
-    ASSERT_EQ(0, this->read());
+    ASSERT_EQ(0, sizeOf(&this->size));
     EXPECT_EQ(4096U, this->size.f_bsize);
     EXPECT_EQ(1024U, this->size.f_frsize);
     EXPECT_EQ(40U, this->size.f_blocks);
@@ -72,7 +67,7 @@ TYPED_TEST(StorageTest, EveryFieldIsFilled)
 TYPED_TEST(StorageTest, EmptyVolumeIsAnAnswer)
 {
     this->backend.storageAnswer = answered(port::VolumeSize{});
-    ASSERT_EQ(0, this->read());
+    ASSERT_EQ(0, sizeOf(&this->size));
     EXPECT_EQ(0U, this->size.f_blocks);
     EXPECT_EQ(0U, this->size.f_bavail);
 }
@@ -95,7 +90,7 @@ TYPED_TEST(StorageTest, ThreeTebibytesFitOrFailAndAreNeverCut)
         return;
     }
     this->backend.storageAnswer = answer;
-    ASSERT_EQ(0, this->read());
+    ASSERT_EQ(0, sizeOf(&this->size));
     EXPECT_EQ(BLOCKS, this->size.f_blocks);
     EXPECT_EQ(BLOCKS, this->size.f_bavail);
 }

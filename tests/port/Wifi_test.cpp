@@ -2,10 +2,6 @@
 // The Wi-Fi functions over a backend that answers what a test says.
 #include <wifi.h>
 
-#include <string>
-#include <utility>
-#include <vector>
-
 #include <gio/gio.h>
 #include <gmock/gmock.h>
 
