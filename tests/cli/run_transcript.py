@@ -11,7 +11,8 @@ a device file may be a "#". Other lines, up to the first command, are comments.
 
 The commands run in an empty directory with links to the device files (devices/) and the tests' tools
 (support/), and in an environment that hides this machine's own services. The shell function "filled"
-fills lines with what was one value a line, as JSON is.
+fills lines with what was one value a line, as JSON is; "await N" prints N lines of
+descriptor 3, as they come, without their times.
 """
 import argparse
 import os
@@ -52,6 +53,8 @@ def environment(command, directory):
         "HOME": str(directory),
         "LANG": "C",
         "BASH_FUNC_filled%%": """() { tr -s ' \n' ' ' | fold -sw 118 | sed 's/ $//'; echo; }""",
+        "BASH_FUNC_await%%": """() { for ((line = 0; line < $1; line++)); do
+            read -r -t 30 text <&3 && echo "${text#??:??:??.???  }"; done; }""",
         "DBUS_SYSTEM_BUS_ADDRESS": "unix:path=/nonexistent",
     }
 

@@ -82,21 +82,6 @@ TEST_F(CaptureTest, EachFactTellsWhereItCameFrom)
     EXPECT_THAT(text, HasSubstr("\n# no [storage]: "));
 }
 
-TEST_F(CaptureTest, IdentityIsMaskedUnlessRevealed)
-{
-    describe(EVERYTHING);
-    const std::string text = capture(*backend, {});
-    for (const char* const secret :
-         {"5d3f0a9c71e84b62a0c4d8e6f1b27390", "R38DUAL0001", "chentelefon", "123456789",
-          "2025550143", "356938035643809", "490154203237518"})
-        EXPECT_THAT(text, Not(HasSubstr(secret)));
-    auto values = valuesOf(text);
-    EXPECT_EQ("+00000000000", values["slot[0].number"]);
-    EXPECT_EQ("000000000", values["slot[0].msin"]);
-    EXPECT_EQ("310", values["slot[0].mcc"]);
-    EXPECT_THAT(text, HasSubstr("masked\n"));
-}
-
 TEST_F(CaptureTest, ServiceThatDoesNotAnswerIsNoServiceWithoutModem)
 {
     FakeBackend fake;

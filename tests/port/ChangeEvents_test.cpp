@@ -10,7 +10,6 @@
 #include <gmock/gmock.h>
 
 #include "common/ContextThread.h"
-#include "common/GLibTypes.h"
 #include "support/FakeBackend.h"
 #include "support/Together.h"
 
@@ -28,30 +27,6 @@ constexpr Change ALL[] = {Change::WifiDevice, Change::WifiConnection, Change::Wi
                           Change::PacketData, Change::FlightMode,     Change::DataRoaming};
 
 const port::Error FAILED = port::notAvailable("nobody is there");
-
-// A main context that is this thread's default one while it lives; the test runs its loop.
-class OwnContext {
-public:
-    OwnContext()
-    {
-        g_main_context_push_thread_default(context_.get());
-    }
-    ~OwnContext()
-    {
-        g_main_context_pop_thread_default(context_.get());
-    }
-    OwnContext(const OwnContext&) = delete;
-    OwnContext& operator=(const OwnContext&) = delete;
-
-    // Everything that waits.
-    void run() const
-    {
-        while (g_main_context_iteration(context_.get(), FALSE) != FALSE) {}
-    }
-
-private:
-    port::Owned<GMainContext> context_{g_main_context_new()};
-};
 
 class ChangeEventsTest : public testing::Test {
 protected:
@@ -80,14 +55,18 @@ protected:
         });
     }
 
+    // Everything that waits.
+    static void runLoop()
+    {
+        while (g_main_context_iteration(nullptr, FALSE) != FALSE) {}
+    }
     // The events since.
     std::vector<std::string> taken()
     {
-        context.run();
+        runLoop();
         return std::exchange(told, {});
     }
 
-    OwnContext context;
     FakeBackend backend;
     FakeNetwork& network = backend.fakeNetwork;
     ChangeEvents events{backend};
@@ -239,7 +218,7 @@ TEST_F(ChangeEventsTest, CallbackMayRunItsLoop)
 {
     EXPECT_TRUE(events.set(Change::FlightMode, [this](int value) {
         told.push_back("begin" + std::to_string(value));
-        context.run();
+        runLoop();
         told.push_back("end" + std::to_string(value));
     }));
     setFlightMode(true);

@@ -48,32 +48,27 @@ TEST_F(LinuxConfigurationTest, GroupIsAllButTheLastPartOfTheKey)
     EXPECT_THAT(ask("db/csc"), StartsWith("error: "));
 }
 
-TEST_F(LinuxConfigurationTest, FileWithoutTheKeyIsPassedOver)
+TEST_F(LinuxConfigurationTest, FileWithoutTheKeyIsNamedAndPassedOver)
 {
-    tree.write("/machine.ini", "[db/csc]\nsalescode=DBT\n");
-    for (const char* const text :
-         {"", "[db/csc]\n", "[db/csc]\nother=x\n", "[other]\nsalescode=x\n",
-          "[db/csc]\nsalescode=\n", "salescode=x\n", "garbage", "[db/csc\nsalescode=x\n",
-          "[db/csc]\nsalescode=\xff\n"}) {
-        tree.write("/user.ini", text);
-        EXPECT_EQ("DBT <" + machine + ">", ask(KEY)) << text;
-    }
-}
-
-TEST_F(LinuxConfigurationTest, ReasonNamesEveryFile)
-{
-    EXPECT_EQ("error: " + user + ": No such file or directory; " + machine +
-                  ": No such file or directory",
-              ask(KEY));
+    const std::string absent = ": No such file or directory";
+    EXPECT_EQ("error: " + user + absent + "; " + machine + absent, ask(KEY));
+    const char* const noKey = "it has no such key";
+    const char* const broken = "it is no file of groups and keys";
     for (const auto& [text, reason] :
          {std::pair("[db/csc]\nsalescode=\n", "it is empty"),
-          {"[db/csc]\n", "it has no such key"},
-          {"[other]\n", "it has no such key"},
-          {"[db/csc]\nsalescode=\xff\n", "it has no readable text for the key"},
-          {"[db/csc\n", "it is no file of groups and keys"}}) {
+          {"", noKey},
+          {"[db/csc]\n", noKey},
+          {"[db/csc]\nother=x\n", noKey},
+          {"[other]\nsalescode=x\n", noKey},
+          {"salescode=x\n", noKey},
+          {"garbage", broken},
+          {"[db/csc\nsalescode=x\n", broken},
+          {"[db/csc]\nsalescode=\xff\n", "it has no readable text for the key"}}) {
         tree.write("/user.ini", text);
-        EXPECT_EQ("error: " + user + ": " + reason + "; " + machine + ": No such file or directory",
-                  ask(KEY));
+        EXPECT_EQ("error: " + user + ": " + reason + "; " + machine + absent, ask(KEY)) << text;
+        tree.write("/machine.ini", "[db/csc]\nsalescode=DBT\n");
+        EXPECT_EQ("DBT <" + machine + ">", ask(KEY)) << text;
+        tree.remove("/machine.ini");
     }
 }
 

@@ -68,14 +68,14 @@ protected:
 };
 
 struct Information {
-    const char *key, *value;
+    const char* key;
     Question question;
 };
 const Information INFORMATION[] = {
-    {"tizen.org/system/tizenid", "id", Question::PlatformId},
-    {"tizen.org/system/platform.name", "name", Question::PlatformName},
-    {"tizen.org/feature/platform.version", "1.2", Question::PlatformVersion},
-    {"tizen.org/system/model_name", "model", Question::ModelName},
+    {"tizen.org/system/tizenid", Question::PlatformId},
+    {"tizen.org/system/platform.name", Question::PlatformName},
+    {"tizen.org/feature/platform.version", Question::PlatformVersion},
+    {"tizen.org/system/model_name", Question::ModelName},
 };
 
 char* const UNTOUCHED = reinterpret_cast<char*>(1);
@@ -100,19 +100,6 @@ int failedSetting(int key)
     return failure([key](char** slot) {
         return system_settings_get_value_string(static_cast<system_settings_key_e>(key), slot);
     });
-}
-
-TEST_F(ShimTest, EveryInformationKeyIsAnswered)
-{
-    for (const Information& row : INFORMATION) {
-        ASSERT_EQ(0, system_info_get_platform_string(row.key, &slot)) << row.key;
-        EXPECT_STREQ(row.value, slot);
-        EXPECT_TRUE(lastOrigin(row.question).available);
-        EXPECT_THAT(lastOrigin(row.question).source,
-                    MatchesRegex(tree().path("/device.toml") + ":[3-6]"));
-        EXPECT_EQ("", lastOrigin(row.question).reason);
-        free(std::exchange(slot, nullptr));
-    }
 }
 
 TEST_F(ShimTest, EachCallHandsOutACopyOfItsOwn)

@@ -26,21 +26,11 @@ protected:
     port::Network& network = backend->network();
 };
 
-TEST_F(SimulatorNetworkTest, RadiosAndSwitchesAnswerWithTheirLines)
+TEST_F(SimulatorNetworkTest, WifiConnectionAndFontSizeAnswerWithTheirLines)
 {
-    describe("[network]\ncellular = 'roaming_off'\nwifi = 'connected'\n"
-             "wifi_connection = 'association'\nbluetooth = 'disconnected'\n"
-             "[settings]\nflight_mode = false\npacket_data = true\nmobile_data = false\n"
-             "data_roaming = true\nfont_size = 'huge'\n");
-    expectAnswer(CellularState::RoamingOff, line(3), network.cellular());
-    expectAnswer(LinkState::Connected, line(4), network.wifi());
-    expectAnswer(WifiConnection::Association, line(5), network.wifiConnection());
-    expectAnswer(LinkState::Disconnected, line(6), network.bluetooth());
-    expectAnswer(false, line(8), backend->get<Question::FlightMode>());
-    expectAnswer(true, line(9), backend->get<Question::PacketData>());
-    expectAnswer(false, line(10), backend->get<Question::MobileData>());
-    expectAnswer(true, line(11), backend->get<Question::DataRoaming>());
-    expectAnswer(FontSize::Huge, line(12), backend->get<Question::FontSize>());
+    describe("[network]\nwifi_connection = 'association'\n[settings]\nfont_size = 'huge'\n");
+    expectAnswer(WifiConnection::Association, line(3), network.wifiConnection());
+    expectAnswer(FontSize::Huge, line(5), backend->get<Question::FontSize>());
     describe("[settings]\nfont_size = 7\n"); // beyond those that have names
     expectAnswer(static_cast<FontSize>(7), line(3), backend->get<Question::FontSize>());
 }
@@ -141,17 +131,8 @@ TEST_F(SimulatorNetworkTest, ProblemOfTheFileIsTheReason)
     expectMissing(problem, backend->now());
 }
 
-TEST_F(SimulatorNetworkTest, VolumeIsAnsweredWholeOrNotAtAll)
+TEST_F(SimulatorNetworkTest, VolumeIsWholeOrNotAvailable)
 {
-    describe("[storage]\nblock_size = 4096\nfragment_size = 512\nblocks = 6442450944\n"
-             "available_blocks = 9223372036854775807\n");
-    const auto answer = backend->internalStorage();
-    ASSERT_TRUE(answer) << answer.error().reason;
-    EXPECT_EQ(4096U, answer.value().value.blockSize);
-    EXPECT_EQ(512U, answer.value().value.fragmentSize);
-    EXPECT_EQ(6442450944U, answer.value().value.blocks); // 3 TiB
-    EXPECT_EQ(9223372036854775807U, answer.value().value.availableBlocks);
-    EXPECT_EQ(line(2), answer.value().source);
     const std::string keys[] = {"block_size", "fragment_size", "blocks", "available_blocks"};
     for (const std::string& missing : keys) {
         std::string text = "[storage]\n";

@@ -31,12 +31,6 @@ protected:
     Telephony& telephony = backend->telephony();
 };
 
-TEST_F(SimulatorTelephonyTest, SlotsComeInOrderUnderTheirNames)
-{
-    describe("[[slot]]\ncp_name = 'b'\n[[slot]]\n[[slot]]\ncp_name = 'a'\n");
-    expectAnswer(std::vector<port::SlotName>{"b", "cp1", "a"}, path, telephony.slots());
-}
-
 TEST_F(SimulatorTelephonyTest, FileWithoutSlotsIsADeviceWithoutAModem)
 {
     for (const char* const facts : {"", "[device]\ntelephony = true\n", "slot = []\n"}) {
@@ -52,27 +46,6 @@ TEST_F(SimulatorTelephonyTest, DeviceMayHaveNoTelephony)
     expectError(Kind::NotSupported, reason, telephony.slots());
     expectError(Kind::NotSupported, reason, telephony.subscriptions());
     expectErrors(Kind::NotSupported, "cp0", reason);
-}
-
-TEST_F(SimulatorTelephonyTest, EveryKeyOfASlotIsAnsweredWithItsLine)
-{
-    describe("[[slot]]\nsim = 'available'\nmcc = '450'\nmnc = '05'\nmsin = '0123456789'\n"
-             "number = '+15550100'\nimei = '490154203237518'\nservice = 'in_service'\n"
-             "roaming = true\nsms = false\ncard_changed = true\n");
-    const auto card = telephony.card("cp0");
-    EXPECT_EQ(CardStatus::Ready, valueOf(card).status);
-    EXPECT_TRUE(valueOf(card).changed);
-    EXPECT_EQ(line(3), card.value().source);
-    const auto imsi = telephony.imsi("cp0");
-    EXPECT_EQ("450", valueOf(imsi).mcc);
-    EXPECT_EQ("05", valueOf(imsi).mnc);
-    EXPECT_EQ("0123456789", valueOf(imsi).msin);
-    EXPECT_EQ(line(4), imsi.value().source);
-    expectAnswer(std::optional<std::string>("+15550100"), line(7), telephony.number("cp0"));
-    expectAnswer("490154203237518", line(8), telephony.imei("cp0"));
-    expectAnswer(ServiceState::InService, line(9), telephony.service("cp0"));
-    expectAnswer(true, line(10), telephony.roaming("cp0"));
-    expectAnswer(false, line(11), telephony.smsReady("cp0"));
 }
 
 TEST_F(SimulatorTelephonyTest, AbsentKeysOfASlotAreNotAvailable)
@@ -147,8 +120,7 @@ TEST_F(SimulatorTelephonyTest, EveryStateOfACardHasItsStatusAndItsReason)
     const char* const off = "the SIM card is switched off";
     const char* const notYet = "the SIM card is not ready yet";
     const struct {
-        const char* key;
-        const char* value;
+        const char *key, *value;
         CardStatus status;
         const char* reason;
     } rows[] = {
@@ -194,8 +166,9 @@ TEST_F(SimulatorTelephonyTest, EveryServiceHasItsState)
     for (const auto& [service, state] : {std::pair("in_service", ServiceState::InService),
                                          {"out_of_service", ServiceState::OutOfService},
                                          {"emergency_only", ServiceState::EmergencyOnly}}) {
-        describe("[[slot]]\nservice = '" + std::string(service) + "'\n");
+        describe("[[slot]]\nservice = '" + std::string(service) + "'\nsms = false\n");
         expectAnswer(state, line(3), telephony.service("cp0"));
+        expectAnswer(false, line(4), telephony.smsReady("cp0"));
     }
 }
 

@@ -226,16 +226,14 @@ TEST_F(TapiHandleTest, EveryErrorHasItsCode)
 
 TEST_F(TapiHandleTest, ImsiComesInItsParts)
 {
-    telephony.imsiAnswer = answered(port::Imsi{"310", "260", "123456789"});
-    ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
-    EXPECT_STREQ("310", imsi.szMcc);
-    EXPECT_STREQ("260", imsi.szMnc);
-    EXPECT_STREQ("123456789", imsi.szMsin);
-    telephony.imsiAnswer = answered(port::Imsi{"001", "01", "0123456789"});
-    ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
-    EXPECT_STREQ("001", imsi.szMcc);
-    EXPECT_STREQ("01", imsi.szMnc);
-    EXPECT_STREQ("0123456789", imsi.szMsin);
+    for (const port::Imsi& whole :
+         {port::Imsi{"310", "260", "123456789"}, port::Imsi{"001", "01", "0123456789"}}) {
+        telephony.imsiAnswer = answered(whole);
+        ASSERT_EQ(0, tel_get_sim_imsi(handle, &imsi));
+        EXPECT_EQ(whole.mcc, imsi.szMcc);
+        EXPECT_EQ(whole.mnc, imsi.szMnc);
+        EXPECT_EQ(whole.msin, imsi.szMsin);
+    }
     EXPECT_EQ("test", lastOrigin(Question::SimIdentity).source);
 }
 
