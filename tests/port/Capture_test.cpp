@@ -55,9 +55,9 @@ std::map<std::string, std::string> valuesOf(const std::string& text)
 
 class CaptureTest : public DeviceFileTest {
 protected:
-    static std::string captured(FakeBackend& fake, bool reveal = false)
+    static std::string captured(FakeBackend& fake)
     {
-        const std::string text = capture(fake, {reveal, {}});
+        const std::string text = capture(fake, {});
         valuesOf(text);
         return text;
     }
