@@ -18,19 +18,16 @@
 #include <sys/socket.h>
 
 #include "devicefile/Descriptor.h"
+#include "support/Answer.h"
 #include "support/Pauses.h"
 #include "support/ScriptedModems.h"
 #include "support/ScriptedService.h"
 
 using port::CellularState;
-using port::Error;
 using port::LinkState;
-using port::Result;
-using port::Sourced;
 using port::WifiConnection;
 using port::linux_backend::Bus;
 using port::linux_backend::LinuxNetwork;
-using testing::AllOf;
 using testing::HasSubstr;
 using testing::StartsWith;
 
@@ -40,6 +37,7 @@ const std::string NM = "org.freedesktop.NetworkManager";
 const std::string NM_PATH = "/org/freedesktop/NetworkManager";
 const std::string NM_DEVICE = NM + ".Device";
 const std::string NM_CONNECTION = NM + ".Settings.Connection";
+const std::string ACTIVE = NM_PATH + "/ActiveConnection/1";
 const std::string MM = "org.freedesktop.ModemManager1";
 const std::string MM_MODEM = MM + ".Modem";
 const std::string MODEM_PATH = "/org/freedesktop/ModemManager1/Modem/";
@@ -51,6 +49,12 @@ std::string object(const std::string& path, const std::string& interface,
     return "@o '" + path + "': {'" + interface + "': {" + properties + "}}";
 }
 
+struct Device {
+    unsigned type;
+    unsigned state;
+    const char* interface = "";
+};
+
 // The state that NetworkManager is made to show.
 struct Networks {
     bool networking = true;
@@ -58,10 +62,9 @@ struct Networks {
     bool wifiHardwareOn = true;
     bool cellularOn = true;
     unsigned radioFlags = 3;
-    std::vector<std::pair<unsigned, unsigned>> devices; // type and state
-    std::vector<std::string> interfaces;                // of these
-    std::vector<std::string> connections;               // "connection" and further settings
-    int active = -1;                                    // one of the connections
+    std::vector<Device> devices;
+    std::vector<std::string> connections; // "connection" and further settings
+    int active = -1;                      // one of the connections
 };
 
 constexpr unsigned WIFI = 2;
@@ -96,17 +99,15 @@ std::string managerObject(const Networks& networks)
 std::string objectsOf(const Networks& networks)
 {
     std::vector<std::string> objects = {managerObject(networks)};
-    for (std::size_t i = 0; i < networks.devices.size(); ++i) {
-        const auto& [type, state] = networks.devices[i];
-        std::string properties = number("DeviceType", type) + ", " + number("State", state);
-        if (i < networks.interfaces.size())
-            properties += ", 'Interface': <'" + networks.interfaces[i] + "'>";
-        objects.push_back(object(NM_PATH + "/Devices/" + std::to_string(i), NM_DEVICE, properties));
-    }
+    for (const auto& [type, state, interface] : networks.devices)
+        objects.push_back(object(NM_PATH + "/Devices/" + std::to_string(objects.size() - 1),
+                                 NM_DEVICE,
+                                 number("DeviceType", type) + ", " + number("State", state) +
+                                     ", 'Interface': <'" + interface + "'>"));
     for (std::size_t i = 0; i < networks.connections.size(); ++i)
         objects.push_back(object(connectionPath(i), NM_CONNECTION, "'Unsaved': <false>"));
     if (networks.active >= 0)
-        objects.push_back(object(NM_PATH + "/ActiveConnection/1", NM + ".Connection.Active",
+        objects.push_back(object(ACTIVE, NM + ".Connection.Active",
                                  "'Type': <'gsm'>, 'Connection': <@o '" +
                                      connectionPath(static_cast<std::size_t>(networks.active)) +
                                      "'>, " + number("State", 2)));
@@ -114,23 +115,9 @@ std::string objectsOf(const Networks& networks)
 }
 
 template <typename T>
-std::string show(const Result<Sourced<T>>& answer)
-{
-    if constexpr (std::is_same_v<T, std::string>) {
-        if (answer)
-            return answer.value().value + " <" + answer.value().source + ">";
-    } else if (answer) {
-        return std::to_string(static_cast<int>(answer.value().value)) + " <" +
-               answer.value().source + ">";
-    }
-    return (answer.error().kind == Error::Kind::NotSupported ? "not supported: " : "error: ") +
-           answer.error().reason;
-}
-
-template <typename T>
 std::string shown(T value, const std::string& source)
 {
-    return show(Result<Sourced<T>>(Sourced<T>{value, source}));
+    return std::to_string(static_cast<int>(value)) + " <" + source + ">";
 }
 
 // The sources of what a modem and an adapter tell.
@@ -167,7 +154,7 @@ protected:
             networkManager->emit(connectionPath(i), NM_CONNECTION, "Updated", "()");
         }
     }
-    void serveDevices(const std::vector<std::pair<unsigned, unsigned>>& devices)
+    void serveDevices(const std::vector<Device>& devices)
     {
         networks.devices = devices;
         serve();
@@ -195,6 +182,18 @@ protected:
             objects.push_back(
                 object("/org/bluez/hci" + std::to_string(i), "org.bluez.Adapter1", adapters[i]));
         serve(bluez, "org.bluez", treeOf(objects));
+    }
+
+    // A link that is on, with a file by which its kind is known; its folder.
+    std::string writeLink(const std::string& name, const std::string& file,
+                          const std::string& state)
+    {
+        const std::string folder = "/sys/class/net/" + name;
+        root.write(folder + file, "DEVTYPE=bluetooth\nINTERFACE=" + name + "\n");
+        root.write(folder + "/flags", "0x1003\n");
+        root.write(folder + "/carrier", "1\n");
+        root.write(folder + "/operstate", state + "\n");
+        return folder;
     }
 
     // The kernel's switch of a radio; 1 has it off.
@@ -239,11 +238,7 @@ TEST_F(NetworkTest, WifiFollowsItsDevice)
         EXPECT_EQ(shown(row.link, NM), show(network.wifi())) << row.device;
         EXPECT_EQ(shown(row.connection, NM), show(network.wifiConnection())) << row.device;
     }
-}
-
-TEST_F(NetworkTest, WifiDeviceThatIsFurthestCounts)
-{
-    serveDevices({{WIFI, 30}, {WIFI, 100}, {WIFI, 10}});
+    serveDevices({{WIFI, 30}, {WIFI, 100}, {WIFI, 10}}); // the one that is furthest counts
     EXPECT_EQ(shown(LinkState::Connected, NM), show(network.wifi()));
     EXPECT_EQ(shown(WifiConnection::Connected, NM), show(network.wifiConnection()));
 }
@@ -265,9 +260,9 @@ TEST_F(NetworkTest, MachineWithoutWifiHasNone)
 {
     networks.radioFlags = 2;
     serveDevices({{1, 100}, {MODEM, 100}});
-    EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device", show(network.wifi()));
-    EXPECT_EQ("not supported: NetworkManager knows no Wi-Fi device",
-              show(network.wifiConnection()));
+    const char* const none = "not supported: NetworkManager knows no Wi-Fi device";
+    EXPECT_EQ(none, show(network.wifi()));
+    EXPECT_EQ(none, show(network.wifiConnection()));
     networks.radioFlags = 1; // there is a radio, and its device has gone
     serve();
     EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi()));
@@ -279,11 +274,7 @@ TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
     EXPECT_EQ("not supported: NetworkManager leaves the Wi-Fi device to others; "
               "no Wi-Fi interface in /sys/class/net",
               show(network.wifi()));
-    const std::string wlan = "/sys/class/net/wlan0";
-    root.write(wlan + "/phy80211/name", "phy0\n");
-    root.write(wlan + "/flags", "0x1003\n");
-    root.write(wlan + "/carrier", "1\n");
-    root.write(wlan + "/operstate", "up\n");
+    const std::string wlan = writeLink("wlan0", "/phy80211/name", "up");
     EXPECT_EQ(shown(LinkState::Connected, wlan), show(network.wifi()));
     EXPECT_EQ(shown(WifiConnection::Connected, wlan), show(network.wifiConnection()));
 }
@@ -329,12 +320,9 @@ TEST_F(NetworkTest, MachineWithoutBluetoothHasNone)
 TEST_F(NetworkTest, KernelTellsOfABluetoothConnectionWithoutNetworkManager)
 {
     serveAdapters({"'Powered': <true>"});
-    root.write("/sys/class/net/bnep0/uevent", "DEVTYPE=bluetooth\nINTERFACE=bnep0\n");
-    root.write("/sys/class/net/bnep0/flags", "0x1003\n");
-    root.write("/sys/class/net/bnep0/carrier", "1\n");
-    root.write("/sys/class/net/bnep0/operstate", "down\n");
+    const std::string bnep = writeLink("bnep0", "/uevent", "down");
     EXPECT_EQ(shown(LinkState::Disconnected, HCI_0), show(network.bluetooth()));
-    root.write("/sys/class/net/bnep0/operstate", "up\n");
+    root.write(bnep + "/operstate", "up\n");
     EXPECT_EQ(shown(LinkState::Connected, HCI_0), show(network.bluetooth()));
 }
 
@@ -435,9 +423,7 @@ TEST_F(NetworkTest, EthernetIsConnectedByItsCable)
                 {100, false, LinkState::Deactivated}};
     for (const auto& row : rows) {
         networks.networking = row.networking;
-        networks.devices = {{1, 10}, {1, row.device}, {WIFI, 100}};
-        networks.interfaces = {"eth0", "eth1", "wlan0"};
-        serve();
+        serveDevices({{1, 10, "eth0"}, {1, row.device, "eth1"}, {WIFI, 100, "wlan0"}});
         EXPECT_EQ(shown(row.state, "org.freedesktop.NetworkManager eth1"), show(network.ethernet()))
             << row.device;
         if (row.networking) {
@@ -526,18 +512,6 @@ TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
     EXPECT_EQ(ON, show(network.dataRoaming())); // the one that connects itself first
 }
 
-TEST_F(NetworkTest, MachineWithoutAModemHasNoCellularSettings)
-{
-    networks.radioFlags = 1;
-    networks.connections = {"'connection': {'type': <'gsm'>}"};
-    serve();
-    for (const auto& answer : {network.packetData(), network.mobileData(), network.dataRoaming()})
-        EXPECT_EQ("not supported: NetworkManager knows no modem", show(answer));
-    networkManager.reset();
-    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus",
-              show(network.packetData()));
-}
-
 TEST_F(NetworkTest, CellularFollowsTheModem)
 {
     serveDevices({{MODEM, 30}});
@@ -563,38 +537,24 @@ TEST_F(NetworkTest, CellularFollowsTheModem)
         serveModems({modem});
         EXPECT_EQ(shown(state, MODEM_0), show(network.cellular())) << modem;
     }
+    serveModems({"'State': <'broken'>", "'State': <3>",
+                 "'State': <8>|'RegistrationState': <uint32 5>", "'State': <7>"});
+    EXPECT_EQ(shown(State::Available, MODEM_2), show(network.cellular())); // is furthest
+    networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
+    serve();
+    const char* const cdma = "'State': <8>}, 'org.freedesktop.ModemManager1.Modem.ModemCdma': {"
+                             "'Cdma1xRegistrationState': <uint32 ";
+    for (const auto& [registrations, state] : // of the two networks, either of which may be abroad
+         {std::pair("2>, 'EvdoRegistrationState': <uint32 2>", State::Available),
+          {"3>, 'EvdoRegistrationState': <uint32 2>", State::RoamingOff},
+          {"2>, 'EvdoRegistrationState': <uint32 3>", State::RoamingOff}}) {
+        serveModems({std::string(cdma) + registrations});
+        EXPECT_EQ(shown(state, MODEM_0), show(network.cellular())) << registrations;
+    }
+    networks.connections = {};
     serveDevices({{MODEM, 100}}); // up
     serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
     EXPECT_EQ(shown(State::Connected, MODEM_0), show(network.cellular()));
-}
-
-TEST_F(NetworkTest, EitherNetworkOfACdmaModemMayBeAbroad)
-{
-    networks.devices = {{MODEM, 30}};
-    networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
-    serve();
-    const struct {
-        const char* registrations;
-        CellularState state;
-    } rows[] = {{"2>, 'EvdoRegistrationState': <uint32 2", CellularState::Available},
-                {"3>, 'EvdoRegistrationState': <uint32 2", CellularState::RoamingOff},
-                {"2>, 'EvdoRegistrationState': <uint32 3", CellularState::RoamingOff}};
-    for (const auto& row : rows) {
-        const std::string modem = MM_MODEM;
-        serve(modemManager, MM,
-              treeOf({object(MODEM_PATH + "0", modem,
-                             "'State': <8>}, '" + modem +
-                                 ".ModemCdma': {'Cdma1xRegistrationState': <uint32 " +
-                                 row.registrations + ">")}));
-        EXPECT_EQ(shown(row.state, MODEM_0), show(network.cellular())) << row.registrations;
-    }
-}
-
-TEST_F(NetworkTest, ModemThatIsFurthestCounts)
-{
-    serveModems({"'State': <'broken'>", "'State': <3>",
-                 "'State': <8>|'RegistrationState': <uint32 5>", "'State': <7>"});
-    EXPECT_EQ(shown(CellularState::Available, MODEM_2), show(network.cellular()));
 }
 
 TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
@@ -608,6 +568,15 @@ TEST_F(NetworkTest, MachineWithoutAModemHasNoCellular)
     EXPECT_EQ("error: " + reason, show(network.cellular()));
     serveModems({});
     EXPECT_EQ("not supported: ModemManager knows no modem", show(network.cellular()));
+
+    networks.radioFlags = 1;
+    networks.connections = {"'connection': {'type': <'gsm'>}"};
+    serveDevices({});
+    for (const auto& answer : {network.packetData(), network.mobileData(), network.dataRoaming()})
+        EXPECT_EQ("not supported: NetworkManager knows no modem", show(answer));
+    networkManager.reset();
+    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus",
+              show(network.packetData()));
 }
 
 TEST_F(NetworkTest, MalformedPropertiesAreTold)
@@ -656,34 +625,28 @@ TEST_F(NetworkTest, ServiceThatKeepsSilentIsNotWaitedForLong)
               2000);
 }
 
-// Every question, and how long it took.
-std::vector<int> timesOfAllQuestions(LinuxNetwork& network)
-{
-    return {
-        millisecondsOf([&] { EXPECT_FALSE(network.cellular()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.wifi()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.wifiConnection()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.bluetooth()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.flightMode()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.packetData()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.mobileData()); }),
-        millisecondsOf([&] { EXPECT_FALSE(network.dataRoaming()); }),
-    };
-}
-
-TEST_F(NetworkTest, AbsentServicesAreToldAtOnce)
-{
-    EXPECT_THAT(timesOfAllQuestions(network), testing::Each(testing::Lt(500)));
-}
-
 TEST_F(NetworkTest, SilentServicesAreNotWaitedForLong)
 {
+    // Every question, and how long it took.
+    const auto timesOfAll = [this] {
+        return std::vector<int>{
+            millisecondsOf([&] { EXPECT_FALSE(network.cellular()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.wifi()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.wifiConnection()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.bluetooth()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.flightMode()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.packetData()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.mobileData()); }),
+            millisecondsOf([&] { EXPECT_FALSE(network.dataRoaming()); }),
+        };
+    };
+    EXPECT_THAT(timesOfAll(), testing::Each(testing::Lt(500))); // while they are absent
     serve();
     serveModems({});
     serveAdapters({});
     for (const auto* const service : {&networkManager, &modemManager, &bluez})
         (*service)->whenAsked([] {}, "GetManagedObjects");
-    const std::vector<int> times = timesOfAllQuestions(network);
+    const std::vector<int> times = timesOfAll();
     EXPECT_THAT(times, testing::Each(testing::Lt(2000)));
     // Each of them was waited for once.
     EXPECT_LT(std::accumulate(times.begin(), times.end(), 0), 4000);
@@ -704,17 +667,15 @@ public:
         std::unique_lock<std::mutex> lock(mutex_);
         return changed_.wait_for(lock, std::chrono::seconds(10), [&] { return count_ >= count; });
     }
-    // The number of calls so far.
-    int count()
+    int count() const
     {
-        const std::lock_guard<std::mutex> lock(mutex_);
         return count_;
     }
 
 private:
     std::mutex mutex_;
     std::condition_variable changed_;
-    int count_ = 0;
+    std::atomic<int> count_{0};
 };
 
 class WatchTest : public NetworkTest {
@@ -760,7 +721,7 @@ TEST_F(WatchTest, EveryKindOfChangeIsTold)
     } rows[] = {
         {*networkManager, NM_PATH, NM},
         {*networkManager, NM_PATH + "/Devices/0", NM_DEVICE},
-        {*networkManager, NM_PATH + "/ActiveConnection/1", NM + ".Connection.Active"},
+        {*networkManager, ACTIVE, NM + ".Connection.Active"},
         {*modemManager, MODEM_PATH + "0", MM_MODEM},
         {*modemManager, MODEM_PATH + "0", MM_MODEM + ".Modem3gpp"},
         {*bluez, "/org/bluez/hci0", "org.bluez.Adapter1"},
@@ -809,9 +770,8 @@ TEST_F(WatchTest, FailureThatDoesNotLastIsTold)
     });
     ASSERT_TRUE(calls.waitFor(1));
     const std::string device = NM_PATH + "/Devices/0";
-    const std::string interface = NM_DEVICE;
-    networkManager->emit(device, interface, "StateChanged", "(uint32 120, uint32 50, uint32 7)");
-    tellChanged(*networkManager, device, interface, "'State': <uint32 30>");
+    networkManager->emit(device, NM_DEVICE, "StateChanged", "(uint32 120, uint32 50, uint32 7)");
+    tellChanged(*networkManager, device, NM_DEVICE, "'State': <uint32 30>");
     EXPECT_TRUE(calls.waitFor(3));
     watch.reset();
     EXPECT_THAT(told, testing::ElementsAre(WifiConnection::Association, WifiConnection::Failure,
@@ -830,10 +790,7 @@ bool switchOn(const char* interface)
 
 TEST_F(WatchTest, KernelTellsOfALinkWhileNetworkManagerIsGone)
 {
-    const std::string wlan = "/sys/class/net/wlan0";
-    root.write(wlan + "/wireless/status", "");
-    root.write(wlan + "/flags", "0x1003\n");
-    root.write(wlan + "/carrier", "1\n");
+    const std::string wlan = writeLink("wlan0", "/wireless/status", "down");
     std::atomic<LinkState> told{LinkState::Deactivated};
     bool hasNetwork = false;
     bool isToldOf = false;
@@ -858,30 +815,19 @@ TEST_F(WatchTest, KernelTellsOfALinkWhileNetworkManagerIsGone)
     watch.reset();
 }
 
-TEST_F(WatchTest, ServiceThatGoesAndComesIsTold)
-{
-    serve();
-    begin();
-    EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
-    EXPECT_TRUE(isTold([this] { serve(); }));
-    EXPECT_TRUE(isTold([this] { tellChanged(*networkManager, NM_PATH, NM); }));
-}
-
-TEST_F(WatchTest, BusThatGoesAndComesIsTold)
-{
-    serve();
-    begin();
-    networkManager.reset();
-    EXPECT_TRUE(isTold([this] { daemon.kill(); }));
-    EXPECT_TRUE(isTold([this] { daemon.start(); }));
-    EXPECT_TRUE(isTold([this] { serve(); }));
-}
-
-TEST_F(WatchTest, BusThatIsNotThereYetIsFound)
+TEST_F(WatchTest, BusOrServiceThatGoesAndComesIsTold)
 {
     daemon.kill();
     begin(); // what the kernel knows is told without a bus
     EXPECT_TRUE(isTold([this] { daemon.start(); }));
+    EXPECT_TRUE(isTold([this] { serve(); }));
+    EXPECT_TRUE(isTold([this] { tellChanged(*networkManager, NM_PATH, NM); }));
+    EXPECT_TRUE(isTold([this] { networkManager.reset(); }));
+    EXPECT_TRUE(isTold([this] { serve(); }));
+    networkManager.reset();
+    EXPECT_TRUE(isTold([this] { daemon.kill(); }));
+    EXPECT_TRUE(isTold([this] { daemon.start(); }));
+    EXPECT_TRUE(isTold([this] { serve(); }));
 }
 
 TEST_F(WatchTest, BurstIsToldInFewCalls)

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The real host name and locale services, started by a private bus. They see an /etc of the test's
-// own and a host name of their own, so nothing reaches the machine.
+// The real host name and locale services, started by a private bus, with an /etc and a host name of
+// their own.
 #include <cstdlib>
 
 #include <gmock/gmock.h>
@@ -11,18 +11,15 @@
 #include "linux/Hostname1.h"
 #include "linux/Locale1.h"
 #include "linux/Settings.h"
+#include "support/Answer.h"
 #include "support/Child.h"
 #include "support/PrivateBus.h"
 #include "support/Together.h"
 
-using port::Fact;
-using port::Result;
 using port::linux_backend::Bus;
-using port::linux_backend::BusObject;
 using port::linux_backend::HOSTNAME1;
 using port::linux_backend::LinuxSettings;
 using port::linux_backend::LOCALE1;
-using testing::StartsWith;
 
 namespace {
 
@@ -67,11 +64,6 @@ protected:
     {
         return show(settings.language());
     }
-    static std::string show(const Result<Fact>& answer)
-    {
-        return answer ? answer.value().value + " <" + answer.value().source + ">"
-                      : "error: " + answer.error().reason;
-    }
 
     const TemporaryTree etc;
     PrivateBus bus;
@@ -86,11 +78,6 @@ TEST_F(SystemdServicesTest, PrettyNameComesBeforeTheStaticOne)
     EXPECT_EQ("Grandma's \xe2\x98\x8e phone <hostname1 PrettyHostname>", deviceName());
     etc.remove("/machine-info");
     EXPECT_EQ("static-name <hostname1 StaticHostname>", deviceName());
-}
-
-TEST_F(SystemdServicesTest, NameSetThroughTheServiceIsSeen)
-{
-    deviceName();
     BusClient(bus.address())
         .mustCall(HOSTNAME1.name, HOSTNAME1.path, HOSTNAME1.interface, "SetPrettyHostname",
                   g_variant_new("(sb)", "Pocket", FALSE));
@@ -101,19 +88,13 @@ TEST_F(SystemdServicesTest, LanguageOfTheMachineIsSeen)
 {
     EXPECT_EQ("error: locale1: Locale sets no language; LC_ALL, LC_MESSAGES and LANG are not set",
               language());
-    setLocale("LANG=ko_KR.UTF-8\n");
-    EXPECT_EQ("ko_KR.UTF-8 <locale1 LANG>", language());
-    setLocale("LANG=ko_KR.UTF-8\nLC_MESSAGES=de_DE.UTF-8\n");
-    EXPECT_EQ("de_DE.UTF-8 <locale1 LC_MESSAGES>", language());
-}
-
-TEST_F(SystemdServicesTest, MachinesLanguageComesBeforeTheProcesss)
-{
     setenv("LANG", "fr_FR.UTF-8", 1);
     EXPECT_EQ("fr_FR.UTF-8 <environment LANG>", language());
     setLocale("LANG=ko_KR.UTF-8\n");
     EXPECT_EQ("ko_KR.UTF-8 <locale1 LANG>", language());
     unsetenv("LANG");
+    setLocale("LANG=ko_KR.UTF-8\nLC_MESSAGES=de_DE.UTF-8\n");
+    EXPECT_EQ("de_DE.UTF-8 <locale1 LC_MESSAGES>", language());
 }
 
 TEST_F(SystemdServicesTest, BackendFindsBothServices)

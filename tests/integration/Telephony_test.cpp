@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Telephony from the real ModemManager, with simulated modems.
 #include <atomic>
-#include <cstdlib>
 #include <functional>
 #include <thread>
 #include <tuple>
@@ -16,21 +15,13 @@ using port::CardStatus;
 using port::Error;
 using port::ServiceState;
 using port::linux_backend::Bus;
-using port::linux_backend::LinuxTelephony;
 using testing::ElementsAre;
-using testing::IsEmpty;
-using testing::StartsWith;
 
 namespace {
 
 using TelephonyTest = ModemsOnBusTest;
 
-TEST_F(TelephonyTest, NoModemIsNoSlot)
-{
-    EXPECT_THAT(valueOf(telephony.slots()), IsEmpty());
-    expectError(Error::Kind::NotAvailable,
-                "org.freedesktop.ModemManager1 knows no modem /virtual/home", telephony.imei(HOME));
-}
+const char NO_MODEM[] = "org.freedesktop.ModemManager1 knows no modem /virtual/home";
 
 TEST_F(TelephonyTest, ModemAtHomeTellsEverything)
 {
@@ -42,9 +33,7 @@ TEST_F(TelephonyTest, ModemAtHomeTellsEverything)
     EXPECT_EQ("org.freedesktop.ModemManager1", telephony.slots().value().source);
     EXPECT_EQ(CardStatus::Ready, valueOf(telephony.card(HOME)).status);
     const auto imsi = telephony.imsi(HOME);
-    EXPECT_EQ("262", valueOf(imsi).mcc);
-    EXPECT_EQ("01", valueOf(imsi).mnc);
-    EXPECT_EQ("1234567890", valueOf(imsi).msin);
+    EXPECT_EQ("262011234567890", valueOf(imsi).mcc + valueOf(imsi).mnc + valueOf(imsi).msin);
     EXPECT_EQ("org.freedesktop.ModemManager1 /virtual/home", imsi.value().source);
     EXPECT_EQ("+4915112345678", valueOf(telephony.number(HOME)));
     EXPECT_EQ("490154203237518", valueOf(telephony.imei(HOME)));
@@ -121,25 +110,6 @@ TEST_F(TelephonyTest, CardThatCannotBeReadIsNoSim)
     }
 }
 
-TEST_F(TelephonyTest, TwoModemsAreTwoSlotsInTheOrderOfTheirDevices)
-{
-    AtModem::State second;
-    second.imsi = "310260987654321";
-    second.mncLength = 3;
-    second.number = "";
-    modems->plugIn("b", second);
-    modems->add("a");
-    EXPECT_TRUE(modems->waitUntil([&] { return valueOf(telephony.slots()).size() == 2; }));
-    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre("/virtual/a", "/virtual/b"));
-    EXPECT_TRUE(modems->waitUntil(
-        [&] { return valueOf(telephony.card("/virtual/b")).status == CardStatus::Ready; }));
-    EXPECT_EQ("001", valueOf(telephony.imsi("/virtual/a")).mcc);
-    const port::Imsi imsi = valueOf(telephony.imsi("/virtual/b"));
-    EXPECT_EQ("310 260 987654321", imsi.mcc + " " + imsi.mnc + " " + imsi.msin);
-    EXPECT_EQ(std::nullopt, valueOf(telephony.number("/virtual/b")));
-    EXPECT_EQ("001", valueOf(telephony.imsi("/virtual/a")).mcc);
-}
-
 // None may be answered with anything but an answer or a reason meanwhile.
 void whileAsked(port::Telephony& telephony, const std::function<void()>& act)
 {
@@ -169,9 +139,7 @@ TEST_F(TelephonyTest, ModemMayBeRemovedWhileAsked)
     });
     for (const auto& question : telephonyQuestions())
         if (question.aboutASlot) {
-            EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
-                      question.ask(telephony, HOME)->reason)
-                << question.name;
+            EXPECT_EQ(NO_MODEM, question.ask(telephony, HOME)->reason) << question.name;
         }
 }
 
@@ -195,8 +163,7 @@ TEST_F(TelephonyTest, RestartedDaemonGivesItsOldObjectsToOtherCards)
     AtModem::State other;
     other.imsi = "262011234567890";
     modems->add("other", other);
-    EXPECT_EQ("org.freedesktop.ModemManager1 knows no modem /virtual/home",
-              telephony.imsi(HOME).error().reason);
+    expectError(Error::Kind::NotAvailable, NO_MODEM, telephony.imsi(HOME));
     EXPECT_EQ("262", valueOf(telephony.imsi("/virtual/other")).mcc);
     modems->add("home");
     EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
@@ -230,28 +197,6 @@ TEST_F(TelephonyTest, FrozenDaemonIsBoundedAndAnswersLater)
     for (int i = 0; i < 10 && !telephony.imsi(HOME); ++i)
         continue;
     EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
-}
-
-TEST_F(TelephonyTest, DaemonIsFoundOnceItRuns)
-{
-    modems->kill();
-    EXPECT_FALSE(telephony.slots());
-    modems->start();
-    modems->add("home");
-    EXPECT_THAT(valueOf(telephony.slots()), ElementsAre(HOME));
-}
-
-TEST(TelephonyWithoutABusTest, EveryQuestionIsNotAvailableAtOnce)
-{
-    const TemporaryTree tree;
-    setenv("DBUS_SYSTEM_BUS_ADDRESS", ("unix:path=" + tree.path("/none")).c_str(), 1);
-    Bus bus;
-    LinuxTelephony telephony(bus);
-    EXPECT_LT(millisecondsOf([&] {
-                  expectErrors(telephony, Error::Kind::NotAvailable, StartsWith("no system bus: "));
-              }),
-              1000);
-    unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
 }
 
 } // namespace

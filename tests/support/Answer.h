@@ -4,6 +4,7 @@
 #define TESTS_SUPPORT_ANSWER_H
 
 #include <stdexcept>
+#include <string>
 #include <utility>
 
 #include <gmock/gmock.h>
@@ -24,6 +25,21 @@ template <typename T>
 T valueOf(const Answer<T>& answer)
 {
     return answer ? answer.value().value : throw std::runtime_error(answer.error().reason);
+}
+
+/// The value and where it is from, or why there is none.
+template <typename T>
+std::string show(const Answer<T>& answer)
+{
+    if (!answer)
+        return (answer.error().kind == port::Error::Kind::NotSupported ? "not supported: "
+                                                                       : "error: ") +
+               answer.error().reason;
+    const auto& [value, source] = answer.value();
+    if constexpr (std::is_same_v<T, std::string>)
+        return value + " <" + source + ">";
+    else
+        return std::to_string(static_cast<int>(value)) + " <" + source + ">";
 }
 
 /// Expects a value, and where it is from.
