@@ -22,8 +22,6 @@ const char SIM_PIN_REQUIRED[] = "+CME ERROR: 11";
 const char SIM_PUK_REQUIRED[] = "+CME ERROR: 12";
 const char INCORRECT_PASSWORD[] = "+CME ERROR: 16";
 
-const char* const DOMAINS[] = {"+CREG", "+CGREG", "+CEREG"};
-
 int listenAt(const std::string& port)
 {
     sockaddr_un address = {};
@@ -56,13 +54,10 @@ std::string swapped(std::string digits)
 // "\r\n" around each line of an answer.
 std::string framed(const std::string& answer)
 {
-    std::string text;
-    for (std::size_t begin = 0; begin <= answer.size();) {
-        const std::size_t end = std::min(answer.find('\n', begin), answer.size());
-        text += "\r\n" + answer.substr(begin, end - begin) + "\r\n";
-        begin = end + 1;
-    }
-    return text;
+    std::string text = "\r\n";
+    for (const char c : answer)
+        text += c == '\n' ? "\r\n\r\n" : std::string(1, c);
+    return text + "\r\n";
 }
 
 // The commands of a line, which semicolons part.
@@ -105,11 +100,11 @@ const AtModem::Row AtModem::ROWS[] = {
     // the card
     {"+CPIN?", nullptr,
      [](AtModem& modem, const auto&) {
-         if (modem.cardError().empty())
-             return information("+CPIN: READY");
-         if (!modem.state_.hasSim)
-             return modem.cardError();
-         return information(modem.state_.pinRetries > 0 ? "+CPIN: SIM PIN" : "+CPIN: SIM PUK");
+         const std::string error = modem.cardError();
+         return error == SIM_NOT_INSERTED   ? error
+                : error == SIM_PIN_REQUIRED ? information("+CPIN: SIM PIN")
+                : error == SIM_PUK_REQUIRED ? information("+CPIN: SIM PUK")
+                                            : information("+CPIN: READY");
      }},
     {"+CPIN=", nullptr,
      [](AtModem& modem, const auto& argument) -> std::string {
@@ -163,16 +158,7 @@ const AtModem::Row AtModem::ROWS[] = {
          return information("+CNUM: \"\",\"" + number + "\"," +
                             (number.front() == '+' ? "145" : "129"));
      }},
-    // the network
-    {"+CREG=?", "+CREG: (0-2)\nOK"},
-    {"+CGREG=?", "+CGREG: (0-2)\nOK"},
-    {"+CEREG=?", "+CEREG: (0-2)\nOK"},
-    {"+CREG?", nullptr, &AtModem::readRegistration<0>},
-    {"+CGREG?", nullptr, &AtModem::readRegistration<1>},
-    {"+CEREG?", nullptr, &AtModem::readRegistration<2>},
-    {"+CREG=", nullptr, &AtModem::reportRegistration<0>},
-    {"+CGREG=", nullptr, &AtModem::reportRegistration<1>},
-    {"+CEREG=", nullptr, &AtModem::reportRegistration<2>},
+    // the network, besides +CREG and its kind
     {"+COPS?", nullptr,
      [](AtModem& modem, const auto&) {
          return information(modem.isRegistered() ? "+COPS: 0,2,\"" + modem.state_.network + "\",7"
@@ -275,22 +261,30 @@ std::string AtModem::answer(const std::string& line)
     if (begin == std::string::npos)
         return "";
     std::string texts;
-    std::string last = OK;
     for (const std::string& command : commandsOf(line.substr(begin + 2))) {
         const std::string reply = answerTo(command);
-        const std::size_t split = reply.rfind('\n');
-        last = reply.substr(split == std::string::npos ? 0 : split + 1);
-        texts += split == std::string::npos ? "" : reply.substr(0, split + 1);
-        if (last != OK)
-            break;
+        const std::size_t last = reply.rfind('\n') + 1;
+        if (reply.substr(last) != OK)
+            return framed(texts + reply);
+        texts += reply.substr(0, last);
     }
-    return framed(texts + last);
+    return framed(texts + OK);
 }
 
 std::string AtModem::answerTo(const std::string& command)
 {
     if (command.empty())
         return OK;
+    for (auto& [domain, mode] : reports_) {
+        if (command == domain + "=?")
+            return information(domain + ": (0-2)");
+        if (command == domain + "?")
+            return information(registrationLine(domain, mode + ","));
+        if (command.rfind(domain + "=", 0) == 0) {
+            mode = command.substr(domain.size() + 1);
+            return OK;
+        }
+    }
     for (const Row& row : ROWS) {
         const std::string known = row.command;
         if (known.back() == '=' ? command.compare(0, known.size(), known) == 0 : command == known)
@@ -322,23 +316,7 @@ bool AtModem::isRegistered() const
 
 std::string AtModem::registrationLine(const std::string& command, const std::string& mode) const
 {
-    const auto asked = reports_.find(command);
-    const bool hasPlace = isRegistered() && asked != reports_.end() && asked->second == "2";
+    const bool hasPlace = isRegistered() && reports_.at(command) == "2";
     return command + ": " + mode + std::to_string(registration()) +
            (hasPlace ? ",\"1234\",\"001122BB\",7" : "");
-}
-
-template <int DOMAIN>
-std::string AtModem::readRegistration(AtModem& modem, const std::string&)
-{
-    const auto report = modem.reports_.find(DOMAINS[DOMAIN]);
-    const std::string mode = report != modem.reports_.end() ? report->second : "0";
-    return information(modem.registrationLine(DOMAINS[DOMAIN], mode + ","));
-}
-
-template <int DOMAIN>
-std::string AtModem::reportRegistration(AtModem& modem, const std::string& argument)
-{
-    modem.reports_[DOMAINS[DOMAIN]] = argument;
-    return OK;
 }

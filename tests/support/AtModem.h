@@ -56,10 +56,6 @@ private:
     int registration() const;
     bool isRegistered() const;
     std::string registrationLine(const std::string& command, const std::string& mode) const;
-    template <int DOMAIN>
-    static std::string readRegistration(AtModem& modem, const std::string&);
-    template <int DOMAIN>
-    static std::string reportRegistration(AtModem& modem, const std::string& argument);
 
     static const Row ROWS[];
 
@@ -68,7 +64,8 @@ private:
     const int stop_;
     std::mutex mutex_;
     State state_;
-    std::map<std::string, std::string> reports_; // "+CREG" and its kind, and how much they report
+    std::map<std::string, std::string> reports_ = { // how much each reports
+        {"+CREG", "0"}, {"+CGREG", "0"}, {"+CEREG", "0"}};
     std::vector<Caller> callers_;
     std::thread thread_;
 };
