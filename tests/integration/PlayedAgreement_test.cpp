@@ -31,7 +31,6 @@ using port::Sourced;
 using port::Telephony;
 using port::WifiConnection;
 using port::devicefile::Device;
-using port::devicefile::Section;
 using port::played::Facts;
 using port::played::SlotFacts;
 
@@ -176,126 +175,108 @@ const Question QUESTIONS[] = {
     {"PIN tries", true, report<&ModemReport::pinTries>},
 };
 
-// The property that a row looks at.
-struct Case {
+// What a row looks at.
+struct Case : Facts {
     const Device& device;
-    const Facts& facts;
     std::size_t index; // of the slot, when the question is of one
 
-    bool has(const char* section, const char* key) const
-    {
-        return device.section(section).find(key) != nullptr;
-    }
-    const Section& section() const
-    {
-        return device.slots[index];
-    }
     const SlotFacts& slot() const
     {
-        return facts.slots[index];
+        return slots[index];
+    }
+    bool slotSays(const char* key) const
+    {
+        return device.slots[index].find(key) != nullptr;
+    }
+    bool isRegistered(std::size_t at) const
+    {
+        return slots[at].isReady() &&
+               (slots[at].service == ServiceState::InService || connectedSlot() == at);
+    }
+    bool hasModem() const
+    {
+        return !slots.empty();
+    }
+    bool isServed() const
+    {
+        for (std::size_t i = 0; i < slots.size(); ++i)
+            if (isRegistered(i))
+                return true;
+        return false;
+    }
+    // Every modem with service is abroad and must not carry data there.
+    bool isKeptFromRoaming() const
+    {
+        for (std::size_t i = 0; i < slots.size(); ++i)
+            if (isRegistered(i) && !slots[i].isRoaming)
+                return false;
+        return isServed() && !dataRoaming.value_or(true);
+    }
+    // NetworkManager's switches and BlueZ's adapter for the radios that are there.
+    bool areRadiosOff() const
+    {
+        if (isBluetoothOn())
+            return false;
+        if (wifi.has_value() == hasModem())
+            return !isWifiOn() && !isCellularOn();
+        return wifi ? !isWifiOn() : !isCellularOn();
     }
 };
 
-bool isRegistered(const Facts& facts, std::size_t index)
-{
-    const SlotFacts& slot = facts.slots[index];
-    return slot.isReady() &&
-           (slot.service == ServiceState::InService || facts.connectedSlot() == index);
-}
-
-bool hasModem(const Case& now)
-{
-    return !now.facts.slots.empty();
-}
-
-bool isServed(const Facts& facts)
-{
-    for (std::size_t i = 0; i < facts.slots.size(); ++i)
-        if (isRegistered(facts, i))
-            return true;
-    return false;
-}
-
-// Every modem with service is abroad and must not carry data there.
-bool isKeptFromRoaming(const Facts& facts)
-{
-    bool atHome = false;
-    for (std::size_t i = 0; i < facts.slots.size(); ++i)
-        atHome = atHome || (isRegistered(facts, i) && !facts.slots[i].isRoaming);
-    return isServed(facts) && !atHome && !facts.dataRoaming.value_or(true);
-}
-
-// NetworkManager's switches and BlueZ's adapter for the radios that are there.
-bool areRadiosOff(const Facts& facts)
-{
-    const bool isWifiOff = !facts.isWifiOn();
-    const bool isCellularOff = !facts.isCellularOn();
-    if (facts.isBluetoothOn())
-        return false;
-    if (facts.wifi.has_value() == !facts.slots.empty())
-        return isWifiOff && isCellularOff;
-    return facts.wifi ? isWifiOff : isCellularOff;
-}
-
 bool contradictsItsSlots(const Case& now)
 {
-    const Facts& facts = now.facts;
-    if (!facts.cellular)
-        return hasModem(now);
-    switch (*facts.cellular) {
+    if (!now.cellular)
+        return now.hasModem();
+    switch (*now.cellular) {
     case CellularState::OutOfService:
-        return !hasModem(now) || isServed(facts) || areRadiosOff(facts);
+        return !now.hasModem() || now.isServed() || now.areRadiosOff();
     case CellularState::FlightMode:
-        return !hasModem(now) || !areRadiosOff(facts);
+        return !now.hasModem() || !now.areRadiosOff();
     case CellularState::RoamingOff:
-        return !isKeptFromRoaming(facts) || areRadiosOff(facts);
+        return !now.isKeptFromRoaming() || now.areRadiosOff();
     case CellularState::Available:
-        return !isServed(facts) || isKeptFromRoaming(facts) || areRadiosOff(facts);
+        return !now.isServed() || now.isKeptFromRoaming() || now.areRadiosOff();
     case CellularState::CallOnlyAvailable:
-        return !isServed(facts) || areRadiosOff(facts);
+        return !now.isServed() || now.areRadiosOff();
     default:
-        return !facts.connectedSlot();
+        return !now.connectedSlot();
     }
 }
 
 bool isPacketDataElsewhere(const Case& now)
 {
-    const auto on = now.facts.packetData;
-    if (!hasModem(now))
-        return on.has_value();
-    if (!on)
-        return true;
-    return *on ? !now.facts.isCellularOn() : now.facts.connectedSlot().has_value();
+    if (!now.hasModem() || !now.packetData)
+        return now.hasModem() || now.packetData;
+    return *now.packetData ? !now.isCellularOn() : now.connectedSlot().has_value();
 }
 
 bool differsFromItsWifi(const Case& now)
 {
-    const Facts& facts = now.facts;
-    if (!now.has("network", "wifi_connection"))
+    if (now.device.section("network").find("wifi_connection") == nullptr)
         return false;
-    if (!facts.wifi || !facts.wifiConnection)
+    if (!now.wifi || !now.wifiConnection)
         return true;
-    if (!facts.isWifiOn())
-        return facts.wifiConnection != WifiConnection::Disconnected;
-    return (facts.wifi == LinkState::Connected) !=
-           (facts.wifiConnection == WifiConnection::Connected);
+    const bool isConnected = now.wifiConnection == WifiConnection::Connected;
+    return now.isWifiOn() ? (now.wifi == LinkState::Connected) != isConnected
+                          : now.wifiConnection != WifiConnection::Disconnected;
 }
 
-bool carriesData(const Facts& facts)
+bool differsFromTheSlotInUse(const Case& now)
 {
-    return facts.connectedSlot() && !(facts.isWifiOn() && facts.wifi == LinkState::Connected);
+    const auto connected = now.connectedSlot();
+    const bool isCarried = connected && !(now.isWifiOn() && now.wifi == LinkState::Connected);
+    return now.dataSlot.value_or(-1) != (isCarried ? static_cast<int>(*connected) : -1);
 }
 
-// Whether some slot's service says something else than its card and the cellular network do.
+// Some slot's service says something else than its card and the cellular network do.
 bool differsInUse(const Case& now)
 {
-    const Facts& facts = now.facts;
-    const auto connected = facts.connectedSlot();
-    if (facts.cellular == CellularState::Connected &&
-        (!connected || static_cast<int>(*connected) != facts.dataSlot))
+    const auto connected = now.connectedSlot();
+    if (now.cellular == CellularState::Connected &&
+        (!connected || static_cast<int>(*connected) != now.dataSlot))
         return true;
-    for (std::size_t i = 0; i < facts.slots.size(); ++i)
-        if (isRegistered(facts, i) != (facts.slots[i].service == ServiceState::InService))
+    for (std::size_t i = 0; i < now.slots.size(); ++i)
+        if (now.isRegistered(i) != (now.slots[i].service == ServiceState::InService))
             return true;
     return false;
 }
@@ -307,8 +288,15 @@ bool hasNoCard(const Case& now)
 
 bool isPrivate(const Case& now)
 {
-    const auto denied = now.section().get<bool>("denied");
+    const auto denied = now.device.slots[now.index].get<bool>("denied");
     return denied && denied.value().value;
+}
+
+bool hasCardThatIsLess(const Case& now)
+{
+    const auto card = now.slot().card;
+    return !card || card == CardStatus::Removed || card == CardStatus::Crashed ||
+           (card >= CardStatus::SubsetLocked && card <= CardStatus::DeviceLocked);
 }
 
 // Where the two cannot agree.
@@ -320,90 +308,66 @@ struct Difference {
 
 const Difference DIFFERENCES[] = {
     {"device name", "without a pretty name a machine has its host name",
-     [](const Case& now) { return now.facts.deviceName.empty(); }},
+     [](auto& now) { return now.deviceName.empty(); }},
     {"model", "without hostname1's the firmware is asked",
-     [](const Case& now) { return now.facts.modelName.empty(); }},
-    {"data slot", "is known only while traffic goes over that modem",
-     [](const Case& now) {
-         const int slot = now.facts.dataSlot.value_or(-1);
-         return carriesData(now.facts) ? slot != static_cast<int>(*now.facts.connectedSlot())
-                                       : slot >= 0;
-     }},
+     [](auto& now) { return now.modelName.empty(); }},
+    {"data slot", "is known only while traffic goes over that modem", differsFromTheSlotInUse},
     {"cellular", "the file says of the network what its slots do not", contradictsItsSlots},
     {"wifi", "NetworkManager has no flight mode in which a radio is on",
-     [](const Case& now) {
-         return now.facts.isFlying() && now.facts.wifi && now.facts.wifi != LinkState::Deactivated;
-     }},
+     [](auto& now) { return now.isFlying() && now.wifi && now.wifi != LinkState::Deactivated; }},
     {"wifi connection", "NetworkManager has no flight mode in which a radio is on",
-     [](const Case& now) {
-         return now.facts.isFlying() && now.facts.wifi == LinkState::Connected;
-     }},
+     [](auto& now) { return now.isFlying() && now.wifi == LinkState::Connected; }},
     {"wifi connection", "the file says of the connection what Wi-Fi is not", differsFromItsWifi},
     {"flight mode", "is unknown in a file and never on a machine",
-     [](const Case& now) { return !now.facts.flightMode; }},
+     [](auto& now) { return !now.flightMode; }},
     {"flight mode", "no machine is in it while its adapter of Bluetooth is on",
-     [](const Case& now) { return now.facts.isFlying() && now.facts.isBluetoothOn(); }},
+     [](auto& now) { return now.isFlying() && now.isBluetoothOn(); }},
     {"flight mode", "is what it is when every radio that is there is off",
-     [](const Case& now) { return !now.facts.isFlying() && areRadiosOff(now.facts); }},
+     [](auto& now) { return !now.isFlying() && now.areRadiosOff(); }},
     {"packet data", "NetworkManager knows one setting, of a modem that is there and on",
      isPacketDataElsewhere},
     {"mobile data", "NetworkManager does not keep it apart from packet data",
-     [](const Case& now) {
-         return isPacketDataElsewhere(now) || now.facts.mobileData != now.facts.packetData;
-     }},
+     [](auto& now) { return isPacketDataElsewhere(now) || now.mobileData != now.packetData; }},
     {"data roaming", "NetworkManager has it in a connection of a modem",
-     [](const Case& now) {
-         return hasModem(now) ? !now.facts.dataRoaming : now.facts.dataRoaming.has_value();
-     }},
+     [](auto& now) { return now.hasModem() != now.dataRoaming.has_value(); }},
     {"", "a slot that is private to the platform is a modem of which nothing is known", isPrivate},
-    {"card", "ModemManager has fewer states of a card",
-     [](const Case& now) {
-         const auto card = now.slot().card;
-         return !card || card == CardStatus::Removed || card == CardStatus::Crashed ||
-                (card >= CardStatus::SubsetLocked && card <= CardStatus::DeviceLocked);
-     }},
+    {"card", "ModemManager has fewer states of a card", hasCardThatIsLess},
     {"imsi", "a card of which nothing is said cannot be read", hasNoCard},
     {"number", "a card of which nothing is said cannot be read", hasNoCard},
     {"number", "\"null\" is the platform's own success without a number",
-     [](const Case& now) {
-         return now.section().find("number") != nullptr && now.slot().number.empty();
-     }},
+     [](auto& now) { return now.slotSays("number") && now.slot().number.empty(); }},
     {"service", "a modem that is not in use is out of service",
-     [](const Case& now) { return !now.slot().service; }},
+     [](auto& now) { return !now.slot().service; }},
     {"roaming", "a modem is abroad only where it has service",
-     [](const Case& now) {
-         return !now.slot().service || now.section().find("roaming") == nullptr ||
+     [](auto& now) {
+         return !now.slot().service || !now.slotSays("roaming") ||
                 (now.slot().isRoaming && now.slot().service != ServiceState::InService);
      }},
     {"iccid", "a card of which nothing is said cannot be read", hasNoCard},
     {"ssid", "a network whose name the file does not say has one all the same",
-     [](const Case& now) { return now.facts.ssid.empty(); }},
+     [](auto& now) { return now.ssid.empty(); }},
     {"ssid", "NetworkManager has no flight mode in which a radio is on",
-     [](const Case& now) { return now.facts.isFlying(); }},
+     [](auto& now) { return now.isFlying(); }},
     {"used slot", "the file says of the network what its slots do not", differsInUse},
     {"network", "a modem without a usable card, or that carries data, is as that says",
-     [](const Case& now) {
-         return isRegistered(now.facts, now.index) !=
-                (now.slot().service == ServiceState::InService);
+     [](auto& now) {
+         return now.isRegistered(now.index) != (now.slot().service == ServiceState::InService);
      }},
     {"network", "a modem at home is in its card's network, and MCC and MNC are one code",
-     [](const Case& now) {
-         return now.slot().operatorMcc.empty() || now.slot().operatorMnc.empty();
-     }},
+     [](auto& now) { return now.slot().operatorMcc.empty() || now.slot().operatorMnc.empty(); }},
     {"power", "a modem is on, and low without its radio, where the file does not say it",
-     [](const Case& now) { return now.section().find("power") == nullptr; }},
+     [](auto& now) { return !now.slotSays("power"); }},
     {"", "a modem that is switched off has no card that can be used",
-     [](const Case& now) {
+     [](auto& now) {
          return now.slot().power == port::PowerState::Off &&
                 now.slot().card != CardStatus::PoweredOff;
      }},
     {"power", "a card that is powered off is a modem that is",
-     [](const Case& now) { return now.slot().card == CardStatus::PoweredOff; }},
+     [](auto& now) { return now.slot().card == CardStatus::PoweredOff; }},
     {"PIN tries", "a card of which nothing is said cannot be asked", hasNoCard},
     {"messages", "are ready only on a modem that is registered",
-     [](const Case& now) {
-         return now.section().find("sms") == nullptr ||
-                (now.slot().hasMessages && !isRegistered(now.facts, now.index));
+     [](auto& now) {
+         return !now.slotSays("sms") || (now.slot().hasMessages && !now.isRegistered(now.index));
      }},
 };
 
@@ -452,7 +416,7 @@ protected:
         for (const Question& question : QUESTIONS) {
             const std::size_t count = question.isOfSlot ? facts.slots.size() : 1;
             for (std::size_t i = 0; i < count; ++i)
-                problems += compare(question, {device.value(), facts, i});
+                problems += compare(question, {facts, device.value(), i});
         }
         return problems;
     }

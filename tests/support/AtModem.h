@@ -65,7 +65,9 @@ private:
     std::mutex mutex_;
     State state_;
     std::map<std::string, std::string> reports_ = { // how much each reports
-        {"+CREG", "0"}, {"+CGREG", "0"}, {"+CEREG", "0"}};
+        {"+CREG", "0"},
+        {"+CGREG", "0"},
+        {"+CEREG", "0"}};
     std::vector<Caller> callers_;
     std::thread thread_;
 };
