@@ -235,10 +235,14 @@ public:
     // The file is changed and changed back: the events that come of it.
     std::string eventsOf(const std::string& faults) const
     {
+        return eventsOf(faults, faults);
+    }
+    std::string eventsOf(const std::string& faults, const std::string& later) const
+    {
         Listener listener;
         library().SetConnectionEventListener(&listener, nullptr);
         change(faults, CHANGED);
-        change(faults, HEALTHY);
+        change(later, HEALTHY);
         library().SetConnectionEventListener(nullptr, nullptr);
         return listener.events;
     }
@@ -605,29 +609,23 @@ std::string flightModeThrice()
 
 TEST_F(FaultsTest, OneCallFailsAndTheOthersDoNot)
 {
-    const std::string error = "{ error = \"RUNTIME_INFO_ERROR_IO_ERROR\", call = ";
-    EXPECT_EQ("yes no yes ",
-              observe("runtime_info_get_value_bool = " + error + "2 }\n", flightModeThrice));
-    EXPECT_EQ("yes yes yes ",
-              observe("runtime_info_get_value_bool = " + error + "4 }\n", flightModeThrice));
-}
-
-TEST_F(FaultsTest, CallsAreCountedAnewWhenTheFaultIsAnother)
-{
-    const std::string once = "runtime_info_get_value_bool = { error = "
-                             "\"RUNTIME_INFO_ERROR_IO_ERROR\", call = 1 }\n";
-    const std::string other = "runtime_info_get_value_bool = { error = "
-                              "\"RUNTIME_INFO_ERROR_REMOTE_IO\", call = 1 }\n";
+    const auto failing = [](const char* error, int call) {
+        return std::string("runtime_info_get_value_bool = { error = \"RUNTIME_INFO_ERROR_") +
+               error + "\", call = " + std::to_string(call) + " }\n";
+    };
+    EXPECT_EQ("yes no yes ", observe(failing("IO_ERROR", 2), flightModeThrice));
+    EXPECT_EQ("yes yes yes ", observe(failing("IO_ERROR", 4), flightModeThrice));
+    // Calls are counted anew when the fault is another.
+    const std::string once = failing("IO_ERROR", 1);
+    const std::string other = failing("REMOTE_IO", 1);
     EXPECT_EQ("no yes yes yes yes yes no yes yes yes yes yes no yes yes ", observe(once, [&] {
                   std::string seen = flightModeThrice();
-                  describe("tel_init = \"null\"\n" + once); // this one is the same
-                  seen += flightModeThrice();
-                  describe(other);
-                  seen += flightModeThrice();
-                  describe("");
-                  seen += flightModeThrice();
-                  describe(other);
-                  return seen + flightModeThrice();
+                  for (const std::string& next :
+                       {"tel_init = \"null\"\n" + once, other, std::string(), other}) {
+                      describe(next);
+                      seen += flightModeThrice();
+                  }
+                  return seen;
               }));
 }
 
@@ -646,25 +644,18 @@ TEST_F(FaultsTest, SeveralFaultsHoldAtOnce)
 
 using Clock = std::chrono::steady_clock;
 
-TEST_F(FaultsTest, DelayedCallAnswersLate)
+TEST_F(FaultsTest, DelayedCallAnswersLateAndThreadsWaitBesideOneAnother)
 {
-    EXPECT_EQ("yes late", observe("runtime_info_get_value_bool = { delay_ms = 300 }\n", [] {
-                  const auto start = Clock::now();
-                  const std::string answer = yesOrNo(library().IsFlightMode());
-                  const bool isLate = Clock::now() - start >= std::chrono::milliseconds(300);
-                  return answer + (isLate ? " late" : " at once");
-              }));
-}
-
-TEST_F(FaultsTest, ThreadsWaitBesideOneAnother)
-{
-    EXPECT_EQ("together", observe("system_settings_get_value_bool = { delay_ms = 1000 }\n", [] {
-                  const auto start = Clock::now();
-                  together(20, [](int) { library().IsMobileData(); });
-                  const auto seconds =
-                      std::chrono::duration_cast<std::chrono::seconds>(Clock::now() - start);
-                  return std::string(seconds.count() < 15 ? "together" : "one by one");
-              }));
+    EXPECT_EQ(
+        "yes, late, together", observe("runtime_info_get_value_bool = { delay_ms = 1000 }\n", [] {
+            const auto start = Clock::now();
+            const std::string answer = yesOrNo(library().IsFlightMode());
+            const auto first = Clock::now();
+            together(20, [](int) { library().IsFlightMode(); });
+            return answer + (first - start >= std::chrono::seconds(1) ? ", late" : ", at once") +
+                   (Clock::now() - first < std::chrono::seconds(15) ? ", together"
+                                                                    : ", one by one");
+        }));
 }
 
 TEST_F(FaultsTest, FaultComesAndGoesWhileAListenerRuns)
@@ -672,14 +663,7 @@ TEST_F(FaultsTest, FaultComesAndGoesWhileAListenerRuns)
     const std::string fault = "runtime_info_get_value_bool = \"RUNTIME_INFO_ERROR_IO_ERROR\"\n";
     EXPECT_EQ("radio 0. connection 0. status no. "
               "radio 1. connection 3. status yes. packet data yes. flight mode yes. ",
-              observe("", [&] {
-                  Listener listener;
-                  library().SetConnectionEventListener(&listener, nullptr);
-                  change(fault, CHANGED);
-                  change("", HEALTHY);
-                  library().SetConnectionEventListener(nullptr, nullptr);
-                  return listener.events;
-              }));
+              observe("", [&] { return eventsOf(fault, ""); }));
 }
 
 // The serial number as the library reads it over a bus with the service that answers from the file.
