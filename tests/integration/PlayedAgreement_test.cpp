@@ -468,23 +468,23 @@ public:
     std::string text()
     {
         lines_ = "schema = 1\n[device]\n";
-        texts("model_name");
-        maybe("telephony", {"true", "true", "true", "false"});
+        texts("model_name", NAMES);
+        values("telephony", "true true true false");
         lines_ += "[settings]\n";
-        texts("device_name");
-        words("language", "de_DE.UTF-8 ko_KR.UTF-8");
+        texts("device_name", NAMES);
+        texts("language", "de_DE.UTF-8 ko_KR.UTF-8");
         for (const char* const key : {"flight_mode", "data_roaming", "mobile_data", "packet_data"})
-            maybe(key, {"true", "false"});
+            values(key, "true false");
         lines_ += "[network]\n";
-        words("cellular", "out_of_service flight_mode roaming_off call_only_available available "
+        texts("cellular", "out_of_service flight_mode roaming_off call_only_available available "
                           "connected not_supported");
-        words("wifi", "deactivated disconnected connected not_supported");
-        words("wifi_connection",
+        texts("wifi", "deactivated disconnected connected not_supported");
+        texts("wifi_connection",
               "failure disconnected association configuration connected not_supported");
-        words("bluetooth", "deactivated disconnected connected not_supported");
-        words("ssid", "Home Caf\\u00e9 abcdefghijklmnopqrstuvwxyz012345");
+        texts("bluetooth", "deactivated disconnected connected not_supported");
+        texts("ssid", "Home Caf\\u00e9 abcdefghijklmnopqrstuvwxyz012345");
         lines_ += "[subscriptions]\n";
-        maybe("data", {"0", "1", "\"unknown\""});
+        values("data", "0 1 \"unknown\"");
         for (unsigned slots = below(3); slots > 0; --slots)
             slot();
         return lines_;
@@ -495,55 +495,50 @@ private:
     {
         return static_cast<unsigned>(random_() % limit); // the same everywhere, for a seed
     }
-    void maybe(const char* key, const std::vector<std::string>& values)
+    // One of some words, or nothing.
+    void values(const char* key, const std::string& words, const char* quote = "")
     {
+        std::istringstream each(words);
+        const std::vector<std::string> all{std::istream_iterator<std::string>(each), {}};
         if (below(6) != 0)
-            lines_ += std::string(key) + " = " +
-                      values[below(static_cast<unsigned>(values.size()))] + "\n";
+            lines_ += std::string(key) + " = " + quote +
+                      all[below(static_cast<unsigned>(all.size()))] + quote + "\n";
     }
-    // One of some words, as a text.
-    void words(const char* key, const std::string& all)
+    void texts(const char* key, const std::string& words)
     {
-        std::istringstream each(all);
-        std::vector<std::string> values;
-        for (std::string word; each >> word;)
-            values.push_back('"' + word + '"');
-        maybe(key, values);
-    }
-    void texts(const char* key)
-    {
-        maybe(key, {"\"Telefon\"", "\"\\u0418\\u0432\\u0430\\u043d\"", "\"a \\\"b\\\"\""});
+        values(key, words, "\"");
     }
     void slot()
     {
         lines_ += "[[slot]]\n";
-        words("sim", "available available available pin puk blocked network_locked absent removed "
+        texts("sim", "available available available pin puk blocked network_locked absent removed "
                      "error powered_off initializing unknown");
         if (below(8) == 0)
-            words("init_status", "sim_nsck_required sim_spck_required sim_init_completed "
+            texts("init_status", "sim_nsck_required sim_spck_required sim_init_completed "
                                  "card_crashed card_poweroff");
-        words("mcc", "001 310");
-        words("mnc", "01 260");
-        words("msin", "1 123456789");
-        words("number", "+12025550143 null");
-        words("imei", "001017000000011 00101700000001");
-        words("service", "in_service in_service out_of_service emergency_only");
-        maybe("roaming", {"true", "false"});
-        words("operator", "Net R\\u00e9seau");
-        words("operator_mcc", "001 208");
-        words("operator_mnc", "02 260");
-        words("access_technology", "gsm lte 5gnr lte-nb-iot");
-        maybe("signal", {"0", "57", "100"});
+        texts("mcc", "001 310");
+        texts("mnc", "01 260");
+        texts("msin", "1 123456789");
+        texts("number", "+12025550143 null");
+        texts("imei", "001017000000011 00101700000001");
+        texts("service", "in_service in_service out_of_service emergency_only");
+        values("roaming", "true false");
+        texts("operator", "Net R\\u00e9seau");
+        texts("operator_mcc", "001 208");
+        texts("operator_mnc", "02 260");
+        texts("access_technology", "gsm lte 5gnr lte-nb-iot");
+        values("signal", "0 57 100");
         if (below(4) == 0)
-            words("power", "on low off");
-        words("iccid", "8999900000000000010 899990000000000002");
-        maybe("pin_retries", {"0", "2", "10"});
-        maybe("sms", {"true", "false"});
-        maybe("enabled", {"true", "false"});
+            texts("power", "on low off");
+        texts("iccid", "8999900000000000010 899990000000000002");
+        values("pin_retries", "0 2 10");
+        values("sms", "true false");
+        values("enabled", "true false");
         if (below(10) == 0)
             lines_ += "denied = true\n";
     }
 
+    static constexpr char NAMES[] = "Telefon \\u0418\\u0432\\u0430\\u043d a\\u0020\\\"b\\\"";
     std::mt19937 random_;
     std::string lines_;
 };

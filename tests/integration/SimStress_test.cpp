@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Many threads ask about SIM cards while the modems come and go: the library, from the facade over the
-// port to the real ModemManager, and the port's telephony by itself.
+// Many threads ask about SIM cards while the modems come and go: from the facade over the port to the
+// real ModemManager.
 #include <CoreSystem.h>
 
 #include <atomic>
@@ -15,7 +15,7 @@
 #include <coresystem_port.h>
 
 #include "support/ModemsOnBusTest.h"
-#include "support/TelephonyQuestions.h"
+#include "support/Together.h"
 
 namespace {
 
@@ -55,60 +55,6 @@ AtModem::State stateOf(int modem)
     state.imsi = mccOf(modem) + "01" + "1234567890";
     return state;
 }
-
-class StressTest : public ModemsOnBusTest {
-protected:
-    // Calls `ask(round, count)` on many threads again and again, for CORESYSTEM_STRESS_SECONDS or 3
-    // seconds, while modems are unplugged and plugged in and the daemon is killed and started.
-    template <typename Ask>
-    void askWhileTheyComeAndGo(Ask ask)
-    {
-        for (int modem = 0; modem < MODEMS; ++modem)
-            modems->add(idOf(modem), stateOf(modem));
-        Count count;
-        std::atomic<bool> done{false};
-        auto askers = std::async(std::launch::async, [&] {
-            together(THREADS, [&](int number) {
-                for (int round = number; !done; ++round)
-                    ask(round, count);
-            });
-        });
-        const char* const seconds = std::getenv("CORESYSTEM_STRESS_SECONDS");
-        const auto end = std::chrono::steady_clock::now() +
-                         std::chrono::seconds(seconds != nullptr ? std::atoi(seconds) : 3);
-        int steps = 0;
-        try {
-            while (std::chrono::steady_clock::now() < end)
-                disturb(steps++);
-        } catch (...) {
-            done = true;
-            throw;
-        }
-        done = true;
-        askers.get();
-        std::cout << THREADS << " threads, " << steps << " disturbances: " << count.asked
-                  << " questions, " << count.answered << " answers" << std::endl;
-        EXPECT_GT(steps, 3);
-        EXPECT_GT(count.answered, THREADS * 10);
-        EXPECT_LT(count.answered, count.asked); // modems did come and go
-    }
-
-private:
-    void disturb(int step)
-    {
-        const int modem = step / 2 % MODEMS;
-        if (step % 12 == 11) {
-            modems->kill();
-            modems->start();
-            for (int i = 0; i < MODEMS; ++i)
-                modems->plugIn(idOf(i), stateOf(i));
-        } else if (step % 2 == 0) {
-            modems->unplug(idOf(modem));
-        } else {
-            modems->add(idOf(modem), stateOf(modem));
-        }
-    }
-};
 
 CoreSystem& library()
 {
@@ -162,31 +108,58 @@ void askSlots(int round, Count& count)
     EXPECT_TRUE(library().DeinitHandleList(&list));
 }
 
-TEST_F(StressTest, ThreadsMayAskTheLibrary)
+// One of them is unplugged or plugged in, or the daemon is killed and started.
+void disturb(ModemsOnBus& modems, int step)
 {
-    coresystem_port::setLogSink(coresystem_port::LogSink::None); // an error line for each failure
-    askWhileTheyComeAndGo([](int round, Count& count) {
-        askFirstCard(count);
-        askSlots(round, count);
-    });
+    const int modem = step / 2 % MODEMS;
+    if (step % 12 == 11) {
+        modems.kill();
+        modems.start();
+        for (int i = 0; i < MODEMS; ++i)
+            modems.plugIn(idOf(i), stateOf(i));
+    } else if (step % 2 == 0) {
+        modems.unplug(idOf(modem));
+    } else {
+        modems.add(idOf(modem), stateOf(modem));
+    }
 }
 
-TEST_F(StressTest, ThreadsMayAskThePortsTelephony)
+using StressTest = ModemsOnBusTest;
+
+// For CORESYSTEM_STRESS_SECONDS or 3 seconds.
+TEST_F(StressTest, ThreadsMayAskTheLibraryWhileModemsComeAndGo)
 {
-    std::atomic<int> imsis{0};
-    askWhileTheyComeAndGo([&](int round, Count& count) {
-        const int modem = round % MODEMS;
-        for (const auto& question : telephonyQuestions()) {
-            const auto error = question.ask(telephony, slotOf(modem));
-            EXPECT_TRUE(!error || !error->reason.empty()) << question.name;
-            count.add(!error);
-        }
-        if (const auto imsi = telephony.imsi(slotOf(modem))) {
-            EXPECT_EQ(mccOf(modem), imsi.value().value.mcc); // never another card's
-            ++imsis;
-        }
+    coresystem_port::setLogSink(coresystem_port::LogSink::None); // an error line for each failure
+    for (int modem = 0; modem < MODEMS; ++modem)
+        modems->add(idOf(modem), stateOf(modem));
+    Count count;
+    std::atomic<bool> done{false};
+    auto askers = std::async(std::launch::async, [&] {
+        together(THREADS, [&](int number) {
+            for (int round = number; !done; ++round) {
+                askFirstCard(count);
+                askSlots(round, count);
+            }
+        });
     });
-    EXPECT_GT(imsis, 0);
+    const char* const seconds = std::getenv("CORESYSTEM_STRESS_SECONDS");
+    const auto end = std::chrono::steady_clock::now() +
+                     std::chrono::seconds(seconds != nullptr ? std::atoi(seconds) : 3);
+    int steps = 0;
+    try {
+        while (std::chrono::steady_clock::now() < end)
+            disturb(*modems, steps++);
+    } catch (...) {
+        done = true;
+        throw;
+    }
+    done = true;
+    askers.get();
+    std::cout << THREADS << " threads, " << steps << " disturbances: " << count.asked
+              << " questions, " << count.answered << " answers" << std::endl;
+    EXPECT_GT(steps, 3);
+    EXPECT_GT(count.answered, THREADS * 10);
+    EXPECT_LT(count.answered, count.asked); // modems did come and go
 }
 
 } // namespace

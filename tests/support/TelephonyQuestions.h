@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // Every question about telephony, as one list.
-#ifndef TESTS_SUPPORT_TELEPHONY_QUESTIONS_H
-#define TESTS_SUPPORT_TELEPHONY_QUESTIONS_H
+#ifndef TESTS_SUPPORT_telephonyQuestions() _H
+#define TESTS_SUPPORT_telephonyQuestions() _H
 
-#include <functional>
 #include <optional>
-#include <vector>
 
 #include <gmock/gmock.h>
 
@@ -19,7 +17,7 @@ struct TelephonyQuestion {
     const char* name;
     bool aboutASlot;
     /// Why there was no answer; nothing when there was one.
-    std::function<std::optional<port::Error>(port::Telephony&, const port::SlotName&)> ask;
+    std::optional<port::Error> (*ask)(port::Telephony&, const port::SlotName&);
 };
 
 template <typename T>
@@ -28,36 +26,32 @@ std::optional<port::Error> errorOf(const port::Result<T>& answer)
     return answer ? std::nullopt : std::optional<port::Error>(answer.error());
 }
 
-template <typename Answer>
-TelephonyQuestion aboutSlot(const char* name, Answer (port::Telephony::*ask)(const port::SlotName&))
+template <auto ASK>
+std::optional<port::Error> ofSlot(port::Telephony& telephony, const port::SlotName& slot)
 {
-    return {name, true, [ask](port::Telephony& telephony, const port::SlotName& slot) {
-                return errorOf((telephony.*ask)(slot));
-            }};
+    return errorOf((telephony.*ASK)(slot));
 }
 
-template <typename Answer>
-TelephonyQuestion aboutDevice(const char* name, Answer (port::Telephony::*ask)())
+template <auto ASK>
+std::optional<port::Error> ofDevice(port::Telephony& telephony, const port::SlotName&)
 {
-    return {name, false, [ask](port::Telephony& telephony, const port::SlotName&) {
-                return errorOf((telephony.*ask)());
-            }};
+    return errorOf((telephony.*ASK)());
 }
 
-inline const std::vector<TelephonyQuestion>& telephonyQuestions()
+inline const auto& telephonyQuestions()
 {
     using port::Telephony;
-    static const std::vector<TelephonyQuestion> all = {
-        aboutDevice("slots", &Telephony::slots),
-        aboutDevice("subscriptions", &Telephony::subscriptions),
-        aboutDevice("reports", &Telephony::reports),
-        aboutSlot("card", &Telephony::card),
-        aboutSlot("imsi", &Telephony::imsi),
-        aboutSlot("number", &Telephony::number),
-        aboutSlot("imei", &Telephony::imei),
-        aboutSlot("service", &Telephony::service),
-        aboutSlot("roaming", &Telephony::roaming),
-        aboutSlot("smsReady", &Telephony::smsReady),
+    static const TelephonyQuestion all[] = {
+        {"slots", false, ofDevice<&Telephony::slots>},
+        {"subscriptions", false, ofDevice<&Telephony::subscriptions>},
+        {"reports", false, ofDevice<&Telephony::reports>},
+        {"card", true, ofSlot<&Telephony::card>},
+        {"imsi", true, ofSlot<&Telephony::imsi>},
+        {"number", true, ofSlot<&Telephony::number>},
+        {"imei", true, ofSlot<&Telephony::imei>},
+        {"service", true, ofSlot<&Telephony::service>},
+        {"roaming", true, ofSlot<&Telephony::roaming>},
+        {"smsReady", true, ofSlot<&Telephony::smsReady>},
     };
     return all;
 }
@@ -79,9 +73,8 @@ void expectErrors(port::Telephony& telephony, port::Error::Kind kind, const Reas
 inline int expectSilence(port::Telephony& telephony)
 {
     return millisecondsOf([&] {
-        together(static_cast<int>(telephonyQuestions().size()), [&](int i) {
-            const auto error =
-                telephonyQuestions()[static_cast<std::size_t>(i)].ask(telephony, HOME);
+        together(std::size(telephonyQuestions()), [&](int i) {
+            const auto error = telephonyQuestions()[i].ask(telephony, HOME);
             ASSERT_TRUE(error);
             EXPECT_EQ(port::Error::Kind::NotAvailable, error->kind);
             EXPECT_EQ("org.freedesktop.ModemManager1 did not answer in time", error->reason);
