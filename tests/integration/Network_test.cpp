@@ -159,6 +159,12 @@ protected:
         networks.devices = devices;
         serve();
     }
+    void serveConnections(const std::vector<std::string>& connections, int active = -1)
+    {
+        networks.connections = connections;
+        networks.active = active;
+        serve();
+    }
     // One modem for each text of properties; "|" begins those of Modem3gpp.
     void serveModems(const std::vector<std::string>& modems)
     {
@@ -293,6 +299,13 @@ TEST_F(NetworkTest, KernelAnswersWithoutNetworkManager)
 
 TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
 {
+    EXPECT_EQ("not supported: org.bluez is not on the system bus; "
+              "no Bluetooth adapter in /sys/class",
+              show(network.bluetooth()));
+    root.write("/sys/class/bluetooth/hci0/type", "");
+    EXPECT_EQ("error: org.bluez is not on the system bus", show(network.bluetooth()));
+    serveAdapters({});
+    EXPECT_EQ("not supported: BlueZ knows no Bluetooth adapter", show(network.bluetooth()));
     serve();
     serveAdapters({"'Powered': <false>"});
     EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
@@ -304,17 +317,6 @@ TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
     EXPECT_EQ(shown(LinkState::Connected, HCI_1), show(network.bluetooth()));
     serveAdapters({"'Powered': <false>"});
     EXPECT_EQ(shown(LinkState::Deactivated, HCI_0), show(network.bluetooth()));
-}
-
-TEST_F(NetworkTest, MachineWithoutBluetoothHasNone)
-{
-    EXPECT_EQ("not supported: org.bluez is not on the system bus; "
-              "no Bluetooth adapter in /sys/class",
-              show(network.bluetooth()));
-    root.write("/sys/class/bluetooth/hci0/type", "");
-    EXPECT_EQ("error: org.bluez is not on the system bus", show(network.bluetooth()));
-    serveAdapters({});
-    EXPECT_EQ("not supported: BlueZ knows no Bluetooth adapter", show(network.bluetooth()));
 }
 
 TEST_F(NetworkTest, KernelTellsOfABluetoothConnectionWithoutNetworkManager)
@@ -379,18 +381,14 @@ TEST_F(NetworkTest, DataIsOnWhenAConnectionWouldComeUp)
 {
     serveDevices({{MODEM, 30}});
     EXPECT_EQ(OFF, show(network.packetData()));
-    networks.connections = {"'connection': {'type': <'802-11-wireless'>}",
-                            "'connection': {'type': <'gsm'>, 'autoconnect': <false>}"};
-    serve();
-    EXPECT_EQ(OFF, show(network.packetData()));
-    EXPECT_EQ(OFF, show(network.mobileData()));
-    networks.active = 1;
-    serve();
-    EXPECT_EQ(ON, show(network.packetData()));
-    EXPECT_EQ(ON, show(network.mobileData()));
-    networks.active = -1;
-    networks.connections[1] = "'connection': {'type': <'cdma'>}";
-    serve();
+    const std::string wireless = "'connection': {'type': <'802-11-wireless'>}";
+    const std::string manual = "'connection': {'type': <'gsm'>, 'autoconnect': <false>}";
+    for (const int active : {-1, 1}) {
+        serveConnections({wireless, manual}, active);
+        EXPECT_EQ(active == 1 ? ON : OFF, show(network.packetData()));
+        EXPECT_EQ(active == 1 ? ON : OFF, show(network.mobileData()));
+    }
+    serveConnections({wireless, "'connection': {'type': <'cdma'>}"});
     EXPECT_EQ(ON, show(network.packetData()));
     networks.cellularOn = false;
     serve();
@@ -498,17 +496,15 @@ TEST_F(NetworkTest, ConnectionThatIsUsedTellsWhetherDataMayRoam)
 {
     serveDevices({{MODEM, 30}});
     EXPECT_EQ("error: NetworkManager has no cellular connection", show(network.dataRoaming()));
-    networks.connections = {
+    std::vector<std::string> connections = {
         "'connection': {'type': <'gsm'>, 'autoconnect': <false>}, 'gsm': {'apn': <'a'>}",
         "'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
-    serve();
+    serveConnections(connections);
     EXPECT_EQ(OFF, show(network.dataRoaming())); // the one that connects itself
-    networks.active = 0;
-    serve();
+    serveConnections(connections, 0);
     EXPECT_EQ(ON, show(network.dataRoaming())); // the one that is up
-    networks.active = -1;
-    networks.connections.push_back("'connection': {'type': <'gsm'>, 'autoconnect-priority': <5>}");
-    serve();
+    connections.push_back("'connection': {'type': <'gsm'>, 'autoconnect-priority': <5>}");
+    serveConnections(connections);
     EXPECT_EQ(ON, show(network.dataRoaming())); // the one that connects itself first
 }
 
@@ -540,8 +536,7 @@ TEST_F(NetworkTest, CellularFollowsTheModem)
     serveModems({"'State': <'broken'>", "'State': <3>",
                  "'State': <8>|'RegistrationState': <uint32 5>", "'State': <7>"});
     EXPECT_EQ(shown(State::Available, MODEM_2), show(network.cellular())); // is furthest
-    networks.connections = {"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"};
-    serve();
+    serveConnections({"'connection': {'type': <'gsm'>}, 'gsm': {'home-only': <true>}"});
     const char* const cdma = "'State': <8>}, 'org.freedesktop.ModemManager1.Modem.ModemCdma': {"
                              "'Cdma1xRegistrationState': <uint32 ";
     for (const auto& [registrations, state] : // of the two networks, either of which may be abroad
@@ -595,8 +590,7 @@ TEST_F(NetworkTest, MalformedPropertiesAreTold)
                                                     "'DeviceType': <uint32 2>, 'State': <'up'>")}));
     EXPECT_THAT(show(network.wifi()), HasSubstr("NetworkManager: State is no number"));
 
-    networks.connections = {"'connection': {'type': <'gsm'>, 'autoconnect': <'no'>}"};
-    serve();
+    serveConnections({"'connection': {'type': <'gsm'>, 'autoconnect': <'no'>}"});
     EXPECT_EQ("error: NetworkManager: a cellular connection has malformed settings",
               show(network.dataRoaming()));
     serveAdapters({"'Powered': <'on'>"});
@@ -708,9 +702,7 @@ protected:
 TEST_F(WatchTest, EveryKindOfChangeIsTold)
 {
     networks.devices = {{WIFI, 30}};
-    networks.connections = {"'connection': {'type': <'vpn'>}", "'connection': {'type': <'gsm'>}"};
-    networks.active = 1;
-    serve();
+    serveConnections({"'connection': {'type': <'vpn'>}", "'connection': {'type': <'gsm'>}"}, 1);
     serveModems({"'State': <8>|'RegistrationState': <uint32 1>"});
     serveAdapters({"'Powered': <true>"});
     begin();

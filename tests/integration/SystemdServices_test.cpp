@@ -6,7 +6,6 @@
 #include <gmock/gmock.h>
 #include <unistd.h>
 
-#include "backend/Backend.h"
 #include "linux/Bus.h"
 #include "linux/Hostname1.h"
 #include "linux/Locale1.h"
@@ -95,18 +94,6 @@ TEST_F(SystemdServicesTest, LanguageOfTheMachineIsSeen)
     unsetenv("LANG");
     setLocale("LANG=ko_KR.UTF-8\nLC_MESSAGES=de_DE.UTF-8\n");
     EXPECT_EQ("de_DE.UTF-8 <locale1 LC_MESSAGES>", language());
-}
-
-TEST_F(SystemdServicesTest, BackendFindsBothServices)
-{
-    const auto backend = port::makeLinuxBackend();
-    for (const auto& service : backend->findServices())
-        if (service.name == HOSTNAME1.name || service.name == LOCALE1.name) {
-            EXPECT_EQ("starts on demand", service.state);
-        }
-    deviceName();
-    EXPECT_EQ("running", backend->findServices().at(0).state);
-    EXPECT_EQ("static-name", backend->get<port::Question::DeviceName>().value().value);
 }
 
 TEST_F(SystemdServicesTest, ThreadsMayAskTheServiceThatStartsMeanwhile)

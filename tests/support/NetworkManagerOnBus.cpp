@@ -54,15 +54,18 @@ std::string NetworkManagerOnBus::obstacle()
 
 NetworkManagerOnBus::NetworkManagerOnBus(const std::string& address) : client_(address)
 {
-    writeConfiguration();
-    const auto option = [this](const char* name, const char* file) {
-        return std::string("--") + name + "=" + tree_.path(file);
-    };
+    std::string text = CONFIGURATION;
+    text.replace(text.find("@ROOT@"), 6, tree_.root());
+    tree_.write("/NetworkManager.conf", text);
+    tree_.write("/connections/none", "");
+    tree_.write("/empty/none", "");
     const std::string log = tree_.path("/log");
-    const std::string options[] = {
-        option("config", "/NetworkManager.conf"), option("config-dir", "/empty"),
-        option("system-config-dir", "/empty"),    option("intern-config", "/intern.conf"),
-        option("state-file", "/state"),           option("pid-file", "/pid")};
+    const std::string options[] = {"--config=" + tree_.path("/NetworkManager.conf"),
+                                   "--config-dir=" + tree_.path("/empty"),
+                                   "--system-config-dir=" + tree_.path("/empty"),
+                                   "--intern-config=" + tree_.path("/intern.conf"),
+                                   "--state-file=" + tree_.path("/state"),
+                                   "--pid-file=" + tree_.path("/pid")};
     process_.start([&] {
         // Without a network of its own it must not start.
         if (writeInto(log.c_str()) && enterEmptyNetwork())
@@ -76,15 +79,6 @@ NetworkManagerOnBus::NetworkManagerOnBus(const std::string& address) : client_(a
     };
     if (!client_.waitUntil(isReady))
         throw std::runtime_error("NetworkManager does not start");
-}
-
-void NetworkManagerOnBus::writeConfiguration() const
-{
-    std::string text = CONFIGURATION;
-    text.replace(text.find("@ROOT@"), 6, tree_.root());
-    tree_.write("/NetworkManager.conf", text);
-    tree_.write("/connections/none", "");
-    tree_.write("/empty/none", "");
 }
 
 void NetworkManagerOnBus::setSwitch(const char* name, bool on) const

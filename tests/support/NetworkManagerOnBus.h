@@ -23,8 +23,6 @@ public:
     void addCellularConnection(bool homeOnly) const;
 
 private:
-    void writeConfiguration() const;
-
     const TemporaryTree tree_;
     const BusClient client_;
     Process process_;
