@@ -76,6 +76,12 @@ protected:
     {
         tellAll({FakeModem::with(properties)});
     }
+    void tellRegistration(const std::string& registration, const char* state = "<8>") const
+    {
+        FakeModem modem = FakeModem::with({{"State", state}});
+        modem.network["RegistrationState"] = registration;
+        tell(modem);
+    }
     void tellSlots(const std::string& paths, const std::string& primary) const
     {
         tellChanged({{"SimSlots", paths}, {"PrimarySimSlot", primary}});
@@ -243,9 +249,7 @@ TEST_F(ScriptedModemsTest, ServiceAndRoamingFollowTheRegistration)
         {11, State::EmergencyOnly, false},
     };
     for (const auto& row : rows) {
-        FakeModem modem;
-        modem.network["RegistrationState"] = "<uint32 " + std::to_string(row.registration) + ">";
-        tell(modem);
+        tellRegistration("<uint32 " + std::to_string(row.registration) + ">");
         EXPECT_EQ(row.service, valueOf(telephony.service(HOME))) << row.registration;
         EXPECT_EQ(row.roaming, valueOf(telephony.roaming(HOME))) << row.registration;
     }
@@ -254,14 +258,11 @@ TEST_F(ScriptedModemsTest, ServiceAndRoamingFollowTheRegistration)
 TEST_F(ScriptedModemsTest, UnknownRegistrationIsNotInvented)
 {
     for (const char* const registration : {"<uint32 4>", "<uint32 12>", "<uint32 4294967295>"}) {
-        FakeModem modem;
-        modem.network["RegistrationState"] = registration;
-        tell(modem);
+        tellRegistration(registration);
         EXPECT_EQ("the modem's registration is not known", wordOf(telephony.service(HOME)));
         EXPECT_EQ(Error::Kind::NotAvailable, telephony.roaming(HOME).error().kind);
         for (const char* const state : {"<-1>", "<2>", "<3>"}) { // failed, locked, disabled
-            modem.modem["State"] = state;
-            tell(modem);
+            tellRegistration(registration, state);
             EXPECT_EQ(ServiceState::OutOfService, valueOf(telephony.service(HOME))) << state;
             EXPECT_FALSE(valueOf(telephony.roaming(HOME))) << state;
         }

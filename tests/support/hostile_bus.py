@@ -24,23 +24,16 @@ WELCOME = b"OK 0123456789abcdef0123456789abcdef\r\n"
 
 def authenticate(client):
     """As far as a client needs it that asks for EXTERNAL, with its identity or without; False when it left."""
-    line = b""
-    while True:
-        byte = client.recv(1)
-        if not byte:
-            return False
-        line += byte
-        if not line.endswith(b"\r\n"):
-            continue
+    for line in client.makefile("rb", buffering=0):
         words = line.lstrip(b"\0").split()
-        line = b""
         if words[0] == b"BEGIN":
             return True
         if words == [b"AUTH", b"EXTERNAL"]:
             client.sendall(b"DATA\r\n")
-            continue
-        client.sendall({b"AUTH": WELCOME, b"DATA": WELCOME,
-                        b"NEGOTIATE_UNIX_FD": b"AGREE_UNIX_FD\r\n"}.get(words[0], b"ERROR\r\n"))
+        else:
+            client.sendall({b"AUTH": WELCOME, b"DATA": WELCOME,
+                            b"NEGOTIATE_UNIX_FD": b"AGREE_UNIX_FD\r\n"}.get(words[0], b"ERROR\r\n"))
+    return False
 
 
 def hold(client):
