@@ -343,6 +343,9 @@ TEST_F(BusTest, StateOfAServiceIsTold)
     EXPECT_EQ("starts on demand", states[1].value());
     EXPECT_EQ("installed, but not running", states[2].error().reason);
     EXPECT_EQ("not on the system bus", states[3].error().reason);
+    const auto told = port::makeLinuxBackend()->findServices().at(0);
+    EXPECT_TRUE(told.found);
+    EXPECT_EQ("running", told.state);
     service->keepSilent("Ping");
     EXPECT_EQ("does not answer", bus.statesOf({HOSTNAME1})[0].error().reason);
 }
