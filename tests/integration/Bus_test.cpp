@@ -2,7 +2,6 @@
 // The port's bus connection when services, or the bus itself, misbehave.
 #include <algorithm>
 #include <atomic>
-#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <thread>

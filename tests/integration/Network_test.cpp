@@ -8,7 +8,6 @@
 #include <filesystem>
 #include <mutex>
 #include <numeric>
-#include <optional>
 #include <thread>
 
 #include <gmock/gmock.h>
@@ -269,6 +268,7 @@ TEST_F(NetworkTest, MachineWithoutWifiHasNone)
     const char* const none = "not supported: NetworkManager knows no Wi-Fi device";
     EXPECT_EQ(none, show(network.wifi()));
     EXPECT_EQ(none, show(network.wifiConnection()));
+    EXPECT_EQ(none, show(network.ssid()));
     networks.radioFlags = 1; // there is a radio, and its device has gone
     serve();
     EXPECT_EQ(shown(LinkState::Deactivated, NM), show(network.wifi()));
@@ -276,6 +276,9 @@ TEST_F(NetworkTest, MachineWithoutWifiHasNone)
 
 TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
 {
+    EXPECT_EQ("not supported: org.freedesktop.NetworkManager is not on the system bus; "
+              "no Wi-Fi interface in /sys/class/net",
+              show(network.wifi()));
     serveDevices({{WIFI, 10}});
     EXPECT_EQ("not supported: NetworkManager leaves the Wi-Fi device to others; "
               "no Wi-Fi interface in /sys/class/net",
@@ -283,18 +286,6 @@ TEST_F(NetworkTest, KernelTellsOfAWifiDeviceThatNobodyManages)
     const std::string wlan = writeLink("wlan0", "/phy80211/name", "up");
     EXPECT_EQ(shown(LinkState::Connected, wlan), show(network.wifi()));
     EXPECT_EQ(shown(WifiConnection::Connected, wlan), show(network.wifiConnection()));
-}
-
-TEST_F(NetworkTest, KernelAnswersWithoutNetworkManager)
-{
-    EXPECT_EQ("not supported: org.freedesktop.NetworkManager is not on the system bus; "
-              "no Wi-Fi interface in /sys/class/net",
-              show(network.wifi()));
-    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus; "
-              "no switch of a radio in /sys/class/rfkill",
-              show(network.flightMode()));
-    writeSwitch(0, "wlan", 1);
-    EXPECT_EQ("1 </sys/class/rfkill>", show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, BluetoothFollowsItsAdapters)
@@ -375,6 +366,13 @@ TEST_F(NetworkTest, BluetoothThatIsOnIsNoFlightMode)
     networkManager.reset(); // the kernel's switches count
     writeSwitch(1, "wlan", 1);
     EXPECT_EQ("0 <org.bluez hci1>", show(network.flightMode()));
+    bluez.reset();
+    root.remove("/sys/class/rfkill/rfkill0");
+    EXPECT_EQ("1 </sys/class/rfkill>", show(network.flightMode()));
+    root.remove("/sys/class/rfkill");
+    EXPECT_EQ("error: org.freedesktop.NetworkManager is not on the system bus; "
+              "no switch of a radio in /sys/class/rfkill",
+              show(network.flightMode()));
 }
 
 TEST_F(NetworkTest, DataIsOnWhenAConnectionWouldComeUp)

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The services that are played from a device file, asked by the linux backend as it is, and the
 // simulator asked about the same file: both answer the same, but where a row says why they cannot.
-#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
@@ -371,12 +370,6 @@ const Difference DIFFERENCES[] = {
      }},
 };
 
-std::string contentOf(const std::string& path)
-{
-    std::ifstream file(path);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
-
 class PlayedAgreement : public testing::Test {
 protected:
     static void SetUpTestSuite()
@@ -447,7 +440,8 @@ TEST_F(PlayedAgreement, EveryDeviceFileAndEveryStepOfItsScenario)
 {
     for (const char* const folder : {DEVICES "/samples", DEVICES "/tests/devices"})
         for (const auto& entry : std::filesystem::directory_iterator(folder)) {
-            std::string text = contentOf(entry.path());
+            std::ifstream file(entry.path());
+            std::string text{std::istreambuf_iterator<char>(file), {}};
             const auto device = port::devicefile::parseDevice(text, entry.path());
             if (!device)
                 continue; // the one that shows a mistake

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // An application's tests on many devices in one process, as an application writes them.
 #include <cstdlib>
-#include <fstream>
 #include <stdexcept>
 
 #include <CoreSystem.h>
