@@ -49,19 +49,6 @@ TEST_F(TelephonyTest, ModemAtHomeTellsEverything)
     EXPECT_EQ(port::Subscriptions::Voice::Unknown, valueOf(telephony.subscriptions()).voice);
 }
 
-TEST_F(TelephonyTest, RoamingBeginsAndEnds)
-{
-    AtModem::State abroad;
-    abroad.registration = 5;
-    AtModem& modem = modems->add("home", abroad);
-    modems->enable("home");
-    EXPECT_TRUE(comesIntoService(HOME));
-    EXPECT_TRUE(valueOf(telephony.roaming(HOME)));
-    modem.change([](AtModem::State& state) { state.registration = 1; });
-    EXPECT_TRUE(modems->waitUntil([&] { return !valueOf(telephony.roaming(HOME)); }));
-    EXPECT_EQ(ServiceState::InService, valueOf(telephony.service(HOME)));
-}
-
 TEST_F(TelephonyTest, ModemWithoutRegistrationIsOutOfService)
 {
     for (const int registration : {2, 3}) { // searching, denied
@@ -166,20 +153,6 @@ TEST_F(TelephonyTest, RestartedDaemonGivesItsOldObjectsToOtherCards)
     expectError(Error::Kind::NotAvailable, NO_MODEM, telephony.imsi(HOME));
     EXPECT_EQ("262", valueOf(telephony.imsi("/virtual/other")).mcc);
     modems->add("home");
-    EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
-}
-
-TEST_F(TelephonyTest, CardPutInLaterIsSeen)
-{
-    AtModem::State empty;
-    empty.hasSim = false;
-    modems->add("home", empty);
-    EXPECT_EQ(CardStatus::Absent, valueOf(telephony.card(HOME)).status);
-    modems->plugIn("home"); // as a modem that starts anew does
-    EXPECT_TRUE(modems->waitUntil([&] {
-        const auto card = telephony.card(HOME);
-        return card && card.value().value.status == CardStatus::Ready;
-    }));
     EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
 }
 

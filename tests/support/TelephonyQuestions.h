@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Every question about telephony, as one list.
-#ifndef TESTS_SUPPORT_telephonyQuestions() _H
-#define TESTS_SUPPORT_telephonyQuestions() _H
+#ifndef TESTS_SUPPORT_TELEPHONY_QUESTIONS_H
+#define TESTS_SUPPORT_TELEPHONY_QUESTIONS_H
 
 #include <optional>
 
@@ -73,7 +73,7 @@ void expectErrors(port::Telephony& telephony, port::Error::Kind kind, const Reas
 inline int expectSilence(port::Telephony& telephony)
 {
     return millisecondsOf([&] {
-        together(std::size(telephonyQuestions()), [&](int i) {
+        together(static_cast<int>(std::size(telephonyQuestions())), [&](int i) {
             const auto error = telephonyQuestions()[i].ask(telephony, HOME);
             ASSERT_TRUE(error);
             EXPECT_EQ(port::Error::Kind::NotAvailable, error->kind);
