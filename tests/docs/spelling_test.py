@@ -11,10 +11,10 @@ from pathlib import Path
 TREE = Path(__file__).resolve().parent.parent.parent
 FOLDERS = ["cli", "devicefile", "port"]
 # Words of the field, and those that stand for themselves: keys, commands, formats.
-KNOWN = set("""Ctrl Imsi Wi backend bluez coresystem dbus dpkg ethernet hostname iface kr mnc msin ok""".split())
+KNOWN = set("""Ctrl busconfig Imsi Wi backend bluez coresystem dbus dpkg ethernet hostname iface kr mnc msin ok""".split())
 
 TEXT = re.compile(r'"((?:[^"\\\n]|\\.)*)"')
-SEVERAL_WORDS = re.compile(r"^[^<].*[a-z] [a-z(]")
+SEVERAL_WORDS = re.compile(r"^[^<].*[a-z] [a-zA-Z(]")
 WORD = re.compile(r"(?<![\w./-])[A-Z]?[a-z']+(?![\w/])")
 
 

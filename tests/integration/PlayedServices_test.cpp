@@ -284,6 +284,21 @@ TEST_F(PlayedServices, RefuseTheRest)
               dbus + "InvalidArgs");
     EXPECT_EQ(call(LOCALE, locale, LOCALE, "SetLocale", "(['FOO=x'], false)"),
               dbus + "InvalidArgs");
+    EXPECT_EQ(call(HOSTNAME, host, HOSTNAME, "GetProductUUID", "(false,)"),
+              "org.freedesktop.hostname1.NoProductUUID");
+}
+
+TEST_F(PlayedServices, AreConnectedWhileAnotherConnectionComesUp)
+{
+    const auto state = [&](const char* cellular, const char* wifi) {
+        played_.become(with(PHONE, {{"network.cellular", cellular},
+                                    {"network.wifi", "disconnected"},
+                                    {"network.wifi_connection", wifi}}));
+        return get(NM, NM_PATH, NM, "State");
+    };
+    EXPECT_EQ(state("available", "disconnected"), "(<uint32 20>,)");
+    EXPECT_EQ(state("available", "configuration"), "(<uint32 40>,)");
+    EXPECT_EQ(state("connected", "configuration"), "(<uint32 70>,)");
 }
 
 TEST_F(PlayedServices, KeepTheLastGoodStateOfAFileThatBreaks)

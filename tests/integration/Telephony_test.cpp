@@ -172,4 +172,16 @@ TEST_F(TelephonyTest, FrozenDaemonIsBoundedAndAnswersLater)
     EXPECT_EQ("001", valueOf(telephony.imsi(HOME)).mcc);
 }
 
+TEST(TelephonyWithoutABusTest, EveryQuestionIsNotAvailableAtOnce)
+{
+    const TemporaryTree tree;
+    setenv("DBUS_SYSTEM_BUS_ADDRESS", ("unix:path=" + tree.path("/none")).c_str(), 1);
+    Bus bus;
+    port::linux_backend::LinuxTelephony telephony(bus);
+    const auto reason = testing::StartsWith("no system bus: ");
+    EXPECT_LT(millisecondsOf([&] { expectErrors(telephony, Error::Kind::NotAvailable, reason); }),
+              1000);
+    unsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+}
+
 } // namespace
