@@ -58,6 +58,22 @@ TEST(TableRows, EveryCellStandsInItsPlace)
     expectCells(LanguageCodeTable::UPPER_CASE, column(LANGUAGE_CODES, 1));
 }
 
+TEST(TableFacts, CellsHaveTheirShape)
+{
+    const std::pair<const Rows*, Row> tables[] = {
+        {&MCC_COUNTRIES, {"[0-9]{3}", "[a-z]{2}", "[ -~]+"}},
+        {&MO_SUPPORT_MCCS, {"[0-9]{3}", "[a-z]{2}", "[ -~]+"}},
+        {&SERVICE_COUNTRIES, {"[0-9]{3}", "[a-z]{2}_[A-Z]{2}"}},
+        {&CALLING_CODES, {"[0-9]{3}", "[1-9][0-9]{0,2}"}},
+        {&ALPHA3_COUNTRIES, {"[0-9]{3}", "[A-Z]{3}"}},
+        {&LANGUAGE_CODES, {"[a-z]{3}", "[A-Z]{2}"}},
+    };
+    for (const auto& [rows, shapes] : tables)
+        for (std::size_t i = 0; i < shapes.size(); ++i)
+            for (const Row& row : *rows)
+                EXPECT_THAT(row[i], testing::MatchesRegex(shapes[i]));
+}
+
 // Or the question whether an MCC supports MO would have an MCC that says no.
 TEST(TableFacts, FirstTwoMoSupportMccsDiffer)
 {
