@@ -312,8 +312,15 @@ TEST_F(BusTest, ServiceOrBusThatDiesWhenAskedIsNotThere)
     service->whenAsked([this] { daemon.kill(); });
     EXPECT_THAT(askName(bus), StartsWith("error: no system bus: "));
     EXPECT_THAT(askName(bus), StartsWith("error: no system bus: "));
-    startBox(); // is found by the next question
-    EXPECT_EQ(box, askName(bus));
+}
+
+TEST_F(BusTest, RestartedBusIsFoundByTheNextQuestion)
+{
+    for (int start = 0; start < 2; ++start) {
+        startBox();
+        EXPECT_EQ(box, askName(bus));
+        daemon.kill();
+    }
 }
 
 TEST_F(BusTest, ServiceThatMustNotBeStartedIsNot)
