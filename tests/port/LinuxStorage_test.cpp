@@ -50,7 +50,7 @@ TEST(LinuxStorageTest, FolderThatCannotBeLookedAtIsTold)
 
 TEST(LinuxStorageTest, BlocksAreCountedInFragmentsAndNeverCut)
 {
-    for (const std::uint64_t blockSize : {4096, 1048576}) { // as a network file system says
+    for (const unsigned long blockSize : {4096UL, 1048576UL}) { // as a network file system says
         struct statvfs64 volume = {};
         volume.f_bsize = blockSize;
         volume.f_frsize = 4096;
